@@ -1,0 +1,29 @@
+# How all of our own code is compiled: standard, warnings, sanitizers, cache.
+
+set(CMAKE_CXX_STANDARD 20)
+set(CMAKE_CXX_STANDARD_REQUIRED ON)
+set(CMAKE_CXX_EXTENSIONS OFF) # in GNU mode `linux` is a macro
+set(CMAKE_CXX_VISIBILITY_PRESET hidden)
+set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
+set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+set(CMAKE_EXPORT_COMPILE_COMMANDS ON)
+set(CMAKE_RUNTIME_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/bin)
+set(CMAKE_LIBRARY_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/bin)
+
+set(CLIPSA_SANITIZE "" CACHE STRING "Sanitizers to build with: empty, `address,undefined` or `thread`")
+
+find_package(Threads REQUIRED)
+find_program(CCACHE_PROGRAM ccache)
+if(CCACHE_PROGRAM)
+    set(CMAKE_CXX_COMPILER_LAUNCHER ${CCACHE_PROGRAM})
+endif()
+
+add_library(clipsa-compile INTERFACE)
+target_compile_features(clipsa-compile INTERFACE cxx_std_20)
+target_compile_options(clipsa-compile INTERFACE -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Werror)
+target_compile_definitions(clipsa-compile INTERFACE QT_NO_KEYWORDS)
+if(CLIPSA_SANITIZE)
+    target_compile_options(clipsa-compile INTERFACE -fsanitize=${CLIPSA_SANITIZE} -fno-omit-frame-pointer
+                                                    -fno-sanitize-recover=all)
+    target_link_options(clipsa-compile INTERFACE -fsanitize=${CLIPSA_SANITIZE})
+endif()

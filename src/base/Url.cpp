@@ -1,0 +1,93 @@
+#include "base/Url.h"
+
+#include <cctype>
+#include <utility>
+
+namespace base {
+
+namespace {
+
+std::string encoded(std::string_view path)
+{
+    static constexpr char kHex[] = "0123456789ABCDEF";
+    std::string text;
+    for (const char character : path) {
+        const auto byte = static_cast<unsigned char>(character);
+        if (std::isalnum(byte) || std::string_view("/-._~!$&'()*+,;=:@").find(character) != std::string_view::npos) {
+            text += character;
+        } else {
+            text += '%';
+            text += kHex[byte >> 4];
+            text += kHex[byte & 15];
+        }
+    }
+    return text;
+}
+
+int hexDigit(char character)
+{
+    if (character >= '0' && character <= '9')
+        return character - '0';
+    if (character >= 'a' && character <= 'f')
+        return character - 'a' + 10;
+    if (character >= 'A' && character <= 'F')
+        return character - 'A' + 10;
+    return -1;
+}
+
+std::string decoded(std::string_view text)
+{
+    std::string path;
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        const bool escape = text[i] == '%' && i + 2 < text.size() && hexDigit(text[i + 1]) >= 0
+            && hexDigit(text[i + 2]) >= 0;
+        path += escape ? static_cast<char>(hexDigit(text[i + 1]) * 16 + hexDigit(text[i + 2])) : text[i];
+        i += escape ? 2 : 0;
+    }
+    return path;
+}
+
+} // namespace
+
+Url Url::fromPath(std::string path)
+{
+    Url url;
+    url.m_scheme = "file";
+    url.m_path = std::move(path);
+    return url;
+}
+
+std::optional<Url> Url::fromString(std::string_view text)
+{
+    const auto colon = text.find(':');
+    if (colon == std::string_view::npos || colon == 0)
+        return std::nullopt;
+    for (const char character : text.substr(0, colon))
+        if (!std::isalnum(static_cast<unsigned char>(character)) && character != '+' && character != '-'
+            && character != '.')
+            return std::nullopt;
+    const std::string_view rest = text.substr(colon + 1);
+    if (text.substr(0, colon) == "file") {
+        if (!rest.starts_with("//"))
+            return fromPath(decoded(rest));
+        const auto slash = rest.find('/', 2);
+        return fromPath(slash == std::string_view::npos ? "/" : decoded(rest.substr(slash)));
+    }
+    Url url;
+    url.m_scheme = std::string(text.substr(0, colon));
+    url.m_rest = std::string(rest);
+    return url;
+}
+
+std::string Url::lastPathComponent() const
+{
+    const auto slash = m_path.rfind('/');
+    return slash == std::string::npos ? m_path : m_path.substr(slash + 1);
+}
+
+std::string Url::string() const
+{
+    return isFile() ? "file://" + encoded(m_path) : m_scheme + ":" + m_rest;
+}
+
+} // namespace base
