@@ -1,0 +1,80 @@
+# Shared by run, test, bench and the tools; sourced by bash, never run. Sets `top` and gives the functions below.
+# shellcheck shell=bash
+
+top=$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)
+
+# fail TEXT: ends the script with one line.
+fail() {
+    printf '%s: %s\n' "${0##*/}" "$1" >&2
+    exit 1
+}
+
+# announce TEXT COMMAND…: runs the command, and says the text if it is still running after half a second.
+announce() {
+    local text=$1 timer status=0
+    shift
+    # The sleep gets no output of its own: one that outlives us must not keep a pipe open.
+    { sleep 0.5 >/dev/null 2>&1 && printf '%s\n' "$text" >&2; } &
+    timer=$!
+    "$@" || status=$?
+    kill "$timer" 2>/dev/null || true
+    wait "$timer" 2>/dev/null || true
+    return "$status"
+}
+
+# packagesIn SECTION…: the packages of these sections of packaging/packages.txt, each once.
+packagesIn() {
+    awk -v wanted=" $* " '
+        { sub(/#.*/, "") }
+        /^\[.*\]/ { section = substr($1, 2, length($1) - 2); next }
+        NF && index(wanted, " " section " ") && !seen[$1]++ { print $1 }' "$top/packaging/packages.txt"
+}
+
+# installPackages SECTION…: installs what is missing. Ends the script with the one command to type where it may not.
+installPackages() {
+    local wanted missing install
+    if ! command -v dpkg-query >/dev/null; then
+        echo "This is not a Debian system: the packages of packaging/packages.txt are not checked." >&2
+        return
+    fi
+    mapfile -t wanted < <(packagesIn "$@")
+    mapfile -t missing < <(
+        { dpkg-query -W -f '${db:Status-Status} ${Package}\n' "${wanted[@]}" 2>/dev/null || true; } |
+            awk '$1 == "installed" { there[$2] = 1 }
+                 END { for (i = 1; i < ARGC; i++) if (!(ARGV[i] in there)) print ARGV[i] }' "${wanted[@]}")
+    [ "${#missing[@]}" -gt 0 ] || return 0
+
+    install="apt-get update -qq && DEBIAN_FRONTEND=noninteractive apt-get install -y -qq --no-install-recommends ${missing[*]}"
+    if [ "$(id -u)" = 0 ]; then
+        install=(sh -c "$install")
+    elif command -v sudo >/dev/null; then
+        install=(sudo sh -c "$install")
+    else
+        printf 'Packages are missing. Install them with this one command, then start again:\n\n  su -c "%s"\n\n' "$install" >&2
+        exit 1
+    fi
+    echo "Installing ${#missing[@]} packages: ${missing[*]}" >&2
+    # dpkg's chatter is only of interest when it fails.
+    local log
+    log=$(mktemp)
+    "${install[@]}" >"$log" 2>&1 || { cat "$log" >&2; rm -f "$log"; fail "the packages could not be installed"; }
+    rm -f "$log"
+}
+
+# buildPreset PRESET [TARGET…]: configures where that is needed, builds the targets (all of them by default).
+buildPreset() {
+    local preset=$1 build="$top/build/$1" quiet=--quiet
+    shift
+    # Ninja itself configures again when a CMake file changes; the presets are the one file that it does not know.
+    if [ ! "$build/build.ninja" -nt "$top/CMakePresets.json" ]; then
+        local log
+        log=$(mktemp)
+        (cd "$top" && announce "Configuring $preset…" cmake --preset "$preset" >"$log" 2>&1) ||
+            { cat "$log" >&2; rm -f "$log"; fail "configuring $preset failed"; }
+        rm -f "$log"
+        touch "$build/build.ninja"
+    fi
+    [ -t 1 ] && quiet=
+    announce "Building $preset (the first time takes minutes)…" ninja -C "$build" $quiet "$@" ||
+        fail "building $preset failed"
+}
