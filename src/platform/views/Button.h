@@ -1,0 +1,51 @@
+/// A control with an image, a glyph or a title, which can differ by state. Main queue only.
+#pragma once
+
+#include "platform/views/Control.h"
+#include "platform/views/Image.h"
+
+#include <string>
+
+namespace platform {
+
+class Button : public Control {
+public:
+    enum class State { Normal, Highlighted };
+
+    using Control::Control;
+
+    static const runtime::Class& classObject();
+    const runtime::Class& isa() const override;
+
+    void setImage(ImageRef image, State state);
+    ImageRef image(State state) const;
+    /// The highlighted image while pressed, where there is one; else the normal one.
+    ImageRef currentImage() const;
+
+    /// A glyph of the presenter's icon set, drawn sharp at any scale in the tint colour: "play", "pause", "share".
+    void setGlyph(std::string name);
+    const std::string& glyph() const { return m_glyph; }
+    /// Moves the glyph inside the button.
+    void setImageInsets(base::EdgeInsets insets);
+    base::EdgeInsets imageInsets() const { return m_imageInsets; }
+
+    void setTitle(std::string title);
+    const std::string& title() const { return m_title; }
+    /// A bold title marks what confirms.
+    void setEmphasized(bool emphasized);
+    bool isEmphasized() const { return m_emphasized; }
+
+    base::Size sizeThatFits() const override;
+    bool activate() override;
+    Accessibility accessibility() const override;
+
+private:
+    ImageRef m_normalImage;
+    ImageRef m_highlightedImage;
+    std::string m_glyph;
+    std::string m_title;
+    base::EdgeInsets m_imageInsets;
+    bool m_emphasized = false;
+};
+
+} // namespace platform

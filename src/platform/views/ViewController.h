@@ -1,0 +1,82 @@
+/// Owns a view and what it shows; can hold other controllers as children. Main queue only.
+///
+/// Appearance follows the window: a controller whose view comes into a visible tree gets viewWillAppear and
+/// viewDidAppear, one whose view leaves it the two opposite calls, each once.
+#pragma once
+
+#include "platform/views/View.h"
+
+#include <memory>
+#include <vector>
+
+namespace platform {
+
+/// Lets controllers change things together with a change of size.
+class TransitionCoordinator {
+public:
+    using Block = std::function<void()>;
+
+    explicit TransitionCoordinator(base::Instant duration) : m_duration(duration) {}
+
+    base::Instant duration() const { return m_duration; }
+    /// `alongside` runs once the new size is in force, inside the transition's animation; `completion` after it.
+    void animateAlongsideTransition(Block alongside, Block completion);
+
+    // For the window that runs the transition.
+    void runAlongside();
+    void runCompletions();
+
+private:
+    base::Instant m_duration;
+    std::vector<Block> m_alongside;
+    std::vector<Block> m_completions;
+};
+
+class ViewController : public Responder {
+public:
+    ViewController() = default;
+    ~ViewController() override;
+
+    static const runtime::Class& classObject();
+    const runtime::Class& isa() const override;
+
+    /// Loads the view on first use: loadView, then viewDidLoad.
+    std::shared_ptr<View> view();
+    bool isViewLoaded() const { return m_view != nullptr; }
+    void setView(std::shared_ptr<View> view);
+
+    // Containment.
+    std::shared_ptr<ViewController> parent() const { return m_parent.lock(); }
+    const std::vector<std::shared_ptr<ViewController>>& childViewControllers() const { return m_children; }
+    void addChildViewController(const std::shared_ptr<ViewController>& child);
+    void removeFromParentViewController();
+    virtual void willMoveToParentViewController(ViewController* /*parent*/) {}
+    virtual void didMoveToParentViewController(ViewController* /*parent*/) {}
+
+    // Lifecycle.
+    /// By default a plain view of flexible size.
+    virtual void loadView();
+    virtual void viewDidLoad() {}
+    virtual void viewWillAppear(bool /*animated*/) {}
+    virtual void viewDidAppear(bool /*animated*/) {}
+    virtual void viewWillDisappear(bool /*animated*/) {}
+    virtual void viewDidDisappear(bool /*animated*/) {}
+    virtual void viewDidLayoutSubviews() {}
+    /// By default handed on to the children.
+    virtual void viewWillTransitionToSize_withTransitionCoordinator(base::Size size, TransitionCoordinator& coordinator);
+
+    bool hasAppeared() const { return m_appeared; }
+    std::shared_ptr<Responder> nextResponder() const override;
+    std::shared_ptr<Window> window() const override;
+
+    // For views and windows.
+    void setAppeared(bool appeared);
+
+private:
+    std::shared_ptr<View> m_view;
+    std::weak_ptr<ViewController> m_parent;
+    std::vector<std::shared_ptr<ViewController>> m_children;
+    bool m_appeared = false;
+};
+
+} // namespace platform

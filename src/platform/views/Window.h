@@ -1,0 +1,91 @@
+/// The root of a view tree: it takes events from the presenter, knows the first responder and the focus, and turns
+/// changes of size into transitions. Main queue only.
+#pragma once
+
+#include "base/Queue.h"
+#include "platform/views/Screen.h"
+#include "platform/views/View.h"
+#include "platform/views/ViewController.h"
+
+#include <map>
+
+namespace platform {
+
+class Window final : public View, public Screen {
+public:
+    /// What rotating or resizing takes to settle on screen.
+    static constexpr base::Instant kTransitionDuration = std::chrono::milliseconds(250);
+
+    Window(base::MainQueue& mainQueue, base::Size size, double scale);
+
+    static const runtime::Class& classObject();
+    const runtime::Class& isa() const override;
+
+    // Screen: the window is the whole of it.
+    base::Rect bounds() const override { return View::bounds(); }
+    double scale() const override { return m_scale; }
+    void setScale(double scale);
+
+    std::shared_ptr<Window> window() const override;
+    std::shared_ptr<Responder> nextResponder() const override { return nullptr; }
+
+    /// Its view fills the window.
+    void setRootViewController(const std::shared_ptr<ViewController>& controller);
+    std::shared_ptr<ViewController> rootViewController() const { return m_root; }
+    /// Shows or hides the window: the controllers appear or disappear.
+    void setVisible(bool visible);
+    bool isVisible() const { return m_visible; }
+
+    /// A new size: coalesced, so that one transition runs for all that is asked before the main queue's next turn.
+    void requestSize(base::Size size);
+    /// The transition itself, at once. Does nothing when the size is the current one.
+    void transitionToSize(base::Size size);
+    std::uint64_t transitionCount() const { return m_transitions; }
+
+    // Events, positions in the window's coordinates.
+    void touchDown(const Touch& touch);
+    void touchMove(const Touch& touch);
+    void touchUp(const Touch& touch);
+    void touchCancel(const Touch& touch);
+    void motion(MotionSubtype subtype);
+    /// Offers a key to the focused view and the responder chain; true when somebody took it.
+    bool keyDown(Key key, char character = 0, bool control = false);
+
+    // First responder.
+    std::shared_ptr<Responder> firstResponder() const { return m_firstResponder.lock(); }
+    void setFirstResponder(const std::shared_ptr<Responder>& responder) { m_firstResponder = responder; }
+
+    // Keyboard focus: Tab order is the order of drawing, top to bottom, leading to trailing.
+    std::shared_ptr<View> focusedView() const;
+    void moveFocus(bool forward);
+    void clearFocus();
+
+    // For the presenter.
+    /// Called once when the tree stops being what was last committed; again only after `commit()`.
+    void setNeedsCommitHandler(std::function<void()> handler) { m_needsCommitHandler = std::move(handler); }
+    /// Lays out what needs it; the presenter mirrors the tree right after.
+    void commit();
+    void noteChange();
+
+private:
+    struct Tracking {
+        std::weak_ptr<View> view;
+        std::vector<std::weak_ptr<GestureRecognizer>> recognizers;
+    };
+
+    std::vector<std::shared_ptr<View>> focusableViews() const;
+
+    base::MainQueue& m_mainQueue;
+    double m_scale;
+    std::shared_ptr<ViewController> m_root;
+    bool m_visible = false;
+    std::optional<base::Size> m_requestedSize;
+    std::uint64_t m_transitions = 0;
+    std::map<int, Tracking> m_touches;
+    std::weak_ptr<Responder> m_firstResponder;
+    std::weak_ptr<View> m_focusedView;
+    std::function<void()> m_needsCommitHandler;
+    bool m_needsCommit = true;
+};
+
+} // namespace platform
