@@ -95,10 +95,10 @@ public:
 
     /// Messages call `method` with the arguments unwrapped; missing ones are nil.
     template <typename R, typename... Parameters>
-    ClassBuilder& method(std::string_view selector, R (T::*method)(Parameters...))
+    ClassBuilder& method(std::string_view selector, R (T::*member)(Parameters...))
     {
-        m_class->addMethod(Selector(selector), [method](Object& self, const Arguments& arguments) {
-            return detail::call(dynamic_cast<T&>(self), method, arguments, std::index_sequence_for<Parameters...>{});
+        m_class->addMethod(Selector(selector), [member](Object& self, const Arguments& arguments) {
+            return detail::call(dynamic_cast<T&>(self), member, arguments, std::index_sequence_for<Parameters...>{});
         });
         return *this;
     }

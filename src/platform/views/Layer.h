@@ -5,6 +5,7 @@
 #include "runtime/Object.h"
 
 #include <cstdint>
+#include <functional>
 
 namespace platform {
 

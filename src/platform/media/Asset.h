@@ -1,0 +1,44 @@
+/// A movie, opened once from a URL. Main queue only, unless said otherwise.
+///
+/// Assets of one URL share the open file, so a movie stays readable after its file was removed.
+#pragma once
+
+#include "base/Error.h"
+#include "base/Geometry.h"
+#include "base/MediaTime.h"
+#include "base/Url.h"
+#include "runtime/Object.h"
+
+#include <memory>
+#include <optional>
+#include <vector>
+
+namespace platform {
+
+enum class MediaType { Video, Audio };
+
+struct AssetTrack {
+    int trackID = 0;
+    MediaType type = MediaType::Video;
+    /// Points, before the preferred transform; pixels that are not square are widened.
+    base::Size naturalSize;
+    /// How the pictures must be turned to stand upright.
+    base::AffineTransform preferredTransform;
+    base::MediaTimeRange timeRange;
+};
+
+class Asset : public runtime::Object {
+public:
+    /// Nothing when the asset was made without a URL.
+    virtual const std::optional<base::Url>& url() const = 0;
+
+    /// Why it cannot be used; null while loading and when all is well.
+    virtual base::ErrorRef error() const = 0;
+    /// Indefinite until known.
+    virtual base::MediaTime duration() const = 0;
+    /// In the file's order; empty until known.
+    virtual std::vector<AssetTrack> tracks() const = 0;
+    std::vector<AssetTrack> tracksWithMediaType(MediaType type) const;
+};
+
+} // namespace platform

@@ -1,0 +1,61 @@
+#include "platform/media/Asset.h"
+#include "platform/media/PlayerLayer.h"
+
+#include <algorithm>
+#include <iterator>
+
+namespace platform {
+
+std::vector<AssetTrack> Asset::tracksWithMediaType(MediaType type) const
+{
+    std::vector<AssetTrack> found;
+    const auto all = tracks();
+    std::copy_if(all.begin(), all.end(), std::back_inserter(found),
+                 [type](const AssetTrack& track) { return track.type == type; });
+    return found;
+}
+
+PlayerLayer::~PlayerLayer()
+{
+    if (m_player)
+        m_player->setFrameHandler({});
+}
+
+std::shared_ptr<PlayerLayer> PlayerLayer::withPlayer(const std::shared_ptr<Player>& player)
+{
+    const std::shared_ptr<PlayerLayer> layer(new PlayerLayer);
+    layer->setPlayer(player);
+    return layer;
+}
+
+void PlayerLayer::setPlayer(const std::shared_ptr<Player>& player)
+{
+    if (m_player == player)
+        return;
+    if (m_player)
+        m_player->setFrameHandler({});
+    m_player = player;
+    if (m_player) {
+        m_player->setFrameHandler([weak = weakSelf<PlayerLayer>()] {
+            if (const auto self = weak.lock())
+                self->setNeedsDisplay();
+        });
+    }
+    setNeedsDisplay();
+}
+
+base::Rect PlayerLayer::videoRect(base::Rect bounds) const
+{
+    const VideoFrameRef frame = currentFrame();
+    if (!frame || bounds.isEmpty())
+        return {};
+    const base::Size size = frame->displaySize();
+    if (!(size.width > 0) || !(size.height > 0))
+        return {};
+    const double scale = std::min(bounds.width() / size.width, bounds.height() / size.height);
+    const base::Size fitted{size.width * scale, size.height * scale};
+    return {{bounds.minX() + (bounds.width() - fitted.width) / 2, bounds.minY() + (bounds.height() - fitted.height) / 2},
+            fitted};
+}
+
+} // namespace platform
