@@ -32,16 +32,19 @@ packagesIn() {
 
 # installPackages SECTION…: installs what is missing. Ends the script with the one command to type where it may not.
 installPackages() {
-    local wanted missing install
+    local wanted name missing=() install log
+    local -A there=()
     if ! command -v dpkg-query >/dev/null; then
         echo "This is not a Debian system: the packages of packaging/packages.txt are not checked." >&2
         return
     fi
     mapfile -t wanted < <(packagesIn "$@")
-    mapfile -t missing < <(
-        { dpkg-query -W -f '${db:Status-Status} ${Package}\n' "${wanted[@]}" 2>/dev/null || true; } |
-            awk '$1 == "installed" { there[$2] = 1 }
-                 END { for (i = 1; i < ARGC; i++) if (!(ARGV[i] in there)) print ARGV[i] }' "${wanted[@]}")
+    for name in $(dpkg-query -W -f '${db:Status-Status}:${Package}\n' "${wanted[@]}" 2>/dev/null); do
+        [[ $name != installed:* ]] || there[${name#*:}]=yes
+    done
+    for name in "${wanted[@]}"; do
+        [ -n "${there[$name]-}" ] || missing+=("$name")
+    done
     [ "${#missing[@]}" -gt 0 ] || return 0
 
     install="apt-get update -qq && DEBIAN_FRONTEND=noninteractive apt-get install -y -qq --no-install-recommends ${missing[*]}"
@@ -55,7 +58,6 @@ installPackages() {
     fi
     echo "Installing ${#missing[@]} packages: ${missing[*]}" >&2
     # dpkg's chatter is only of interest when it fails.
-    local log
     log=$(mktemp)
     "${install[@]}" >"$log" 2>&1 || { cat "$log" >&2; rm -f "$log"; fail "the packages could not be installed"; }
     rm -f "$log"
