@@ -6,7 +6,7 @@
 
 #include <cstddef>
 
-namespace fakes {
+namespace tests {
 
 struct TestSystem {
     base::ManualClock clock;
@@ -38,4 +38,4 @@ struct TestSystem {
     }
 };
 
-} // namespace fakes
+} // namespace tests
