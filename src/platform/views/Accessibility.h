@@ -10,12 +10,12 @@ enum class AccessibilityRole { None, Button, Label, Image, Toolbar, Slider, Grou
 struct Accessibility {
     AccessibilityRole role = AccessibilityRole::None;
     std::string name;
-    std::string value;       ///< for labels and sliders, as a person reads it
+    std::string value; ///< for labels and sliders, as a person reads it
     bool enabled = true;
-    double minimum = 0;      ///< for sliders
+    double minimum = 0; ///< for sliders
     double maximum = 0;
     double number = 0;
-    double step = 0;         ///< what one increment moves
+    double step = 0; ///< what one increment moves
 };
 
 } // namespace platform

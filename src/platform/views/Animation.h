@@ -24,6 +24,9 @@ struct PropertyAnimation {
 void animate(base::MainQueue& mainQueue, base::Instant duration, const std::function<void()>& changes,
              std::function<void(bool finished)> completion = {});
 
+/// Runs `changes` as if no `animate()` were running: for what is placed before it is first shown.
+void withoutAnimation(const std::function<void()>& changes);
+
 /// The duration of the innermost `animate()` that is running its changes; zero outside.
 base::Instant currentAnimationDuration();
 

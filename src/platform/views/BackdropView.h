@@ -8,8 +8,8 @@ namespace platform {
 /// A view marked with these flags (`View::setBackdropMaskFlags`) takes part in the mask of a backdrop.
 enum BackdropMask : unsigned {
     kBackdropMaskGrayscale = 1U << 0U, ///< where the mask is transparent, the blur shows undarkened
-    kBackdropMaskColor = 1U << 1U,     ///< where the mask is opaque, the blur shows darkened, so that a glyph stands out
-    kBackdropMaskShape = 1U << 2U,     ///< nothing of the backdrop shows where the mask is opaque
+    kBackdropMaskColor = 1U << 1U, ///< where the mask is opaque, the blur shows darkened, so that a glyph stands out
+    kBackdropMaskShape = 1U << 2U, ///< nothing of the backdrop shows where the mask is opaque
 };
 
 class BackdropView final : public View {

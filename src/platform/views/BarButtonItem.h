@@ -13,6 +13,9 @@ public:
     enum class Kind { Action, Undo, Pause, Play, Done, Save, Cancel, FlexibleSpace, FixedSpace, Custom };
 
     BarButtonItem(Kind kind, std::weak_ptr<runtime::Object> target, runtime::Selector action);
+    static const runtime::Class& classObject();
+    const runtime::Class& isa() const override;
+
     /// A space; `width` counts for the fixed kind.
     static std::shared_ptr<BarButtonItem> flexibleSpace();
     static std::shared_ptr<BarButtonItem> fixedSpace(double width);
@@ -24,7 +27,7 @@ public:
 
     /// Points; 0 means: as wide as its content.
     double width() const { return m_width; }
-    void setWidth(double width) { m_width = width; }
+    void setWidth(double width);
     base::EdgeInsets imageInsets() const { return m_imageInsets; }
     void setImageInsets(base::EdgeInsets insets);
 
@@ -32,10 +35,15 @@ public:
     /// A button whose target does not answer its action is disabled.
     std::shared_ptr<View> view();
 
+    /// Enables or disables the button, as its target answers the action now or not. A view of one's own stays as it is.
+    void validate();
+
     /// What a tap does.
     void trigger();
 
 private:
+    std::shared_ptr<Button> button() const;
+
     Kind m_kind;
     runtime::TargetAction m_targetAction;
     double m_width = 0;

@@ -58,7 +58,7 @@ private:
     bool m_enabled = true;
     bool m_highlighted = false;
     bool m_passesTouches = true;
-    bool m_tracking = false;
+    std::optional<int> m_trackedTouch; ///< the finger that came down here
 };
 
 } // namespace platform

@@ -25,6 +25,9 @@ public:
     /// The action gets the recogniser as its argument.
     TapGestureRecognizer(std::weak_ptr<runtime::Object> target, runtime::Selector action);
 
+    static const runtime::Class& classObject();
+    const runtime::Class& isa() const override;
+
     void touchBegan(const Touch& touch) override;
     void touchMoved(const Touch& touch) override;
     void touchEnded(const Touch& touch) override;

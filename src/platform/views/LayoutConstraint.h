@@ -18,6 +18,8 @@ struct LayoutConstraint {
     double constant = 0;
 
     bool refersTo(const View& view) const;
+    /// Whether a view that it speaks of is gone.
+    bool isDead() const;
     friend bool operator==(const LayoutConstraint& a, const LayoutConstraint& b);
 };
 

@@ -6,7 +6,9 @@
 #include "platform/views/Control.h"
 #include "platform/views/Image.h"
 
+#include <cstdint>
 #include <map>
+#include <optional>
 #include <vector>
 
 namespace platform {
@@ -35,12 +37,11 @@ public:
     virtual double movieScrubberDuration(MovieScrubber& scrubber) = 0;
     virtual std::vector<double> movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(MovieScrubber& scrubber,
                                                                                          std::int32_t count,
-                                                                                         double start, double end)
-        = 0;
+                                                                                         double start, double end) = 0;
     /// Width by height.
     virtual double movieScrubberThumbnailAspectRatio(MovieScrubber& scrubber) = 0;
-    /// Answered later through `setThumbnailImage_forTimestamp`.
-    virtual void movieScrubber_requestThumbnailImageForTimestamp(MovieScrubber& scrubber, double timestamp) = 0;
+    /// Answered later through `setThumbnailImage_forTimestamp`. A source without pictures leaves the strip plain.
+    virtual void movieScrubber_requestThumbnailImageForTimestamp(MovieScrubber& /*scrubber*/, double /*timestamp*/) {}
 };
 
 class MovieScrubber final : public Control {
@@ -95,10 +96,17 @@ public:
     /// Moves the play head as a finger would: begins, changes, ends. For keys and assistive technology.
     void scrubTo(double seconds);
 
+    /// Asks for the pictures that a new width makes room for.
+    void layoutSubviews() override;
+
 private:
     double secondsAt(double x) const;
+    void beginDrag();
     void dragTo(double seconds);
     void endDrag();
+    std::int32_t thumbnailCount() const;
+    /// Asks for the timestamps, then for the pictures: all of them, or those that are not here yet.
+    void requestThumbnails(bool all);
 
     std::weak_ptr<MovieScrubberDelegate> m_delegate;
     std::weak_ptr<MovieScrubberDataSource> m_dataSource;
@@ -111,6 +119,8 @@ private:
     bool m_editable = false;
     bool m_editing = false;
     bool m_dragging = false;
+    std::optional<int> m_draggingTouch;
+    std::int32_t m_thumbnailCount = 0; ///< as last asked for
     std::vector<double> m_timestamps;
     std::map<double, ImageRef> m_thumbnails;
 };

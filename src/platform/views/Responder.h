@@ -23,10 +23,10 @@ enum class Key { Space, Escape, Return, Left, Right, Home, End, Comma, Period, C
 /// A key that a responder answers while it stands in the chain of the first responder.
 struct KeyCommand {
     Key key = Key::Character;
-    char character = 0;  ///< for Key::Character: a lower-case letter
+    char character = 0; ///< for Key::Character: a lower-case letter
     bool control = false;
     runtime::Selector action;
-    std::string title;   ///< what it does, for help and assistive technology
+    std::string title; ///< what it does, for help and assistive technology
 };
 
 class Responder : public runtime::Object {

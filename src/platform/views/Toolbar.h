@@ -39,6 +39,18 @@ public:
     Accessibility accessibility() const override;
 
 private:
+    /// A title that had to shrink: it grows back to what it wanted to be as soon as there is room.
+    struct Shrunk {
+        std::weak_ptr<View> view;
+        double wanted;
+        double given;
+    };
+
+    double wantedWidth(BarButtonItem& item) const;
+    void place(const std::shared_ptr<View>& view, double x, double width);
+
+    std::vector<Shrunk> m_shrunk;
+    std::vector<std::weak_ptr<View>> m_placed; ///< have a place already: a move from it may be animated
     Items m_items;
     std::weak_ptr<ToolbarDelegate> m_delegate;
 };

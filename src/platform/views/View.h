@@ -16,6 +16,7 @@
 #include <cstdint>
 #include <memory>
 #include <optional>
+#include <string>
 #include <variant>
 #include <vector>
 
@@ -147,12 +148,23 @@ protected:
 private:
     friend class Window;
 
-    void insertChild(Child child, std::size_t index);
+    friend class ViewController;
+
     void detachSubview(View& view);
+    void placeSubview(const std::shared_ptr<View>& view, const View* below);
+    bool reorderSubview(const View& view, const View* below);
+    std::vector<Child>::iterator positionOf(const View* view);
     void dropConstraintsReferringTo(const View& view);
+    void markConstraintsReferringTo(const View& view);
     void resizeSubviews(base::Size oldSize);
+    /// Whether controllers whose views stand in this view have appeared.
+    bool showsControllers() const;
+    void appearControllers();
+    std::vector<std::shared_ptr<ViewController>> topControllers() const;
+    void markTintChanged();
     void noteAnimation(AnimatedProperty property, base::Rect fromFrame, double fromAlpha);
-    void windowChanged();
+    void didMoveToWindowWithSubviews();
+    void noteChange();
     base::Rect autoresizedFrame(base::Size oldParent, base::Size newParent) const;
 
     base::Rect m_frame;
@@ -165,6 +177,7 @@ private:
     bool m_userInteractionEnabled = true;
     bool m_translatesAutoresizing = true;
     bool m_needsLayout = true;
+    bool m_layingOut = false;
     unsigned m_backdropMaskFlags = 0;
     std::string m_accessibilityLabel;
     std::uint64_t m_revision = 1;

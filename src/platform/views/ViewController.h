@@ -6,6 +6,7 @@
 
 #include "platform/views/View.h"
 
+#include <functional>
 #include <memory>
 #include <vector>
 
@@ -63,14 +64,19 @@ public:
     virtual void viewDidDisappear(bool /*animated*/) {}
     virtual void viewDidLayoutSubviews() {}
     /// By default handed on to the children.
-    virtual void viewWillTransitionToSize_withTransitionCoordinator(base::Size size, TransitionCoordinator& coordinator);
+    virtual void viewWillTransitionToSize_withTransitionCoordinator(base::Size size,
+                                                                    TransitionCoordinator& coordinator);
 
     bool hasAppeared() const { return m_appeared; }
     std::shared_ptr<Responder> nextResponder() const override;
     std::shared_ptr<Window> window() const override;
 
     // For views and windows.
+    /// Calls what is due of this controller and of those whose views stand in its view; nothing when that is so already.
     void setAppeared(bool appeared);
+    /// The two halves of disappearing, for a view that leaves its place in between: adds to `leaving` who was told.
+    void beginDisappearing(std::vector<std::shared_ptr<ViewController>>& leaving);
+    static void endDisappearing(const std::vector<std::shared_ptr<ViewController>>& leaving);
 
 private:
     std::shared_ptr<View> m_view;

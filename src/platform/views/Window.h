@@ -7,6 +7,7 @@
 #include "platform/views/View.h"
 #include "platform/views/ViewController.h"
 
+#include <functional>
 #include <map>
 
 namespace platform {
@@ -53,7 +54,7 @@ public:
 
     // First responder.
     std::shared_ptr<Responder> firstResponder() const { return m_firstResponder.lock(); }
-    void setFirstResponder(const std::shared_ptr<Responder>& responder) { m_firstResponder = responder; }
+    void setFirstResponder(const std::shared_ptr<Responder>& responder);
 
     // Keyboard focus: Tab order is the order of drawing, top to bottom, leading to trailing.
     std::shared_ptr<View> focusedView() const;
@@ -66,13 +67,22 @@ public:
     /// Lays out what needs it; the presenter mirrors the tree right after.
     void commit();
     void noteChange();
+    /// The root controller's view fills the window.
+    void layoutSubviews() override;
 
 private:
     struct Tracking {
+        Touch last;
         std::weak_ptr<View> view;
         std::vector<std::weak_ptr<GestureRecognizer>> recognizers;
     };
 
+    friend class View;
+
+    void cancelTouch(int id);
+    /// Forgets the focus and the first responder when they are out of the window.
+    void forgetStrays();
+    void focus(const std::shared_ptr<View>& view);
     std::vector<std::shared_ptr<View>> focusableViews() const;
 
     base::MainQueue& m_mainQueue;

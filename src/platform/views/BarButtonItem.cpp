@@ -1,0 +1,142 @@
+#include "platform/views/BarButtonItem.h"
+
+#include <utility>
+
+namespace platform {
+
+namespace {
+
+const runtime::Selector& triggerSelector()
+{
+    static const runtime::Selector selector("trigger");
+    return selector;
+}
+
+/// What the standard items look like, and how they are called.
+struct Looks {
+    const char* glyph;
+    const char* name;
+    bool emphasized = false;
+};
+
+Looks looksOf(BarButtonItem::Kind kind)
+{
+    using Kind = BarButtonItem::Kind;
+    switch (kind) {
+    case Kind::Action:
+        return {"share", "Share"};
+    case Kind::Play:
+        return {"play", "Play"};
+    case Kind::Pause:
+        return {"pause", "Pause"};
+    case Kind::Undo:
+        return {"", "Undo"};
+    case Kind::Done:
+        return {"", "Done", true};
+    case Kind::Save:
+        return {"", "Save", true};
+    case Kind::Cancel:
+        return {"", "Cancel"};
+    case Kind::FlexibleSpace:
+    case Kind::FixedSpace:
+    case Kind::Custom:
+        break;
+    }
+    return {"", ""};
+}
+
+} // namespace
+
+BarButtonItem::BarButtonItem(Kind kind, std::weak_ptr<runtime::Object> target, runtime::Selector action)
+    : m_kind(kind), m_targetAction(std::move(target), std::move(action))
+{
+}
+
+const runtime::Class& BarButtonItem::classObject()
+{
+    static const runtime::Class& instance =
+        runtime::ClassBuilder<BarButtonItem>("BarButtonItem", &runtime::Object::classObject())
+            .method(triggerSelector().name(), &BarButtonItem::trigger)
+            .build();
+    return instance;
+}
+
+const runtime::Class& BarButtonItem::isa() const
+{
+    return classObject();
+}
+
+std::shared_ptr<BarButtonItem> BarButtonItem::flexibleSpace()
+{
+    return std::make_shared<BarButtonItem>(Kind::FlexibleSpace, std::weak_ptr<runtime::Object>(), runtime::Selector());
+}
+
+std::shared_ptr<BarButtonItem> BarButtonItem::fixedSpace(double width)
+{
+    auto space =
+        std::make_shared<BarButtonItem>(Kind::FixedSpace, std::weak_ptr<runtime::Object>(), runtime::Selector());
+    space->setWidth(width);
+    return space;
+}
+
+std::shared_ptr<BarButtonItem> BarButtonItem::withCustomView(std::shared_ptr<View> view)
+{
+    auto item = std::make_shared<BarButtonItem>(Kind::Custom, std::weak_ptr<runtime::Object>(), runtime::Selector());
+    item->m_view = std::move(view);
+    return item;
+}
+
+void BarButtonItem::setWidth(double width)
+{
+    if (m_width == width)
+        return;
+    m_width = width;
+    if (const auto bar = m_view ? m_view->superview() : nullptr)
+        bar->setNeedsLayout();
+}
+
+void BarButtonItem::setImageInsets(base::EdgeInsets insets)
+{
+    m_imageInsets = insets;
+    if (const auto itsButton = button())
+        itsButton->setImageInsets(insets);
+}
+
+std::shared_ptr<View> BarButtonItem::view()
+{
+    if (m_view || isSpace() || m_kind == Kind::Custom)
+        return m_view;
+    const Looks looks = looksOf(m_kind);
+    const auto made = std::make_shared<Button>();
+    if (*looks.glyph) {
+        made->setGlyph(looks.glyph);
+        made->setAccessibilityLabel(looks.name);
+    } else {
+        made->setTitle(looks.name);
+    }
+    made->setEmphasized(looks.emphasized);
+    made->setImageInsets(m_imageInsets);
+    made->addTarget(weakSelf<runtime::Object>(), triggerSelector(), kTouchUpInside);
+    made->sizeToFit();
+    m_view = made;
+    validate();
+    return m_view;
+}
+
+void BarButtonItem::validate()
+{
+    if (const auto itsButton = button())
+        itsButton->setEnabled(m_targetAction.isAnswered());
+}
+
+void BarButtonItem::trigger()
+{
+    m_targetAction.send(self<runtime::Object>());
+}
+
+std::shared_ptr<Button> BarButtonItem::button() const
+{
+    return m_kind == Kind::Custom ? nullptr : std::dynamic_pointer_cast<Button>(m_view);
+}
+
+} // namespace platform

@@ -1,0 +1,118 @@
+#include "platform/views/Button.h"
+
+#include <algorithm>
+#include <utility>
+
+namespace platform {
+
+namespace {
+
+constexpr double kTouchSize = 44;
+constexpr double kFontSize = 17;
+/// An average letter of the system font, by its size: an estimate, since fonts are the presenter's.
+constexpr double kLetterWidth = 0.6;
+constexpr double kTitlePadding = 16;
+
+std::size_t letters(const std::string& text)
+{
+    return static_cast<std::size_t>(std::count_if(
+        text.begin(), text.end(), [](char each) { return (static_cast<unsigned char>(each) & 0xC0U) != 0x80U; }));
+}
+
+} // namespace
+
+const runtime::Class& Button::classObject()
+{
+    static const runtime::Class& instance = runtime::ClassBuilder<Button>("Button", &Control::classObject()).build();
+    return instance;
+}
+
+const runtime::Class& Button::isa() const
+{
+    return classObject();
+}
+
+void Button::setImage(ImageRef image, State state)
+{
+    ImageRef& place = state == State::Normal ? m_normalImage : m_highlightedImage;
+    if (place == image)
+        return;
+    place = std::move(image);
+    setNeedsDisplay();
+}
+
+ImageRef Button::image(State state) const
+{
+    return state == State::Normal ? m_normalImage : m_highlightedImage;
+}
+
+ImageRef Button::currentImage() const
+{
+    return isHighlighted() && m_highlightedImage ? m_highlightedImage : m_normalImage;
+}
+
+void Button::setGlyph(std::string name)
+{
+    if (m_glyph == name)
+        return;
+    m_glyph = std::move(name);
+    setNeedsDisplay();
+}
+
+void Button::setImageInsets(base::EdgeInsets insets)
+{
+    if (m_imageInsets == insets)
+        return;
+    m_imageInsets = insets;
+    setNeedsDisplay();
+}
+
+void Button::setTitle(std::string title)
+{
+    if (m_title == title)
+        return;
+    m_title = std::move(title);
+    setNeedsDisplay();
+}
+
+void Button::setEmphasized(bool emphasized)
+{
+    if (m_emphasized == emphasized)
+        return;
+    m_emphasized = emphasized;
+    setNeedsDisplay();
+}
+
+base::Size Button::sizeThatFits() const
+{
+    if (m_normalImage)
+        return m_normalImage->size();
+    if (!m_glyph.empty())
+        return {kTouchSize, kTouchSize};
+    if (m_title.empty())
+        return View::sizeThatFits();
+    const double text = kLetterWidth * kFontSize * static_cast<double>(letters(m_title));
+    return {std::max(kTouchSize, text + kTitlePadding), kTouchSize};
+}
+
+bool Button::activate()
+{
+    if (!isEnabled())
+        return false;
+    const auto keepAlive = shared_from_this();
+    sendActionsFor(kTouchDown);
+    sendActionsFor(kTouchUpInside);
+    return true;
+}
+
+Accessibility Button::accessibility() const
+{
+    Accessibility description = View::accessibility();
+    description.role = AccessibilityRole::Button;
+    if (description.name.empty())
+        description.name = m_title;
+    description.enabled = isEnabled();
+    return description;
+}
+
+} // namespace platform

@@ -1,0 +1,60 @@
+#include "platform/views/Label.h"
+
+#include <utility>
+
+namespace platform {
+
+const runtime::Class& Label::classObject()
+{
+    static const runtime::Class& instance = runtime::ClassBuilder<Label>("Label", &View::classObject()).build();
+    return instance;
+}
+
+const runtime::Class& Label::isa() const
+{
+    return classObject();
+}
+
+void Label::setText(std::string text)
+{
+    if (m_text == text)
+        return;
+    m_text = std::move(text);
+    setNeedsDisplay();
+}
+
+void Label::setFontSize(double points)
+{
+    if (m_fontSize == points)
+        return;
+    m_fontSize = points;
+    setNeedsDisplay();
+}
+
+void Label::setTextColor(Color color)
+{
+    if (m_textColor == color)
+        return;
+    m_textColor = color;
+    setNeedsDisplay();
+}
+
+void Label::setTextAlignment(TextAlignment alignment)
+{
+    if (m_alignment == alignment)
+        return;
+    m_alignment = alignment;
+    setNeedsDisplay();
+}
+
+Accessibility Label::accessibility() const
+{
+    Accessibility description = View::accessibility();
+    description.role = AccessibilityRole::Label;
+    if (description.name.empty())
+        description.name = m_text;
+    description.value = m_text;
+    return description;
+}
+
+} // namespace platform

@@ -1,0 +1,131 @@
+#include "platform/views/Window.h"
+
+#include <cassert>
+#include <utility>
+
+namespace platform {
+
+Window::Window(base::MainQueue& mainQueue, base::Size size, double scale)
+    : View({{0, 0}, size}), m_mainQueue(mainQueue), m_scale(scale)
+{
+}
+
+const runtime::Class& Window::classObject()
+{
+    static const runtime::Class& instance = runtime::ClassBuilder<Window>("Window", &View::classObject()).build();
+    return instance;
+}
+
+const runtime::Class& Window::isa() const
+{
+    return classObject();
+}
+
+void Window::setScale(double scale)
+{
+    if (m_scale == scale)
+        return;
+    m_scale = scale;
+    setNeedsDisplay();
+    setNeedsLayout();
+}
+
+std::shared_ptr<Window> Window::window() const
+{
+    // Empty during construction and destruction.
+    return std::static_pointer_cast<Window>(std::const_pointer_cast<runtime::Object>(weak_from_this().lock()));
+}
+
+void Window::setRootViewController(const std::shared_ptr<ViewController>& controller)
+{
+    if (m_root == controller)
+        return;
+    const auto keepAlive = shared_from_this();
+    if (const auto previous = std::exchange(m_root, controller))
+        previous->view()->removeFromSuperview();
+    if (!controller)
+        return;
+    controller->view()->setFrame(bounds());
+    addSubview(controller->view());
+}
+
+void Window::setVisible(bool visible)
+{
+    if (m_visible == visible)
+        return;
+    const auto keepAlive = shared_from_this();
+    m_visible = visible;
+    for (const auto& controller : topControllers())
+        controller->setAppeared(visible);
+}
+
+void Window::layoutSubviews()
+{
+    View::layoutSubviews();
+    if (m_root && m_root->isViewLoaded() && m_root->view()->superview().get() == this)
+        m_root->view()->setFrame(bounds());
+}
+
+void Window::requestSize(base::Size size)
+{
+    const bool isWaiting = m_requestedSize.has_value();
+    m_requestedSize = size;
+    if (isWaiting)
+        return;
+    m_mainQueue.post([weak = weakSelf<Window>()] {
+        if (const auto window = weak.lock())
+            window->transitionToSize(std::exchange(window->m_requestedSize, std::nullopt).value());
+    });
+}
+
+void Window::transitionToSize(base::Size size)
+{
+    if (size == bounds().size)
+        return;
+    const auto keepAlive = shared_from_this();
+    const auto root = m_root;
+    const auto coordinator = std::make_shared<TransitionCoordinator>(kTransitionDuration);
+    ++m_transitions;
+    if (root)
+        root->viewWillTransitionToSize_withTransitionCoordinator(size, *coordinator);
+    const auto changes = [&] {
+        setFrame({{0, 0}, size});
+        if (root)
+            root->view()->setFrame(bounds());
+        coordinator->runAlongside();
+        layoutIfNeeded();
+    };
+    animate(m_mainQueue, kTransitionDuration, changes, [coordinator](bool) { coordinator->runCompletions(); });
+}
+
+void Window::setFirstResponder(const std::shared_ptr<Responder>& responder)
+{
+    m_firstResponder = responder;
+}
+
+void Window::forgetStrays()
+{
+    const auto isHere = [this](const Responder& responder) { return responder.window().get() == this; };
+    if (const auto responder = firstResponder(); responder && !isHere(*responder))
+        m_firstResponder.reset();
+    if (const auto view = m_focusedView.lock(); view && !isHere(*view))
+        clearFocus();
+}
+
+void Window::commit()
+{
+    const auto keepAlive = shared_from_this();
+    m_needsCommit = true; // what the layout changes is part of this picture
+    layoutIfNeeded();
+    m_needsCommit = false;
+}
+
+void Window::noteChange()
+{
+    if (std::exchange(m_needsCommit, true) || !m_needsCommitHandler)
+        return;
+    const auto handler = m_needsCommitHandler; // may replace itself
+    handler();
+}
+
+} // namespace platform

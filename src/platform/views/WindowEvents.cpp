@@ -1,0 +1,203 @@
+// What a window does with fingers, keys and shakes.
+#include "platform/views/Window.h"
+
+#include "platform/views/GestureRecognizer.h"
+
+#include <algorithm>
+#include <cctype>
+#include <utility>
+
+namespace platform {
+
+namespace {
+
+template <typename T> std::vector<std::shared_ptr<T>> locked(const std::vector<std::weak_ptr<T>>& weak)
+{
+    std::vector<std::shared_ptr<T>> strong;
+    for (const auto& each : weak)
+        if (auto object = each.lock())
+            strong.push_back(std::move(object));
+    return strong;
+}
+
+bool canBeReached(const View& view)
+{
+    return !view.isHidden() && view.alpha() >= 0.01 && view.isUserInteractionEnabled();
+}
+
+void collectFocusable(const std::shared_ptr<View>& view, std::vector<std::shared_ptr<View>>& found)
+{
+    if (!canBeReached(*view))
+        return;
+    if (view->canBecomeFocused() && !view->bounds().isEmpty())
+        found.push_back(view);
+    for (const auto& below : view->subviews())
+        collectFocusable(below, found);
+}
+
+bool matches(const KeyCommand& command, Key key, char character, bool control)
+{
+    const auto lower = [](char each) { return std::tolower(static_cast<unsigned char>(each)); };
+    return command.key == key && command.control == control
+           && (key != Key::Character || lower(command.character) == lower(character));
+}
+
+} // namespace
+
+void Window::touchDown(const Touch& touch)
+{
+    const auto keepAlive = shared_from_this();
+    cancelTouch(touch.id);
+    const auto hit = hitTest(touch.position);
+    if (!hit)
+        return;
+    std::vector<std::shared_ptr<GestureRecognizer>> recognizers;
+    for (auto view = hit; view; view = view->superview()) {
+        recognizers.insert(recognizers.end(), view->gestureRecognizers().begin(), view->gestureRecognizers().end());
+        if (!view->passesTouchesToSuperviewRecognizers())
+            break;
+    }
+    m_touches[touch.id] = {touch, hit, {recognizers.begin(), recognizers.end()}};
+    hit->touchBegan(touch);
+    for (const auto& recognizer : recognizers)
+        recognizer->touchBegan(touch);
+}
+
+void Window::touchMove(const Touch& touch)
+{
+    const auto keepAlive = shared_from_this();
+    const auto found = m_touches.find(touch.id);
+    if (found == m_touches.end())
+        return;
+    const auto view = found->second.view.lock();
+    if (!view || view->window().get() != this) {
+        cancelTouch(touch.id);
+        return;
+    }
+    found->second.last = touch;
+    const auto recognizers = locked(found->second.recognizers);
+    view->touchMoved(touch);
+    for (const auto& recognizer : recognizers)
+        recognizer->touchMoved(touch);
+}
+
+void Window::touchUp(const Touch& touch)
+{
+    const auto keepAlive = shared_from_this();
+    const auto found = m_touches.find(touch.id);
+    if (found == m_touches.end())
+        return;
+    const auto view = found->second.view.lock();
+    if (!view || view->window().get() != this) {
+        cancelTouch(touch.id);
+        return;
+    }
+    const auto recognizers = locked(found->second.recognizers);
+    m_touches.erase(found);
+    view->touchEnded(touch);
+    for (const auto& recognizer : recognizers)
+        recognizer->touchEnded(touch);
+}
+
+void Window::touchCancel(const Touch& touch)
+{
+    const auto keepAlive = shared_from_this();
+    cancelTouch(touch.id);
+}
+
+void Window::cancelTouch(int id)
+{
+    const auto found = m_touches.find(id);
+    if (found == m_touches.end())
+        return;
+    const Touch last = found->second.last;
+    const auto view = found->second.view.lock();
+    const auto recognizers = locked(found->second.recognizers);
+    m_touches.erase(found);
+    if (view)
+        view->touchCancelled(last);
+    for (const auto& recognizer : recognizers)
+        recognizer->touchCancelled(last);
+}
+
+void Window::motion(MotionSubtype subtype)
+{
+    const auto keepAlive = shared_from_this();
+    if (const auto responder = firstResponder())
+        responder->motionEnded_withEvent(subtype, {subtype});
+}
+
+bool Window::keyDown(Key key, char character, bool control)
+{
+    const auto keepAlive = shared_from_this();
+    if (const auto view = focusedView(); view && (key == Key::Return || key == Key::Space) && !control) {
+        const auto reachable = focusableViews();
+        if (std::find(reachable.begin(), reachable.end(), view) != reachable.end() && view->activate())
+            return true;
+    }
+    for (auto responder = firstResponder(); responder; responder = responder->nextResponder())
+        for (const KeyCommand& command : responder->keyCommands())
+            if (matches(command, key, character, control) && responder->respondsTo(command.action)) {
+                responder->perform(command.action);
+                return true;
+            }
+    return false;
+}
+
+std::shared_ptr<View> Window::focusedView() const
+{
+    return m_focusedView.lock();
+}
+
+std::vector<std::shared_ptr<View>> Window::focusableViews() const
+{
+    std::vector<std::shared_ptr<View>> views;
+    for (const auto& view : subviews())
+        collectFocusable(view, views);
+    const auto top = [](const std::shared_ptr<View>& view) { return view->convertToRoot({}).y; };
+    const auto left = [](const std::shared_ptr<View>& view) { return view->convertToRoot({}).x; };
+    std::stable_sort(views.begin(), views.end(), [&](const auto& a, const auto& b) { return top(a) < top(b); });
+    // A row is what begins above the middle of its first view: buttons of one bar do not all begin at the same height.
+    for (auto row = views.begin(); row != views.end();) {
+        const double middle = top(*row) + (*row)->bounds().height() / 2;
+        const auto end = std::find_if(row, views.end(), [&](const auto& view) { return top(view) >= middle; });
+        std::stable_sort(row, end, [&](const auto& a, const auto& b) { return left(a) < left(b); });
+        row = end;
+    }
+    return views;
+}
+
+void Window::moveFocus(bool forward)
+{
+    const auto views = focusableViews();
+    if (views.empty()) {
+        clearFocus();
+        return;
+    }
+    const auto current = std::find(views.begin(), views.end(), focusedView());
+    if (current == views.end())
+        focus(forward ? views.front() : views.back());
+    else if (forward)
+        focus(current + 1 == views.end() ? views.front() : *(current + 1));
+    else
+        focus(current == views.begin() ? views.back() : *(current - 1));
+}
+
+void Window::clearFocus()
+{
+    focus(nullptr);
+}
+
+void Window::focus(const std::shared_ptr<View>& view)
+{
+    const auto previous = m_focusedView.lock();
+    if (previous == view)
+        return;
+    m_focusedView = view;
+    for (const auto& changed : {previous, view})
+        if (changed)
+            changed->setNeedsDisplay();
+    noteChange();
+}
+
+} // namespace platform
