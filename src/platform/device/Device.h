@@ -7,6 +7,10 @@
 
 namespace platform {
 
+/// The capability service's question about the home button: an answer of 2 means that there is none. Opaque, and stored
+/// as it is.
+inline constexpr std::string_view kDeviceHomeButtonKey = "9qW1yXn0bTUd5c3pEJhM2g";
+
 enum class InterfaceIdiom { Phone, Pad };
 
 class Device {
