@@ -22,6 +22,15 @@ announce() {
     return "$status"
 }
 
+# quietly COMMAND…: shows what the command says only if it fails.
+quietly() {
+    local log status=0
+    log=$(mktemp)
+    "$@" >"$log" 2>&1 || { status=$?; cat "$log" >&2; }
+    rm -f "$log"
+    return "$status"
+}
+
 # packagesIn SECTION…: the packages of these sections of packaging/packages.txt, each once.
 packagesIn() {
     awk -v wanted=" $* " '
@@ -32,7 +41,7 @@ packagesIn() {
 
 # installPackages SECTION…: installs what is missing. Ends the script with the one command to type where it may not.
 installPackages() {
-    local wanted name missing=() install log
+    local wanted name missing=() install
     local -A there=()
     if ! command -v dpkg-query >/dev/null; then
         echo "This is not a Debian system: the packages of packaging/packages.txt are not checked." >&2
@@ -57,26 +66,26 @@ installPackages() {
         exit 1
     fi
     echo "Installing ${#missing[@]} packages: ${missing[*]}" >&2
-    # dpkg's chatter is only of interest when it fails.
-    log=$(mktemp)
-    "${install[@]}" >"$log" 2>&1 || { cat "$log" >&2; rm -f "$log"; fail "the packages could not be installed"; }
-    rm -f "$log"
+    quietly "${install[@]}" || fail "the packages could not be installed"
 }
 
 # buildPreset PRESET [TARGET…]: configures where that is needed, builds the targets (all of them by default).
 buildPreset() {
-    local preset=$1 build="$top/build/$1" quiet=--quiet
+    local preset=$1 build="$top/build/$1"
     shift
     # Ninja itself configures again when a CMake file changes; the presets are the one file that it does not know.
     if [ ! "$build/build.ninja" -nt "$top/CMakePresets.json" ]; then
-        local log
-        log=$(mktemp)
-        (cd "$top" && announce "Configuring $preset…" cmake --preset "$preset" >"$log" 2>&1) ||
-            { cat "$log" >&2; rm -f "$log"; fail "configuring $preset failed"; }
-        rm -f "$log"
+        announce "Configuring $preset…" quietly cmake -S "$top" --preset "$preset" || fail "configuring $preset failed"
         touch "$build/build.ninja"
     fi
-    [ -t 1 ] && quiet=
-    announce "Building $preset (the first time takes minutes)…" ninja -C "$build" $quiet "$@" ||
-        fail "building $preset failed"
+    announce "Building $preset (the first time takes minutes)…" runNinja "$build" "$@" || fail "building $preset failed"
+}
+
+# runNinja DIRECTORY [TARGET…]: with its progress on a terminal, with nothing but trouble elsewhere.
+runNinja() {
+    if [ -t 1 ]; then
+        ninja -C "$@"
+    else
+        ninja --quiet -C "$@" | { grep -v '^ninja: no work to do\.$' || true; }
+    fi
 }
