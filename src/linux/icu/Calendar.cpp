@@ -1,0 +1,123 @@
+#include "linux/icu/Calendar.h"
+
+#include <unicode/smpdtfmt.h>
+#include <unicode/timezone.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <mutex>
+#include <utility>
+
+namespace intl {
+
+namespace {
+
+std::string processEnvironment(const char* name)
+{
+    const char* value = std::getenv(name);
+    return value ? value : "";
+}
+
+std::unique_ptr<icu::TimeZone> zoneNamed(const std::string& name)
+{
+    std::unique_ptr<icu::TimeZone> zone(icu::TimeZone::createTimeZone(icu::UnicodeString::fromUTF8(name)));
+    // What has no name that ICU knows becomes a zone all the same, of this one name.
+    icu::UnicodeString id;
+    if (zone && zone->getID(id) == UCAL_UNKNOWN_ZONE_ID)
+        zone.reset();
+    return zone;
+}
+
+std::unique_ptr<icu::TimeZone> zoneOfTheDevice(const Environment& environment)
+{
+    std::string name = environment("TZ");
+    if (name.starts_with(':'))
+        name.erase(0, 1);
+    if (!name.empty())
+        if (auto zone = zoneNamed(name))
+            return zone;
+    // ICU keeps what it finds in a variable that it does not guard.
+    static std::mutex mutex;
+    const std::lock_guard lock(mutex);
+    return std::unique_ptr<icu::TimeZone>(icu::TimeZone::detectHostTimeZone());
+}
+
+class DateFormatter final : public platform::DateFormatter {
+public:
+    DateFormatter(const std::string& locale, const Environment& environment)
+    {
+        UErrorCode status = U_ZERO_ERROR;
+        m_format = std::make_unique<icu::SimpleDateFormat>(icu::UnicodeString(), icu::Locale(locale.c_str()), status);
+        if (U_FAILURE(status))
+            m_format.reset();
+        else if (auto zone = zoneOfTheDevice(environment))
+            m_format->adoptTimeZone(zone.release());
+    }
+
+    void setDateFormat(std::string format) override
+    {
+        if (m_format)
+            m_format->applyPattern(icu::UnicodeString::fromUTF8(format));
+    }
+
+    void setTimeZone(const std::optional<platform::TimeZone>& zone) override
+    {
+        if (!m_format || !zone)
+            return;
+        if (auto known = zoneNamed(zone->name))
+            m_format->adoptTimeZone(known.release());
+    }
+
+    std::string stringFromDate(base::Date date) const override
+    {
+        std::string text;
+        if (m_format) {
+            icu::UnicodeString formatted;
+            m_format->format(date.secondsSince1970 * 1000, formatted).toUTF8String(text);
+        }
+        return text;
+    }
+
+private:
+    std::unique_ptr<icu::SimpleDateFormat> m_format; ///< null when ICU has no data at all
+};
+
+} // namespace
+
+std::string localeFromPosixName(std::string_view name)
+{
+    const auto at = std::min(name.find('@'), name.size());
+    const std::string_view modifier = name.substr(std::min(at + 1, name.size()));
+    const std::string_view territory = name.substr(0, std::min(name.find('.'), at));
+    if (territory.empty() || territory == "C" || territory == "POSIX")
+        return "en_US_POSIX";
+
+    std::string locale(territory);
+    const std::string_view script = modifier.starts_with("latin")      ? "_Latn"
+                                    : modifier.starts_with("cyrillic") ? "_Cyrl"
+                                                                       : "";
+    return locale.insert(std::min(locale.find('_'), locale.size()), script);
+}
+
+Calendar::Calendar(Environment environment)
+    : m_environment(environment ? std::move(environment) : Environment(processEnvironment))
+{
+}
+
+std::unique_ptr<platform::DateFormatter> Calendar::makeDateFormatter() const
+{
+    std::string name;
+    for (const char* variable : {"LC_ALL", "LC_TIME", "LANG"})
+        if (name.empty())
+            name = m_environment(variable);
+    return std::make_unique<DateFormatter>(localeFromPosixName(name), m_environment);
+}
+
+std::optional<platform::TimeZone> Calendar::timeZoneWithName(const std::string& name) const
+{
+    if (!zoneNamed(name))
+        return std::nullopt;
+    return platform::TimeZone{name};
+}
+
+} // namespace intl
