@@ -1,0 +1,153 @@
+// The scrubber's questions and answers, and the way into trim mode and out of it.
+
+#include "editor/VKVideoEditorViewController.h"
+
+#include "support/TempMovieNames.h"
+#include "support/VKFileManagerExtensions.h"
+
+#include <cmath>
+
+using platform::MovieScrubber;
+
+void VKVideoEditorViewController::movieScrubberDidBeginEditing(MovieScrubber& /*scrubber*/)
+{
+    editMode();
+    setTrimming(true);
+}
+
+void VKVideoEditorViewController::movieScrubberDidCancelEditing(MovieScrubber& /*scrubber*/)
+{
+    avTrimmer()->setEditing_animated(false, true);
+    previewMode();
+    setTrimming(false);
+}
+
+void VKVideoEditorViewController::editMode()
+{
+    if (isPadMode()) {
+        topToolBar()->setItems(
+            {cancelTrimButton(), flexSpace(), titleButton(), flexSpace(), playButton(), fixSpace(), trimButton()});
+    } else {
+        bottomToolBar()->setItems({flexSpace(), playButton(), flexSpace()});
+        topToolBar()->setItems({cancelTrimButton(), flexSpace(), titleButton(), flexSpace(), trimButton()});
+    }
+    // Already on entering, before anything is cut.
+    setHasEdit(true);
+}
+
+void VKVideoEditorViewController::previewMode()
+{
+    const auto close = hasEdit() ? doneButton() : cancelButton();
+    if (isPadMode()) {
+        topToolBar()->setItems({close, flexSpace(), titleButton(), flexSpace(), playButton(), fixSpace(), shareButton(),
+                                fixSpace(), saveButton()});
+    } else {
+        bottomToolBar()->setItems({shareButton(), flexSpace(), playButton(), flexSpace()});
+        topToolBar()->setItems({close, flexSpace(), titleButton(), flexSpace(), saveButton()});
+    }
+}
+
+void VKVideoEditorViewController::undoAction()
+{
+    if (isExporting())
+        return;
+    if (const auto delegate = avTrimmer()->delegate())
+        delegate->movieScrubberDidCancelEditing(*avTrimmer());
+}
+
+void VKVideoEditorViewController::movieScrubber_editingStartValueDidChange(MovieScrubber& /*scrubber*/, double seconds)
+{
+    avPlayer()->pause();
+    setEditStartTime(seconds);
+    m_platform.system.mainQueue.post([weak = weakSelf<VKVideoEditorViewController>(), seconds] {
+        if (const auto self = weak.lock())
+            self->avPlayer()->seekToTime(self->mediaTime(seconds));
+    });
+    setTrimming(true);
+}
+
+void VKVideoEditorViewController::movieScrubber_editingEndValueDidChange(MovieScrubber& /*scrubber*/, double seconds)
+{
+    avPlayer()->pause();
+    setEditEndTime(seconds);
+    m_platform.system.mainQueue.post([weak = weakSelf<VKVideoEditorViewController>(), seconds] {
+        if (const auto self = weak.lock())
+            self->avPlayer()->seekToTime(self->mediaTime(seconds));
+    });
+    setTrimming(true);
+}
+
+void VKVideoEditorViewController::movieScrubberDidBeginScrubbing_withHandle(MovieScrubber& /*scrubber*/, int /*handle*/)
+{
+    setScrubbing(true);
+    pauseAction();
+}
+
+void VKVideoEditorViewController::movieScrubber_valueDidChange(MovieScrubber& /*scrubber*/, double seconds)
+{
+    avPlayer()->seekToTime(mediaTime(seconds));
+}
+
+void VKVideoEditorViewController::movieScrubberDidEndScrubbing_withHandle(MovieScrubber& /*scrubber*/, int /*handle*/)
+{
+    avPlayer()->seekToTime(mediaTime(avTrimmer()->value()));
+    setScrubbing(false);
+}
+
+double VKVideoEditorViewController::movieScrubberDuration(MovieScrubber& /*scrubber*/)
+{
+    return getPlayerDuration();
+}
+
+std::vector<double> VKVideoEditorViewController::movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(
+    MovieScrubber& /*scrubber*/, std::int32_t count, double start, double end)
+{
+    if (end == 0.0)
+        return {0.0};
+    std::vector<double> timestamps;
+    const double duration = getPlayerDuration();
+    const double step = (end - start) / count;
+    double time = start;
+    for (std::int32_t i = 0; i < count; ++i) {
+        timestamps.push_back(time);
+        time += step;
+        // Written so that a duration that is not a number ends after the first.
+        if (!(time <= duration))
+            break;
+    }
+    return timestamps;
+}
+
+base::Url VKVideoEditorViewController::trimFileURL() const
+{
+    const std::string name = support::trimmedMovieName(applicationName().value_or(""));
+    return support::tempMovieUrl(support::tempMovieStem(VKExtensions::_srTempPath(m_platform.files), name),
+                                 m_platform.system.clock.date());
+}
+
+base::Size VKVideoEditorViewController::getVideoSize() const
+{
+    const auto item = avPlayer()->currentItem();
+    const auto tracks =
+        item ? item->asset()->tracksWithMediaType(platform::MediaType::Video) : std::vector<platform::AssetTrack>{};
+    if (tracks.empty())
+        return {};
+    const base::Size size = tracks.front().preferredTransform.apply(tracks.front().naturalSize);
+    return {std::abs(size.width), std::abs(size.height)};
+}
+
+double VKVideoEditorViewController::movieScrubberThumbnailAspectRatio(MovieScrubber& /*scrubber*/)
+{
+    const base::Size size = getVideoSize();
+    return size.width > 0 && size.height > 0 ? size.width / size.height : 1.0;
+}
+
+void VKVideoEditorViewController::goToStart()
+{
+    avTrimmer()->scrubTo(0);
+}
+
+void VKVideoEditorViewController::goToEnd()
+{
+    avTrimmer()->scrubTo(avTrimmer()->duration());
+}

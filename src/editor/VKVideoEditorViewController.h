@@ -1,0 +1,145 @@
+/// The one screen of the system: it shows the recording with its chrome, plays it, and tells its delegate which
+/// activities the user completed. Main queue only.
+///
+/// Split by concern: construction and lifecycle here and in the .cpp of this name, the two arrangements in +Layout,
+/// playing in +Playback, the scrubber and trim mode in +Trimming, finishing in +Finish.
+#pragma once
+
+#include "editor/VKVideoEditorProperties.h"
+#include "platform/hosting/Platform.h"
+#include "platform/views/ViewController.h"
+
+class VKVideoEditorViewController;
+
+class VKVideoEditorViewControllerDelegate {
+public:
+    virtual ~VKVideoEditorViewControllerDelegate() = default;
+    /// The user is done. `activityTypes` is the editor's own list, not a copy.
+    virtual void videoEditor_didFinishWithActivityTypes(VKVideoEditorViewController& editor,
+                                                        const std::shared_ptr<ActivityTypes>& activityTypes) = 0;
+};
+
+class VKVideoEditorViewController final : public platform::ViewController,
+                                          public VKVideoEditorProperties,
+                                          public platform::ToolbarDelegate,
+                                          public platform::MovieScrubberDelegate,
+                                          public platform::MovieScrubberDataSource,
+                                          public runtime::KeyValueObserver {
+public:
+    /// How long the chrome takes to fade.
+    static constexpr base::Instant kFadeDuration = std::chrono::milliseconds(250);
+
+    /// `size` becomes the view's frame unless it is empty. Nothing is checked: whatever is missing stays missing.
+    static std::shared_ptr<VKVideoEditorViewController>
+    initWithBundleIdentifier_URL_applicationName_overrideTintColor_size(
+        const platform::Platform& platform, std::optional<std::string> bundleIdentifier, std::optional<base::Url> url,
+        std::optional<std::string> applicationName, std::optional<platform::Color> overrideTintColor, base::Rect size);
+    /// The same without a tint colour, the view's frame left as it is made.
+    static std::shared_ptr<VKVideoEditorViewController> initWithBundleIdentifier_URL_applicationName(
+        const platform::Platform& platform, std::optional<std::string> bundleIdentifier, std::optional<base::Url> url,
+        std::optional<std::string> applicationName);
+    ~VKVideoEditorViewController() override;
+
+    static const runtime::Class& classObject();
+    const runtime::Class& isa() const override { return classObject(); }
+
+    std::shared_ptr<VKVideoEditorViewControllerDelegate> delegate() const { return m_delegate.lock(); }
+    void setDelegate(std::weak_ptr<VKVideoEditorViewControllerDelegate> delegate) { m_delegate = std::move(delegate); }
+
+    /// Asked of the device once a process.
+    bool deviceHasHomeButton() const;
+    /// 1 when the view is wider than high (landscape), else 0; a square counts as 0.
+    int currentOrientation();
+
+    // Lifecycle and events.
+    void viewWillAppear(bool animated) override;
+    void viewDidAppear(bool animated) override;
+    void viewWillDisappear(bool animated) override;
+    void viewDidLayoutSubviews() override;
+    void viewWillTransitionToSize_withTransitionCoordinator(base::Size size,
+                                                            platform::TransitionCoordinator& coordinator) override;
+    bool canBecomeFirstResponder() const override { return true; }
+    void motionEnded_withEvent(platform::MotionSubtype motion, const platform::MotionEvent& event) override;
+    std::vector<platform::KeyCommand> keyCommands() const override;
+
+    // Chrome.
+    void handleSingleTap(const std::shared_ptr<runtime::Object>& recognizer);
+    void configureClipsaUIHidden();
+    void showUI();
+    void hideUI();
+
+    // The two arrangements.
+    void applyPhoneUILayout();
+    void applyPadUILayout();
+    void applyPhoneConstraints();
+    void applyPadConstraints();
+
+    // Playing.
+    void reloadAVLayerWithURL(const std::optional<base::Url>& url);
+    void observeValueForKeyPath_ofObject_change_context(std::string_view keyPath, runtime::Object& object,
+                                                        const runtime::KeyValueChange& change, void* context) override;
+    void itemDidFinishPlaying(const std::shared_ptr<runtime::Object>& notification);
+    void playAction();
+    void pauseAction();
+    /// Re-fits the picture and the bars to the view, and has the scrubber ask for everything anew.
+    void refreshAVRotation();
+    /// Seconds; not a number until the item is ready.
+    double getPlayerDuration() const;
+
+    // The scrubber's questions and answers, and trim mode.
+    void movieScrubber_valueDidChange(platform::MovieScrubber& scrubber, double seconds) override;
+    void movieScrubberDidBeginScrubbing_withHandle(platform::MovieScrubber& scrubber, int handle) override;
+    void movieScrubberDidEndScrubbing_withHandle(platform::MovieScrubber& scrubber, int handle) override;
+    void movieScrubber_editingStartValueDidChange(platform::MovieScrubber& scrubber, double seconds) override;
+    void movieScrubber_editingEndValueDidChange(platform::MovieScrubber& scrubber, double seconds) override;
+    void movieScrubberDidBeginEditing(platform::MovieScrubber& scrubber) override;
+    void movieScrubberDidCancelEditing(platform::MovieScrubber& scrubber) override;
+    double movieScrubberDuration(platform::MovieScrubber& scrubber) override;
+    std::vector<double> movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(platform::MovieScrubber& scrubber,
+                                                                                 std::int32_t count, double start,
+                                                                                 double end) override;
+    double movieScrubberThumbnailAspectRatio(platform::MovieScrubber& scrubber) override;
+    void editMode();
+    void previewMode();
+    void undoAction();
+    /// A new place in the temporary store, named after the app and the second.
+    base::Url trimFileURL() const;
+    /// The upright size of the item's first video track; zero without one.
+    base::Size getVideoSize() const;
+
+    // Finishing.
+    void doneAction();
+
+    // Keys: what has no button of its own.
+    void togglePlayback();
+    void leave();
+    void goToStart();
+    void goToEnd();
+
+private:
+    explicit VKVideoEditorViewController(const platform::Platform& platform) : m_platform(platform) {}
+
+    // Construction, in this order.
+    void makeVideoOverlay();
+    void makeTitle();
+    void makePlayerChain();
+    void makeScrubber();
+    void makeBarItems();
+    void makeToolbars(const std::optional<platform::Color>& overrideTintColor);
+    void makeViewTree();
+    void applyLayoutForDevice();
+
+    base::Rect topToolBarFrame();
+    base::Rect bottomToolBarFrame();
+    void buildPlayer();
+    void observePlayerItem();
+    void addPlayHeadObserver();
+    void layOutBars(const std::shared_ptr<platform::BarButtonItem>& playOrPause);
+    void fadeChromeTo(double alpha);
+    base::MediaTime mediaTime(double seconds) const;
+    void addStripConstraint(platform::LayoutAttribute attribute, const std::shared_ptr<platform::View>& other,
+                            platform::LayoutAttribute otherAttribute);
+
+    const platform::Platform& m_platform;
+    std::weak_ptr<VKVideoEditorViewControllerDelegate> m_delegate;
+};

@@ -1,0 +1,136 @@
+#include "extension/VKVideoEditorExtensionViewController.h"
+
+#include "extension/VKVideoEditorExtensionContext.h"
+
+#include <atomic>
+#include <utility>
+
+const runtime::Class& VKVideoEditorExtensionViewControllerFocusView::classObject()
+{
+    using Self = VKVideoEditorExtensionViewControllerFocusView;
+    static const runtime::Class& instance =
+        runtime::ClassBuilder<Self>("VKVideoEditorExtensionViewControllerFocusView", &View::classObject())
+            .maker([] { return std::make_shared<Self>(); })
+            .build();
+    return instance;
+}
+
+const runtime::Class& VKVideoEditorExtensionViewController::classObject()
+{
+    using Self = VKVideoEditorExtensionViewController;
+    static const runtime::Class& instance =
+        runtime::ClassBuilder<Self>("VKVideoEditorExtensionViewController", &ExtensionViewController::classObject())
+            .maker([] { return std::make_shared<Self>(); })
+            .build();
+    return instance;
+}
+
+void VKVideoEditorExtensionViewController::viewDidLoad()
+{
+    ExtensionViewController::viewDidLoad();
+    setupChildViewControllers();
+}
+
+void VKVideoEditorExtensionViewController::viewWillAppear(bool animated)
+{
+    ExtensionViewController::viewWillAppear(animated);
+    if (!videoEditorViewController())
+        setupVideoEditorController();
+}
+
+void VKVideoEditorExtensionViewController::viewDidDisappear(bool animated)
+{
+    ExtensionViewController::viewDidDisappear(animated);
+    extensionContext()->platform().system.log.message("VKVideoEditorExtensionViewController -viewDidDisappear:");
+    tearDownChildViewControllers();
+}
+
+void VKVideoEditorExtensionViewController::setupChildViewControllers()
+{
+    const base::System& system = extensionContext()->platform().system;
+    system.log.message("VKVideoEditorExtensionViewController -setupChildViewControllers");
+
+    // The loader's thread writes the values, but never holds the controller: the last reference must die here.
+    inputItemsFromClientWithCompletionHandler(
+        [weak = weakSelf<VKVideoEditorExtensionViewController>(), payload = m_payload,
+         &system](const auto& bundleIdentifier, const auto& appName, const auto& movieURL,
+                  const auto& fileAttachmentURL, const auto& overrideShareMessage, const auto& overrideTintColor) {
+            payload->setValues(
+                {bundleIdentifier, appName, movieURL, fileAttachmentURL, overrideShareMessage, overrideTintColor});
+            system.mainQueue.post([weak, &system] {
+                const auto self = weak.lock();
+                if (!self)
+                    return;
+                system.log.message("loaded input items");
+                self->setupVideoEditorController();
+            });
+        });
+}
+
+void VKVideoEditorExtensionViewController::inputItemsFromClientWithCompletionHandler(InputItemsCompletion completion)
+{
+    base::Log& log = extensionContext()->platform().system.log;
+    log.message("VKVideoEditorExtensionViewController -inputItemsFromClientWithCompletionHandler:");
+
+    // Shared by all loads of this call, which outlive it.
+    const auto slots = std::make_shared<Payload>();
+    // Set by a load that completes the required values; no use once the enumeration is over.
+    const auto stop = std::make_shared<std::atomic<bool>>(false);
+    for (const platform::InputItem& item : extensionContext()->inputItems()) {
+        if (*stop)
+            break;
+        if (item.attachments.empty()
+            || !item.attachments.front()->hasItemConformingToTypeIdentifier(platform::kGenericDataType))
+            continue;
+        item.attachments.front()->loadItemForTypeIdentifier(
+            platform::kGenericDataType, [slots, stop, &log, completion, title = item.attributedTitle](
+                                            const runtime::Value& value, const base::ErrorRef& error) {
+                if (error) {
+                    log.error("Error loading input item for type");
+                    log.console(title + ": " + error->description());
+                    return;
+                }
+                const PayloadValues values = slots->store(title, value);
+                if (!values.hasAllRequired())
+                    return;
+                completion(values.bundleIdentifier, values.appName, values.movieURL, values.fileAttachmentURL,
+                           values.overrideShareMessage, values.overrideTintColor);
+                *stop = true;
+            });
+    }
+}
+
+void VKVideoEditorExtensionViewController::setupVideoEditorController()
+{
+    const auto editor =
+        VKVideoEditorViewController::initWithBundleIdentifier_URL_applicationName_overrideTintColor_size(
+            extensionContext()->platform(), bundleIdentifier(), movieURL(), appName(), overrideTintColor(),
+            view()->bounds());
+    setVideoEditorViewController(editor);
+    editor->setFileAttachmentURL(fileAttachmentURL());
+    editor->setOverrideShareMessage(overrideShareMessage());
+    editor->setDelegate(self<VKVideoEditorExtensionViewController>());
+    addChildViewController(editor);
+    view()->addSubview(editor->view());
+    editor->didMoveToParentViewController(this);
+}
+
+void VKVideoEditorExtensionViewController::tearDownChildViewControllers()
+{
+    if (const auto editor = videoEditorViewController()) {
+        editor->willMoveToParentViewController(nullptr);
+        editor->view()->removeFromSuperview();
+        editor->removeFromParentViewController();
+    }
+    setVideoEditorViewController(nullptr);
+}
+
+void VKVideoEditorExtensionViewController::videoEditor_didFinishWithActivityTypes(
+    VKVideoEditorViewController& /*editor*/, const std::shared_ptr<ActivityTypes>& activityTypes)
+{
+    extensionContext()->platform().system.log.message(
+        "VKVideoEditorExtensionViewController -videoEditorViewDidFinishWithActivityTypes:");
+    const auto context = std::dynamic_pointer_cast<VKVideoEditorExtensionContext>(extensionContext());
+    if (const auto host = context ? context->extensionObjectProxy() : nullptr)
+        host->extensionDidFinishWithActivityTypes(activityTypes);
+}

@@ -1,0 +1,180 @@
+#include "EditorFixture.h"
+
+using platform::MotionSubtype;
+
+namespace {
+
+class Lifecycle : public EditorTest {};
+
+} // namespace
+
+TEST_F(Lifecycle, TheEditorIsFirstResponderWhileItIsShown)
+{
+    open();
+    EXPECT_EQ(fake->window->firstResponder(), editor);
+    fake->window->setVisible(false);
+    EXPECT_EQ(fake->window->firstResponder(), nullptr);
+}
+
+TEST_F(Lifecycle, HidingAndAtOnceConfiguringShowsTheChromeAgain)
+{
+    open();
+    editor->hideUI();
+    EXPECT_TRUE(editor->isUIHidden());
+    editor->configureClipsaUIHidden();
+    EXPECT_FALSE(editor->isUIHidden());
+    EXPECT_EQ(editor->topToolBar()->alpha(), 1.0);
+}
+
+TEST_F(Lifecycle, BarsAndScrubberFadeTogetherAndTheLargePlayButtonStays)
+{
+    open();
+    editor->hideUI();
+    for (const std::shared_ptr<platform::View>& view :
+         {std::static_pointer_cast<platform::View>(editor->topToolBar()),
+          std::static_pointer_cast<platform::View>(editor->bottomToolBar()),
+          std::static_pointer_cast<platform::View>(editor->scrubberContainterView())}) {
+        EXPECT_EQ(view->alpha(), 0.0);
+        const auto animations = view->takeAnimations();
+        ASSERT_EQ(animations.size(), 1U);
+        EXPECT_EQ(animations.front().duration, std::chrono::milliseconds(250));
+    }
+    EXPECT_EQ(editor->videoOverlayPlayButton()->asView()->alpha(), 1.0);
+    EXPECT_EQ(editor->titleLabel()->alpha(), 1.0);
+}
+
+TEST_F(Lifecycle, ATapOnTheMovieTogglesTheChromeAndNothingElse)
+{
+    open();
+    tap(40, 200);
+    EXPECT_TRUE(editor->isUIHidden());
+    EXPECT_FALSE(player().isPlaying());
+    tap(40, 200);
+    EXPECT_FALSE(editor->isUIHidden());
+}
+
+TEST_F(Lifecycle, AFadedBarTakesNoTaps)
+{
+    open();
+    const auto cancel = editor->cancelButton()->view();
+    editor->hideUI();
+    settle();
+    tap(cancel);
+    EXPECT_TRUE(delegate->finishes.empty());
+    EXPECT_FALSE(editor->isUIHidden());
+}
+
+TEST_F(Lifecycle, AShakeWhileTrimmingUndoesAndIsPassedOn)
+{
+    open();
+    editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
+    fake->window->motion(MotionSubtype::Shake);
+    EXPECT_FALSE(editor->isTrimming());
+    EXPECT_EQ(container->motions, 1);
+}
+
+TEST_F(Lifecycle, AShakeWhileExportingDoesNotUndoButIsPassedOn)
+{
+    open();
+    editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
+    editor->setExporting(true);
+    fake->window->motion(MotionSubtype::Shake);
+    EXPECT_TRUE(editor->isTrimming());
+    EXPECT_EQ(container->motions, 1);
+}
+
+TEST_F(Lifecycle, AShakeOutsideTrimModeChangesNothingButIsPassedOn)
+{
+    open();
+    const auto before = top();
+    fake->window->motion(MotionSubtype::Shake);
+    EXPECT_EQ(top(), before);
+    EXPECT_EQ(container->motions, 1);
+}
+
+TEST_F(Lifecycle, OtherMotionsAreOnlyPassedOn)
+{
+    open();
+    editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
+    fake->window->motion(MotionSubtype::None);
+    EXPECT_TRUE(editor->isTrimming());
+    EXPECT_EQ(container->motions, 1);
+}
+
+TEST_F(Lifecycle, ThePictureFillsTheViewAfterEachLayout)
+{
+    open();
+    EXPECT_EQ(editor->avPlayerLayer()->frame(), base::Rect::make(0, 0, 360, 720));
+    turnTo({720, 360});
+    EXPECT_EQ(editor->avPlayerLayer()->frame(), base::Rect::make(0, 0, 720, 360));
+}
+
+TEST_F(Lifecycle, AReleasedEditorLeavesNoTemporaryFile)
+{
+    fake->files.addDirectory("/private/var/mobile/Library/Velkor");
+    fake->files.addFile("/private/var/mobile/Library/Velkor/movie.mp4", "movie");
+    fake->files.addFile("/private/var/mobile/Library/Velkor/Game_1.mp4", "trimmed");
+    open();
+    editor.reset();
+    fake->window->setRootViewController(nullptr);
+    container.reset();
+    settle();
+    const auto names = fake->files.contentsOfDirectory("/private/var/mobile/Library/Velkor");
+    ASSERT_TRUE(names);
+    EXPECT_TRUE(names.value().empty());
+}
+
+TEST_F(Lifecycle, AReleasedEditorIsReallyGoneAndObservesNothing)
+{
+    open();
+    const std::weak_ptr<VKVideoEditorViewController> gone = editor;
+    const auto item = editor->avPlayerItem();
+    const auto keptPlayer = fake->media.player();
+    editor.reset();
+    fake->window->setRootViewController(nullptr);
+    container.reset();
+    settle();
+    EXPECT_TRUE(gone.expired());
+    EXPECT_EQ(item->observerCount(), 0U);
+    EXPECT_FALSE(keptPlayer->hasObservers());
+    EXPECT_EQ(fake->notifications.registrationCount(), 0U);
+}
+
+TEST_F(Lifecycle, TheCloseItemFinishesWithTheListItselfAndPausesThePlayer)
+{
+    open();
+    editor->activityTypes()->push_back("mail");
+    player().play();
+    tap(editor->cancelButton()->view());
+    ASSERT_EQ(delegate->finishes.size(), 1U);
+    EXPECT_EQ(delegate->finishes.front(), editor->activityTypes());
+    EXPECT_FALSE(player().isPlaying());
+}
+
+TEST_F(Lifecycle, NothingFinishesWhileTheShareSheetIsUp)
+{
+    open();
+    editor->setShareSheetUp(true);
+    tap(editor->cancelButton()->view());
+    EXPECT_TRUE(delegate->finishes.empty());
+}
+
+TEST_F(Lifecycle, EscapeLeavesTrimModeFirstAndThenTheEditor)
+{
+    open();
+    editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
+    EXPECT_TRUE(fake->window->keyDown(platform::Key::Escape));
+    EXPECT_FALSE(editor->isTrimming());
+    EXPECT_TRUE(delegate->finishes.empty());
+    EXPECT_TRUE(fake->window->keyDown(platform::Key::Escape));
+    EXPECT_EQ(delegate->finishes.size(), 1U);
+}
+
+TEST_F(Lifecycle, SpacePlaysAndPauses)
+{
+    open();
+    EXPECT_TRUE(fake->window->keyDown(platform::Key::Space));
+    EXPECT_TRUE(player().isPlaying());
+    EXPECT_TRUE(fake->window->keyDown(platform::Key::Space));
+    EXPECT_FALSE(player().isPlaying());
+}

@@ -1,0 +1,94 @@
+#include "EditorFixture.h"
+
+namespace {
+
+class Scrubber : public EditorTest {
+protected:
+    std::vector<double> stamps(int count, double start, double end)
+    {
+        return editor->movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(*editor->avTrimmer(), count, start,
+                                                                                end);
+    }
+};
+
+} // namespace
+
+TEST_F(Scrubber, TimestampsAreEvenlySpacedAndStopAtTheMoviesEnd)
+{
+    fake->media.movies[kMovie] = tests::FakeMovie::lasting(15);
+    open();
+    EXPECT_EQ(stamps(10, 0, 20), (std::vector<double>{0, 2, 4, 6, 8, 10, 12, 14}));
+}
+
+TEST_F(Scrubber, AnEndOfZeroGivesOneTimestampAndACountOfZeroNone)
+{
+    open();
+    EXPECT_EQ(stamps(10, 0, 0), (std::vector<double>{0}));
+    EXPECT_TRUE(stamps(0, 0, 20).empty());
+    EXPECT_TRUE(stamps(-3, 0, 20).empty());
+}
+
+TEST_F(Scrubber, AnUnknownDurationStopsAfterTheFirst)
+{
+    fake->media.movies.clear();
+    open();
+    EXPECT_EQ(stamps(10, 0, 20), (std::vector<double>{0}));
+}
+
+TEST_F(Scrubber, EnteringTrimModeAndCancellingTurnsTheFirstButtonIntoDone)
+{
+    open();
+    editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
+    EXPECT_TRUE(editor->isTrimming());
+    EXPECT_TRUE(editor->hasEdit());
+    EXPECT_EQ(top(), phoneTop(editor->cancelTrimButton(), editor->trimButton()));
+    editor->undoAction();
+    EXPECT_FALSE(editor->isTrimming());
+    EXPECT_EQ(top(), phoneTop(editor->doneButton(), editor->saveButton()));
+    EXPECT_EQ(bottom(), (Items{editor->shareButton(), editor->flexSpace(), editor->playButton(), editor->flexSpace()}));
+}
+
+TEST_F(Scrubber, UndoDoesNothingWhileExporting)
+{
+    open();
+    editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
+    editor->setExporting(true);
+    editor->undoAction();
+    EXPECT_TRUE(editor->isTrimming());
+}
+
+TEST_F(Scrubber, MovingAHandlePausesSeeksLaterAndLeavesTheBarsAsTheyWere)
+{
+    open();
+    editor->playAction();
+    const auto before = bottom();
+    const auto seeks = player().seeks().size();
+    editor->movieScrubber_editingStartValueDidChange(*editor->avTrimmer(), 3);
+    EXPECT_FALSE(player().isPlaying());
+    EXPECT_TRUE(editor->isTrimming());
+    EXPECT_EQ(editor->editStartTime(), 3);
+    EXPECT_EQ(player().seeks().size(), seeks);
+    EXPECT_EQ(bottom(), before);
+    fake->machine.drain();
+    EXPECT_NEAR(player().seeks().back().seconds(), 3, 1e-9);
+}
+
+TEST_F(Scrubber, ATurnedTrackGivesAnUprightSize)
+{
+    auto movie = tests::FakeMovie::lasting(10, {1920, 1080});
+    movie.tracks.front().preferredTransform = {0, 1, -1, 0, 1080, 0};
+    fake->media.movies[kMovie] = movie;
+    open();
+    EXPECT_EQ(editor->getVideoSize(), (base::Size{1080, 1920}));
+    EXPECT_DOUBLE_EQ(editor->movieScrubberThumbnailAspectRatio(*editor->avTrimmer()), 0.5625);
+}
+
+TEST_F(Scrubber, AMovieWithoutAPictureHasNoSizeAndAnAspectRatioOfOne)
+{
+    auto movie = tests::FakeMovie::lasting(10);
+    movie.tracks.erase(movie.tracks.begin());
+    fake->media.movies[kMovie] = movie;
+    open();
+    EXPECT_EQ(editor->getVideoSize(), base::Size{});
+    EXPECT_EQ(editor->movieScrubberThumbnailAspectRatio(*editor->avTrimmer()), 1.0);
+}
