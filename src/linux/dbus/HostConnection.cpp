@@ -1,0 +1,187 @@
+#include "linux/dbus/HostConnection.h"
+
+#include "linux/dbus/DisconnectWatch.h"
+#include "linux/dbus/Protocol.h"
+#include "linux/dbus/Wire.h"
+
+#include <QDBusConnection>
+#include <QDBusMessage>
+#include <QDBusServer>
+#include <QDBusVariant>
+#include <QDBusVirtualObject>
+
+#include <optional>
+#include <utility>
+
+namespace dbus {
+
+namespace {
+
+const char* const kIntrospection = R"XML(
+  <interface name="org.clipsa.ExtensionRuntime1">
+    <method name="InputItems"><arg direction="out" type="a(saas)"/></method>
+    <method name="LoadItem">
+      <arg direction="in" type="u" name="item"/><arg direction="in" type="u" name="attachment"/>
+      <arg direction="in" type="s" name="type"/><arg direction="out" type="v"/>
+    </method>
+  </interface>
+  <interface name="org.clipsa.VKVideoEditorExtensionHostProtocol">
+    <method name="ExtensionDidFinishWithActivityTypes"><arg direction="in" type="as" name="activityTypes"/></method>
+  </interface>
+)XML";
+
+const char* const kHostInterface = "org.clipsa.VKVideoEditorExtensionHostProtocol";
+const char* const kFinishMember = "ExtensionDidFinishWithActivityTypes";
+
+/// "unix:path=" with everything escaped that an address cannot hold as it is.
+std::string addressOf(const std::string& path)
+{
+    static constexpr char kHex[] = "0123456789abcdef";
+    std::string address = "unix:path=";
+    for (const char character : path) {
+        const auto byte = static_cast<unsigned char>(character);
+        if ((byte < 128 && std::isalnum(byte)) || std::string_view("-_/.").find(character) != std::string_view::npos) {
+            address += character;
+        } else {
+            address += '%';
+            address += kHex[byte >> 4];
+            address += kHex[byte & 15];
+        }
+    }
+    return address;
+}
+
+} // namespace
+
+HostAttachment HostAttachment::of(runtime::Value value, std::string type)
+{
+    return {{platform::kGenericDataType, std::move(type)},
+            [value = std::move(value)](const LoadedItem& answer) { answer(value); }};
+}
+
+struct HostConnection::State final : QDBusVirtualObject {
+    State(const QString& address, std::vector<HostItem> hostItems, Handlers hostHandlers)
+        : items(std::move(hostItems)), handlers(std::move(hostHandlers)), server(address), watch([this] {
+              connection.reset();
+              if (const auto disconnected = std::exchange(handlers.disconnected, {}))
+                  disconnected();
+          })
+    {
+        connect(&server, &QDBusServer::newConnection, this, &State::accept);
+    }
+
+    ~State() override { close(); }
+
+    void accept(const QDBusConnection& peer)
+    {
+        if (accepted) {
+            QDBusConnection::disconnectFromPeer(peer.name());
+            return;
+        }
+        accepted = true;
+        connection = peer;
+        connection->registerVirtualObject(QLatin1String(kHostPath), this);
+        watch.watch(peer);
+        if (handlers.editorConnected)
+            handlers.editorConnected();
+    }
+
+    void close()
+    {
+        accepted = true;
+        handlers = {};
+        if (connection)
+            QDBusConnection::disconnectFromPeer(std::exchange(connection, std::nullopt)->name());
+    }
+
+    QString introspect(const QString& path) const override
+    {
+        return path == QLatin1String(kHostPath) ? QString::fromLatin1(kIntrospection) : QString();
+    }
+
+    bool handleMessage(const QDBusMessage& message, const QDBusConnection& peer) override
+    {
+        if (!connection || message.path() != QLatin1String(kHostPath))
+            return false;
+        if (message.interface() == QLatin1String(kRuntimeInterface)) {
+            if (message.member() == QLatin1String("InputItems") && message.signature().isEmpty())
+                return peer.send(message.createReply(QVariant::fromValue(wireItems())));
+            if (message.member() == QLatin1String("LoadItem") && message.signature() == QLatin1String("uus")) {
+                load(message, peer);
+                return true;
+            }
+        }
+        if (message.interface() == QLatin1String(kHostInterface) && message.member() == QLatin1String(kFinishMember)
+            && message.signature() == QLatin1String("as")) {
+            if (message.isReplyRequired())
+                peer.send(message.createReply());
+            if (const auto finished = std::exchange(handlers.finished, {}))
+                finished(fromQt(message.arguments().constFirst().toStringList()));
+            return true;
+        }
+        return false;
+    }
+
+    QList<WireItem> wireItems() const
+    {
+        QList<WireItem> list;
+        for (const HostItem& item : items) {
+            WireItem wire{toQt(item.title), {}};
+            for (const HostAttachment& attachment : item.attachments)
+                wire.attachments.append(toQt(attachment.types));
+            list.append(wire);
+        }
+        return list;
+    }
+
+    void load(const QDBusMessage& message, const QDBusConnection& peer)
+    {
+        const auto item = message.arguments().at(0).toUInt();
+        const auto attachment = message.arguments().at(1).toUInt();
+        if (item >= items.size() || attachment >= items[item].attachments.size()) {
+            peer.send(message.createErrorReply(QDBusError::InvalidArgs, QStringLiteral("there is no such item")));
+            return;
+        }
+        items[item].attachments[attachment].load([message, peer](const base::Result<runtime::Value>& loaded) {
+            const auto value = loaded ? toWire(loaded.value()) : base::Result<QVariant>(loaded.error());
+            peer.send(value ? message.createReply(QVariant::fromValue(QDBusVariant(value.value())))
+                            : message.createErrorReply(QDBusError::Failed, toQt(value.error()->description())));
+        });
+    }
+
+    std::vector<HostItem> items;
+    Handlers handlers;
+    QDBusServer server;
+    DisconnectWatch watch;
+    std::optional<QDBusConnection> connection;
+    bool accepted = false;
+};
+
+HostConnection::HostConnection(std::unique_ptr<State> state) : m_state(std::move(state)) {}
+
+HostConnection::~HostConnection() = default;
+
+base::Result<std::unique_ptr<HostConnection>> HostConnection::listen(const std::string& path,
+                                                                     std::vector<HostItem> items, Handlers handlers)
+{
+    registerWireTypes();
+    if (path.size() > kMaximumPathSize)
+        return base::Error::make(kErrorDomain, kTooLarge, "the path is too long for a socket: " + path);
+    auto state = std::make_unique<State>(toQt(addressOf(path)), std::move(items), std::move(handlers));
+    if (!state->server.isConnected())
+        return base::Error::make(kErrorDomain, kNotConnected,
+                                 "cannot listen at " + path + ": " + fromQt(state->server.lastError().message()));
+    return std::unique_ptr<HostConnection>(new HostConnection(std::move(state)));
+}
+
+std::string HostConnection::address() const
+{
+    return fromQt(m_state->server.address());
+}
+
+void HostConnection::disconnectEditor()
+{
+    m_state->close();
+}
+
+} // namespace dbus
