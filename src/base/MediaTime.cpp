@@ -1,6 +1,7 @@
 #include "base/MediaTime.h"
 
 #include <cmath>
+#include <initializer_list>
 #include <limits>
 #include <numeric>
 
@@ -23,17 +24,33 @@ MediaTime fromWide(Wide value, std::int32_t timescale)
     return MediaTime::make(static_cast<std::int64_t>(value), timescale);
 }
 
+/// What is invalid stays so, then what is indefinite; a number changes nothing about an infinity.
+MediaTime combinedBeyondNumbers(const MediaTime& a, const MediaTime& b, int sign)
+{
+    using Kind = MediaTime::Kind;
+    for (const Kind kind : {Kind::Invalid, Kind::Indefinite})
+        if (a.kind == kind || b.kind == kind)
+            return {0, 0, kind};
+    const Kind opposite = b.kind == Kind::PositiveInfinity ? Kind::NegativeInfinity : Kind::PositiveInfinity;
+    const Kind second = b.isNumeric() || sign > 0 ? b.kind : opposite;
+    if (a.isNumeric())
+        return {0, 0, second};
+    return b.isNumeric() || a.kind == second ? a : MediaTime::invalid();
+}
+
 MediaTime combined(const MediaTime& a, const MediaTime& b, int sign)
 {
-    if (!a.isNumeric())
-        return a;
-    if (!b.isNumeric())
-        return b;
+    if (!a.isNumeric() || !b.isNumeric())
+        return combinedBeyondNumbers(a, b, sign);
     const std::int64_t common = std::lcm<std::int64_t>(a.timescale, b.timescale);
-    if (common > std::numeric_limits<std::int32_t>::max())
-        return fromWide(Wide(a.value) + sign * Wide(b.convertedTo(a.timescale).value), a.timescale);
-    return fromWide(Wide(a.value) * (common / a.timescale) + sign * Wide(b.value) * (common / b.timescale),
-                    static_cast<std::int32_t>(common));
+    if (common <= std::numeric_limits<std::int32_t>::max()) {
+        const MediaTime exact =
+            fromWide(Wide(a.value) * (common / a.timescale) + sign * Wide(b.value) * (common / b.timescale),
+                     static_cast<std::int32_t>(common));
+        if (exact.isValid())
+            return exact;
+    }
+    return fromWide(Wide(a.value) + sign * rounded(Wide(b.value) * a.timescale, b.timescale), a.timescale);
 }
 
 double approximate(const MediaTime& time)

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <future>
+#include <memory>
 #include <utility>
 
 namespace base {
@@ -12,12 +13,14 @@ void Queue::run(const Task& task)
         task();
         return;
     }
-    std::promise<void> done;
-    post([&] {
+    // Shared: the caller goes on, and off its stack, while the task is still about to leave set_value().
+    const auto done = std::make_shared<std::promise<void>>();
+    const auto finished = done->get_future();
+    post([&task, done] {
         task();
-        done.set_value();
+        done->set_value();
     });
-    done.get_future().wait();
+    finished.wait();
 }
 
 MainQueue::MainQueue(const Clock& clock, std::function<void()> wake) : m_clock(clock), m_wake(std::move(wake)) {}
@@ -82,7 +85,7 @@ std::size_t MainQueue::runDue()
 
 void MainQueue::drain()
 {
-    while (runDue() > 0) { }
+    while (runDue() > 0) {}
 }
 
 std::optional<Instant> MainQueue::untilNext() const

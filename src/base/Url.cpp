@@ -1,11 +1,26 @@
 #include "base/Url.h"
 
-#include <cctype>
 #include <utility>
 
 namespace base {
 
 namespace {
+
+// Not std::isalnum, which asks the locale.
+bool isLetter(char character)
+{
+    return (character >= 'a' && character <= 'z') || (character >= 'A' && character <= 'Z');
+}
+
+bool isLetterOrDigit(char character)
+{
+    return isLetter(character) || (character >= '0' && character <= '9');
+}
+
+char lowered(char character)
+{
+    return character >= 'A' && character <= 'Z' ? static_cast<char>(character - 'A' + 'a') : character;
+}
 
 std::string encoded(std::string_view path)
 {
@@ -13,7 +28,8 @@ std::string encoded(std::string_view path)
     std::string text;
     for (const char character : path) {
         const auto byte = static_cast<unsigned char>(character);
-        if (std::isalnum(byte) || std::string_view("/-._~!$&'()*+,;=:@").find(character) != std::string_view::npos) {
+        if (isLetterOrDigit(character)
+            || std::string_view("/-._~!$&'()*+,;=:@").find(character) != std::string_view::npos) {
             text += character;
         } else {
             text += '%';
@@ -39,8 +55,8 @@ std::string decoded(std::string_view text)
 {
     std::string path;
     for (std::size_t i = 0; i < text.size(); ++i) {
-        const bool escape = text[i] == '%' && i + 2 < text.size() && hexDigit(text[i + 1]) >= 0
-            && hexDigit(text[i + 2]) >= 0;
+        const bool escape =
+            text[i] == '%' && i + 2 < text.size() && hexDigit(text[i + 1]) >= 0 && hexDigit(text[i + 2]) >= 0;
         path += escape ? static_cast<char>(hexDigit(text[i + 1]) * 16 + hexDigit(text[i + 2])) : text[i];
         i += escape ? 2 : 0;
     }
@@ -60,21 +76,23 @@ Url Url::fromPath(std::string path)
 std::optional<Url> Url::fromString(std::string_view text)
 {
     const auto colon = text.find(':');
-    if (colon == std::string_view::npos || colon == 0)
+    if (colon == std::string_view::npos || colon == 0 || !isLetter(text.front()))
         return std::nullopt;
-    for (const char character : text.substr(0, colon))
-        if (!std::isalnum(static_cast<unsigned char>(character)) && character != '+' && character != '-'
-            && character != '.')
+    std::string scheme;
+    for (const char character : text.substr(0, colon)) {
+        if (!isLetterOrDigit(character) && character != '+' && character != '-' && character != '.')
             return std::nullopt;
+        scheme += lowered(character);
+    }
     const std::string_view rest = text.substr(colon + 1);
-    if (text.substr(0, colon) == "file") {
+    if (scheme == "file") {
         if (!rest.starts_with("//"))
             return fromPath(decoded(rest));
         const auto slash = rest.find('/', 2);
         return fromPath(slash == std::string_view::npos ? "/" : decoded(rest.substr(slash)));
     }
     Url url;
-    url.m_scheme = std::string(text.substr(0, colon));
+    url.m_scheme = std::move(scheme);
     url.m_rest = std::string(rest);
     return url;
 }
@@ -87,7 +105,10 @@ std::string Url::lastPathComponent() const
 
 std::string Url::string() const
 {
-    return isFile() ? "file://" + encoded(m_path) : m_scheme + ":" + m_rest;
+    if (!isFile())
+        return m_scheme + ":" + m_rest;
+    // Behind two slashes the first part of a relative path would read as the name of a host.
+    return (m_path.starts_with('/') ? "file://" : "file:") + encoded(m_path);
 }
 
 } // namespace base

@@ -55,8 +55,7 @@ Implementation Class::implementation(const Selector& selector) const
 const InstanceVariable* Class::instanceVariable(const std::string& name) const
 {
     for (const Class* candidate = this; candidate; candidate = candidate->m_superclass)
-        if (const auto found = candidate->m_instanceVariables.find(name);
-            found != candidate->m_instanceVariables.end())
+        if (const auto found = candidate->m_instanceVariables.find(name); found != candidate->m_instanceVariables.end())
             return &found->second;
     return nullptr;
 }

@@ -98,7 +98,10 @@ public:
     ClassBuilder& method(std::string_view selector, R (T::*member)(Parameters...))
     {
         m_class->addMethod(Selector(selector), [member](Object& self, const Arguments& arguments) {
-            return detail::call(dynamic_cast<T&>(self), member, arguments, std::index_sequence_for<Parameters...>{});
+            // After an exchange with another class it can be an object of that one: not for this method.
+            auto* const receiver = dynamic_cast<T*>(&self);
+            return receiver ? detail::call(*receiver, member, arguments, std::index_sequence_for<Parameters...>{})
+                            : Value{};
         });
         return *this;
     }

@@ -46,6 +46,8 @@ private:
         bool anyObject;
     };
 
+    bool isRegistered(const Object& observer, const Selector& selector, const std::string& name) const;
+
     mutable std::mutex m_mutex;
     std::vector<Registration> m_registrations;
 };

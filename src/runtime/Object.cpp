@@ -44,7 +44,7 @@ bool Object::setInstanceVariable(const std::string& name, const Value& value)
 
 void Object::addObserver(KeyValueObserver& observer, std::string keyPath, void* context)
 {
-    m_observations.push_back({&observer, std::move(keyPath), context});
+    m_observations.push_back({&observer, std::move(keyPath), context, m_nextObservation++});
 }
 
 void Object::removeObserver(KeyValueObserver& observer, std::string_view keyPath)
@@ -61,9 +61,8 @@ void Object::didChangeValueForKey(std::string_view key)
     const auto keepAlive = weak_from_this().lock();
     const auto observations = m_observations;
     for (const Observation& observation : observations) {
-        const bool stillThere = std::any_of(m_observations.begin(), m_observations.end(), [&](const Observation& each) {
-            return each.observer == observation.observer && each.keyPath == observation.keyPath;
-        });
+        const bool stillThere = std::any_of(m_observations.begin(), m_observations.end(),
+                                            [&](const Observation& each) { return each.id == observation.id; });
         if (stillThere && observation.keyPath == key)
             observation.observer->observeValueForKeyPath_ofObject_change_context(key, *this, {}, observation.context);
     }

@@ -7,6 +7,7 @@
 #include "runtime/Selector.h"
 #include "runtime/Value.h"
 
+#include <cstdint>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -15,15 +16,14 @@
 namespace runtime {
 
 /// What a change of an observed key carries. Values travel only when the observer asked for them; ours never do.
-struct KeyValueChange { };
+struct KeyValueChange {};
 
 /// Is told of changes to the keys that it observes, on the thread that made the change.
 class CLIPSA_RUNTIME KeyValueObserver {
 public:
     virtual ~KeyValueObserver();
     virtual void observeValueForKeyPath_ofObject_change_context(std::string_view keyPath, Object& object,
-                                                                const KeyValueChange& change, void* context)
-        = 0;
+                                                                const KeyValueChange& change, void* context) = 0;
 };
 
 class CLIPSA_RUNTIME Object : public std::enable_shared_from_this<Object> {
@@ -54,10 +54,7 @@ public:
     /// A typed strong reference to this; only while one exists already.
     template <typename T> std::shared_ptr<T> self() { return std::dynamic_pointer_cast<T>(shared_from_this()); }
     /// A typed weak reference to this, empty during construction and destruction.
-    template <typename T> std::weak_ptr<T> weakSelf()
-    {
-        return std::dynamic_pointer_cast<T>(weak_from_this().lock());
-    }
+    template <typename T> std::weak_ptr<T> weakSelf() { return std::dynamic_pointer_cast<T>(weak_from_this().lock()); }
 
 protected:
     /// Tells the observers of `key`. They may come and go, and release this object, while they are told.
@@ -68,9 +65,11 @@ private:
         KeyValueObserver* observer;
         std::string keyPath;
         void* context;
+        std::uint64_t id; ///< tells entries of one observer for one key apart
     };
 
     std::vector<Observation> m_observations;
+    std::uint64_t m_nextObservation = 0;
 };
 
 /// Who is told what: a weak target and the message it gets. Sending does nothing once the target is gone, or when it
