@@ -74,7 +74,7 @@ TEST_F(Construction, EverythingStartsAsTheUserFindsIt)
 
 TEST_F(Construction, TheTitleShowsTheAppWithTheRecordingsDateHangingBelow)
 {
-    fake->files.addFile(kMovie, "movie", {1'234.0});
+    fake->files.addFile(kMovie, 5, base::Date{1'234.0});
     open();
     const auto title = editor->titleLabel();
     EXPECT_EQ(title->text(), "Game");
@@ -86,7 +86,7 @@ TEST_F(Construction, TheTitleShowsTheAppWithTheRecordingsDateHangingBelow)
     ASSERT_EQ(title->subviews().size(), 1U);
     const auto date = std::dynamic_pointer_cast<platform::Label>(title->subviews().front());
     ASSERT_TRUE(date);
-    EXPECT_EQ(date->text(), "at 1234");
+    EXPECT_EQ(date->text(), "MMMM d hh:mm a @ 1234");
     EXPECT_EQ(date->fontSize(), 10);
     EXPECT_EQ(date->frame(), Rect::make(0, 17, 120, 17));
     EXPECT_EQ(editor->titleButton()->view(), title);
@@ -170,7 +170,7 @@ TEST_F(Construction, ADeviceWithoutAHomeButtonHasTallerBars)
 {
     GTEST_FLAG_SET(death_test_style, "threadsafe");
     IN_A_PROCESS_OF_ITS_OWN({
-        fake->device.integers[platform::kDeviceHomeButtonKey] = 2;
+        fake->device.integers[std::string(platform::kDeviceHomeButtonKey)] = 2;
         open();
         EXPECT_FALSE(editor->hasHomeButton());
         EXPECT_EQ(editor->topToolBar()->frame(), Rect::make(0, 0, 360, 85));
@@ -184,7 +184,7 @@ TEST_F(Construction, AnyOtherAnswerMeansAHomeButton)
     for (const int answer : {0, 1, 3, -2}) {
         IN_A_PROCESS_OF_ITS_OWN({
             if (answer != 0)
-                fake->device.integers[platform::kDeviceHomeButtonKey] = answer;
+                fake->device.integers[std::string(platform::kDeviceHomeButtonKey)] = answer;
             open();
             EXPECT_TRUE(editor->hasHomeButton());
             EXPECT_EQ(editor->topToolBar()->frame(), Rect::make(0, 0, 360, 60));
@@ -198,7 +198,7 @@ TEST_F(Construction, TheHomeButtonIsAskedForOnceAProcess)
     GTEST_FLAG_SET(death_test_style, "threadsafe");
     IN_A_PROCESS_OF_ITS_OWN({
         open();
-        fake->device.integers[platform::kDeviceHomeButtonKey] = 2;
+        fake->device.integers[std::string(platform::kDeviceHomeButtonKey)] = 2;
         EXPECT_TRUE(editor->deviceHasHomeButton());
     });
 }

@@ -112,8 +112,8 @@ TEST_F(Lifecycle, ThePictureFillsTheViewAfterEachLayout)
 TEST_F(Lifecycle, AReleasedEditorLeavesNoTemporaryFile)
 {
     fake->files.addDirectory("/private/var/mobile/Library/Velkor");
-    fake->files.addFile("/private/var/mobile/Library/Velkor/movie.mp4", "movie");
-    fake->files.addFile("/private/var/mobile/Library/Velkor/Game_1.mp4", "trimmed");
+    fake->files.addFile("/private/var/mobile/Library/Velkor/movie.mp4", 5);
+    fake->files.addFile("/private/var/mobile/Library/Velkor/Game_1.mp4", 7);
     open();
     editor.reset();
     fake->window->setRootViewController(nullptr);

@@ -51,9 +51,13 @@ TEST_F(Playback, ChangesOfOtherObjectsAndKeysAreNotTheEditors)
 {
     fake->media.movies.clear();
     open();
-    tests::FakePlayerItem other(nullptr);
-    other.becomeReady(3);
-    editor->observeValueForKeyPath_ofObject_change_context("status", other, {}, nullptr);
+    const auto other = std::make_shared<tests::FakePlayerItem>(nullptr);
+    other->becomeReady(3);
+    editor->observeValueForKeyPath_ofObject_change_context("status", *other, {}, nullptr);
+    EXPECT_FALSE(editor->currentItemLoaded());
+    fake->media.item()->becomeReady(10);
+    editor->setCurrentItemLoaded(false);
+    editor->observeValueForKeyPath_ofObject_change_context("rate", *editor->avPlayerItem(), {}, nullptr);
     EXPECT_FALSE(editor->currentItemLoaded());
 }
 

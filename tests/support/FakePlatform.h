@@ -4,6 +4,7 @@
 #include "platform/hosting/Platform.h"
 #include "platform/views/Canvas.h"
 #include "platform/views/Window.h"
+#include "support/FakeCalendar.h"
 #include "support/FakeFileManager.h"
 #include "support/FakeMedia.h"
 #include "support/TestSystem.h"
@@ -59,30 +60,6 @@ public:
 
 private:
     const platform::Screen& m_screen;
-};
-
-/// Writes dates as their seconds: "at 1700000000".
-class FakeCalendar final : public platform::Calendar {
-public:
-    std::unique_ptr<platform::DateFormatter> makeDateFormatter() const override
-    {
-        return std::make_unique<Formatter>();
-    }
-    std::optional<platform::TimeZone> timeZoneWithName(const std::string& /*name*/) const override
-    {
-        return std::nullopt;
-    }
-
-private:
-    class Formatter final : public platform::DateFormatter {
-    public:
-        void setDateFormat(std::string /*format*/) override {}
-        void setTimeZone(const std::optional<platform::TimeZone>& /*zone*/) override {}
-        std::string stringFromDate(base::Date date) const override
-        {
-            return "at " + std::to_string(date.wholeSeconds());
-        }
-    };
 };
 
 /// The order of the members is the order in which they are made.

@@ -17,8 +17,9 @@ constexpr double kNoise = 1e-9;
 
 double withoutNoise(double value)
 {
-    // Adding zero turns a negative zero into a plain one.
-    return std::round(value / kNoise) * kNoise + 0.0;
+    // A power of two, so that the result is exact. Adding zero turns a negative zero into a plain one.
+    constexpr double kGrid = 1 << 20;
+    return std::round(value * kGrid) / kGrid + 0.0;
 }
 
 /// sum of factors × unknowns = constant.
@@ -165,6 +166,8 @@ private:
         const auto second = constraint.second.lock();
         if (!first || !add(equation, *first, constraint.firstAttribute, 1))
             return std::nullopt;
+        if (!second && constraint.secondAttribute != LayoutAttribute::None)
+            return std::nullopt; // its view is gone
         if (second && !add(equation, *second, constraint.secondAttribute, -constraint.multiplier))
             return std::nullopt;
         equation.constant += constraint.constant;
