@@ -1,0 +1,64 @@
+#include "support/TempMovieNames.h"
+#include "support/VKDateExtensions.h"
+
+#include "linux/icu/Calendar.h"
+#include "support/FakeCalendar.h"
+
+#include <gmock/gmock.h>
+
+namespace {
+
+using testing::ElementsAre;
+
+constexpr const char* kTempPath = "/private/var/mobile/Library/Velkor/";
+
+TEST(TheNameOfATemporaryMovie, IsStemSecondsAndExtensionBehindADoubledSlash)
+{
+    EXPECT_EQ(support::tempMovieUrl(support::tempMovieStem(kTempPath, support::kMixedMovieName), {1'700'000'000.9}),
+              base::Url::fromPath("/private/var/mobile/Library/Velkor//VKClipsa_Final1700000000.mp4"));
+    EXPECT_EQ(support::tempMovieUrl(support::tempMovieStem(kTempPath, support::kUploadMovieName), {1'700'000'000}),
+              base::Url::fromPath("/private/var/mobile/Library/Velkor//VKClipsa_YouTube1700000000.mp4"));
+    EXPECT_EQ(support::tempMovieUrl(support::tempMovieStem(kTempPath, support::trimmedMovieName("Chess")), {5.5}),
+              base::Url::fromPath("/private/var/mobile/Library/Velkor//Chess_5.mp4"));
+}
+
+TEST(TheNameOfATemporaryMovie, TruncatesTheTimeTowardZeroAndKeepsItsSign)
+{
+    EXPECT_EQ(support::tempMovieUrl("/a", {-1.9}).path(), "/a-1.mp4");
+    EXPECT_EQ(support::tempMovieUrl("/a", {-0.9}).path(), "/a0.mp4");
+    EXPECT_EQ(support::tempMovieUrl("/a", {4e12}).path(), "/a4000000000000.mp4");
+}
+
+TEST(TheNameOfATemporaryMovie, IsTheSameTwiceInASecond)
+{
+    EXPECT_EQ(support::tempMovieUrl("/a", {10.1}), support::tempMovieUrl("/a", {10.9}));
+}
+
+TEST(TheNameOfATemporaryMovie, KeepsTheLettersOfAnAppName)
+{
+    const auto url =
+        support::tempMovieUrl(support::tempMovieStem(kTempPath, support::trimmedMovieName("Šach %i")), {7});
+    EXPECT_EQ(url.lastPathComponent(), "Šach %i_7.mp4");
+}
+
+TEST(TheTextOfADate, NeedsANewFormatterEveryTimeAndStaysInTheDevicesZone)
+{
+    const tests::FakeCalendar calendar;
+    EXPECT_EQ(VKExtensions::_srGetStringFromDate(calendar, {42}), "MMMM d hh:mm a @ 42");
+    EXPECT_EQ(VKExtensions::_srGetStringFromDate(calendar, {43}), "MMMM d hh:mm a @ 43");
+    EXPECT_EQ(calendar.formattersMade, 2);
+    EXPECT_THAT(calendar.zonesAskedFor, ElementsAre("...", "..."));
+    EXPECT_THAT(calendar.zonesSet, ElementsAre("device", "device"));
+}
+
+TEST(TheTextOfADate, IsMonthDayAndTimeInAnEnglishLocaleInTheDevicesZone)
+{
+    constexpr base::Date kMarch5{1709669220}; // 5 March 2024, 20:07 UTC
+    const intl::Calendar calendar([](const char* name) -> std::string {
+        const std::string_view variable(name);
+        return variable == "LANG" ? "en_US.UTF-8" : variable == "TZ" ? "Europe/Berlin" : "";
+    });
+    EXPECT_EQ(VKExtensions::_srGetStringFromDate(calendar, kMarch5), "March 5 09:07 PM");
+}
+
+} // namespace
