@@ -117,7 +117,7 @@ std::shared_ptr<View> BarButtonItem::view()
     made->setEmphasized(looks.emphasized);
     made->setImageInsets(m_imageInsets);
     made->addTarget(weakSelf<runtime::Object>(), triggerSelector(), kTouchUpInside);
-    made->sizeToFit();
+    withoutAnimation([&] { made->sizeToFit(); });
     m_view = made;
     validate();
     return m_view;

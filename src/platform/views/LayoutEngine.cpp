@@ -15,13 +15,6 @@ enum Part : std::size_t { X, Y, Width, Height, PartCount };
 
 constexpr double kNoise = 1e-9;
 
-double withoutNoise(double value)
-{
-    // A power of two, so that the result is exact. Adding zero turns a negative zero into a plain one.
-    constexpr double kGrid = 1 << 20;
-    return std::round(value * kGrid) / kGrid + 0.0;
-}
-
 /// sum of factors × unknowns = constant.
 struct Equation {
     std::vector<double> factors;
@@ -215,6 +208,13 @@ private:
 };
 
 } // namespace
+
+double withoutNoise(double value)
+{
+    // A power of two, so that the result is exact. Adding zero turns a negative zero into a plain one.
+    constexpr double kGrid = 1 << 20;
+    return std::round(value * kGrid) / kGrid + 0.0;
+}
 
 void solveConstraints(View& owner, const std::vector<LayoutConstraint>& constraints)
 {

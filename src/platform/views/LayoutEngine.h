@@ -12,4 +12,7 @@ namespace platform {
 /// as it is, sizes before positions. Other views, and `owner` itself, are constants.
 void solveConstraints(View& owner, const std::vector<LayoutConstraint>& constraints);
 
+/// The value that was meant where arithmetic left a trace: on a grid much finer than any pixel.
+double withoutNoise(double value);
+
 } // namespace platform

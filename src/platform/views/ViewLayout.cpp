@@ -14,12 +14,6 @@ namespace {
 /// A layout that never settles is cut short after so many passes; it goes on with the next picture.
 constexpr int kMaxPasses = 4;
 
-double withoutNoise(double value)
-{
-    constexpr double kNoise = 1e-9;
-    return std::round(value / kNoise) * kNoise + 0.0;
-}
-
 struct Span {
     double origin;
     double size;
@@ -35,13 +29,11 @@ Span resized(Span span, double oldTotal, double newTotal, bool flexibleBefore, b
     const double after = oldTotal - span.origin - span.size;
     const double shared =
         (flexibleBefore ? span.origin : 0) + (flexibleSize ? span.size : 0) + (flexibleAfter ? after : 0);
-    const auto share = [&](bool isFlexible, double part) {
-        if (!isFlexible)
-            return 0.0;
+    const auto share = [&](double part) {
         return std::abs(shared) < 1e-9 ? change / flexible : change * part / shared;
     };
-    return {withoutNoise(span.origin + share(flexibleBefore, span.origin)),
-            withoutNoise(span.size + share(flexibleSize, span.size))};
+    return {flexibleBefore ? withoutNoise(span.origin + share(span.origin)) : span.origin,
+            flexibleSize ? withoutNoise(span.size + share(span.size)) : span.size};
 }
 
 } // namespace

@@ -1,0 +1,235 @@
+#include "platform/views/MovieScrubber.h"
+
+#include "Fixture.h"
+
+#include <cmath>
+
+namespace {
+
+using base::Rect;
+using platform::MovieScrubber;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+struct Movie final : platform::MovieScrubberDataSource, platform::MovieScrubberDelegate {
+    double movieScrubberDuration(MovieScrubber&) override { return duration; }
+    std::vector<double> movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(MovieScrubber&, std::int32_t count,
+                                                                                 double start, double end) override
+    {
+        std::vector<double> timestamps;
+        for (std::int32_t i = 0; i < count; ++i)
+            timestamps.push_back(start + (end - start) * i / count);
+        return timestamps;
+    }
+    double movieScrubberThumbnailAspectRatio(MovieScrubber&) override { return aspectRatio; }
+    void movieScrubber_requestThumbnailImageForTimestamp(MovieScrubber&, double timestamp) override
+    {
+        requested.push_back(timestamp);
+    }
+
+    void movieScrubber_valueDidChange(MovieScrubber&, double seconds) override { say("value", seconds); }
+    void movieScrubberDidBeginScrubbing_withHandle(MovieScrubber&, int handle) override
+    {
+        say("begin", handle);
+        if (onBegin)
+            onBegin();
+    }
+    void movieScrubberDidEndScrubbing_withHandle(MovieScrubber&, int handle) override { say("end", handle); }
+    void movieScrubber_editingStartValueDidChange(MovieScrubber&, double seconds) override { say("start", seconds); }
+    void movieScrubber_editingEndValueDidChange(MovieScrubber&, double seconds) override { say("finish", seconds); }
+    void movieScrubberDidBeginEditing(MovieScrubber&) override { said.emplace_back("editing"); }
+    void movieScrubberDidCancelEditing(MovieScrubber&) override { said.emplace_back("cancelled"); }
+
+    void say(const std::string& what, double number)
+    {
+        said.push_back(what + " " + std::to_string(std::lround(number)));
+    }
+
+    double duration = 30;
+    double aspectRatio = 0.5;
+    std::vector<double> requested;
+    std::vector<std::string> said;
+    std::function<void()> onBegin;
+};
+
+struct Scrubbers : tests::WindowFixture {
+    std::shared_ptr<Movie> movie = std::make_shared<Movie>();
+    std::shared_ptr<MovieScrubber> scrubber = std::make_shared<MovieScrubber>();
+
+    Scrubbers()
+    {
+        scrubber->setFrame(Rect::make(0, 100, 320, 38));
+        scrubber->setEdgeInset(10);
+        scrubber->setDataSource(movie);
+        scrubber->setDelegate(movie);
+        window->addSubview(scrubber);
+    }
+    static platform::ImageRef picture()
+    {
+        return std::make_shared<const platform::Image>(platform::Bitmap::transparent(1, 1), 1.0);
+    }
+};
+
+TEST_F(Scrubbers, ThePlayHeadStandsInProportionOnTheTrack)
+{
+    EXPECT_EQ(scrubber->trackRect(), Rect::make(10, 0, 300, 38));
+    EXPECT_EQ(scrubber->playHeadX(), 10);
+    scrubber->reloadData();
+    scrubber->setValue(15);
+    EXPECT_EQ(scrubber->playHeadX(), 160);
+    EXPECT_THAT(movie->said, IsEmpty());
+}
+
+TEST_F(Scrubbers, TheValueIsLimitedOnceTheDurationIsKnown)
+{
+    scrubber->setValue(100);
+    EXPECT_EQ(scrubber->value(), 100);
+    scrubber->reloadData();
+    EXPECT_EQ(scrubber->value(), 30);
+    scrubber->setValue(-1);
+    EXPECT_EQ(scrubber->value(), 0);
+    scrubber->setValue(std::nan(""));
+    EXPECT_EQ(scrubber->value(), 0);
+    EXPECT_THAT(movie->said, IsEmpty());
+}
+
+TEST_F(Scrubbers, AFingerAnywhereMovesThePlayHead)
+{
+    scrubber->reloadData();
+    window->touchDown({1, {110, 110}, {}});
+    window->touchMove({1, {210, 400}, {}});
+    window->touchMove({1, {210, 401}, {}});
+    window->touchMove({1, {390, 110}, {}});
+    window->touchUp({1, {390, 110}, {}});
+    EXPECT_THAT(movie->said, ElementsAre("begin 1", "value 10", "value 20", "value 30", "end 1"));
+}
+
+TEST_F(Scrubbers, ASecondFingerIsIgnored)
+{
+    scrubber->reloadData();
+    window->touchDown({1, {110, 110}, {}});
+    window->touchDown({2, {210, 110}, {}});
+    window->touchUp({2, {210, 110}, {}});
+    window->touchCancel({1, {110, 110}, {}});
+    EXPECT_THAT(movie->said, ElementsAre("begin 1", "value 10", "end 1"));
+}
+
+TEST_F(Scrubbers, WithoutADurationDragsAreIgnored)
+{
+    for (const double duration : {std::nan(""), 0.0, -1.0, HUGE_VAL}) {
+        movie->duration = duration;
+        scrubber->setValue(7);
+        scrubber->reloadData();
+        tap(110, 110);
+        scrubber->scrubTo(3);
+        EXPECT_EQ(scrubber->value(), 7);
+        EXPECT_EQ(scrubber->duration(), 0);
+        EXPECT_THAT(scrubber->timestamps(), IsEmpty());
+    }
+    EXPECT_THAT(movie->said, IsEmpty());
+}
+
+TEST_F(Scrubbers, ADisabledOneIgnoresDrags)
+{
+    scrubber->reloadData();
+    scrubber->setEnabled(false);
+    tap(110, 110);
+    EXPECT_THAT(movie->said, IsEmpty());
+}
+
+TEST_F(Scrubbers, AMovieThatGoesAwayEndsTheDrag)
+{
+    scrubber->reloadData();
+    window->touchDown({1, {110, 110}, {}});
+    movie->duration = 0;
+    scrubber->reloadData();
+    window->touchUp({1, {210, 110}, {}});
+    EXPECT_THAT(movie->said, ElementsAre("begin 1", "value 10", "end 1"));
+}
+
+TEST_F(Scrubbers, TheDelegateMayTakeItAway)
+{
+    scrubber->reloadData();
+    movie->onBegin = [this] {
+        scrubber->removeFromSuperview();
+        scrubber.reset();
+        movie.reset();
+    };
+    tap(110, 110);
+    EXPECT_EQ(scrubber, nullptr);
+}
+
+TEST_F(Scrubbers, ScrubbingByKeysBeginsAndEnds)
+{
+    scrubber->reloadData();
+    scrubber->scrubTo(12);
+    scrubber->scrubTo(std::nan(""));
+    EXPECT_THAT(movie->said, ElementsAre("begin 1", "value 12", "end 1"));
+}
+
+TEST_F(Scrubbers, AsksForAsManyPicturesAsFit)
+{
+    scrubber->reloadData();
+    EXPECT_EQ(scrubber->timestamps().size(), 16U);
+    EXPECT_EQ(movie->requested, scrubber->timestamps());
+}
+
+TEST_F(Scrubbers, KeepsOnlyPicturesOfCurrentTimestamps)
+{
+    scrubber->reloadData();
+    const double second = scrubber->timestamps()[1];
+    scrubber->setThumbnailImage_forTimestamp(picture(), second);
+    scrubber->setThumbnailImage_forTimestamp(picture(), 0.123);
+    scrubber->setThumbnailImage_forTimestamp(nullptr, 0);
+    EXPECT_EQ(scrubber->thumbnails().size(), 1U);
+    movie->duration = 7;
+    scrubber->reloadData();
+    EXPECT_THAT(scrubber->thumbnails(), IsEmpty());
+}
+
+TEST_F(Scrubbers, ANewWidthAsksForTheMissingPicturesOnly)
+{
+    movie->aspectRatio = 300.0 / 38 / 2;
+    scrubber->reloadData();
+    window->commit();
+    EXPECT_THAT(movie->requested, ElementsAre(0, 15));
+    scrubber->setThumbnailImage_forTimestamp(picture(), 0);
+    movie->requested.clear();
+    scrubber->setFrame(Rect::make(0, 100, 620, 38));
+    window->commit();
+    EXPECT_THAT(movie->requested, ElementsAre(7.5, 15, 22.5));
+    EXPECT_EQ(scrubber->thumbnails().size(), 1U);
+}
+
+TEST_F(Scrubbers, ASourceThatIsGoneLeavesNothing)
+{
+    scrubber->reloadData();
+    movie.reset();
+    scrubber->reloadData();
+    EXPECT_EQ(scrubber->duration(), 0);
+    EXPECT_THAT(scrubber->timestamps(), IsEmpty());
+}
+
+TEST_F(Scrubbers, IsASliderToAssistiveTechnology)
+{
+    scrubber->reloadData();
+    scrubber->setValue(5.9);
+    const auto description = scrubber->accessibility();
+    EXPECT_EQ(description.role, platform::AccessibilityRole::Slider);
+    EXPECT_EQ(description.name, "Position");
+    EXPECT_EQ(description.value, "0:05 of 0:30");
+    EXPECT_EQ(description.maximum, 30);
+    movie->duration = 3700;
+    scrubber->reloadData();
+    EXPECT_EQ(scrubber->accessibility().value, "0:05 of 1:01:40");
+}
+
+TEST_F(Scrubbers, EditingIsAState)
+{
+    EXPECT_FALSE(scrubber->isEditing());
+    scrubber->setEditing_animated(true, true);
+    EXPECT_TRUE(scrubber->isEditing());
+    EXPECT_THAT(movie->said, IsEmpty());
+}
+
+} // namespace
