@@ -1,0 +1,166 @@
+#include "linux/ffmpeg/Demuxer.h"
+
+#include <algorithm>
+#include <string_view>
+
+namespace ffmpeg {
+
+namespace {
+
+constexpr int kBufferSize = 64 * 1024;
+constexpr int kErrorsInARow = 64; ///< after so many failed reads without a packet there is nothing more to come
+
+/// Formats that hold movies in one file. Playlists and the like, which name other files, are left out on purpose.
+constexpr const char* kFormats = "mov,mp4,matroska,webm,mpegts,mpeg,avi,flv,ogg,asf,nut,ivf,h264,hevc,m4v,gif,"
+                                 "wav,mp3,aac,flac,caf,aiff,w64,apng";
+
+int refuseToOpen(AVFormatContext*, AVIOContext**, const char*, int, AVDictionary**)
+{
+    return AVERROR(EPERM);
+}
+
+bool isKnown(const AVStream& stream)
+{
+    const AVCodecParameters& parameters = *stream.codecpar;
+    if (parameters.codec_type == AVMEDIA_TYPE_VIDEO)
+        return parameters.codec_id != AV_CODEC_ID_NONE && parameters.width > 0 && parameters.height > 0;
+    if (parameters.codec_type == AVMEDIA_TYPE_AUDIO)
+        return parameters.codec_id != AV_CODEC_ID_NONE && parameters.sample_rate > 0
+               && parameters.ch_layout.nb_channels > 0;
+    return parameters.codec_type != AVMEDIA_TYPE_UNKNOWN;
+}
+
+} // namespace
+
+Demuxer::Demuxer(std::shared_ptr<OpenFile> file, Cancelled cancelled)
+    : m_file(std::move(file)), m_cancelled(std::move(cancelled))
+{
+}
+
+Demuxer::~Demuxer() = default;
+
+int Demuxer::readBytes(void* self, std::uint8_t* into, int count)
+{
+    auto& demuxer = *static_cast<Demuxer*>(self);
+    if (demuxer.isCancelled())
+        return AVERROR_EXIT;
+    const std::int64_t got = demuxer.m_file->read(demuxer.m_position, into, static_cast<std::size_t>(count));
+    if (got == 0)
+        return AVERROR_EOF;
+    if (got < 0)
+        return static_cast<int>(got);
+    demuxer.m_position += got;
+    return static_cast<int>(got);
+}
+
+std::int64_t Demuxer::moveTo(void* self, std::int64_t offset, int whence)
+{
+    auto& demuxer = *static_cast<Demuxer*>(self);
+    const std::int64_t size = demuxer.m_file->size();
+    if (whence & AVSEEK_SIZE)
+        return size;
+    switch (whence & ~AVSEEK_FORCE) {
+    case SEEK_SET:
+        break;
+    case SEEK_CUR:
+        offset += demuxer.m_position;
+        break;
+    case SEEK_END:
+        offset += size;
+        break;
+    default:
+        return AVERROR(EINVAL);
+    }
+    if (offset < 0)
+        return AVERROR(EINVAL);
+    return demuxer.m_position = offset;
+}
+
+base::Result<std::unique_ptr<Demuxer>> Demuxer::open(std::shared_ptr<OpenFile> file, Cancelled cancelled)
+{
+    std::unique_ptr<Demuxer> demuxer(new Demuxer(std::move(file), std::move(cancelled)));
+    auto* buffer = static_cast<std::uint8_t*>(av_malloc(kBufferSize));
+    demuxer->m_io.reset(avio_alloc_context(buffer, kBufferSize, 0, demuxer.get(), readBytes, nullptr, moveTo));
+
+    AVFormatContext* context = avformat_alloc_context();
+    context->pb = demuxer->m_io.get();
+    context->io_open = refuseToOpen;
+    context->interrupt_callback = {[](void* self) { return int(static_cast<Demuxer*>(self)->isCancelled()); },
+                                   demuxer.get()};
+    context->max_streams = 64;
+    context->probesize = 4 << 20;
+    context->max_analyze_duration = 2 * AV_TIME_BASE;
+    context->format_whitelist = av_strdup(kFormats);
+    int error = avformat_open_input(&context, nullptr, nullptr, nullptr); // frees the context when it fails
+    if (error >= 0) {
+        demuxer->m_context.reset(context);
+        // Movies with a header need no look at their packets, which would delay the first picture.
+        const bool known = demuxer->isMov() || demuxer->seeksByTable();
+        const auto streams = context->streams;
+        if (!known || context->nb_streams == 0
+            || !std::all_of(streams, streams + context->nb_streams, [](AVStream* each) { return isKnown(*each); }))
+            error = avformat_find_stream_info(context, nullptr);
+    }
+    if (error < 0)
+        return base::Error::make("ffmpeg", error,
+                                 "“" + demuxer->m_file->name() + "” is not a movie that can be opened: " + textOf(error)
+                                     + ".");
+    return demuxer;
+}
+
+void Demuxer::select(const std::vector<int>& streams)
+{
+    for (int i = 0; i < streamCount(); ++i) {
+        const bool wanted = std::find(streams.begin(), streams.end(), i) != streams.end();
+        stream(i).discard = wanted ? AVDISCARD_DEFAULT : AVDISCARD_ALL;
+    }
+}
+
+int Demuxer::read(AVPacket& packet)
+{
+    av_packet_unref(&packet);
+    for (int tries = 0; tries < kErrorsInARow; ++tries) {
+        if (isCancelled())
+            return AVERROR_EXIT;
+        const int result = av_read_frame(m_context.get(), &packet);
+        if (result >= 0 && stream(packet.stream_index).discard < AVDISCARD_ALL)
+            return 0;
+        if (result == AVERROR_EOF || result == AVERROR_EXIT || result == AVERROR(EIO))
+            return result;
+        if (result >= 0)
+            tries = -1; // a packet that nobody wanted
+        av_packet_unref(&packet);
+    }
+    return AVERROR_INVALIDDATA;
+}
+
+bool Demuxer::seek(int stream, std::int64_t timestamp)
+{
+    return av_seek_frame(m_context.get(), stream, timestamp, AVSEEK_FLAG_BACKWARD) >= 0;
+}
+
+bool Demuxer::seekToByte(std::int64_t position)
+{
+    return avformat_seek_file(m_context.get(), -1, 0, position, position, AVSEEK_FLAG_BYTE) >= 0;
+}
+
+bool Demuxer::seekToStart(int stream)
+{
+    if (!seeksByTable())
+        return seekToByte(0);
+    // Some formats search forwards from a negative time only; far enough before any start, and no overflow in sums.
+    return seek(stream, INT64_MIN / 4) || seekToByte(0);
+}
+
+bool Demuxer::seeksByTable() const
+{
+    const std::string_view name = m_context->iformat->name;
+    return isMov() || name.find("matroska") != std::string_view::npos;
+}
+
+bool Demuxer::isMov() const
+{
+    return std::string_view(m_context->iformat->name).find("mov") != std::string_view::npos;
+}
+
+} // namespace ffmpeg

@@ -1,0 +1,58 @@
+/// Reads a file's packets. One thread at a time; each reader of a movie has a demuxer of its own over the shared file.
+#pragma once
+
+#include "base/Result.h"
+#include "linux/ffmpeg/Libraries.h"
+#include "linux/ffmpeg/OpenFile.h"
+
+#include <atomic>
+#include <memory>
+#include <vector>
+
+namespace ffmpeg {
+
+/// Set by whoever no longer wants the result; reading then fails soon. Shared, because the reader may live longer.
+using Cancelled = std::shared_ptr<const std::atomic<bool>>;
+
+class Demuxer {
+public:
+    /// Reads the header, and as much more as it takes to know each stream's codec.
+    /// Nothing but `file` is ever read, whatever the movie refers to.
+    static base::Result<std::unique_ptr<Demuxer>> open(std::shared_ptr<OpenFile> file, Cancelled cancelled);
+    ~Demuxer();
+
+    const OpenFile& file() const { return *m_file; }
+    AVFormatContext& context() { return *m_context; }
+    AVStream& stream(int index) { return *m_context->streams[index]; }
+    int streamCount() const { return static_cast<int>(m_context->nb_streams); }
+    bool isCancelled() const { return m_cancelled && *m_cancelled; }
+    /// From now on reading stops when this is set.
+    void setCancelled(Cancelled cancelled) { m_cancelled = std::move(cancelled); }
+
+    /// Only the packets of these streams are read.
+    void select(const std::vector<int>& streams);
+    /// 0, AVERROR_EOF at the end or where the file is cut, or another error after which nothing more can be read.
+    int read(AVPacket& packet);
+    /// To the keyframe at or before `timestamp` of `stream`. False when the file cannot do that.
+    bool seek(int stream, std::int64_t timestamp);
+    bool seekToByte(std::int64_t position);
+    bool seekToStart(int stream);
+
+    /// Whether the file's own table finds keyframes; a movie without one needs a PacketIndex.
+    bool seeksByTable() const;
+    bool isMov() const;
+
+private:
+    Demuxer(std::shared_ptr<OpenFile> file, Cancelled cancelled);
+
+    static int readBytes(void* self, std::uint8_t* into, int count);
+    static std::int64_t moveTo(void* self, std::int64_t offset, int whence);
+
+    std::shared_ptr<OpenFile> m_file;
+    Cancelled m_cancelled;
+    std::int64_t m_position = 0;
+    Owned<AVIOContext> m_io;
+    Owned<AVFormatContext> m_context;
+};
+
+} // namespace ffmpeg

@@ -1,0 +1,41 @@
+/// The media engine on the FFmpeg libraries. Main queue only; outlives neither the system nor the notification center.
+///
+/// Assets of one URL share one open file: while any of them (or a player of one) lives, the movie can be read, even
+/// after its file was removed. Players may outlive the framework.
+#pragma once
+
+#include "base/System.h"
+#include "linux/ffmpeg/AudioOutput.h"
+#include "platform/media/MediaFramework.h"
+#include "runtime/NotificationCenter.h"
+
+#include <functional>
+#include <memory>
+#include <string>
+
+namespace ffmpeg {
+
+struct Engine;
+
+struct Options {
+    /// From the path that a URL names to the one that is opened; called on a worker. The path itself when empty.
+    std::function<std::string(const std::string&)> resolvePath;
+    /// The device that is heard. Empty plays silently, by the system's clock.
+    MakeAudioOutput audioOutput;
+};
+
+class FFmpegMediaFramework final : public platform::MediaFramework {
+public:
+    FFmpegMediaFramework(const base::System& system, runtime::NotificationCenter& center, Options options);
+    ~FFmpegMediaFramework() override;
+
+    std::shared_ptr<platform::Asset> assetWithURL(const std::optional<base::Url>& url) override;
+    /// `asset` must be one of this framework's.
+    std::shared_ptr<platform::PlayerItem> playerItemWithAsset(const std::shared_ptr<platform::Asset>& asset) override;
+    std::shared_ptr<platform::Player> playerWithPlayerItem(const std::shared_ptr<platform::PlayerItem>& item) override;
+
+private:
+    std::shared_ptr<Engine> m_engine;
+};
+
+} // namespace ffmpeg

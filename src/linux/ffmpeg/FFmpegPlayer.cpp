@@ -1,0 +1,278 @@
+#include "linux/ffmpeg/FFmpegPlayer.h"
+
+#include <algorithm>
+#include <utility>
+
+namespace ffmpeg {
+
+using base::MediaTime;
+
+std::shared_ptr<FFmpegPlayer> FFmpegPlayer::make(const std::shared_ptr<Engine>& engine,
+                                                 std::shared_ptr<FFmpegPlayerItem> item)
+{
+    const std::shared_ptr<FFmpegPlayer> player(new FFmpegPlayer(engine, std::move(item)));
+    if (player->m_item) {
+        player->m_item->setTimeSource([raw = player.get()] { return raw->currentTime(); });
+        player->m_item->ffmpegAsset()->whenLoaded([weak = player->weakSelf<FFmpegPlayer>()] {
+            if (const auto self = weak.lock())
+                self->movieLoaded();
+        });
+    }
+    return player;
+}
+
+FFmpegPlayer::FFmpegPlayer(std::shared_ptr<Engine> engine, std::shared_ptr<FFmpegPlayerItem> item)
+    : m_engine(std::move(engine)), m_item(std::move(item))
+{
+}
+
+FFmpegPlayer::~FFmpegPlayer()
+{
+    if (m_item)
+        m_item->setTimeSource({});
+    if (m_pictures)
+        m_pictures->cancel();
+    m_engine->retire(std::move(m_pictures));
+}
+
+void FFmpegPlayer::movieLoaded()
+{
+    m_movie = m_item->ffmpegAsset()->movie();
+    if (!m_movie)
+        return;
+    m_target = clamped(m_target);
+    m_position = m_target.convertedTo(m_movie->timescale());
+    const auto keepAlive = shared_from_this();
+    if (const auto& video = m_movie->video()) {
+        base::MainQueue& main = m_engine->system.mainQueue;
+        m_pictures = std::make_unique<PictureWorker>(
+            m_movie, [weak = weakSelf<FFmpegPlayer>(), &main](std::uint64_t generation, FrameRef frame) {
+                main.post([weak, generation, frame = std::move(frame)] {
+                    // Locked here: see FFmpegAsset::load().
+                    if (const auto self = weak.lock())
+                        self->picturesArrived(generation, frame);
+                });
+            });
+        if (video->tickAt(m_target) <= std::max(m_movie->firstFrame()->pts(), video->origin))
+            setFrame(m_movie->firstFrame());
+    }
+    goTo(m_target);
+}
+
+base::MediaTime FFmpegPlayer::currentTime() const
+{
+    if (!m_running)
+        return m_position;
+    const auto elapsed = m_engine->system.clock.now() - m_startedAt;
+    const MediaTime now =
+        m_position + MediaTime::make(elapsed.count(), 1'000'000'000).convertedTo(m_movie->timescale());
+    return now < m_movie->duration() ? now : m_movie->duration();
+}
+
+base::MediaTime FFmpegPlayer::clamped(MediaTime time) const
+{
+    const MediaTime start = MediaTime::make(0, time.timescale);
+    if (time < start)
+        return start;
+    return m_movie && time > m_movie->duration() ? m_movie->duration() : time;
+}
+
+void FFmpegPlayer::play()
+{
+    if (m_playing)
+        return;
+    m_playing = true;
+    if (m_movie)
+        start();
+}
+
+void FFmpegPlayer::pause()
+{
+    if (!m_playing)
+        return;
+    halt();
+    m_playing = false;
+    if (m_movie)
+        goTo(m_position);
+}
+
+void FFmpegPlayer::seekToTime(MediaTime time)
+{
+    if (!time.isNumeric())
+        return;
+    goTo(clamped(time));
+    m_engine->system.mainQueue.post([weak = weakSelf<FFmpegPlayer>()] {
+        if (const auto self = weak.lock())
+            self->m_observers.jumped(self->currentTime());
+    });
+}
+
+/// Stands at `time`, which is within the movie, and goes on from there when it is playing.
+void FFmpegPlayer::goTo(MediaTime time)
+{
+    m_running = false;
+    m_settled = !m_pictures;
+    m_target = time;
+    m_position = m_movie ? time.convertedTo(m_movie->timescale()) : time;
+    if (!m_movie)
+        return;
+    if (m_playing)
+        start();
+    else if (m_pictures)
+        m_pictures->show(++m_generation, m_movie->video()->tickAt(m_target));
+}
+
+void FFmpegPlayer::start()
+{
+    ++m_generation;
+    ++m_tickSerial;
+    m_running = false;
+    m_picturesReady = !m_pictures;
+    if (m_pictures)
+        m_pictures->play(m_generation, m_movie->video()->tickAt(m_target));
+    m_engine->system.mainQueue.post([weak = weakSelf<FFmpegPlayer>(), generation = m_generation] {
+        const auto self = weak.lock();
+        if (self && self->m_generation == generation)
+            self->runWhenReady();
+    });
+}
+
+void FFmpegPlayer::picturesArrived(std::uint64_t generation, const FrameRef& frame)
+{
+    if (generation != m_generation)
+        return;
+    const auto keepAlive = shared_from_this();
+    if (frame) {
+        setFrame(frame);
+        if (generation != m_generation)
+            return;
+    }
+    if (m_running) {
+        tick();
+    } else if (m_playing) {
+        m_picturesReady = true;
+        runWhenReady();
+    } else {
+        m_settled = !frame || !frame->isReduced();
+    }
+}
+
+bool FFmpegPlayer::hasPictures() const
+{
+    return !m_pictures || m_pictures->isAhead();
+}
+
+void FFmpegPlayer::runWhenReady()
+{
+    if (!m_playing || m_running || !m_picturesReady)
+        return;
+    m_startedAt = m_engine->system.clock.now();
+    m_toldTo = m_position;
+    m_running = true;
+    tick();
+}
+
+/// Stops time where it is. Whoever calls then says what the workers do.
+void FFmpegPlayer::halt()
+{
+    m_target = m_position = currentTime();
+    m_running = false;
+    ++m_generation;
+    ++m_tickSerial;
+}
+
+void FFmpegPlayer::tick()
+{
+    const auto keepAlive = shared_from_this();
+    const std::uint64_t generation = m_generation;
+    // Whoever is called can pause or seek: then this run is over.
+    const auto isOver = [&] { return generation != m_generation || !m_running; };
+    const MediaTime now = currentTime();
+    if (m_pictures) {
+        if (const FrameRef due = m_pictures->takeDue(m_movie->video()->tickAt(now))) {
+            setFrame(due);
+            if (isOver())
+                return;
+        }
+    }
+    m_observers.played(std::exchange(m_toldTo, now), now);
+    if (isOver())
+        return;
+    if (now >= m_movie->duration())
+        reachEnd();
+    else
+        scheduleTick();
+}
+
+void FFmpegPlayer::scheduleTick()
+{
+    const MediaTime now = currentTime();
+    MediaTime next = m_movie->duration();
+    const auto consider = [&](MediaTime time) {
+        if (time < next)
+            next = time;
+    };
+    if (m_pictures) {
+        if (const auto due = m_pictures->nextDue())
+            consider(m_movie->video()->timeOf(*due));
+    }
+    if (const auto due = m_observers.nextAfter(m_toldTo))
+        consider(*due);
+    if (next < now)
+        next = now;
+    m_engine->system.mainQueue.postAfter(untilTick(next), [weak = weakSelf<FFmpegPlayer>(), serial = ++m_tickSerial] {
+        const auto self = weak.lock();
+        if (self && self->m_running && self->m_tickSerial == serial)
+            self->tick();
+    });
+}
+
+/// Rounded up in both units, so that the time is there when the tick comes: a tick too early would have to come again.
+base::Instant FFmpegPlayer::untilTick(MediaTime next) const
+{
+    const std::int32_t timescale = m_movie->timescale();
+    MediaTime ticks = next.convertedTo(timescale);
+    if (ticks < next)
+        ++ticks.value;
+    const std::int64_t fromStart = ticks.value - m_position.convertedTo(timescale).value;
+    const base::Instant due(av_rescale_rnd(fromStart, 1'000'000'000, timescale, AV_ROUND_UP));
+    return std::max(base::Instant(0), m_startedAt + due - m_engine->system.clock.now());
+}
+
+void FFmpegPlayer::reachEnd()
+{
+    halt();
+    m_target = m_position = m_movie->duration();
+    if (m_actionAtItemEnd == platform::ActionAtItemEnd::Pause)
+        m_playing = false;
+    m_engine->center.post(platform::kPlayerItemDidPlayToEndNotification, m_item);
+}
+
+void FFmpegPlayer::setFrame(const FrameRef& frame)
+{
+    if (m_frame && m_frame->pts() == frame->pts() && m_frame->isReduced() == frame->isReduced())
+        return;
+    m_frame = frame;
+    if (const auto handler = m_frameHandler)
+        handler();
+}
+
+platform::Player::ObserverToken FFmpegPlayer::addPeriodicTimeObserver(MediaTime interval,
+                                                                      std::function<void(MediaTime)> callback)
+{
+    auto token = m_observers.addPeriodic(interval, std::move(callback));
+    if (m_running)
+        scheduleTick();
+    return token;
+}
+
+platform::Player::ObserverToken FFmpegPlayer::addBoundaryTimeObserver(std::vector<MediaTime> times,
+                                                                      std::function<void()> callback)
+{
+    auto token = m_observers.addBoundary(std::move(times), std::move(callback));
+    if (m_running)
+        scheduleTick();
+    return token;
+}
+
+} // namespace ffmpeg

@@ -1,0 +1,91 @@
+/// Plays an item: the current picture, the sound, and who is told when. Main queue only.
+///
+/// Time goes on with what the sound device has played; where nothing is heard, with the system's clock. It stands still
+/// after play() and seeks until picture and sound are there.
+#pragma once
+
+#include "linux/ffmpeg/Engine.h"
+#include "linux/ffmpeg/FFmpegPlayerItem.h"
+#include "linux/ffmpeg/PictureWorker.h"
+#include "platform/media/Player.h"
+#include "platform/media/TimeObservers.h"
+
+#include <cstdint>
+#include <functional>
+#include <memory>
+
+namespace ffmpeg {
+
+class FFmpegPlayer final : public platform::Player {
+public:
+    /// `item` may be null: then nothing is ever played.
+    static std::shared_ptr<FFmpegPlayer> make(const std::shared_ptr<Engine>& engine,
+                                              std::shared_ptr<FFmpegPlayerItem> item);
+    ~FFmpegPlayer() override;
+
+    std::shared_ptr<platform::PlayerItem> currentItem() const override { return m_item; }
+    /// At the end of the item it ends again at once.
+    void play() override;
+    void pause() override;
+    bool isPlaying() const override { return m_playing; }
+    base::MediaTime currentTime() const override;
+    void seekToTime(base::MediaTime time) override;
+    void setActionAtItemEnd(platform::ActionAtItemEnd action) override { m_actionAtItemEnd = action; }
+    ObserverToken addPeriodicTimeObserver(base::MediaTime interval,
+                                          std::function<void(base::MediaTime)> callback) override;
+    ObserverToken addBoundaryTimeObserver(std::vector<base::MediaTime> times, std::function<void()> callback) override;
+    void removeTimeObserver(const ObserverToken& token) override { m_observers.remove(token); }
+    platform::VideoFrameRef currentFrame() const override { return m_frame; }
+    void setFrameHandler(std::function<void()> handler) override { m_frameHandler = std::move(handler); }
+
+    /// Whether time goes on: playing, and neither picture nor sound is waited for.
+    bool isRunning() const { return m_running; }
+    /// Paused, and the full picture for where it stands is shown (or there is none).
+    bool isSettled() const { return !m_playing && m_movie && m_settled; }
+    /// While running: whether the next picture has been decoded, or there is none any more.
+    bool hasPictures() const;
+
+private:
+    FFmpegPlayer(std::shared_ptr<Engine> engine, std::shared_ptr<FFmpegPlayerItem> item);
+
+    // Loading and positions.
+    void movieLoaded();
+    base::MediaTime clamped(base::MediaTime time) const;
+    void goTo(base::MediaTime time);
+
+    // From play() to running, and back.
+    void start();
+    void picturesArrived(std::uint64_t generation, const FrameRef& frame);
+    void runWhenReady();
+    void halt();
+
+    // While running.
+    void tick();
+    void scheduleTick();
+    base::Instant untilTick(base::MediaTime next) const;
+    void reachEnd();
+    void setFrame(const FrameRef& frame);
+
+    std::shared_ptr<Engine> m_engine;
+    std::shared_ptr<FFmpegPlayerItem> m_item;
+    std::shared_ptr<Movie> m_movie;
+    std::unique_ptr<PictureWorker> m_pictures;
+
+    platform::TimeObservers m_observers;
+    FrameRef m_frame;
+    std::function<void()> m_frameHandler;
+    platform::ActionAtItemEnd m_actionAtItemEnd = platform::ActionAtItemEnd::Pause;
+
+    bool m_playing = false;
+    bool m_running = false;
+    bool m_picturesReady = false;
+    bool m_settled = false;
+    base::MediaTime m_position = base::MediaTime::zero(); ///< where it stands, or from where it runs
+    base::MediaTime m_target = base::MediaTime::zero();   ///< the same, as exactly as it was asked for
+    base::MediaTime m_toldTo;                             ///< observers were told of all moments up to this
+    base::Instant m_startedAt{0};
+    std::uint64_t m_generation = 0; ///< grows with each seek, play and pause
+    std::uint64_t m_tickSerial = 0; ///< only the latest scheduled tick counts
+};
+
+} // namespace ffmpeg

@@ -1,0 +1,205 @@
+#include "linux/ffmpeg/Movie.h"
+
+#include "linux/ffmpeg/VideoDecoder.h"
+
+#include <algorithm>
+#include <utility>
+
+namespace ffmpeg {
+
+using base::Error;
+using base::MediaTime;
+
+namespace {
+
+constexpr int kPacketsToFirstFrame = 20'000; ///< an edit list may hide many before it
+
+bool isPicture(const AVStream& stream)
+{
+    // Covers of albums are no movies.
+    return stream.codecpar->codec_type == AVMEDIA_TYPE_VIDEO && !(stream.disposition & AV_DISPOSITION_ATTACHED_PIC);
+}
+
+bool isSound(const AVStream& stream)
+{
+    return stream.codecpar->codec_type == AVMEDIA_TYPE_AUDIO;
+}
+
+} // namespace
+
+base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file, Cancelled cancelled)
+{
+    auto demuxer = Demuxer::open(file, cancelled);
+    if (!demuxer)
+        return demuxer.error();
+    const auto movie = std::make_shared<Movie>();
+    movie->m_file = std::move(file);
+    movie->m_spare = std::move(demuxer).value();
+
+    const auto failed = [&](const base::ErrorRef& why) {
+        const std::string& name = movie->m_file->name();
+        return Error::make("ffmpeg", why->code(),
+                           "“" + name + "” is not a movie that can be opened: " + why->description() + ".");
+    };
+    movie->describe();
+    if (!movie->m_video && movie->m_audioStreams.empty())
+        return failed(Error::make("ffmpeg", AVERROR_STREAM_NOT_FOUND, "it has neither pictures nor sound"));
+    if (movie->m_video) {
+        if (const auto decoded = movie->decodeFirstFrame(); !decoded)
+            return failed(decoded.error());
+    }
+    if (const auto found = movie->findDuration(cancelled); !found)
+        return failed(found.error());
+    return movie;
+}
+
+void Movie::describe()
+{
+    AVFormatContext& context = m_spare->context();
+    // Broadcast streams start at any time; movies with a header mean what they say.
+    if (!m_spare->seeksByTable() && context.start_time != AV_NOPTS_VALUE)
+        m_origin = context.start_time;
+    for (int i = 0; i < m_spare->streamCount(); ++i) {
+        const AVStream& stream = m_spare->stream(i);
+        if (!isPicture(stream) && !isSound(stream))
+            continue;
+        if (isPicture(stream) && !m_video)
+            describeVideo(stream);
+        if (isSound(stream) && avcodec_find_decoder(stream.codecpar->codec_id))
+            m_audioStreams.push_back(i);
+        platform::AssetTrack track;
+        track.trackID = stream.id > 0 ? stream.id : i + 1;
+        track.type = isPicture(stream) ? platform::MediaType::Video : platform::MediaType::Audio;
+        m_tracks.push_back(track);
+    }
+}
+
+void Movie::describeVideo(const AVStream& stream)
+{
+    VideoTrack track;
+    track.stream = stream.index;
+    track.timeBase = stream.time_base;
+    track.origin = av_rescale_q(m_origin, AV_TIME_BASE_Q, stream.time_base);
+    track.timescale = stream.time_base.den;
+    while (track.timescale < 600)
+        track.timescale *= 2;
+    m_video = track;
+}
+
+base::Result<void> Movie::decodeFirstFrame()
+{
+    const int stream = m_video->stream;
+    const auto decoder = VideoDecoder::open(m_spare->stream(stream), *m_video, 1);
+    if (!decoder)
+        return decoder.error();
+    m_spare->select({stream});
+    const auto packet = newPacket();
+    int error = 0;
+    for (int sent = 0; !m_firstFrame && sent < kPacketsToFirstFrame; ++sent) {
+        error = m_spare->read(*packet);
+        if (error != 0) {
+            decoder.value()->finish();
+            m_firstFrame = decoder.value()->receive();
+            break;
+        }
+        decoder.value()->send(*packet);
+        // A visible keyframe comes first; nothing behind it has to be waited for.
+        if (sent == 0 && (packet->flags & AV_PKT_FLAG_KEY) && !(packet->flags & AV_PKT_FLAG_DISCARD)) {
+            decoder.value()->finish();
+            m_firstFrame = decoder.value()->receive();
+            decoder.value()->flush();
+            if (!m_firstFrame)
+                decoder.value()->send(*packet);
+        }
+        if (!m_firstFrame)
+            m_firstFrame = decoder.value()->receive();
+    }
+    if (!m_firstFrame)
+        return error == AVERROR_EXIT ? Error::make("ffmpeg", error, "it is no longer wanted")
+                                     : Error::make("ffmpeg", AVERROR_INVALIDDATA, "it holds no picture");
+
+    AVStream& about = m_spare->stream(stream);
+    auto* picture = const_cast<AVFrame*>(&m_firstFrame->picture()); // only read; FFmpeg's signature lacks the const
+    m_video->aspect = av_guess_sample_aspect_ratio(&m_spare->context(), &about, picture);
+    const base::Size natural = squareSize(picture->width, picture->height, m_video->aspect);
+    const base::AffineTransform transform = preferredTransform(about, natural);
+    m_video->orientation = Orientation::fromTransform(transform);
+    Owned<AVFrame> again(av_frame_clone(picture));
+    m_firstFrame = std::make_shared<DecodedFrame>(std::move(again), m_firstFrame->pts(), m_firstFrame->time(),
+                                                  m_video->orientation, m_video->aspect);
+    const auto track = std::find_if(m_tracks.begin(), m_tracks.end(),
+                                    [](const auto& each) { return each.type == platform::MediaType::Video; });
+    track->naturalSize = natural;
+    track->preferredTransform = transform;
+    return {};
+}
+
+base::Result<void> Movie::findDuration(const Cancelled& cancelled)
+{
+    AVFormatContext& context = m_spare->context();
+    std::int64_t length = context.duration; // microseconds
+    if (length == AV_NOPTS_VALUE || length <= 0) {
+        const auto index = packetIndex(cancelled);
+        if (!index)
+            return Error::make("ffmpeg", AVERROR_EXIT, "it cannot be read to its end");
+        length = std::max<std::int64_t>(0, index->end().value_or(m_origin) - m_origin);
+    }
+    m_duration = MediaTime::make(length, AV_TIME_BASE);
+    auto track = m_tracks.begin();
+    MediaTime longest = MediaTime::make(0, timescale());
+    for (int i = 0; i < m_spare->streamCount(); ++i) {
+        const AVStream& stream = m_spare->stream(i);
+        if (!isPicture(stream) && !isSound(stream))
+            continue;
+        const auto ticks = [&](std::int64_t value) {
+            return MediaTime::make(value * stream.time_base.num, stream.time_base.den);
+        };
+        std::int64_t start = stream.start_time;
+        if (m_video && i == m_video->stream)
+            start = m_firstFrame->pts();
+        if (start == AV_NOPTS_VALUE)
+            start = 0;
+        const MediaTime from = ticks(start) - MediaTime::make(m_origin, AV_TIME_BASE);
+        track->timeRange.start = std::max(from.convertedTo(timescale()), MediaTime::make(0, timescale()),
+                                          [](const MediaTime& a, const MediaTime& b) { return a < b; });
+        const bool known = stream.duration != AV_NOPTS_VALUE && stream.duration > 0;
+        track->timeRange.duration =
+            (known ? ticks(stream.duration) : m_duration - track->timeRange.start).convertedTo(timescale());
+        if (known && longest < track->timeRange.end())
+            longest = track->timeRange.end();
+        ++track;
+    }
+    // Headers round to milliseconds what the tracks know to the tick.
+    const double rounding = std::abs(longest.seconds() - m_duration.seconds());
+    m_duration = rounding < 0.002 ? longest : m_duration.convertedTo(timescale());
+    return {};
+}
+
+base::Result<std::unique_ptr<Demuxer>> Movie::demuxer(Cancelled cancelled) const
+{
+    {
+        const std::lock_guard lock(m_mutex);
+        if (m_spare) {
+            m_spare->setCancelled(std::move(cancelled));
+            return std::move(m_spare);
+        }
+    }
+    return Demuxer::open(m_file, std::move(cancelled));
+}
+
+std::shared_ptr<const PacketIndex> Movie::packetIndex(const Cancelled& cancelled) const
+{
+    const std::lock_guard lock(m_indexMutex);
+    if (!m_index) {
+        auto reader = Demuxer::open(m_file, cancelled);
+        if (!reader)
+            return nullptr;
+        if (m_video)
+            m_index = PacketIndex::build(*reader.value(), m_video->stream);
+        else
+            m_index = PacketIndex::build(*reader.value(), -1);
+    }
+    return m_index;
+}
+
+} // namespace ffmpeg

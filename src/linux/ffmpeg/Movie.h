@@ -1,0 +1,67 @@
+/// What is known of a movie once it was opened; shared by everything that reads it. Immutable but for what it makes on
+/// demand; any thread.
+#pragma once
+
+#include "base/Result.h"
+#include "linux/ffmpeg/DecodedFrame.h"
+#include "linux/ffmpeg/Demuxer.h"
+#include "linux/ffmpeg/PacketIndex.h"
+#include "linux/ffmpeg/VideoTrack.h"
+#include "platform/media/Asset.h"
+
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace ffmpeg {
+
+class Movie {
+public:
+    /// Reads the header and decodes the first picture; nothing more, because somebody waits for that picture.
+    /// A movie that has neither picture nor sound, or whose pictures cannot be decoded, is an error.
+    static base::Result<std::shared_ptr<Movie>> open(std::shared_ptr<OpenFile> file, Cancelled cancelled);
+
+    const std::shared_ptr<OpenFile>& file() const { return m_file; }
+    const std::vector<platform::AssetTrack>& tracks() const { return m_tracks; }
+    base::MediaTime duration() const { return m_duration; }
+    /// Ticks a second of all times that are told.
+    std::int32_t timescale() const { return m_video ? m_video->timescale : kSoundTimescale; }
+    /// Nothing when there is only sound.
+    const std::optional<VideoTrack>& video() const { return m_video; }
+    /// Streams whose sound can be decoded.
+    const std::vector<int>& audioStreams() const { return m_audioStreams; }
+    /// Where the movie begins, in microseconds of the file's own time.
+    std::int64_t origin() const { return m_origin; }
+    /// Null when there is only sound.
+    const FrameRef& firstFrame() const { return m_firstFrame; }
+
+    /// A reader of the shared file. The first call gives the one that opened the movie.
+    base::Result<std::unique_ptr<Demuxer>> demuxer(Cancelled cancelled) const;
+    /// Made by the first who asks, while others wait. Null when that was cancelled or the file cannot be read.
+    std::shared_ptr<const PacketIndex> packetIndex(const Cancelled& cancelled) const;
+
+private:
+    static constexpr std::int32_t kSoundTimescale = 90000;
+
+    void describe();
+    base::Result<void> decodeFirstFrame();
+    void describeVideo(const AVStream& stream);
+    base::Result<void> findDuration(const Cancelled& cancelled);
+
+    std::shared_ptr<OpenFile> m_file;
+    std::vector<platform::AssetTrack> m_tracks;
+    base::MediaTime m_duration;
+    std::optional<VideoTrack> m_video;
+    std::vector<int> m_audioStreams;
+    std::int64_t m_origin = 0;
+    FrameRef m_firstFrame;
+
+    mutable std::mutex m_mutex;
+    mutable std::unique_ptr<Demuxer> m_spare;
+    mutable std::mutex m_indexMutex;
+    mutable std::shared_ptr<const PacketIndex> m_index;
+};
+
+} // namespace ffmpeg

@@ -1,0 +1,62 @@
+#include "linux/ffmpeg/OpenFile.h"
+
+#include <cerrno>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace ffmpeg {
+
+using base::Error;
+
+base::Result<std::shared_ptr<OpenFile>> OpenFile::open(const std::string& path)
+{
+    const std::string name = path.substr(path.find_last_of('/') + 1);
+    const std::string doing = "“" + name + "” cannot be opened";
+    // Without O_NONBLOCK a pipe would wait for somebody to write to it.
+    const int descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+    if (descriptor < 0)
+        return Error::fromErrno(errno, doing);
+    std::shared_ptr<OpenFile> file(new OpenFile(descriptor, name));
+    struct stat about {};
+    if (fstat(descriptor, &about) != 0)
+        return Error::fromErrno(errno, doing);
+    if (S_ISDIR(about.st_mode))
+        return Error::fromErrno(EISDIR, doing);
+    if (!S_ISREG(about.st_mode))
+        return Error::fromErrno(EINVAL, doing);
+    return file;
+}
+
+OpenFile::~OpenFile()
+{
+    ::close(m_descriptor);
+}
+
+std::int64_t OpenFile::size() const
+{
+    struct stat about {};
+    return fstat(m_descriptor, &about) == 0 ? about.st_size : -1;
+}
+
+std::int64_t OpenFile::read(std::int64_t position, std::uint8_t* into, std::size_t count) const
+{
+    for (;;) {
+        const ssize_t got = pread(m_descriptor, into, count, position);
+        if (got >= 0)
+            return got;
+        if (errno != EINTR)
+            return -errno;
+    }
+}
+
+bool OpenFile::isStillAt(const std::string& path) const
+{
+    struct stat there {};
+    if (stat(path.c_str(), &there) != 0)
+        return errno == ENOENT || errno == ENOTDIR;
+    struct stat mine {};
+    return fstat(m_descriptor, &mine) == 0 && mine.st_dev == there.st_dev && mine.st_ino == there.st_ino;
+}
+
+} // namespace ffmpeg

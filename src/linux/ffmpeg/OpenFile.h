@@ -1,0 +1,35 @@
+/// A movie's file, opened once and held open: it stays readable after it was removed. Immutable; any thread.
+#pragma once
+
+#include "base/Result.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+namespace ffmpeg {
+
+class OpenFile {
+public:
+    /// Regular files only: anything else could block, or never end.
+    static base::Result<std::shared_ptr<OpenFile>> open(const std::string& path);
+    ~OpenFile();
+    OpenFile(const OpenFile&) = delete;
+    OpenFile& operator=(const OpenFile&) = delete;
+
+    /// The last component of the path, for messages.
+    const std::string& name() const { return m_name; }
+    std::int64_t size() const;
+    /// Bytes read, 0 at the end, or a negative errno. Readers do not share a position.
+    std::int64_t read(std::int64_t position, std::uint8_t* into, std::size_t count) const;
+    /// Whether `path` leads to this very file (or, when `path` leads nowhere any more, led to it).
+    bool isStillAt(const std::string& path) const;
+
+private:
+    OpenFile(int descriptor, std::string name) : m_descriptor(descriptor), m_name(std::move(name)) {}
+
+    int m_descriptor;
+    std::string m_name;
+};
+
+} // namespace ffmpeg

@@ -1,0 +1,163 @@
+#include "linux/ffmpeg/PictureWorker.h"
+
+#include <chrono>
+#include <utility>
+
+namespace ffmpeg {
+
+namespace {
+
+constexpr int kThreads = 2;
+/// A finger that has not moved for so long rests.
+constexpr std::chrono::milliseconds kRest{80};
+
+} // namespace
+
+PictureWorker::PictureWorker(std::shared_ptr<const Movie> movie, Arrived arrived)
+    : m_movie(std::move(movie)), m_arrived(std::move(arrived)), m_thread([this] { loop(); })
+{
+}
+
+PictureWorker::~PictureWorker()
+{
+    cancel();
+    m_thread.join();
+}
+
+void PictureWorker::cancel()
+{
+    {
+        const std::lock_guard lock(m_mutex);
+        *m_cancelled = true;
+    }
+    m_changed.notify_all();
+}
+
+void PictureWorker::show(std::uint64_t generation, std::int64_t tick)
+{
+    request(generation, tick, false);
+}
+
+void PictureWorker::play(std::uint64_t generation, std::int64_t tick)
+{
+    request(generation, tick, true);
+}
+
+void PictureWorker::request(std::uint64_t generation, std::int64_t tick, bool plays)
+{
+    {
+        const std::lock_guard lock(m_mutex);
+        m_request = {generation, tick, plays};
+        m_generation = generation;
+        m_queue.clear();
+        m_exhausted = false;
+    }
+    m_changed.notify_all();
+}
+
+FrameRef PictureWorker::takeDue(std::int64_t tick)
+{
+    FrameRef due;
+    {
+        const std::lock_guard lock(m_mutex);
+        while (!m_queue.empty() && m_queue.front()->pts() <= tick) {
+            due = std::move(m_queue.front());
+            m_queue.pop_front();
+        }
+    }
+    if (due)
+        m_changed.notify_all();
+    return due;
+}
+
+std::optional<std::int64_t> PictureWorker::nextDue() const
+{
+    const std::lock_guard lock(m_mutex);
+    return m_queue.empty() ? std::nullopt : std::optional(m_queue.front()->pts());
+}
+
+bool PictureWorker::isAhead() const
+{
+    const std::lock_guard lock(m_mutex);
+    return !m_queue.empty() || m_exhausted;
+}
+
+void PictureWorker::loop()
+{
+    const auto source = VideoSource::open(m_movie, m_cancelled, kThreads);
+    for (;;) {
+        Request request;
+        {
+            std::unique_lock lock(m_mutex);
+            const auto hasWork = [&] {
+                return *m_cancelled || m_answered != m_generation
+                       || (m_request.plays && m_playedTo != kForever && m_queue.size() < kAhead);
+            };
+            if (m_unrefined)
+                m_changed.wait_for(lock, kRest, hasWork);
+            else
+                m_changed.wait(lock, hasWork);
+            if (*m_cancelled)
+                return;
+            request = m_request;
+        }
+        if (!source) {
+            m_answered = request.generation;
+            m_playedTo = kForever;
+            m_arrived(request.generation, nullptr);
+        } else if (m_answered != request.generation) {
+            answer(*source.value(), request);
+        } else if (request.plays) {
+            playOn(*source.value(), request);
+        } else if (m_unrefined) {
+            refine(*source.value(), request);
+        }
+    }
+}
+
+void PictureWorker::answer(VideoSource& source, const Request& request)
+{
+    source.setReducing(!request.plays);
+    const auto want = request.plays ? VideoSource::Want::Full : VideoSource::Want::Any;
+    const auto shown = source.at(request.tick, want, [&] { return isOvertaken(request); });
+    if (isOvertaken(request) || *m_cancelled)
+        return;
+    m_answered = request.generation;
+    m_unrefined = shown && shown->frame->isReduced();
+    m_playedTo = shown ? shown->until : kForever;
+    if (m_playedTo == kForever) {
+        const std::lock_guard lock(m_mutex);
+        m_exhausted = true;
+    }
+    m_arrived(request.generation, shown ? shown->frame : nullptr);
+}
+
+void PictureWorker::refine(VideoSource& source, const Request& request)
+{
+    const auto shown = source.at(request.tick, VideoSource::Want::Full, [&] { return isOvertaken(request); });
+    m_unrefined = false;
+    if (!isOvertaken(request))
+        m_arrived(request.generation, shown ? shown->frame : nullptr);
+}
+
+void PictureWorker::playOn(VideoSource& source, const Request& request)
+{
+    const auto shown = source.at(m_playedTo, VideoSource::Want::Full, [&] { return isOvertaken(request); });
+    if (isOvertaken(request) || *m_cancelled)
+        return;
+    bool tells = false;
+    {
+        const std::lock_guard lock(m_mutex);
+        if (isOvertaken(request))
+            return;
+        tells = m_queue.empty();
+        if (shown)
+            m_queue.push_back(shown->frame);
+        m_playedTo = shown ? shown->until : kForever;
+        m_exhausted = m_playedTo == kForever;
+    }
+    if (tells)
+        m_arrived(request.generation, nullptr);
+}
+
+} // namespace ffmpeg

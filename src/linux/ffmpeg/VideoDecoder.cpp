@@ -1,0 +1,86 @@
+#include "linux/ffmpeg/VideoDecoder.h"
+
+#include <utility>
+
+namespace ffmpeg {
+
+namespace {
+
+/// Larger pictures are an attack, or nothing that could be shown: 8K is 33 million pixels.
+constexpr std::int64_t kMostPixels = 64 << 20;
+
+base::ErrorRef failure(int error, const AVStream& stream)
+{
+    return base::Error::make("ffmpeg", error,
+                             std::string("its pictures (") + avcodec_get_name(stream.codecpar->codec_id)
+                                 + ") cannot be decoded: " + textOf(error));
+}
+
+} // namespace
+
+VideoDecoder::VideoDecoder(Owned<AVCodecContext> context, const VideoTrack& track)
+    : m_context(std::move(context)), m_frame(newFrame()), m_track(track)
+{
+}
+
+base::Result<std::unique_ptr<VideoDecoder>> VideoDecoder::open(const AVStream& stream, const VideoTrack& track,
+                                                               int threads)
+{
+    const AVCodec* codec = avcodec_find_decoder(stream.codecpar->codec_id);
+    if (!codec)
+        return failure(AVERROR_DECODER_NOT_FOUND, stream);
+    Owned<AVCodecContext> context(avcodec_alloc_context3(codec));
+    int error = avcodec_parameters_to_context(context.get(), stream.codecpar);
+    context->pkt_timebase = stream.time_base;
+    context->thread_count = threads;
+    context->thread_type = FF_THREAD_FRAME;
+    context->max_pixels = kMostPixels;
+    if (error >= 0)
+        error = avcodec_open2(context.get(), codec, nullptr);
+    if (error < 0)
+        return failure(error, stream);
+    return std::unique_ptr<VideoDecoder>(new VideoDecoder(std::move(context), track));
+}
+
+void VideoDecoder::send(const AVPacket& packet)
+{
+    // Pictures were taken out before, so the decoder has room; anything else it says is about a damaged packet.
+    avcodec_send_packet(m_context.get(), &packet);
+}
+
+void VideoDecoder::finish()
+{
+    avcodec_send_packet(m_context.get(), nullptr);
+}
+
+FrameRef VideoDecoder::receive()
+{
+    for (;;) {
+        const int result = avcodec_receive_frame(m_context.get(), m_frame.get());
+        if (result == AVERROR(EAGAIN) || result == AVERROR_EOF || result == AVERROR(EINVAL))
+            return nullptr;
+        if (result < 0)
+            continue; // a damaged picture; the decoder reports each once
+        std::int64_t pts = m_frame->best_effort_timestamp;
+        if (pts == AV_NOPTS_VALUE)
+            pts = m_lastPts == AV_NOPTS_VALUE ? m_track.origin : m_lastPts + m_step;
+        if (m_lastPts != AV_NOPTS_VALUE && pts > m_lastPts)
+            m_step = pts - m_lastPts;
+        m_lastPts = pts;
+        return std::make_shared<DecodedFrame>(std::exchange(m_frame, newFrame()), pts, m_track.timeOf(pts),
+                                              m_track.orientation, m_track.aspect);
+    }
+}
+
+void VideoDecoder::flush()
+{
+    avcodec_flush_buffers(m_context.get());
+    m_lastPts = AV_NOPTS_VALUE;
+}
+
+void VideoDecoder::setSkipsUnreferenced(bool skips)
+{
+    m_context->skip_frame = skips ? AVDISCARD_NONREF : AVDISCARD_DEFAULT;
+}
+
+} // namespace ffmpeg

@@ -1,0 +1,40 @@
+/// Turns packets of a picture stream into pictures, in order of presentation. One thread at a time.
+///
+/// Damaged packets are passed over: there are fewer pictures then, or such with flaws, never an error.
+#pragma once
+
+#include "base/Result.h"
+#include "linux/ffmpeg/DecodedFrame.h"
+#include "linux/ffmpeg/VideoTrack.h"
+
+#include <memory>
+
+namespace ffmpeg {
+
+class VideoDecoder {
+public:
+    /// Two threads decode at half the latency of one; more cost memory and bring little.
+    static base::Result<std::unique_ptr<VideoDecoder>> open(const AVStream& stream, const VideoTrack& track,
+                                                            int threads);
+
+    void send(const AVPacket& packet);
+    /// No packet comes any more: the pictures that are still inside come out.
+    void finish();
+    /// The next picture; null when more packets are needed, or all have come out.
+    FrameRef receive();
+    /// Forgets everything: the next packet is one of another place.
+    void flush();
+    /// Leaves out pictures that no other picture refers to. For packets sent from now on.
+    void setSkipsUnreferenced(bool skips);
+
+private:
+    VideoDecoder(Owned<AVCodecContext> context, const VideoTrack& track);
+
+    Owned<AVCodecContext> m_context;
+    Owned<AVFrame> m_frame;
+    VideoTrack m_track;
+    std::int64_t m_lastPts = AV_NOPTS_VALUE;
+    std::int64_t m_step = 1; ///< between the last two pictures: for one that has no time
+};
+
+} // namespace ffmpeg

@@ -1,0 +1,154 @@
+#include "linux/ffmpeg/VideoSource.h"
+
+#include <algorithm>
+#include <utility>
+
+namespace ffmpeg {
+
+VideoSource::VideoSource(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer,
+                         std::unique_ptr<VideoDecoder> decoder, Cancelled cancelled)
+    : m_movie(std::move(movie)), m_track(*m_movie->video()), m_demuxer(std::move(demuxer)),
+      m_decoder(std::move(decoder)), m_cancelled(std::move(cancelled)), m_packet(newPacket())
+{
+    m_demuxer->select({m_track.stream});
+}
+
+base::Result<std::unique_ptr<VideoSource>> VideoSource::open(std::shared_ptr<const Movie> movie, Cancelled cancelled,
+                                                             int threads)
+{
+    auto demuxer = movie->demuxer(cancelled);
+    if (!demuxer)
+        return demuxer.error();
+    const VideoTrack& track = *movie->video();
+    if (track.stream >= demuxer.value()->streamCount())
+        return base::Error::make("ffmpeg", AVERROR_INVALIDDATA, "the file has changed");
+    auto decoder = VideoDecoder::open(demuxer.value()->stream(track.stream), track, threads);
+    if (!decoder)
+        return decoder.error();
+    return std::unique_ptr<VideoSource>(new VideoSource(std::move(movie), std::move(demuxer).value(),
+                                                        std::move(decoder).value(), std::move(cancelled)));
+}
+
+std::optional<ShownFrame> VideoSource::at(std::int64_t tick, Want want, const std::function<bool()>& stopped)
+{
+    const auto cached = m_cache.at(tick);
+    if (cached && (want == Want::Any || !cached->frame->isReduced()))
+        return cached;
+    if (!goesOnTo(tick))
+        seek(tick);
+    while (!stopped() && !*m_cancelled) {
+        if (m_next && m_next->pts() <= tick) {
+            advance(tick);
+        } else if (!m_next && !m_ended) {
+            decodeSome();
+        } else if (m_current) {
+            const ShownFrame shown{m_current, m_next ? m_next->pts() : kForever};
+            m_cache.insert(shown, tick);
+            return shown;
+        } else if (!m_fromStart) {
+            seekFarther();
+        } else if (m_next) {
+            return ShownFrame{m_next, m_next->pts()};
+        } else {
+            return std::nullopt;
+        }
+    }
+    return std::nullopt;
+}
+
+bool VideoSource::goesOnTo(std::int64_t tick) const
+{
+    if (!m_positioned || (m_current ? m_current->pts() : m_next ? m_next->pts() : kForever) > tick)
+        return false;
+    const std::int64_t head = m_next ? m_next->pts() : m_current->pts();
+    const std::int64_t near = av_rescale_q(250, {1, 1000}, m_track.timeBase);
+    const auto keyframe = keyframeBefore(tick);
+    return m_ended || !keyframe || *keyframe <= head + near;
+}
+
+std::optional<std::int64_t> VideoSource::keyframeBefore(std::int64_t tick) const
+{
+    if (m_index) {
+        const PacketEntry* found = m_index->keyframeAt(tick);
+        return found ? std::optional(found->pts) : std::nullopt;
+    }
+    AVStream& stream = m_demuxer->stream(m_track.stream);
+    const AVIndexEntry* found = avformat_index_get_entry_from_timestamp(&stream, tick, AVSEEK_FLAG_BACKWARD);
+    return found ? std::optional(found->timestamp) : std::nullopt;
+}
+
+void VideoSource::seek(std::int64_t tick)
+{
+    m_decoder->flush();
+    m_current = m_next = nullptr;
+    m_positioned = m_awaitsKeyframe = true;
+    m_finishing = m_ended = false;
+    m_soughtTick = tick;
+    m_stepBack = 0;
+    if (!m_demuxer->seeksByTable()) {
+        if (!m_index)
+            m_index = m_movie->packetIndex(m_cancelled);
+        const PacketEntry* keyframe = m_index ? m_index->keyframeAt(tick) : nullptr;
+        m_fromStart = !keyframe || keyframe->position < 0 || !m_demuxer->seekToByte(keyframe->position);
+        if (m_fromStart)
+            m_demuxer->seekToStart(m_track.stream);
+        return;
+    }
+    const auto keyframe = keyframeBefore(tick);
+    m_fromStart = keyframe && !keyframeBefore(*keyframe - 1);
+    if (!m_demuxer->seek(m_track.stream, tick)) {
+        m_fromStart = true;
+        m_demuxer->seekToStart(m_track.stream);
+    }
+}
+
+/// The table's times are those of decoding: what it led to can lie behind the tick.
+void VideoSource::seekFarther()
+{
+    const std::int64_t second = std::max<std::int64_t>(1, av_rescale_q(1, {1, 1}, m_track.timeBase));
+    const std::int64_t step = m_stepBack ? m_stepBack * 2 : second;
+    const std::int64_t tick = m_soughtTick - step;
+    seek(tick);
+    m_stepBack = step;
+    if (tick < m_track.origin - second) {
+        m_fromStart = true;
+        m_demuxer->seekToStart(m_track.stream);
+    }
+}
+
+void VideoSource::decodeSome()
+{
+    if (FrameRef frame = m_decoder->receive()) {
+        ++m_decodedCount;
+        // Broken files give pictures out of order; time does not go back for them.
+        if (!m_current || frame->pts() > m_current->pts())
+            m_next = std::move(frame);
+        return;
+    }
+    if (m_finishing) {
+        m_ended = true;
+        return;
+    }
+    if (m_demuxer->read(*m_packet) != 0) {
+        m_decoder->finish();
+        m_finishing = true;
+        return;
+    }
+    if (m_awaitsKeyframe && !(m_packet->flags & AV_PKT_FLAG_KEY) && !m_fromStart)
+        return;
+    m_awaitsKeyframe = false;
+    m_decoder->send(*m_packet);
+}
+
+void VideoSource::advance(std::int64_t focus)
+{
+    if (m_current && !m_cache.at(m_current->pts())) {
+        const FrameRef kept = m_reducing ? DecodedFrame::reduced(m_current, kReducedLimit) : m_current;
+        if (kept)
+            m_cache.insert({kept, m_next->pts()}, focus);
+    }
+    m_current = std::move(m_next);
+    m_next = nullptr;
+}
+
+} // namespace ffmpeg
