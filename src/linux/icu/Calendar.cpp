@@ -1,10 +1,14 @@
 #include "linux/icu/Calendar.h"
 
+#include <unicode/simpletz.h>
 #include <unicode/smpdtfmt.h>
 #include <unicode/timezone.h>
 
 #include <algorithm>
+#include <cmath>
+#include <cstdint>
 #include <cstdlib>
+#include <ctime>
 #include <mutex>
 #include <utility>
 
@@ -28,18 +32,33 @@ std::unique_ptr<icu::TimeZone> zoneNamed(const std::string& name)
     return zone;
 }
 
+/// Null when TZ is written in one of the ways that only the C library understands: as rules, or as a path.
 std::unique_ptr<icu::TimeZone> zoneOfTheDevice(const Environment& environment)
 {
     std::string name = environment("TZ");
     if (name.starts_with(':'))
         name.erase(0, 1);
     if (!name.empty())
-        if (auto zone = zoneNamed(name))
-            return zone;
+        return zoneNamed(name);
     // ICU keeps what it finds in a variable that it does not guard.
     static std::mutex mutex;
     const std::lock_guard lock(mutex);
     return std::unique_ptr<icu::TimeZone>(icu::TimeZone::detectHostTimeZone());
+}
+
+/// A zone of the offset that the C library knows for `date`.
+std::unique_ptr<icu::TimeZone> zoneOfTheLibrary(base::Date date)
+{
+    constexpr double kFarthest = 1e15; // seconds: years still fit into the library's type
+    std::tm local = {};
+    if (std::abs(date.secondsSince1970) < kFarthest) {
+        const auto seconds = static_cast<std::time_t>(std::floor(date.secondsSince1970));
+        ::tzset();
+        ::localtime_r(&seconds, &local);
+    }
+    constexpr std::int32_t kMilliseconds = 1000;
+    const auto offset = static_cast<std::int32_t>(local.tm_gmtoff) * kMilliseconds;
+    return std::make_unique<icu::SimpleTimeZone>(offset, icu::UnicodeString("Local"));
 }
 
 class DateFormatter final : public platform::DateFormatter {
@@ -50,8 +69,8 @@ public:
         m_format = std::make_unique<icu::SimpleDateFormat>(icu::UnicodeString(), icu::Locale(locale.c_str()), status);
         if (U_FAILURE(status))
             m_format.reset();
-        else if (auto zone = zoneOfTheDevice(environment))
-            m_format->adoptTimeZone(zone.release());
+        else
+            adopt(zoneOfTheDevice(environment));
     }
 
     void setDateFormat(std::string format) override
@@ -65,21 +84,30 @@ public:
         if (!m_format || !zone)
             return;
         if (auto known = zoneNamed(zone->name))
-            m_format->adoptTimeZone(known.release());
+            adopt(std::move(known));
     }
 
     std::string stringFromDate(base::Date date) const override
     {
+        if (!m_format)
+            return {};
+        if (!m_hasZone)
+            m_format->adoptTimeZone(zoneOfTheLibrary(date).release());
         std::string text;
-        if (m_format) {
-            icu::UnicodeString formatted;
-            m_format->format(date.secondsSince1970 * 1000, formatted).toUTF8String(text);
-        }
-        return text;
+        icu::UnicodeString formatted;
+        return m_format->format(date.secondsSince1970 * 1000, formatted).toUTF8String(text);
     }
 
 private:
+    void adopt(std::unique_ptr<icu::TimeZone> zone)
+    {
+        m_hasZone = zone != nullptr;
+        if (zone)
+            m_format->adoptTimeZone(zone.release());
+    }
+
     std::unique_ptr<icu::SimpleDateFormat> m_format; ///< null when ICU has no data at all
+    bool m_hasZone = false;                          ///< otherwise each date has an offset of its own
 };
 
 } // namespace
