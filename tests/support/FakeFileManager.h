@@ -139,7 +139,7 @@ public:
         if (auto error = scripted(FileOperation::Remove, at))
             return error;
         if (at.empty())
-            return failed(EBUSY, calls.back());
+            return failed(path.empty() ? ENOENT : EBUSY, calls.back());
         if (std::erase_if(m_items, [&](const auto& item) { return isWithin(item.first, at); }) == 0)
             return failed(ENOENT, calls.back());
         return {};
