@@ -1,0 +1,93 @@
+#include "support/EngineTest.h"
+
+#include <array>
+
+namespace {
+
+using Quality = platform::VideoFrame::Quality;
+
+class Rendering : public tests::EngineTest {
+protected:
+    void expectColours(const std::string& name, Quality quality, int tolerance)
+    {
+        ASSERT_EQ(open(movie(name)), Status::ReadyToPlay);
+        const auto pixels = tests::pixelsOf(*player->currentFrame(), 640, 360, quality);
+        constexpr std::array<std::array<int, 3>, 6> kColours{
+            {{255, 0, 0}, {0, 255, 0}, {0, 0, 255}, {255, 255, 255}, {128, 128, 128}, {0, 0, 0}}};
+        for (std::size_t i = 0; i < kColours.size(); ++i) {
+            const auto* pixel = pixels.at(106 + 212 * static_cast<int>(i % 3), 90 + 180 * static_cast<int>(i / 3));
+            for (std::size_t c = 0; c < 3; ++c)
+                EXPECT_NEAR(pixel[2 - c], kColours[i][c], tolerance) << name << " patch " << i << " channel " << c;
+            EXPECT_EQ(pixel[3], 255);
+        }
+    }
+};
+
+TEST_F(Rendering, ColoursFollowTheMovieMatrixAndRange)
+{
+    for (const auto* name : {"bars-709.mp4", "bars-601.mp4", "bars-full.mp4"}) {
+        expectColours(name, Quality::Exact, 3);
+        expectColours(name, Quality::Fast, 4);
+    }
+}
+
+TEST_F(Rendering, TurnedMoviesStandUpright)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    const auto flat = tests::pixelsOf(*player->currentFrame(), 640, 360);
+    ASSERT_EQ(open(movie("rotated.mp4")), Status::ReadyToPlay);
+    const auto left = tests::pixelsOf(*player->currentFrame(), 360, 640);
+    ASSERT_EQ(open(movie("rotated-clockwise.mp4")), Status::ReadyToPlay);
+    const auto right = tests::pixelsOf(*player->currentFrame(), 360, 640);
+    for (int y = 4; y < 360; y += 31) {
+        for (int x = 4; x < 640; x += 29) {
+            // A quarter turn counterclockwise takes the top right corner to the top left.
+            ASSERT_NEAR(left.luma(y, 639 - x), flat.luma(x, y), 2) << x << ", " << y;
+            ASSERT_NEAR(right.luma(359 - y, x), flat.luma(x, y), 2) << x << ", " << y;
+        }
+    }
+}
+
+TEST_F(Rendering, AnySizeIsDrawnWithinItsRows)
+{
+    ASSERT_EQ(open(movie("rotated.mp4")), Status::ReadyToPlay);
+    const auto frame = player->currentFrame();
+    for (const auto& [width, height] : {std::pair{1, 1}, {3, 7}, {45, 80}, {333, 77}, {1080, 1920}}) {
+        const std::ptrdiff_t stride = width * 4 + 20;
+        std::vector<std::uint8_t> bytes(static_cast<std::size_t>(stride * height), 77);
+        ASSERT_TRUE(frame->render(bytes.data(), stride, width, height, Quality::Fast)) << width;
+        for (int y = 0; y < height; ++y)
+            for (std::ptrdiff_t x = width * 4; x < stride; ++x)
+                ASSERT_EQ(bytes[static_cast<std::size_t>(y * stride + x)], 77);
+    }
+}
+
+TEST_F(Rendering, ImpossibleSizesAreRefused)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    std::vector<std::uint8_t> bytes(64);
+    EXPECT_FALSE(player->currentFrame()->render(bytes.data(), 16, 0, 4, Quality::Fast));
+    EXPECT_FALSE(player->currentFrame()->render(bytes.data(), 16, 4, -1, Quality::Fast));
+    EXPECT_FALSE(player->currentFrame()->render(bytes.data(), 8, 4, 4, Quality::Fast));
+    EXPECT_FALSE(player->currentFrame()->render(nullptr, 16, 4, 4, Quality::Fast));
+}
+
+TEST_F(Rendering, AReducedPictureLooksTheSame)
+{
+    ASSERT_EQ(open(movie("bars-709.mp4")), Status::ReadyToPlay);
+    const auto full = std::dynamic_pointer_cast<const ffmpeg::DecodedFrame>(player->currentFrame());
+    const auto small = ffmpeg::DecodedFrame::reduced(full, 320);
+    ASSERT_TRUE(small);
+    EXPECT_TRUE(small->isReduced());
+    EXPECT_LT(small->byteCount() * 2, full->byteCount());
+    EXPECT_EQ(small->displaySize(), full->displaySize());
+    const auto a = tests::pixelsOf(*full, 640, 360);
+    const auto b = tests::pixelsOf(*small, 640, 360);
+    for (int patch = 0; patch < 6; ++patch)
+        for (int c = 0; c < 4; ++c)
+            EXPECT_NEAR(a.at(106 + 212 * (patch % 3), 90 + 180 * (patch / 3))[c],
+                        b.at(106 + 212 * (patch % 3), 90 + 180 * (patch / 3))[c], 3);
+    EXPECT_EQ(ffmpeg::DecodedFrame::reduced(full, 960), full);
+}
+
+} // namespace

@@ -1,0 +1,202 @@
+#include "linux/ffmpeg/VideoSource.h"
+#include "support/EngineTest.h"
+
+#include <random>
+
+namespace {
+
+class Seeking : public tests::EngineTest {
+protected:
+    MediaTime frame(int number, int rate) { return MediaTime::make(number, rate); }
+};
+
+TEST_F(Seeking, TheTimeIsTheSoughtOneAtOnceAndThePictureFollows)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    player->seekToTime(at(1.5));
+    EXPECT_EQ(player->currentTime(), at(1.5));
+    EXPECT_EQ(item->currentTime(), at(1.5));
+    EXPECT_EQ(player->currentTime().timescale, 15360);
+    EXPECT_EQ(tests::numberIn(player->currentFrame()), 0);
+    EXPECT_EQ(numberAt(at(1.5)), 45);
+}
+
+TEST_F(Seeking, EveryPictureOfALongGroupIsFoundInAnyOrder)
+{
+    ASSERT_EQ(open(movie("long-gop.mp4")), Status::ReadyToPlay);
+    std::mt19937 random(7);
+    for (int i = 0; i < 25; ++i) {
+        const int number = static_cast<int>(random() % 1200);
+        ASSERT_EQ(numberAt(frame(number, 60)), number);
+    }
+}
+
+TEST_F(Seeking, APictureIsVisibleFromItsTimeUntilTheNext)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    EXPECT_EQ(numberAt(MediaTime::make(60 * 512, 15360)), 60);
+    EXPECT_EQ(numberAt(MediaTime::make(61 * 512 - 1, 15360)), 60);
+    EXPECT_EQ(numberAt(MediaTime::make(61 * 512, 15360)), 61);
+    EXPECT_EQ(numberAt(MediaTime::make(60 * 512 - 1, 15360)), 59);
+}
+
+TEST_F(Seeking, IrregularTimesAreKept)
+{
+    ASSERT_EQ(open(movie("vfr.mkv")), Status::ReadyToPlay);
+    const auto time = [](int n) { return 33 * n + 2 * (7 * n % 11) + 400 * (n / 20); };
+    for (const int n : {79, 3, 40, 19, 20, 21, 0, 55}) {
+        EXPECT_EQ(numberAt(MediaTime::make(time(n), 1000)), time(n));
+        EXPECT_EQ(player->currentFrame()->time(), MediaTime::make(time(n), 1000));
+    }
+    EXPECT_EQ(numberAt(MediaTime::make(time(20) - 1, 1000)), time(19)) << "the gap shows the picture before it";
+}
+
+TEST_F(Seeking, BothEndsClamp)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    EXPECT_EQ(numberAt(at(99)), 119);
+    EXPECT_EQ(player->currentTime(), at(4));
+    EXPECT_EQ(numberAt(at(-5)), 0);
+    EXPECT_EQ(player->currentTime(), at(0));
+}
+
+TEST_F(Seeking, ATimeThatIsNotNumericIsIgnored)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    EXPECT_EQ(numberAt(at(2)), 60);
+    for (const auto time : {MediaTime::invalid(), MediaTime::indefinite(), MediaTime::positiveInfinity()})
+        player->seekToTime(time);
+    EXPECT_EQ(player->currentTime(), at(2));
+}
+
+TEST_F(Seeking, ANewerSeekOvertakesTheOlderOnes)
+{
+    ASSERT_EQ(open(movie("long-gop.mp4")), Status::ReadyToPlay);
+    for (int i = 0; i < 300; ++i)
+        player->seekToTime(frame(i * 4, 60));
+    EXPECT_EQ(numberAt(frame(17, 60)), 17);
+}
+
+TEST_F(Seeking, ASeekBeforeTheItemIsReadyIsKept)
+{
+    asset = media.assetWithURL(base::Url::fromPath(movie("clock.mp4")));
+    item = media.playerItemWithAsset(asset);
+    player = std::dynamic_pointer_cast<ffmpeg::FFmpegPlayer>(media.playerWithPlayerItem(item));
+    player->seekToTime(at(3));
+    EXPECT_EQ(player->currentTime(), at(3));
+    ASSERT_TRUE(waitFor([&] { return player->isSettled(); }));
+    EXPECT_EQ(tests::numberIn(player->currentFrame()), 90);
+}
+
+TEST_F(Seeking, OffsetsEditListsAndBroadcastClocksStartAtZero)
+{
+    ASSERT_EQ(open(movie("edit-list.mp4")), Status::ReadyToPlay);
+    EXPECT_EQ(numberAt(at(1)), 60);
+    EXPECT_EQ(numberAt(at(0)), 30);
+    ASSERT_EQ(open(movie("start-offset.mp4")), Status::ReadyToPlay);
+    EXPECT_EQ(numberAt(at(2.5)), 30);
+    EXPECT_EQ(numberAt(at(1)), 0) << "before the first picture, the first";
+    EXPECT_EQ(numberAt(at(5.5)), 119);
+    ASSERT_EQ(open(movie("size-change.ts")), Status::ReadyToPlay);
+    EXPECT_EQ(numberAt(MediaTime::make(15, 30)), 15);
+    EXPECT_EQ(numberAt(MediaTime::make(45, 30)), 45);
+    EXPECT_EQ(player->currentFrame()->displaySize(), (base::Size{360, 640}));
+    EXPECT_EQ(numberAt(MediaTime::make(7, 30)), 7);
+}
+
+TEST_F(Seeking, OtherCodecsAreExactToo)
+{
+    ASSERT_EQ(open(movie("vp9.webm")), Status::ReadyToPlay);
+    for (const int n : {50, 10, 59, 0})
+        EXPECT_EQ(numberAt(MediaTime::make(n * 1000 / 30 + 9, 1000)), n);
+}
+
+TEST_F(Seeking, PeriodicObserversAreCalledAfterASeekAndNotInsideIt)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    std::vector<MediaTime> told;
+    const auto token = player->addPeriodicTimeObserver(at(0.1), [&](MediaTime time) { told.push_back(time); });
+    player->seekToTime(at(2));
+    EXPECT_TRUE(told.empty());
+    mainQueue.drain();
+    EXPECT_EQ(told, std::vector<MediaTime>{at(2)});
+    player->removeTimeObserver(token);
+    player->seekToTime(at(3));
+    mainQueue.drain();
+    EXPECT_EQ(told.size(), 1u);
+}
+
+TEST_F(Seeking, TheFrameHandlerIsNotCalledInsideTheSeek)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    int changes = 0;
+    player->setFrameHandler([&] { ++changes; });
+    player->seekToTime(at(1));
+    EXPECT_EQ(changes, 0);
+    ASSERT_TRUE(waitFor([&] { return player->isSettled(); }));
+    EXPECT_EQ(changes, 1);
+    EXPECT_EQ(numberAt(at(1.001)), 30);
+    EXPECT_EQ(changes, 1) << "the picture is the same";
+}
+
+// How much is decoded.
+
+class Scrubbing : public Seeking {
+protected:
+    std::unique_ptr<ffmpeg::VideoSource> source(const std::string& name)
+    {
+        auto file = ffmpeg::OpenFile::open(movie(name));
+        auto opened = ffmpeg::Movie::open(std::move(file).value(), cancelled);
+        auto made = ffmpeg::VideoSource::open(std::move(opened).value(), cancelled, 2);
+        return std::move(made).value();
+    }
+    int number(ffmpeg::VideoSource& from, int of, int rate = 60)
+    {
+        const auto shown =
+            from.at(std::int64_t(of) * 15360 / rate, ffmpeg::VideoSource::Want::Any, [] { return false; });
+        return shown ? tests::numberIn(shown->frame) : -1;
+    }
+
+    std::shared_ptr<std::atomic<bool>> cancelled = std::make_shared<std::atomic<bool>>(false);
+};
+
+TEST_F(Scrubbing, EachGroupOfPicturesIsDecodedOnce)
+{
+    const auto movie = source("long-gop.mp4");
+    EXPECT_EQ(number(*movie, 300), 300);
+    const auto once = movie->decodedCount();
+    EXPECT_LE(once, 304);
+    for (int i = 299; i >= 0; --i)
+        ASSERT_EQ(number(*movie, i), i);
+    EXPECT_EQ(movie->decodedCount(), once) << "stepping back decodes nothing again";
+    EXPECT_EQ(number(*movie, 310), 310);
+    EXPECT_LE(movie->decodedCount(), 314) << "going forward goes on where it stood";
+}
+
+TEST_F(Scrubbing, TheCacheKeepsItsBound)
+{
+    ffmpeg::FrameCache cache(3'000'000);
+    const auto movie = source("long-gop.mp4");
+    std::int64_t until = 0;
+    for (int i = 0; i < 100; ++i) {
+        const auto shown = movie->at(until, ffmpeg::VideoSource::Want::Full, [] { return false; });
+        ASSERT_TRUE(shown);
+        cache.insert(*shown, shown->frame->pts());
+        ASSERT_LE(cache.byteCount(), 3'000'000u);
+        until = shown->until;
+    }
+    EXPECT_FALSE(cache.at(0)) << "the farthest goes first";
+    EXPECT_TRUE(cache.at(99 * 256));
+    EXPECT_FALSE(cache.at(100 * 256)) << "nobody knows what comes there";
+}
+
+TEST_F(Scrubbing, AStoppedSearchGivesNothingAndTheNextOneStillWorks)
+{
+    const auto movie = source("long-gop.mp4");
+    int asked = 0;
+    EXPECT_FALSE(movie->at(1000 * 256, ffmpeg::VideoSource::Want::Any, [&] { return ++asked > 50; }));
+    EXPECT_EQ(number(*movie, 5), 5);
+    EXPECT_EQ(number(*movie, 700), 700);
+}
+
+} // namespace
