@@ -1,0 +1,49 @@
+// The host's program: does what its command line says.
+
+#include "app/host/CommandLine.h"
+#include "app/host/OpenMovie.h"
+#include "app/host/TerminationSignals.h"
+
+#include <QCoreApplication>
+
+#include <cstdio>
+#include <string>
+#include <vector>
+
+namespace {
+
+int run(const host::OpenCommand& command)
+{
+    return host::openMovie(command);
+}
+
+int run(const host::ServiceCommand&)
+{
+    return host::kExitFailed;
+}
+
+int run(const host::HelpCommand&)
+{
+    std::fputs(host::kHelpText, stdout);
+    return host::kExitDone;
+}
+
+int run(const host::VersionCommand&)
+{
+    std::fputs(host::kVersionText, stdout);
+    return host::kExitDone;
+}
+
+} // namespace
+
+int main(int argc, char* argv[])
+{
+    const auto command = host::parseCommandLine(std::vector<std::string>(argv + 1, argv + argc));
+    if (!command) {
+        std::fprintf(stderr, "clipsa: %s\n", command.error()->description().c_str());
+        return host::kExitUsage;
+    }
+    host::blockTerminationSignals();
+    const QCoreApplication application(argc, argv);
+    return std::visit([](const auto& chosen) { return run(chosen); }, command.value());
+}

@@ -1,0 +1,207 @@
+#include "app/host/CommandLine.h"
+
+#include "app/host/RequestText.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cstdint>
+#include <limits>
+
+namespace host {
+
+const char* const kHelpText = R"(Clipsa looks at, trims, saves and shares a screen recording.
+
+  clipsa open MOVIE [OPTION…]   open MOVIE in the editor; print what was done with it, one activity a line
+  clipsa service                serve recorders on the session bus, as org.clipsa.Clipsa
+  clipsa tour MOVIE [OPTION…]   open MOVIE without a screen, and leave a picture of each step
+  clipsa --help, --version
+
+Options of open:
+  --app-name NAME           the recorded app, as the title shows it (default: the file's name)
+  --bundle-id ID            the recorded app's desktop or AppStream id
+  --attachment FILE         a file to share along with the movie
+  --message TEXT            the text to share, in place of the usual one
+  --tint #RRGGBB            the colour of the top bar
+  --device phone|pad        the layout (default: as the machine is)
+  --home-button yes|no      whether the device has a home button
+  --graphics-quality N      10 spares a slow device live blurs
+  --json                    print one JSON object in place of lines
+
+MOVIE is never changed: the editor gets a name of its own for it, or a copy.
+Exit status: 0 the user has finished; 1 it could not be done; 2 a wrong option or file; 3 the editor ended early.
+)";
+
+const char* const kVersionText = "clipsa " CLIPSA_VERSION "\n";
+
+namespace {
+
+base::ErrorRef usageError(const std::string& text)
+{
+    return base::Error::make("org.clipsa.usage", 2, text + " (see clipsa --help)");
+}
+
+/// The words one by one; `--name=value` is the same as `--name value`, and nothing after `--` is an option.
+class Words {
+public:
+    explicit Words(const std::vector<std::string>& words, std::size_t first) : m_words(words), m_next(first) {}
+
+    /// False at the end.
+    bool advance()
+    {
+        m_value.reset();
+        if (m_next >= m_words.size())
+            return false;
+        m_word = m_words[m_next++];
+        if (!m_onlyPlain && m_word == "--") {
+            m_onlyPlain = true;
+            return advance();
+        }
+        m_isOption = !m_onlyPlain && m_word.size() > 1 && m_word.front() == '-';
+        const std::size_t equals = m_word.find('=');
+        if (m_isOption && equals != std::string::npos) {
+            m_value = m_word.substr(equals + 1);
+            m_word.resize(equals);
+        }
+        return true;
+    }
+
+    bool isOption() const { return m_isOption; }
+    const std::string& word() const { return m_word; }
+    bool hasOwnValue() const { return m_value.has_value(); }
+
+    base::Result<std::string> value()
+    {
+        if (!m_value && m_next < m_words.size())
+            m_value = m_words[m_next++];
+        if (!m_value)
+            return usageError(m_word + " needs a value");
+        if (const auto checked = checkText(*m_value, "the value of " + m_word); !checked)
+            return checked.error();
+        return *m_value;
+    }
+
+private:
+    const std::vector<std::string>& m_words;
+    std::size_t m_next;
+    bool m_onlyPlain = false;
+    bool m_isOption = false;
+    std::string m_word;
+    std::optional<std::string> m_value;
+};
+
+std::optional<std::int32_t> wholeNumber(const std::string& text)
+{
+    std::int32_t number = 0;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+    if (error != std::errc() || end != text.data() + text.size() || number < 0)
+        return std::nullopt;
+    return number;
+}
+
+base::Result<void> takeEditorOption(OpenCommand& command, const std::string& option, const std::string& value)
+{
+    if (option == "--device" && value != "phone" && value != "pad")
+        return usageError("--device is phone or pad, not \"" + value + "\"");
+    if (option == "--home-button" && value != "yes" && value != "no")
+        return usageError("--home-button is yes or no, not \"" + value + "\"");
+    if (option == "--graphics-quality" && !wholeNumber(value))
+        return usageError("--graphics-quality is a number from 0 up, not \"" + value + "\"");
+    command.editorArguments.push_back(option);
+    command.editorArguments.push_back(value);
+    return {};
+}
+
+base::Result<void> takeOpenOption(OpenCommand& command, Words& words)
+{
+    const std::string option = words.word();
+    if (option == "--json") {
+        if (words.hasOwnValue())
+            return usageError("--json takes no value");
+        command.json = true;
+        return {};
+    }
+    static constexpr const char* kOptions[] = {"--app-name", "--bundle-id", "--attachment",  "--message",
+                                               "--tint",     "--device",    "--home-button", "--graphics-quality"};
+    if (std::find(std::begin(kOptions), std::end(kOptions), option) == std::end(kOptions))
+        return usageError("there is no option " + option);
+    const auto value = words.value();
+    if (!value)
+        return value.error();
+    if (option == "--app-name") {
+        command.appName = value.value();
+    } else if (option == "--bundle-id") {
+        command.bundleId = value.value();
+    } else if (option == "--attachment") {
+        command.attachment = value.value();
+    } else if (option == "--message") {
+        command.message = value.value();
+    } else if (option == "--tint") {
+        command.tint = platform::Color::fromHex(value.value());
+        if (!command.tint)
+            return usageError("--tint is a colour like #3584e4, not \"" + value.value() + "\"");
+    } else {
+        return takeEditorOption(command, option, value.value());
+    }
+    return {};
+}
+
+base::Result<Command> parseOpen(Words words)
+{
+    OpenCommand command;
+    while (words.advance()) {
+        if (words.isOption()) {
+            if (words.word() == "--help" || words.word() == "-h")
+                return Command(HelpCommand{});
+            if (const auto taken = takeOpenOption(command, words); !taken)
+                return taken.error();
+        } else if (!command.movie.empty()) {
+            return usageError("one movie at a time: both " + command.movie + " and " + words.word() + " are given");
+        } else if (words.word().empty()) {
+            return usageError("the movie's name is empty");
+        } else {
+            command.movie = words.word();
+        }
+    }
+    if (command.movie.empty())
+        return usageError("open needs a movie");
+    return Command(std::move(command));
+}
+
+base::Result<Command> parseService(Words words)
+{
+    ServiceCommand command;
+    while (words.advance()) {
+        if (words.word() == "--help" || words.word() == "-h")
+            return Command(HelpCommand{});
+        if (words.word() != "--idle-seconds")
+            return usageError("service knows no " + words.word());
+        const auto value = words.value();
+        if (!value)
+            return value.error();
+        const auto seconds = wholeNumber(value.value());
+        if (!seconds)
+            return usageError("--idle-seconds is a number from 0 up, not \"" + value.value() + "\"");
+        command.idle = std::chrono::seconds(*seconds);
+    }
+    return Command(command);
+}
+
+} // namespace
+
+base::Result<Command> parseCommandLine(const std::vector<std::string>& words)
+{
+    if (words.empty())
+        return usageError("say what to do, for example: clipsa open recording.mp4");
+    const std::string& first = words.front();
+    if (first == "--help" || first == "-h" || first == "help")
+        return Command(HelpCommand{});
+    if (first == "--version")
+        return Command(VersionCommand{});
+    if (first == "open")
+        return parseOpen(Words(words, 1));
+    if (first == "service")
+        return parseService(Words(words, 1));
+    return usageError("there is no command " + first);
+}
+
+} // namespace host

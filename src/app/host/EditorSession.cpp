@@ -1,0 +1,220 @@
+#include "app/host/EditorSession.h"
+
+#include "app/host/EditorDirectory.h"
+#include "app/host/Payload.h"
+#include "linux/dbus/HostConnection.h"
+
+#include <QObject>
+#include <QTimer>
+
+#include <atomic>
+#include <csignal>
+#include <sys/stat.h>
+#include <thread>
+#include <utility>
+
+namespace host {
+
+namespace {
+
+/// How long the last words of a process that has ended can be under way to us.
+constexpr std::chrono::milliseconds kLastWords{500};
+constexpr std::chrono::seconds kLongCopy{1};
+
+} // namespace
+
+struct EditorSession::State final : QObject {
+    State(dbus::EditRequest editRequest, EditorDirectory editorDirectory, const Place& editorPlace, Handlers callbacks)
+        : request(std::move(editRequest)), directory(std::move(editorDirectory)), place(editorPlace),
+          handlers(std::move(callbacks)), movie(std::make_shared<Promise>())
+    {
+        if (request.attachment || !request.attachmentPath.empty())
+            attachment = std::make_shared<Promise>();
+        timer.setSingleShot(true);
+        connect(&timer, &QTimer::timeout, this, &State::whenTimeIsUp);
+    }
+
+    ~State() override
+    {
+        stopping = true;
+        if (worker.joinable())
+            worker.join();
+    }
+
+    base::Result<void> start();
+    void handFilesOver();
+    base::Result<runtime::Value> attachmentPath();
+    CopyProgress progress();
+    void close();
+    void whenTimeIsUp();
+    void processEnded(ProcessEnd end);
+    void end();
+
+    // In the order in which they must outlive each other: the directory goes when the process has gone.
+    dbus::EditRequest request;
+    EditorDirectory directory;
+    Place place;
+    Handlers handlers;
+    std::shared_ptr<Promise> movie;
+    std::shared_ptr<Promise> attachment;
+    std::unique_ptr<dbus::HostConnection> connection;
+    std::unique_ptr<EditorProcess> process;
+    QTimer timer;
+    int nextSignal = SIGTERM;
+    std::optional<ProcessEnd> processEnd;
+    EditorOutcome outcome;
+    bool closing = false;
+
+    std::atomic<bool> stopping = false;
+    std::thread worker;
+};
+
+base::Result<void> EditorSession::State::start()
+{
+    const auto socket = directory.socketPath();
+    if (!socket)
+        return socket.error();
+    auto listening =
+        dbus::HostConnection::listen(socket.value(), payloadItems(request, movie, attachment),
+                                     {.editorConnected = {},
+                                      .finished =
+                                          [this](std::vector<std::string> activityTypes) {
+                                              outcome.activityTypes = std::move(activityTypes);
+                                              // Later, because closing destroys what calls us.
+                                              QMetaObject::invokeMethod(this, &State::close, Qt::QueuedConnection);
+                                              if (handlers.finished)
+                                                  handlers.finished(*outcome.activityTypes);
+                                          },
+                                      .disconnected =
+                                          [this] {
+                                              if (processEnd)
+                                                  QMetaObject::invokeMethod(this, &State::end, Qt::QueuedConnection);
+                                          }});
+    if (!listening)
+        return listening.error();
+    connection = std::move(listening).value();
+
+    ProcessStart editor{place.editorProgram,
+                        {"--connect", connection->address(), "--device-root", directory.deviceRoot()},
+                        request.environment,
+                        directory.lock()};
+    editor.arguments.insert(editor.arguments.end(), request.editorArguments.begin(), request.editorArguments.end());
+    auto started = EditorProcess::start(editor, [this](ProcessEnd ended) { processEnded(ended); });
+    if (!started)
+        return started.error();
+    process = std::move(started).value();
+    worker = std::thread([this] {
+        handFilesOver();
+        sweepEditorDirectories(place.directoriesRoot);
+    });
+    return {};
+}
+
+/// On the worker. The attachment first: the movie is the last that the editor waits for.
+void EditorSession::State::handFilesOver()
+{
+    if (attachment)
+        attachment->keep(attachmentPath());
+    const auto way = handOver(request.movie.get(), directory.movieDirectory(), request.movieName, progress());
+    if (way) {
+        movie->keep(runtime::Value(kDeviceMovieDirectory + request.movieName));
+        return;
+    }
+    movie->keep(way.error());
+    QMetaObject::invokeMethod(this, [this, error = way.error()] {
+        if (!closing)
+            outcome.error = error;
+        close();
+    });
+}
+
+base::Result<runtime::Value> EditorSession::State::attachmentPath()
+{
+    if (!request.attachment)
+        return runtime::Value(request.attachmentPath);
+    const std::string parent = directory.attachmentDirectory();
+    if (::mkdir(parent.c_str(), S_IRWXU) != 0)
+        return base::Error::fromErrno(errno, "cannot make " + parent);
+    const auto way = handOver(request.attachment.get(), parent, request.attachmentName, progress());
+    if (!way)
+        return way.error();
+    return runtime::Value(parent + "/" + request.attachmentName);
+}
+
+CopyProgress EditorSession::State::progress()
+{
+    return [this, start = std::chrono::steady_clock::now(), told = false](std::uint64_t, std::uint64_t total) mutable {
+        if (!told && std::chrono::steady_clock::now() - start > kLongCopy) {
+            told = true;
+            QMetaObject::invokeMethod(this, [this, total] {
+                if (const auto copying = std::exchange(handlers.copying, {}))
+                    copying(total);
+            });
+        }
+        return !stopping;
+    };
+}
+
+void EditorSession::State::close()
+{
+    if (std::exchange(closing, true))
+        return;
+    stopping = true; // nobody waits for the movie any more
+    connection->disconnectEditor();
+    if (processEnd)
+        QMetaObject::invokeMethod(this, &State::end, Qt::QueuedConnection);
+    else
+        timer.start(place.patience);
+}
+
+void EditorSession::State::whenTimeIsUp()
+{
+    if (processEnd) {
+        QMetaObject::invokeMethod(this, &State::end, Qt::QueuedConnection); // not inside the timer that it destroys
+        return;
+    }
+    process->signal(std::exchange(nextSignal, SIGKILL));
+    timer.start(place.patience);
+}
+
+void EditorSession::State::processEnded(ProcessEnd ended)
+{
+    processEnd = ended;
+    timer.stop();
+    // The last message can still be under way when its sender has ended; the end of the connection comes behind it.
+    if (closing)
+        end();
+    else
+        timer.start(kLastWords);
+}
+
+void EditorSession::State::end()
+{
+    timer.stop();
+    outcome.end = processEnd.value_or(ProcessEnd{});
+    if (const auto ended = std::exchange(handlers.ended, {}))
+        ended(outcome); // may destroy us
+}
+
+EditorSession::EditorSession(std::unique_ptr<State> state) : m_state(std::move(state)) {}
+
+EditorSession::~EditorSession() = default;
+
+base::Result<std::unique_ptr<EditorSession>> EditorSession::start(dbus::EditRequest request, const Place& place,
+                                                                  Handlers handlers)
+{
+    auto directory = EditorDirectory::make(place.directoriesRoot);
+    if (!directory)
+        return directory.error();
+    auto state = std::make_unique<State>(std::move(request), std::move(directory).value(), place, std::move(handlers));
+    if (const auto started = state->start(); !started)
+        return started.error();
+    return std::unique_ptr<EditorSession>(new EditorSession(std::move(state)));
+}
+
+void EditorSession::close()
+{
+    m_state->close();
+}
+
+} // namespace host

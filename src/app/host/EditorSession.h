@@ -1,0 +1,63 @@
+/// One editor, from being asked for to being gone: its directory, its process, the connection, and the movie on its way.
+///
+/// Lives on one thread, whose Qt event loop runs; handlers are called there, `ended` last and once, and it may destroy
+/// the session. What the recorder handed in is neither changed nor removed, whatever happens.
+#pragma once
+
+#include "app/host/EditorProcess.h"
+#include "app/host/HandOver.h"
+#include "base/Result.h"
+#include "linux/dbus/EditRequest.h"
+
+#include <chrono>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace host {
+
+struct EditorOutcome {
+    /// What the user did, in order; nothing when the editor did not say that the user has finished.
+    std::optional<std::vector<std::string>> activityTypes;
+    /// How the editor's process ended.
+    ProcessEnd end;
+    /// Why there was nothing to edit, if so: the movie could not be handed over.
+    base::ErrorRef error;
+};
+
+class EditorSession {
+public:
+    struct Place {
+        std::string editorProgram;
+        std::string directoriesRoot; ///< directories of dead editors in it are swept meanwhile
+        /// How long an editor may take to go after being asked, and after SIGTERM, before stronger means are used.
+        std::chrono::milliseconds patience = std::chrono::seconds(10);
+    };
+    struct Handlers {
+        /// The user has finished; the editor is being closed.
+        std::function<void(const std::vector<std::string>& activityTypes)> finished;
+        /// A copy has been under way for a second; at most once.
+        std::function<void(std::uint64_t totalBytes)> copying;
+        std::function<void(const EditorOutcome&)> ended;
+    };
+
+    /// Starts the editor before anything that takes long; the movie arrives while it starts up.
+    static base::Result<std::unique_ptr<EditorSession>> start(dbus::EditRequest request, const Place& place,
+                                                              Handlers handlers);
+    /// Closes the editor the hard way if it still runs.
+    ~EditorSession();
+
+    /// Asks the editor to go; `ended` follows when it has.
+    void close();
+
+private:
+    struct State;
+
+    explicit EditorSession(std::unique_ptr<State> state);
+
+    std::unique_ptr<State> m_state;
+};
+
+} // namespace host

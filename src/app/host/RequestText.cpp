@@ -1,0 +1,94 @@
+#include "app/host/RequestText.h"
+
+#include "linux/dbus/Protocol.h"
+
+namespace host {
+
+namespace {
+
+/// The length of the UTF-8 character that `text` begins with; 0 when it begins with none.
+std::size_t characterLength(std::string_view text)
+{
+    const auto byte = [text](std::size_t i) { return static_cast<unsigned char>(text[i]); };
+    const std::size_t length = byte(0) < 0x80                      ? 1
+                               : byte(0) >= 0xC2 && byte(0) < 0xE0 ? 2
+                               : byte(0) >= 0xE0 && byte(0) < 0xF0 ? 3
+                               : byte(0) >= 0xF0 && byte(0) < 0xF5 ? 4
+                                                                   : 0;
+    if (length > text.size())
+        return 0;
+    for (std::size_t i = 1; i < length; ++i)
+        if ((byte(i) & 0xC0) != 0x80)
+            return 0;
+    // Neither longer than needed, nor half a surrogate pair, nor beyond the last character.
+    if ((byte(0) == 0xE0 && byte(1) < 0xA0) || (byte(0) == 0xED && byte(1) > 0x9F)
+        || (byte(0) == 0xF0 && byte(1) < 0x90) || (byte(0) == 0xF4 && byte(1) > 0x8F))
+        return 0;
+    return length;
+}
+
+bool isControl(char character)
+{
+    return static_cast<unsigned char>(character) < 0x20 || character == 0x7F;
+}
+
+/// Copies characters as long as they fit into `limit` bytes; `one` gives what stands for a character.
+template <typename Replace> std::string rewritten(std::string_view text, std::size_t limit, Replace&& replace)
+{
+    std::string result;
+    while (!text.empty()) {
+        const std::size_t length = characterLength(text);
+        const std::string_view piece = length == 0 ? std::string_view("_") : replace(text.substr(0, length));
+        if (result.size() + piece.size() > limit)
+            break;
+        result += piece;
+        text.remove_prefix(length == 0 ? 1 : length);
+    }
+    return result;
+}
+
+} // namespace
+
+base::Result<void> checkText(std::string_view text, const std::string& what)
+{
+    if (text.size() > dbus::kMaximumTextSize)
+        return base::Error::make(dbus::kErrorDomain, dbus::kTooLarge, what + " is longer than 1 MiB; shorten it");
+    for (std::string_view rest = text; !rest.empty();) {
+        const std::size_t length = characterLength(rest);
+        if (length == 0 || rest.front() == '\0')
+            return base::Error::make(dbus::kErrorDomain, dbus::kBadArgument, what + " is not UTF-8 text");
+        rest.remove_prefix(length);
+    }
+    return {};
+}
+
+std::string safeFileName(std::string_view name, std::string_view fallback)
+{
+    name.remove_prefix(name.rfind('/') + 1);
+    // What does not fit goes from the stem: the extension says what kind of file it is.
+    const std::size_t dot = name.rfind('.');
+    const bool hasExtension = dot != std::string_view::npos && dot > 0 && name.size() - dot <= 16;
+    const auto plain = [](std::string_view character) {
+        return isControl(character.front()) ? std::string_view("_") : character;
+    };
+    const std::string extension = hasExtension ? rewritten(name.substr(dot), 32, plain) : "";
+    std::string safe = rewritten(hasExtension ? name.substr(0, dot) : name, 255 - extension.size(), plain) + extension;
+    return safe.empty() || safe == "." || safe == ".." ? std::string(fallback) : safe;
+}
+
+std::string safeAppName(std::string_view name)
+{
+    return rewritten(name, 200, [](std::string_view character) -> std::string_view {
+        if (character == "/")
+            return "\u2044";
+        return isControl(character.front()) ? " " : character;
+    });
+}
+
+std::string withoutExtension(std::string_view fileName)
+{
+    const std::size_t dot = fileName.rfind('.');
+    return std::string(dot == std::string_view::npos || dot == 0 ? fileName : fileName.substr(0, dot));
+}
+
+} // namespace host
