@@ -40,13 +40,15 @@ function(layer NAME)
     endforeach()
 endfunction()
 
-# program(NAME MAIN LINKS layer… LIBRARIES target…): an executable made of one main file and layers.
+# program(NAME MAIN LINKS layer… LIBRARIES target…): an executable made of one main file and layers. Its target is called
+# program-NAME, because the layer `editor` is the target clipsa-editor.
 function(program NAME MAIN)
     cmake_parse_arguments(PARSE_ARGV 2 PROGRAM "" "" "LINKS;LIBRARIES")
-    add_executable(${NAME} ${MAIN})
-    target_link_libraries(${NAME} PRIVATE clipsa-compile ${PROGRAM_LIBRARIES})
+    add_executable(program-${NAME} ${MAIN})
+    set_target_properties(program-${NAME} PROPERTIES OUTPUT_NAME ${NAME})
+    target_link_libraries(program-${NAME} PRIVATE clipsa-compile ${PROGRAM_LIBRARIES})
     foreach(link IN LISTS PROGRAM_LINKS)
         string(REPLACE "/" "-" linkTarget "clipsa-${link}")
-        target_link_libraries(${NAME} PRIVATE ${linkTarget})
+        target_link_libraries(program-${NAME} PRIVATE ${linkTarget})
     endforeach()
 endfunction()

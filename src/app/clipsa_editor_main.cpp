@@ -1,0 +1,22 @@
+// The extension's process. It is started by its host, gets the payload through a private connection, and ends with it.
+
+#include "app/editor/EditorOptions.h"
+#include "app/editor/EditorProgram.h"
+
+#include <QGuiApplication>
+
+#include <cstdio>
+
+int main(int argc, char* argv[])
+{
+    const auto options = app::EditorOptions::parse({argv + 1, argv + argc});
+    if (!options) {
+        std::fprintf(stderr, "clipsa-editor: %s\n", options.error()->description().c_str());
+        return 2;
+    }
+    QGuiApplication application(argc, argv);
+    QGuiApplication::setApplicationName("Clipsa");
+    QGuiApplication::setDesktopFileName("org.clipsa.Clipsa");
+    QGuiApplication::setQuitOnLastWindowClosed(false);
+    return app::EditorProgram(options.value()).run();
+}

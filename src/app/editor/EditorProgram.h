@@ -1,0 +1,79 @@
+/// The editor process: makes the platform on Linux, starts the extension in it, and ends with its host. GUI thread.
+///
+/// From a connection to a host it takes the payload; the window opens once the payload has been loaded, or has not come
+/// in time. When the host closes the connection, or dies, the extension disappears and run() returns.
+#pragma once
+
+#include "app/editor/EditorOptions.h"
+#include "app/editor/PayloadWatch.h"
+#include "linux/dbus/ExtensionConnection.h"
+#include "linux/ffmpeg/FFmpegMediaFramework.h"
+#include "linux/icu/Calendar.h"
+#include "linux/qt/MainLoop.h"
+#include "linux/qt/Presenter.h"
+#include "linux/qt/SvgImageCatalog.h"
+#include "linux/xdg/DeviceProfile.h"
+#include "linux/xdg/FileManager.h"
+#include "platform/hosting/ExtensionContext.h"
+
+#include <memory>
+#include <optional>
+
+class VKVideoEditorViewController;
+
+namespace app {
+
+class Script;
+
+class EditorProgram {
+public:
+    /// A host that does not hand over its payload in that time gets a window that shows what there is.
+    static constexpr base::Instant kPayloadLimit = std::chrono::seconds(1);
+
+    explicit EditorProgram(const EditorOptions& options);
+    ~EditorProgram();
+
+    /// Until the host is done with us; gives the process's exit status.
+    int run();
+
+    const base::System& system() const { return m_system; }
+    platform::Window& window() { return *m_window; }
+    qtui::Presenter& presenter() { return m_presenter; }
+    /// Null before the payload has come, and after the end.
+    std::shared_ptr<VKVideoEditorViewController> editor() const;
+
+private:
+    base::Result<void> start();
+    void show();
+    void closeRequested();
+    void disconnected();
+
+    EditorOptions m_options;
+    base::SystemClock m_clock;
+    base::StreamLog m_log;
+    base::MainQueue m_mainQueue;
+    qtui::MainLoop m_loop;
+    // They end before the main queue that they post to, and before the loop that it wakes.
+    base::WorkerQueue m_backgroundQueue;
+    base::WorkerQueue m_defaultQueue;
+    base::System m_system;
+
+    runtime::NotificationCenter m_notifications;
+    std::shared_ptr<platform::Window> m_window;
+    xdg::DeviceProfile m_device;
+    qtui::SvgImageCatalog m_images;
+    xdg::FileManager m_files;
+    intl::Calendar m_calendar;
+    ffmpeg::FFmpegMediaFramework m_media;
+    platform::Platform m_platform;
+    qtui::Presenter m_presenter;
+
+    std::shared_ptr<dbus::ExtensionConnection> m_connection;
+    platform::Extension m_extension;
+    PayloadWatch m_payload;
+    std::unique_ptr<Script> m_script;
+    bool m_shown = false;
+    int m_exitStatus = 0;
+};
+
+} // namespace app

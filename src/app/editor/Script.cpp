@@ -1,0 +1,233 @@
+#include "app/editor/Script.h"
+
+#include "app/editor/EditorProgram.h"
+#include "app/editor/SyntheticInput.h"
+#include "editor/VKVideoEditorViewController.h"
+
+#include <QFile>
+#include <QGuiApplication>
+#include <QImage>
+#include <QQuickWindow>
+
+#include <cstdio>
+#include <cstdlib>
+#include <sstream>
+
+namespace app {
+
+namespace {
+
+constexpr base::Instant kRetry = std::chrono::milliseconds(5);
+
+double number(const std::string& text)
+{
+    return std::strtod(text.c_str(), nullptr);
+}
+
+/// The frontmost visible view with that accessible name.
+std::shared_ptr<platform::View> viewNamed(const std::shared_ptr<platform::View>& view, const std::string& name)
+{
+    if (view->isHidden() || view->alpha() < 0.01)
+        return nullptr;
+    const auto subviews = view->subviews();
+    for (auto it = subviews.rbegin(); it != subviews.rend(); ++it)
+        if (auto found = viewNamed(*it, name))
+            return found;
+    return view->accessibility().name == name ? view : nullptr;
+}
+
+std::string seconds(double value)
+{
+    char text[32];
+    std::snprintf(text, sizeof text, "%.3f", value);
+    return text;
+}
+
+void replace(std::string& text, const std::string& from, const std::string& to)
+{
+    for (auto at = text.find(from); at != std::string::npos; at = text.find(from, at + to.size()))
+        text.replace(at, from.size(), to);
+}
+
+} // namespace
+
+Script::Script(EditorProgram& program, const std::string& path) : m_program(program)
+{
+    QFile file(QString::fromStdString(path));
+    if (!file.open(QIODevice::ReadOnly)) {
+        m_commands.push_back({"missing", path});
+        return;
+    }
+    std::istringstream lines(file.readAll().toStdString());
+    for (std::string line; std::getline(lines, line);) {
+        std::istringstream stream(line.substr(0, line.find('#')));
+        Words words;
+        for (std::string word; stream >> word;)
+            words.push_back(word);
+        if (!words.empty())
+            m_commands.push_back(std::move(words));
+    }
+    program.presenter().setFirstPictureHandler([this] { m_pictureSeen = true; });
+}
+
+Script::~Script() = default;
+
+void Script::start()
+{
+    next();
+}
+
+void Script::next()
+{
+    const auto& clock = m_program.system().clock;
+    if (!m_since)
+        m_since = clock.now();
+    while (m_next < m_commands.size()) {
+        const std::weak_ptr<bool> alive = m_alive;
+        const bool done = carryOut(m_commands[m_next]);
+        if (alive.expired())
+            return;
+        if (!done)
+            break;
+        ++m_next;
+        m_since = clock.now();
+    }
+    if (m_next == m_commands.size())
+        return;
+    if (clock.now() - *m_since > kCommandLimit) {
+        std::string line;
+        for (const std::string& word : m_commands[m_next])
+            line += word + " ";
+        fail("the script cannot go on at: " + line);
+        return;
+    }
+    m_program.system().mainQueue.postAfter(kRetry, [this, alive = std::weak_ptr(m_alive)] {
+        if (!alive.expired())
+            next();
+    });
+}
+
+void Script::fail(const std::string& why)
+{
+    m_program.system().log.error(why);
+    QGuiApplication::exit(5);
+    std::_Exit(5);
+}
+
+bool Script::carryOut(const Words& words)
+{
+    const std::string& command = words.front();
+    const auto argument = [&](std::size_t i) { return i < words.size() ? words[i] : std::string(); };
+    if (command == "size") {
+        const QSize size(static_cast<int>(number(argument(1))), static_cast<int>(number(argument(2))));
+        QQuickWindow& window = m_program.presenter().quickWindow();
+        if (window.size() != size)
+            window.resize(size);
+        return m_program.window().View::bounds().size == base::Size{double(size.width()), double(size.height())};
+    }
+    if (command == "wait")
+        return waitFor(argument(1));
+    if (command == "tap")
+        return tap(words);
+    if (command == "drag")
+        return drag(words);
+    if (command == "key")
+        return key(argument(1));
+    if (command == "scheme") {
+        m_program.presenter().setScheme(argument(1) == "dark" ? qtui::Scheme::Dark : qtui::Scheme::Light);
+        return true;
+    }
+    if (command == "pause")
+        return m_program.system().clock.now() - *m_since
+            >= std::chrono::duration_cast<base::Instant>(std::chrono::duration<double, std::milli>(number(argument(1))));
+    if (command == "picture")
+        return picture(argument(1));
+    if (command == "print") {
+        print(words);
+        return true;
+    }
+    return false;
+}
+
+bool Script::waitFor(const std::string& what) const
+{
+    const auto editor = m_program.editor();
+    if (!editor)
+        return false;
+    if (what == "picture")
+        return m_pictureSeen;
+    if (what == "ready")
+        return editor->currentItemLoaded()
+            || editor->avPlayerItem()->status() == platform::PlayerItem::Status::Failed;
+    if (what == "hidden" || what == "shown") // and what the fade takes
+        return editor->isUIHidden() == (what == "hidden")
+            && m_program.system().clock.now() - *m_since > VKVideoEditorViewController::kFadeDuration;
+    return false;
+}
+
+bool Script::tap(const Words& words)
+{
+    base::Point at;
+    if (words.size() == 3) {
+        at = {number(words[1]), number(words[2])};
+    } else {
+        const auto view = viewNamed(m_program.window().rootViewController()->view(), words.at(1));
+        if (!view)
+            return false;
+        at = view->convertToRoot({view->bounds().width() / 2, view->bounds().height() / 2});
+    }
+    SyntheticInput input(m_program.presenter().quickWindow());
+    input.press(at);
+    input.release(at);
+    return true;
+}
+
+bool Script::drag(const Words& words)
+{
+    constexpr int kSteps = 20;
+    if (words.size() != 5)
+        return false;
+    const base::Point from{number(words[1]), number(words[2])};
+    const base::Point to{number(words[3]), number(words[4])};
+    SyntheticInput input(m_program.presenter().quickWindow());
+    input.press(from);
+    for (int i = 1; i <= kSteps; ++i) {
+        const double part = double(i) / kSteps;
+        input.move({from.x + (to.x - from.x) * part, from.y + (to.y - from.y) * part});
+    }
+    input.release(to);
+    return true;
+}
+
+bool Script::key(const std::string& name)
+{
+    return SyntheticInput(m_program.presenter().quickWindow()).key(name);
+}
+
+bool Script::picture(const std::string& file)
+{
+    const char* folder = std::getenv("CLIPSA_PICTURES");
+    const QString path = QString::fromStdString((folder ? std::string(folder) + "/" : std::string()) + file);
+    if (!m_program.presenter().grab().save(path))
+        fail("cannot write the picture " + path.toStdString());
+    return true;
+}
+
+void Script::print(const Words& words) const
+{
+    std::string line;
+    for (std::size_t i = 1; i < words.size(); ++i)
+        line += (i > 1 ? " " : "") + words[i];
+    if (const auto editor = m_program.editor()) {
+        replace(line, "{time}", seconds(editor->avPlayer()->currentTime().seconds()));
+        replace(line, "{duration}", seconds(editor->getPlayerDuration()));
+        const base::Size size = editor->getVideoSize();
+        replace(line, "{size}",
+                std::to_string(static_cast<int>(size.width)) + "x" + std::to_string(static_cast<int>(size.height)));
+        replace(line, "{chrome}", editor->isUIHidden() ? "hidden" : "shown");
+    }
+    std::printf("%s\n", line.c_str());
+    std::fflush(stdout);
+}
+
+} // namespace app

@@ -1,0 +1,60 @@
+/// Does to the editor what a person would, by a script: for the guided tour, and for tests of the whole program.
+///
+/// A script is a text file, one command a line, `#` for comments:
+///   size W H               resize the window, in points
+///   wait picture|ready     until the movie's first picture is shown; until its item is ready (or failed)
+///   wait hidden|shown      until the chrome has faded out or in
+///   tap NAME  |  tap X Y   touch a control by its accessible name, or a place in points
+///   drag X1 Y1 X2 Y2       touch, move in small steps, lift
+///   key NAME               space, escape, return, left, right, home, end, tab, comma, period, undo
+///   scheme light|dark
+///   pause MILLISECONDS     let time pass
+///   picture FILE           write what is on the screen as a PNG, into $CLIPSA_PICTURES or here
+///   print WORDS            a line on standard output; {time}, {duration}, {size}, {chrome} are filled in
+/// A command that cannot be carried out within ten seconds ends the process with status 5. GUI thread.
+#pragma once
+
+#include "base/Clock.h"
+
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace app {
+
+class EditorProgram;
+
+class Script {
+public:
+    static constexpr base::Instant kCommandLimit = std::chrono::seconds(10);
+
+    Script(EditorProgram& program, const std::string& path);
+    ~Script();
+
+    void start();
+
+private:
+    using Words = std::vector<std::string>;
+
+    /// Whether the command is done; if not, it is tried again a little later.
+    bool carryOut(const Words& words);
+    bool waitFor(const std::string& what) const;
+    bool tap(const Words& words);
+    bool drag(const Words& words);
+    bool key(const std::string& name);
+    bool picture(const std::string& file);
+    void print(const Words& words) const;
+    void next();
+    void fail(const std::string& why);
+
+    EditorProgram& m_program;
+    std::vector<Words> m_commands;
+    std::size_t m_next = 0;
+    std::optional<base::Instant> m_since;
+    bool m_pictureSeen = false;
+    std::shared_ptr<bool> m_alive = std::make_shared<bool>(true);
+};
+
+} // namespace app
