@@ -1,0 +1,51 @@
+/// The window on the screen, as far as Qt is concerned: hands events to the presenter. GUI thread.
+#pragma once
+
+#include "linux/qt/input/InputFeed.h"
+
+#include <QQuickItem>
+#include <QQuickWindow>
+
+#include <atomic>
+
+namespace qtui {
+
+class Mirror;
+class Presenter;
+
+/// Where the items hang; tells when a picture is due.
+class RootItem final : public QQuickItem {
+public:
+    explicit RootItem(std::function<void()> due) : m_due(std::move(due)) {}
+
+protected:
+    void updatePolish() override { m_due(); }
+
+private:
+    std::function<void()> m_due;
+};
+
+class StageWindow final : public QQuickWindow {
+public:
+    StageWindow(Presenter& presenter, platform::Window& views, const base::Clock& clock);
+    ~StageWindow() override;
+
+    RootItem& root() { return m_root; }
+    InputFeed& input() { return m_input; }
+    platform::Window& views() const { return m_views; }
+    const Mirror& mirror() const;
+
+    QAccessibleInterface* accessibleRoot() const override;
+
+protected:
+    bool event(QEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
+
+private:
+    Presenter& m_presenter;
+    platform::Window& m_views;
+    InputFeed m_input;
+    RootItem m_root;
+};
+
+} // namespace qtui

@@ -1,0 +1,36 @@
+/// What assistive technology sees of a window: the views that have a role, with what can be done to them. GUI thread.
+///
+/// The tree is asked for live from the views; an interface lives as long as the view's item.
+#pragma once
+
+#include "platform/views/View.h"
+
+#include <memory>
+#include <vector>
+
+namespace qtui {
+
+class StageWindow;
+class ViewItem;
+
+/// Makes Qt answer for stage windows and view items. Any number of times.
+void installAccessibility();
+
+/// The views below `view` that can be seen and have a role; views without one give way to what is below them.
+std::vector<std::shared_ptr<platform::View>> accessibleChildren(const platform::View& view);
+
+/// Tells who listens what a commit has changed.
+class Announcer {
+public:
+    void announce(StageWindow& window);
+
+private:
+    std::weak_ptr<platform::View> m_focused;
+    double m_number = 0; ///< of the focused view, where it has one
+};
+
+/// Tell who listens that an item has come, or is about to go. Nothing when nobody listens.
+void announceCreated(ViewItem& item);
+void announceRemoved(ViewItem& item);
+
+} // namespace qtui

@@ -1,0 +1,48 @@
+/// What an item draws: filled rectangles and pictures, back to front. Works the same on every rendering backend.
+#pragma once
+
+#include <QColor>
+#include <QImage>
+#include <QQuickItem>
+
+#include <functional>
+#include <vector>
+
+class QPainter;
+
+namespace qtui {
+
+/// One rectangle, in the item's coordinates: a picture stretched over it, or a colour where there is none.
+struct Sprite {
+    QRectF rect;
+    QColor color;
+    QImage image;
+    bool smooth = false; ///< interpolated when stretched; sharp pixels otherwise
+
+    bool isPicture() const { return !image.isNull(); }
+};
+
+/// A picture of `area` (item coordinates, points) at `scale` pixels per point, painted by `paint` in points.
+Sprite paintedSprite(const QRectF& area, double scale, const std::function<void(QPainter&)>& paint);
+
+/// An item that shows sprites. GUI thread, except where Qt Quick says otherwise.
+class SpriteItem : public QQuickItem {
+public:
+    SpriteItem();
+
+    const std::vector<Sprite>& sprites() const { return m_sprites; }
+    /// Draws them with the next picture.
+    void setSprites(std::vector<Sprite> sprites);
+    /// Moves everything that is drawn, children aside.
+    void setSpriteOffset(QPointF offset);
+
+protected:
+    /// Runs on the render thread while the GUI thread stands still.
+    QSGNode* updatePaintNode(QSGNode* node, UpdatePaintNodeData* data) override;
+
+private:
+    std::vector<Sprite> m_sprites;
+    QPointF m_offset;
+};
+
+} // namespace qtui

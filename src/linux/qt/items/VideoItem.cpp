@@ -1,0 +1,60 @@
+#include "linux/qt/items/VideoItem.h"
+
+#include <algorithm>
+#include <cmath>
+
+namespace qtui {
+
+using Quality = platform::VideoFrame::Quality;
+
+void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
+{
+    if (!visible)
+        return;
+    const platform::VideoFrameRef frame = layer.currentFrame();
+    const base::Rect fitted = layer.videoRect(base::Rect::make(0, 0, shownSize().width(), shownSize().height()));
+    const Quality quality = layer.player() && layer.player()->isPlaying() ? Quality::Fast : Quality::Exact;
+    const QRectF wanted = toQRectF(fitted);
+    const QRectF rect(stage().snapped(wanted.topLeft()), stage().snapped(wanted.bottomRight()));
+    const QSize size(static_cast<int>(std::lround(rect.width() * stage().scale)),
+                     static_cast<int>(std::lround(rect.height() * stage().scale)));
+    const bool showable = frame && !size.isEmpty();
+    // A picture that rests is worth converting again when it was converted in haste.
+    const bool good = m_frame == frame && m_picture.size() == size && m_quality >= quality;
+    if (good && m_pictureRect == rect && m_shownSize == shownSize())
+        return;
+    if (!good) {
+        m_frame = frame;
+        m_picture = {};
+        if (showable && convert(*frame, size, quality))
+            m_quality = quality;
+    }
+    m_pictureRect = m_picture.isNull() ? QRectF() : rect;
+    m_shownSize = shownSize();
+    setSprites({{ownRect(), Qt::black, {}, false}, {m_pictureRect, {}, m_picture, false}});
+}
+
+bool VideoItem::convert(const platform::VideoFrame& frame, QSize size, Quality quality)
+{
+    QImage& buffer = freeBuffer(size);
+    ++stage().statistics.pictures;
+    if (!frame.render(buffer.bits(), buffer.bytesPerLine(), size.width(), size.height(), quality))
+        return false;
+    m_picture = buffer;
+    return true;
+}
+
+QImage& VideoItem::freeBuffer(QSize size)
+{
+    const auto isFree = [&](const QImage& buffer) { return buffer.size() == size && buffer.isDetached(); };
+    auto found = std::find_if(m_buffers.begin(), m_buffers.end(), isFree);
+    if (found == m_buffers.end()) {
+        // In turn, so that the one given up is the oldest; who still shows it keeps its pixels alive.
+        std::rotate(m_buffers.begin(), m_buffers.begin() + 1, m_buffers.end());
+        found = m_buffers.end() - 1;
+        *found = QImage(size, QImage::Format_RGB32);
+    }
+    return *found;
+}
+
+} // namespace qtui
