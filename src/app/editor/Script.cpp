@@ -123,7 +123,9 @@ bool Script::carryOut(const Words& words)
         QQuickWindow& window = m_program.presenter().quickWindow();
         if (window.size() != size)
             window.resize(size);
-        return m_program.window().View::bounds().size == base::Size{double(size.width()), double(size.height())};
+        // And what the transition takes to settle.
+        return m_program.window().View::bounds().size == base::Size{double(size.width()), double(size.height())}
+            && m_program.system().clock.now() - *m_since > 2 * platform::Window::kTransitionDuration;
     }
     if (command == "wait")
         return waitFor(argument(1));

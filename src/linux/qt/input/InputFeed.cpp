@@ -94,7 +94,7 @@ void InputFeed::cancelTouches()
 void InputFeed::touch(const QTouchEvent& event)
 {
     for (const QEventPoint& point : event.points()) {
-        const base::Point position = toPoint(point.position());
+        const base::Point position = toPoint(point.scenePosition());
         switch (point.state()) {
         case QEventPoint::Pressed:
             down(point.id(), position);
