@@ -2,6 +2,7 @@
 
 #include "app/host/CommandLine.h"
 #include "app/host/OpenMovie.h"
+#include "app/host/ServeRecorders.h"
 #include "app/host/TerminationSignals.h"
 
 #include <QCoreApplication>
@@ -17,9 +18,9 @@ int run(const host::OpenCommand& command)
     return host::openMovie(command);
 }
 
-int run(const host::ServiceCommand&)
+int run(const host::ServiceCommand& command)
 {
-    return host::kExitFailed;
+    return host::serveRecorders(command);
 }
 
 int run(const host::HelpCommand&)

@@ -214,6 +214,7 @@ base::Result<std::unique_ptr<EditorSession>> EditorSession::start(dbus::EditRequ
 
 void EditorSession::close()
 {
+    m_state->outcome.closed = true;
     m_state->close();
 }
 

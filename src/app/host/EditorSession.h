@@ -25,6 +25,8 @@ struct EditorOutcome {
     ProcessEnd end;
     /// Why there was nothing to edit, if so: the movie could not be handed over.
     base::ErrorRef error;
+    /// Whether the editor went because close() asked it to.
+    bool closed = false;
 };
 
 class EditorSession {

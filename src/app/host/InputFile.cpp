@@ -1,5 +1,7 @@
 #include "app/host/InputFile.h"
 
+#include "linux/dbus/EditRequest.h"
+
 #include <cerrno>
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -10,7 +12,7 @@ namespace {
 
 base::ErrorRef refusal(int number, const std::string& text)
 {
-    return base::Error::make(base::kPosixErrorDomain, number, text);
+    return base::Error::make(dbus::kBadInputDomain, number, text);
 }
 
 base::ErrorRef cannotOpen(const std::string& path, int number)
@@ -23,11 +25,11 @@ base::ErrorRef cannotOpen(const std::string& path, int number)
     case EPERM:
         return refusal(number, path + " may not be read; ask its owner for permission, or copy it");
     case ELOOP:
-        return refusal(number, path + " is a link that leads nowhere; give the file itself");
+        return refusal(number, path + " is a link that leads round in circles; give the file itself");
     case ENXIO:
         return refusal(number, path + " is not a file with a movie; give a recording that is on disk");
     default:
-        return base::Error::fromErrno(number, "cannot open " + path);
+        return refusal(number, base::Error::fromErrno(number, "cannot open " + path)->description());
     }
 }
 
@@ -48,7 +50,7 @@ base::Result<void> checkInput(int descriptor, const std::string& what, Emptiness
     struct stat status = {};
     const int flags = ::fcntl(descriptor, F_GETFL);
     if (flags < 0 || ::fstat(descriptor, &status) != 0)
-        return base::Error::fromErrno(errno, "cannot look at " + what);
+        return refusal(errno, base::Error::fromErrno(errno, "cannot look at " + what)->description());
     if (S_ISDIR(status.st_mode))
         return refusal(EISDIR, what + " is a directory; give one recording in it");
     if (!S_ISREG(status.st_mode))

@@ -1,4 +1,5 @@
-/// The files that are handed in, opened and looked at without trusting them. Any thread.
+/// The files that are handed in, opened and looked at without trusting them. Any thread. Errors are of
+/// dbus::kBadInputDomain: one line that names the file and says what to do.
 #pragma once
 
 #include "base/Result.h"
@@ -10,8 +11,7 @@ namespace host {
 
 enum class Emptiness { Allowed, Refused };
 
-/// Opens a regular file for reading, without waiting for a FIFO's other end. The error is one line that names the file
-/// and says what to do.
+/// Opens a regular file for reading, without waiting for a FIFO's other end.
 base::Result<dbus::FileDescriptor> openInput(const std::string& path, Emptiness emptiness);
 
 /// Whether a descriptor that somebody sent is a regular file that can be read. Looks at nothing but the descriptor.

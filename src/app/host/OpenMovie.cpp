@@ -2,8 +2,7 @@
 
 #include "app/host/EditorDirectory.h"
 #include "app/host/EditorSession.h"
-#include "app/host/InputFile.h"
-#include "app/host/RequestText.h"
+#include "app/host/PrepareRequest.h"
 #include "app/host/TerminationSignals.h"
 
 #include <QCoreApplication>
@@ -12,8 +11,6 @@
 #include <QJsonObject>
 
 #include <cstdio>
-#include <cstdlib>
-#include <memory>
 
 namespace host {
 
@@ -22,12 +19,6 @@ namespace {
 void complain(const std::string& text)
 {
     std::fprintf(stderr, "clipsa: %s\n", text.c_str());
-}
-
-std::string absolute(const std::string& path)
-{
-    const std::unique_ptr<char, decltype(&std::free)> resolved(::realpath(path.c_str(), nullptr), &std::free);
-    return resolved ? resolved.get() : path;
 }
 
 void print(const std::vector<std::string>& activityTypes, const OpenCommand& command, const std::string& movie)
@@ -59,43 +50,29 @@ int exitStatus(const EditorOutcome& outcome, const std::string& movie)
     return kExitEditorEnded;
 }
 
-} // namespace
-
-base::Result<OpenRequest> openRequest(const OpenCommand& command)
+dbus::EditRequest requestFor(const OpenCommand& command)
 {
-    OpenRequest open;
-    auto movie = openInput(command.movie, Emptiness::Refused);
-    if (!movie)
-        return movie.error();
-    open.movie = absolute(command.movie);
-    dbus::EditRequest& request = open.request;
-    request.movie = std::move(movie).value();
-    request.movieName = safeFileName(open.movie, "recording.mp4");
-    request.appName = safeAppName(command.appName.empty() ? withoutExtension(request.movieName) : command.appName);
-    if (!command.bundleId.empty())
-        request.bundleIdentifier = command.bundleId;
-    if (!command.attachment.empty()) {
-        const auto attachment = openInput(command.attachment, Emptiness::Allowed);
-        if (!attachment)
-            return attachment.error();
-        request.attachmentPath = absolute(command.attachment);
-        if (const auto checked = checkText(request.attachmentPath, "the name of " + request.attachmentPath); !checked)
-            return checked.error();
-    }
+    dbus::EditRequest request;
+    request.moviePath = command.movie;
+    request.appName = command.appName;
+    request.bundleIdentifier = command.bundleId;
+    request.attachmentPath = command.attachment;
     request.message = command.message;
     request.tint = command.tint;
     request.editorArguments = command.editorArguments;
-    return open;
+    return request;
 }
+
+} // namespace
 
 int openMovie(const OpenCommand& command)
 {
-    auto open = openRequest(command);
-    if (!open) {
-        complain(open.error()->description());
+    dbus::EditRequest request = requestFor(command);
+    if (const auto prepared = prepare(request); !prepared) {
+        complain(prepared.error()->description());
         return kExitUsage;
     }
-    const std::string movie = open.value().movie;
+    const std::string movie = request.moviePath;
     const auto program = findEditorProgram();
     const auto root = editorDirectoriesRoot();
     if (!program || !root) {
@@ -114,8 +91,7 @@ int openMovie(const OpenCommand& command)
         status = exitStatus(outcome, movie);
         QCoreApplication::exit();
     };
-    auto session =
-        EditorSession::start(std::move(open.value().request), {program.value(), root.value()}, std::move(handlers));
+    auto session = EditorSession::start(std::move(request), {program.value(), root.value()}, std::move(handlers));
     if (!session) {
         complain(session.error()->description());
         return kExitFailed;

@@ -1,5 +1,6 @@
 #include "app/host/RequestText.h"
 
+#include "linux/dbus/EditRequest.h"
 #include "linux/dbus/Protocol.h"
 
 namespace host {
@@ -52,11 +53,11 @@ template <typename Replace> std::string rewritten(std::string_view text, std::si
 base::Result<void> checkText(std::string_view text, const std::string& what)
 {
     if (text.size() > dbus::kMaximumTextSize)
-        return base::Error::make(dbus::kErrorDomain, dbus::kTooLarge, what + " is longer than 1 MiB; shorten it");
+        return base::Error::make(dbus::kBadInputDomain, dbus::kTooLarge, what + " is longer than 1 MiB; shorten it");
     for (std::string_view rest = text; !rest.empty();) {
         const std::size_t length = characterLength(rest);
         if (length == 0 || rest.front() == '\0')
-            return base::Error::make(dbus::kErrorDomain, dbus::kBadArgument, what + " is not UTF-8 text");
+            return base::Error::make(dbus::kBadInputDomain, dbus::kBadArgument, what + " is not UTF-8 text");
         rest.remove_prefix(length);
     }
     return {};

@@ -1,5 +1,5 @@
-/// What a recorder, or a person at a shell, asks for: a movie to be edited, and how. Files are open already and known
-/// to be readable; texts are UTF-8 and not larger than what can travel.
+/// What a recorder, or a person at a shell, asks for: a movie to be edited, and how. A plain value that owns its open
+/// files. Nothing in it has been checked before the host has prepared it; what is empty then gets its default.
 #pragma once
 
 #include "linux/dbus/FileDescriptor.h"
@@ -12,15 +12,17 @@
 
 namespace dbus {
 
-/// The bundle identifier of a recording whose app is not known; one must be given.
-inline constexpr const char* kUnknownBundleIdentifier = "org.clipsa.recording";
+/// The domain of errors that are the asker's, as opposed to the machine's.
+inline constexpr const char* kBadInputDomain = "org.clipsa.input";
 
 struct EditRequest {
+    /// The movie: where it is, or an open file.
+    std::string moviePath;
     FileDescriptor movie;
     std::string movieName; ///< the file name that the editor's own copy gets
     std::string appName;
-    std::string bundleIdentifier = kUnknownBundleIdentifier;
-    /// A file to share with the movie: where it is, or an open file of this name.
+    std::string bundleIdentifier;
+    /// A file to share with the movie: where it is, or an open file.
     std::string attachmentPath;
     FileDescriptor attachment;
     std::string attachmentName;

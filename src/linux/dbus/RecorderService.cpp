@@ -1,0 +1,309 @@
+#include "linux/dbus/RecorderService.h"
+
+#include "base/Url.h"
+#include "linux/dbus/EditOptions.h"
+#include "linux/dbus/Protocol.h"
+#include "linux/dbus/RecorderIntrospection.h"
+#include "linux/dbus/Wire.h"
+
+#include <QDBusConnection>
+#include <QDBusMessage>
+#include <QDBusPendingCallWatcher>
+#include <QDBusPendingReply>
+#include <QDBusServiceWatcher>
+#include <QDBusVirtualObject>
+#include <QTimer>
+
+#include <cstdio>
+#include <map>
+#include <optional>
+#include <utility>
+
+namespace dbus {
+
+namespace {
+
+const char* const kName = "org.clipsa.Clipsa";
+const char* const kPath = "/org/clipsa/Clipsa";
+const char* const kRecorderInterface = "org.clipsa.Recorder1";
+const char* const kSessionInterface = "org.clipsa.RecorderSession1";
+const char* const kApplicationInterface = "org.freedesktop.Application";
+const char* const kBadInput = "org.clipsa.Error.BadInput";
+const char* const kFailed = "org.clipsa.Error.Failed";
+
+} // namespace
+
+class RecorderService::Bus final : public QDBusVirtualObject {
+public:
+    Bus(QDBusConnection connection, Launcher launcher, std::chrono::milliseconds idle, std::function<void()> whenIdle)
+        : m_connection(std::move(connection)), m_launcher(std::move(launcher)), m_whenIdle(std::move(whenIdle))
+    {
+        m_idle.setSingleShot(true);
+        m_idle.setInterval(idle);
+        connect(&m_idle, &QTimer::timeout, this, &Bus::leaveIfIdle);
+        m_callers.setConnection(m_connection);
+        m_callers.setWatchMode(QDBusServiceWatcher::WatchForUnregistration);
+        connect(&m_callers, &QDBusServiceWatcher::serviceUnregistered, this, &Bus::callerLeft);
+    }
+
+    base::Result<void> start()
+    {
+        m_connection.registerVirtualObject(QLatin1String(kPath), this, QDBusConnection::SubPath);
+        if (!m_connection.registerService(QLatin1String(kName)))
+            return base::Error::make(kErrorDomain, kRefused, "another clipsa service has the name org.clipsa.Clipsa");
+        m_idle.start();
+        return {};
+    }
+
+    void close()
+    {
+        m_closing = true;
+        for (const auto& [number, session] : m_sessions)
+            session.editor->close();
+        if (m_sessions.empty())
+            m_whenIdle();
+    }
+
+    QString introspect(const QString& path) const override
+    {
+        if (path == QLatin1String(kPath))
+            return QString::fromLatin1(kServiceIntrospection);
+        return sessionAt(path) ? QString::fromLatin1(kSessionIntrospection) : QString();
+    }
+
+    bool handleMessage(const QDBusMessage& message, const QDBusConnection&) override
+    {
+        const QString call = message.interface() + u'.' + message.member();
+        if (message.path() != QLatin1String(kPath))
+            return call == QLatin1String(kSessionInterface) + QStringLiteral(".Close") && closeSession(message);
+        const QString signature = message.signature();
+        if (call == QLatin1String(kRecorderInterface) + QStringLiteral(".Edit") && signature == QLatin1String("ha{sv}"))
+            edit(message);
+        else if (call == QLatin1String(kApplicationInterface) + QStringLiteral(".Open")
+                 && signature == QLatin1String("asa{sv}"))
+            open(message);
+        else if (call == QLatin1String(kApplicationInterface) + QStringLiteral(".Activate"))
+            refuse(message, "Clipsa has no window of its own; give it a recording to open");
+        else if (call == QLatin1String(kApplicationInterface) + QStringLiteral(".ActivateAction"))
+            refuse(message, "Clipsa has no actions");
+        else
+            return false;
+        return true;
+    }
+
+private:
+    struct Session {
+        std::string caller; ///< empty: nobody in particular, and nobody is told
+        std::unique_ptr<Editor> editor;
+    };
+
+    QString pathOf(std::uint64_t number) const
+    {
+        return QLatin1String(kPath) + QStringLiteral("/session/%1").arg(number);
+    }
+
+    std::optional<std::uint64_t> sessionAt(const QString& path) const
+    {
+        for (const auto& [number, session] : m_sessions)
+            if (pathOf(number) == path)
+                return number;
+        return std::nullopt;
+    }
+
+    void answer(const QDBusMessage& message, const QVariantList& values = {})
+    {
+        if (message.isReplyRequired())
+            m_connection.send(message.createReply(values));
+    }
+
+    void refuse(const QDBusMessage& message, const std::string& why, const char* error = kBadInput)
+    {
+        std::fprintf(stderr, "clipsa: %s\n", why.c_str());
+        if (message.isReplyRequired())
+            m_connection.send(message.createErrorReply(QLatin1String(error), toQt(why)));
+    }
+
+    void refuse(const QDBusMessage& message, const base::ErrorRef& error)
+    {
+        refuse(message, error->description(), error->domain() == kBadInputDomain ? kBadInput : kFailed);
+    }
+
+    void edit(const QDBusMessage& message)
+    {
+        const QVariantList arguments = message.arguments();
+        EditRequest request;
+        request.movie = descriptorFrom(arguments.at(0));
+        if (const auto taken = takeOptions(qdbus_cast<QVariantMap>(arguments.at(1)), request); !taken) {
+            refuse(message, taken.error()->description());
+            return;
+        }
+        const auto number = launch(std::move(request), fromQt(message.service()));
+        if (!number) {
+            refuse(message, number.error());
+            return;
+        }
+        answer(message, {QVariant::fromValue(QDBusObjectPath(pathOf(number.value())))});
+    }
+
+    void open(const QDBusMessage& message)
+    {
+        const auto data = qdbus_cast<QVariantMap>(message.arguments().at(1));
+        base::ErrorRef error;
+        for (const QString& uri : message.arguments().at(0).toStringList()) {
+            const auto url = base::Url::fromString(fromQt(uri));
+            EditRequest request;
+            request.moviePath = url && url->isFile() ? url->path() : fromQt(uri);
+            takePlatformData(data, request);
+            const auto number = launch(std::move(request), {});
+            if (!number)
+                error = number.error();
+        }
+        if (error)
+            refuse(message, error);
+        else
+            answer(message);
+    }
+
+    base::Result<std::uint64_t> launch(EditRequest request, std::string caller)
+    {
+        if (m_closing)
+            return base::Error::make(kErrorDomain, kNotConnected, "Clipsa is being closed");
+        const std::uint64_t number = ++m_lastSession;
+        EditorEvents events;
+        events.completed = [this, number](const std::vector<std::string>& activityTypes) {
+            tell(number, QStringLiteral("Completed"), toQt(activityTypes));
+        };
+        events.ended = [this, number](const std::string& failure) {
+            if (!failure.empty())
+                tell(number, QStringLiteral("Failed"), toQt(failure));
+            // Later: the editor that calls us is destroyed with its session.
+            QMetaObject::invokeMethod(
+                this, [this, number] { forget(number); }, Qt::QueuedConnection);
+        };
+        auto editor = m_launcher(std::move(request), std::move(events));
+        if (!editor)
+            return editor.error();
+        m_idle.stop();
+        watch(caller);
+        m_sessions.emplace(number, Session{std::move(caller), std::move(editor).value()});
+        return number;
+    }
+
+    void tell(std::uint64_t number, const QString& signal, const QVariant& value)
+    {
+        const auto session = m_sessions.find(number);
+        if (session == m_sessions.end() || session->second.caller.empty())
+            return;
+        auto message = QDBusMessage::createTargetedSignal(toQt(session->second.caller), pathOf(number),
+                                                          QLatin1String(kSessionInterface), signal);
+        m_connection.send(message << value);
+    }
+
+    void forget(std::uint64_t number)
+    {
+        auto session = m_sessions.extract(number);
+        if (session.empty())
+            return;
+        const std::string& caller = session.mapped().caller;
+        bool watched = false;
+        for (const auto& [other, living] : m_sessions)
+            watched |= living.caller == caller;
+        if (!watched && !caller.empty())
+            m_callers.removeWatchedService(toQt(caller));
+        if (!m_sessions.empty())
+            return;
+        if (m_closing)
+            m_whenIdle();
+        else
+            m_idle.start();
+    }
+
+    void watch(const std::string& caller)
+    {
+        if (caller.empty() || m_callers.watchedServices().contains(toQt(caller)))
+            return;
+        m_callers.addWatchedService(toQt(caller));
+        // It may have left before we watched; then nobody says so any more.
+        auto question = QDBusMessage::createMethodCall(
+            QStringLiteral("org.freedesktop.DBus"), QStringLiteral("/org/freedesktop/DBus"),
+            QStringLiteral("org.freedesktop.DBus"), QStringLiteral("NameHasOwner"));
+        auto* watcher = new QDBusPendingCallWatcher(m_connection.asyncCall(question << toQt(caller)), this);
+        connect(watcher, &QDBusPendingCallWatcher::finished, this, [this, caller](QDBusPendingCallWatcher* finished) {
+            finished->deleteLater();
+            const QDBusPendingReply<bool> there = *finished;
+            if (there.isValid() && !there.value())
+                callerLeft(toQt(caller));
+        });
+    }
+
+    void callerLeft(const QString& name)
+    {
+        for (const auto& [number, session] : m_sessions)
+            if (session.caller == fromQt(name))
+                session.editor->close();
+    }
+
+    bool closeSession(const QDBusMessage& message)
+    {
+        const auto number = sessionAt(message.path());
+        if (!number)
+            return false;
+        const Session& session = m_sessions.at(*number);
+        if (session.caller != fromQt(message.service())) {
+            refuse(message, "only the recorder that asked for a session can close it");
+            return true;
+        }
+        session.editor->close();
+        answer(message);
+        return true;
+    }
+
+    void leaveIfIdle()
+    {
+        // Calls that reached us while we had the name are answered before we go.
+        m_connection.unregisterService(QLatin1String(kName));
+        QMetaObject::invokeMethod(
+            this,
+            [this] {
+                if (m_sessions.empty())
+                    m_whenIdle();
+                else
+                    m_connection.registerService(QLatin1String(kName));
+            },
+            Qt::QueuedConnection);
+    }
+
+    QDBusConnection m_connection;
+    Launcher m_launcher;
+    std::function<void()> m_whenIdle;
+    QTimer m_idle;
+    QDBusServiceWatcher m_callers;
+    std::uint64_t m_lastSession = 0;
+    bool m_closing = false;
+    std::map<std::uint64_t, Session> m_sessions;
+};
+
+RecorderService::RecorderService(std::unique_ptr<Bus> bus) : m_bus(std::move(bus)) {}
+
+RecorderService::~RecorderService() = default;
+
+base::Result<std::unique_ptr<RecorderService>> RecorderService::start(Launcher launcher, std::chrono::milliseconds idle,
+                                                                      std::function<void()> whenIdle)
+{
+    registerWireTypes();
+    const auto connection = QDBusConnection::sessionBus();
+    if (!connection.isConnected())
+        return base::Error::make(kErrorDomain, kNotConnected,
+                                 "there is no session bus: " + fromQt(connection.lastError().message()));
+    auto bus = std::make_unique<Bus>(connection, std::move(launcher), idle, std::move(whenIdle));
+    if (const auto started = bus->start(); !started)
+        return started.error();
+    return std::unique_ptr<RecorderService>(new RecorderService(std::move(bus)));
+}
+
+void RecorderService::close()
+{
+    m_bus->close();
+}
+
+} // namespace dbus

@@ -1,0 +1,53 @@
+/// Clipsa on the session bus, as org.clipsa.Clipsa: recorders hand in movies, each gets an editor and a session of its
+/// own, and is told how it ended.
+///
+/// Lives on one thread, whose Qt event loop runs. It does not start editors itself: it is given how to.
+#pragma once
+
+#include "base/Result.h"
+#include "linux/dbus/EditRequest.h"
+
+#include <chrono>
+#include <functional>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace dbus {
+
+class RecorderService {
+public:
+    /// An editor that was started for somebody. Destroying it ends it the hard way.
+    class Editor {
+    public:
+        virtual ~Editor() = default;
+        /// Asks it to go; its `ended` follows.
+        virtual void close() = 0;
+    };
+
+    struct EditorEvents {
+        std::function<void(const std::vector<std::string>& activityTypes)> completed;
+        /// The last; `failure` says why the user did not get to finish, and is empty after `completed`.
+        std::function<void(const std::string& failure)> ended;
+    };
+
+    /// Starts an editor. An error of kBadInputDomain is told to the caller as its own.
+    using Launcher = std::function<base::Result<std::unique_ptr<Editor>>(EditRequest request, EditorEvents events)>;
+
+    /// `whenIdle` is called when there has been nothing to do for `idle`, and the name has been given back.
+    static base::Result<std::unique_ptr<RecorderService>> start(Launcher launcher, std::chrono::milliseconds idle,
+                                                                std::function<void()> whenIdle);
+    ~RecorderService();
+
+    /// Asks all editors to go; `whenIdle` follows as soon as they have. Nobody else is served.
+    void close();
+
+private:
+    class Bus;
+
+    explicit RecorderService(std::unique_ptr<Bus> bus);
+
+    std::unique_ptr<Bus> m_bus;
+};
+
+} // namespace dbus
