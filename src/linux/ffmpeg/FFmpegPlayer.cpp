@@ -1,11 +1,21 @@
 #include "linux/ffmpeg/FFmpegPlayer.h"
 
 #include <algorithm>
+#include <chrono>
 #include <utility>
 
 namespace ffmpeg {
 
 using base::MediaTime;
+
+namespace {
+
+/// A sound server that does not answer for so long is not waited for.
+constexpr base::Instant kPatience = std::chrono::seconds(2);
+/// The device's time is not the clock's; it is asked again at most this often.
+constexpr base::Instant kShortestWait = std::chrono::milliseconds(1);
+
+} // namespace
 
 std::shared_ptr<FFmpegPlayer> FFmpegPlayer::make(const std::shared_ptr<Engine>& engine,
                                                  std::shared_ptr<FFmpegPlayerItem> item)
@@ -30,9 +40,13 @@ FFmpegPlayer::~FFmpegPlayer()
 {
     if (m_item)
         m_item->setTimeSource({});
+    m_output = nullptr;
     if (m_pictures)
         m_pictures->cancel();
+    if (m_sound)
+        m_sound->cancel();
     m_engine->retire(std::move(m_pictures));
+    m_engine->retire(std::move(m_sound));
 }
 
 void FFmpegPlayer::movieLoaded()
@@ -63,9 +77,10 @@ base::MediaTime FFmpegPlayer::currentTime() const
 {
     if (!m_running)
         return m_position;
-    const auto elapsed = m_engine->system.clock.now() - m_startedAt;
-    const MediaTime now =
-        m_position + MediaTime::make(elapsed.count(), 1'000'000'000).convertedTo(m_movie->timescale());
+    const MediaTime elapsed =
+        m_output ? MediaTime::make(m_output->framesHeard(), kSampleRate)
+                 : MediaTime::make((m_engine->system.clock.now() - m_startedAt).count(), 1'000'000'000);
+    const MediaTime now = m_position + elapsed.convertedTo(m_movie->timescale());
     return now < m_movie->duration() ? now : m_movie->duration();
 }
 
@@ -111,29 +126,39 @@ void FFmpegPlayer::seekToTime(MediaTime time)
 void FFmpegPlayer::goTo(MediaTime time)
 {
     m_running = false;
-    m_settled = !m_pictures;
+    silence();
     m_target = time;
     m_position = m_movie ? time.convertedTo(m_movie->timescale()) : time;
     if (!m_movie)
         return;
     if (m_playing)
         start();
-    else if (m_pictures)
+    else
+        showPicture();
+}
+
+void FFmpegPlayer::showPicture()
+{
+    m_settled = !m_pictures;
+    if (m_pictures)
         m_pictures->show(++m_generation, m_movie->video()->tickAt(m_target));
 }
 
 void FFmpegPlayer::start()
 {
+    silence();
     ++m_generation;
     ++m_tickSerial;
     m_running = false;
-    m_picturesReady = !m_pictures;
-    if (m_pictures)
+    m_awaitsPictures = m_pictures != nullptr;
+    if (m_pictures) {
         m_pictures->play(m_generation, m_movie->video()->tickAt(m_target));
+        return;
+    }
     m_engine->system.mainQueue.post([weak = weakSelf<FFmpegPlayer>(), generation = m_generation] {
         const auto self = weak.lock();
         if (self && self->m_generation == generation)
-            self->runWhenReady();
+            self->startSound();
     });
 }
 
@@ -150,8 +175,8 @@ void FFmpegPlayer::picturesArrived(std::uint64_t generation, const FrameRef& fra
     if (m_running) {
         tick();
     } else if (m_playing) {
-        m_picturesReady = true;
-        runWhenReady();
+        if (std::exchange(m_awaitsPictures, false))
+            startSound();
     } else {
         m_settled = !frame || !frame->isReduced();
     }
@@ -162,10 +187,54 @@ bool FFmpegPlayer::hasPictures() const
     return !m_pictures || m_pictures->isAhead();
 }
 
-void FFmpegPlayer::runWhenReady()
+/// Pictures are there. Sound starts behind them, so that time never has to jump.
+void FFmpegPlayer::startSound()
 {
-    if (!m_playing || m_running || !m_picturesReady)
+    base::MainQueue& main = m_engine->system.mainQueue;
+    if (m_movie->audioStreams().empty() || !m_engine->options.audioOutput) {
+        run();
         return;
+    }
+    const auto weak = weakSelf<FFmpegPlayer>();
+    if (!m_sound) {
+        const auto started = [weak, &main](std::uint64_t generation, const std::shared_ptr<const AudioOutput>& output) {
+            // The output weakly: a message that is never delivered must not keep it, because it calls the worker.
+            main.post([weak, generation, silent = !output, device = std::weak_ptr(output)] {
+                const auto self = weak.lock();
+                if (self && (silent || !device.expired()))
+                    self->soundStarted(generation, device.lock());
+            });
+        };
+        m_sound = std::make_unique<SoundWorker>(m_movie, m_engine->options.audioOutput, started);
+    }
+    m_sound->start(m_generation, m_position.convertedTo(kSampleRate).value);
+    main.postAfter(kPatience, [weak, generation = m_generation] {
+        const auto self = weak.lock();
+        if (self && generation == self->m_generation && self->m_playing && !self->m_running) {
+            self->silence();
+            self->run();
+        }
+    });
+}
+
+void FFmpegPlayer::soundStarted(std::uint64_t generation, std::shared_ptr<const AudioOutput> output)
+{
+    if (generation != m_generation || !m_playing || m_running)
+        return;
+
+    m_output = std::move(output);
+    run();
+}
+
+void FFmpegPlayer::silence()
+{
+    m_output = nullptr;
+    if (m_sound)
+        m_sound->stop();
+}
+
+void FFmpegPlayer::run()
+{
     m_startedAt = m_engine->system.clock.now();
     m_toldTo = m_position;
     m_running = true;
@@ -177,6 +246,7 @@ void FFmpegPlayer::halt()
 {
     m_target = m_position = currentTime();
     m_running = false;
+    silence();
     ++m_generation;
     ++m_tickSerial;
 }
@@ -234,6 +304,10 @@ base::Instant FFmpegPlayer::untilTick(MediaTime next) const
     MediaTime ticks = next.convertedTo(timescale);
     if (ticks < next)
         ++ticks.value;
+    if (m_output) {
+        const MediaTime wait = ticks - currentTime();
+        return std::max(kShortestWait, base::Instant(wait.convertedTo(1'000'000'000).value));
+    }
     const std::int64_t fromStart = ticks.value - m_position.convertedTo(timescale).value;
     const base::Instant due(av_rescale_rnd(fromStart, 1'000'000'000, timescale, AV_ROUND_UP));
     return std::max(base::Instant(0), m_startedAt + due - m_engine->system.clock.now());
@@ -245,6 +319,7 @@ void FFmpegPlayer::reachEnd()
     m_target = m_position = m_movie->duration();
     if (m_actionAtItemEnd == platform::ActionAtItemEnd::Pause)
         m_playing = false;
+    showPicture(); // the last one, which may not have come in time
     m_engine->center.post(platform::kPlayerItemDidPlayToEndNotification, m_item);
 }
 

@@ -7,6 +7,7 @@
 #include "linux/ffmpeg/Engine.h"
 #include "linux/ffmpeg/FFmpegPlayerItem.h"
 #include "linux/ffmpeg/PictureWorker.h"
+#include "linux/ffmpeg/SoundWorker.h"
 #include "platform/media/Player.h"
 #include "platform/media/TimeObservers.h"
 
@@ -52,11 +53,15 @@ private:
     void movieLoaded();
     base::MediaTime clamped(base::MediaTime time) const;
     void goTo(base::MediaTime time);
+    void showPicture();
 
     // From play() to running, and back.
     void start();
     void picturesArrived(std::uint64_t generation, const FrameRef& frame);
-    void runWhenReady();
+    void startSound();
+    void soundStarted(std::uint64_t generation, std::shared_ptr<const AudioOutput> output);
+    void silence();
+    void run();
     void halt();
 
     // While running.
@@ -69,7 +74,11 @@ private:
     std::shared_ptr<Engine> m_engine;
     std::shared_ptr<FFmpegPlayerItem> m_item;
     std::shared_ptr<Movie> m_movie;
-    std::unique_ptr<PictureWorker> m_pictures;
+    std::unique_ptr<PictureWorker> m_pictures; ///< null when there are none
+    std::unique_ptr<SoundWorker> m_sound;      ///< null until it is needed
+    /// What time goes by while running; null for the system's clock. Let go before the sound worker is told anything:
+    /// the device must end on the worker's thread.
+    std::shared_ptr<const AudioOutput> m_output;
 
     platform::TimeObservers m_observers;
     FrameRef m_frame;
@@ -78,7 +87,7 @@ private:
 
     bool m_playing = false;
     bool m_running = false;
-    bool m_picturesReady = false;
+    bool m_awaitsPictures = false; ///< between play() and the first picture
     bool m_settled = false;
     base::MediaTime m_position = base::MediaTime::zero(); ///< where it stands, or from where it runs
     base::MediaTime m_target = base::MediaTime::zero();   ///< the same, as exactly as it was asked for

@@ -1,0 +1,222 @@
+#include "linux/ffmpeg/SoundMixer.h"
+#include "support/EngineTest.h"
+
+#include <cmath>
+#include <mutex>
+#include <numbers>
+
+namespace {
+
+using namespace std::chrono_literals;
+
+/// How loud a tone is in `samples` (pairs at 48 kHz), as the peak of a sine.
+double toneIn(const std::vector<float>& samples, double frequency, std::size_t channel)
+{
+    double sine = 0;
+    double cosine = 0;
+    const std::size_t frames = samples.size() / 2;
+    for (std::size_t i = 0; i < frames; ++i) {
+        const double angle = 2 * std::numbers::pi * frequency * static_cast<double>(i) / 48000;
+        sine += static_cast<double>(samples[2 * i + channel]) * std::sin(angle);
+        cosine += static_cast<double>(samples[2 * i + channel]) * std::cos(angle);
+    }
+    return 2 * std::hypot(sine, cosine) / static_cast<double>(frames);
+}
+
+/// A device that plays when the test says so.
+class Device {
+public:
+    ffmpeg::MakeAudioOutput maker()
+    {
+        return [this](ffmpeg::AudioOutput::Fill fill) -> std::unique_ptr<ffmpeg::AudioOutput> {
+            const std::lock_guard lock(m_mutex);
+            ++made;
+            if (isMissing)
+                return nullptr;
+            m_fill = std::move(fill);
+            m_heard = 0;
+            return std::make_unique<Output>(*this);
+        };
+    }
+    /// What was heard: nothing when nobody plays.
+    std::vector<float> play(std::size_t frames)
+    {
+        const std::lock_guard lock(m_mutex);
+        std::vector<float> samples(frames * 2);
+        if (!m_fill)
+            return {};
+        m_fill(samples.data(), frames);
+        m_heard += static_cast<std::int64_t>(frames);
+        return samples;
+    }
+    bool isPlaying() const
+    {
+        const std::lock_guard lock(m_mutex);
+        return m_fill != nullptr;
+    }
+
+    std::atomic<int> made = 0;
+    std::atomic<bool> isMissing = false;
+
+private:
+    struct Output final : ffmpeg::AudioOutput {
+        explicit Output(Device& theDevice) : device(theDevice) {}
+        ~Output() override
+        {
+            const std::lock_guard lock(device.m_mutex);
+            device.m_fill = nullptr;
+        }
+        std::int64_t framesHeard() const override { return device.m_heard; }
+        Device& device;
+    };
+
+    mutable std::mutex m_mutex;
+    ffmpeg::AudioOutput::Fill m_fill;
+    std::atomic<std::int64_t> m_heard = 0;
+};
+
+class Sound : public tests::EngineTest {
+protected:
+    std::unique_ptr<ffmpeg::SoundMixer> mixer(const std::string& name)
+    {
+        auto file = ffmpeg::OpenFile::open(movie(name));
+        const auto opened = ffmpeg::Movie::open(std::move(file).value(), nullptr);
+        return std::move(ffmpeg::SoundMixer::open(opened.value(), nullptr)).value();
+    }
+    static std::vector<float> mix(ffmpeg::SoundMixer& from, double seconds)
+    {
+        std::vector<float> samples(static_cast<std::size_t>(seconds * 48000) * 2);
+        from.mix(samples.data(), samples.size() / 2);
+        return samples;
+    }
+    void playFile(ffmpeg::FFmpegMediaFramework& framework, const std::string& name)
+    {
+        item = framework.playerItemWithAsset(framework.assetWithURL(base::Url::fromPath(movie(name))));
+        player = std::dynamic_pointer_cast<ffmpeg::FFmpegPlayer>(framework.playerWithPlayerItem(item));
+        player->play();
+        ASSERT_TRUE(waitFor([&] { return player->isRunning(); }));
+    }
+
+    Device device; // outlives the players
+};
+
+TEST_F(Sound, AllTracksAreHeardAtOnceEachAtItsOwnLevel)
+{
+    const auto from = mixer("clock.mp4");
+    mix(*from, 0.5);
+    const auto second = mix(*from, 1);
+    // Making the tone stereo took 3 dB off it when the movie was made.
+    EXPECT_NEAR(toneIn(second, 440, 0), 0.088, 0.005);
+    EXPECT_NEAR(toneIn(second, 440, 1), 0.088, 0.005);
+    EXPECT_NEAR(toneIn(second, 880, 0), 0.125, 0.005) << "one channel is heard on both sides, no quieter";
+    EXPECT_NEAR(toneIn(second, 880, 1), 0.125, 0.01);
+}
+
+TEST_F(Sound, AfterASeekTheSamplesAreThoseOfThatTime)
+{
+    const auto from = mixer("clock.mp4");
+    const auto all = mix(*from, 4);
+    for (const std::int64_t frame : {96000, 24000, 150001, 0, 1}) {
+        from->seek(frame);
+        const auto part = mix(*from, 0.2);
+        for (std::size_t i = 0; i < part.size(); i += 97)
+            ASSERT_NEAR(part[i], all[static_cast<std::size_t>(frame) * 2 + i], 2e-3) << frame << " + " << i;
+    }
+}
+
+TEST_F(Sound, OtherCodecsAndContainersToo)
+{
+    for (const auto* name : {"vp9.webm", "vfr.mkv"}) {
+        const auto from = mixer(name);
+        from->seek(48000);
+        const auto part = mix(*from, 0.5);
+        EXPECT_NEAR(toneIn(part, 440, 0), 0.125, 0.015) << name;
+    }
+}
+
+TEST_F(Sound, BeforeAndBehindTheSoundThereIsSilence)
+{
+    const auto from = mixer("start-offset.mp4");
+    EXPECT_LT(toneIn(mix(*from, 1), 440, 0), 1e-3);
+    mix(*from, 0.6);
+    EXPECT_GT(toneIn(mix(*from, 1), 440, 0), 0.08);
+    from->seek(6 * 48000);
+    EXPECT_LT(toneIn(mix(*from, 1), 440, 0), 1e-3);
+}
+
+TEST_F(Sound, TimeGoesOnWithWhatTheDeviceHasPlayed)
+{
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+    playFile(heard, "clock.mp4");
+    EXPECT_EQ(player->currentTime(), at(0));
+    clock.advance(10s);
+    EXPECT_EQ(player->currentTime(), at(0)) << "the clock does not count";
+    const auto samples = device.play(24000);
+    EXPECT_EQ(player->currentTime(), at(0.5));
+    EXPECT_GT(toneIn(std::vector<float>(samples.begin(), samples.begin() + 2400 * 2), 440, 0), 0.05);
+    clock.advance(10ms);
+    ASSERT_TRUE(waitFor([&] {
+        clock.advance(1ms);
+        return tests::numberIn(player->currentFrame()) == 15;
+    }));
+}
+
+TEST_F(Sound, PausingSilencesAndPlayingGoesOnWhereItStood)
+{
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+    playFile(heard, "clock.mp4");
+    device.play(4800);
+    player->pause();
+    EXPECT_EQ(player->currentTime(), at(0.1));
+    for (const float sample : device.play(480))
+        EXPECT_EQ(sample, 0);
+    player->play();
+    ASSERT_TRUE(waitFor([&] { return player->isRunning(); }));
+    device.play(4800);
+    EXPECT_EQ(player->currentTime(), at(0.2));
+}
+
+TEST_F(Sound, ADeviceThatIsAheadHearsSilenceAndTimeGoesOn)
+{
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+    playFile(heard, "clock.mp4");
+    device.play(150000);
+    EXPECT_EQ(player->currentTime(), MediaTime::make(150000, 48000));
+    ASSERT_TRUE(waitFor([&] {
+        const auto samples = device.play(240);
+        return !samples.empty() && std::abs(samples[100]) > 1e-3f;
+    })) << "it catches up";
+}
+
+TEST_F(Sound, WithoutADeviceMoviesPlayByTheClock)
+{
+    device.isMissing = true;
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+    playFile(heard, "clock.mp4");
+    EXPECT_EQ(device.made, 1);
+    clock.advance(100ms);
+    EXPECT_EQ(player->currentTime(), at(0.1));
+}
+
+TEST_F(Sound, MoviesWithoutSoundNeedNoDevice)
+{
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+    playFile(heard, "no-sound.mp4");
+    clock.advance(100ms);
+    EXPECT_EQ(player->currentTime(), at(0.1));
+    EXPECT_EQ(device.made, 0);
+}
+
+TEST_F(Sound, TheDeviceGoesWithThePlayer)
+{
+    {
+        ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+        playFile(heard, "clock.mp4");
+        EXPECT_TRUE(device.isPlaying());
+        player = nullptr;
+        item = nullptr;
+    }
+    EXPECT_FALSE(device.isPlaying()) << "the framework waited for it";
+}
+
+} // namespace
