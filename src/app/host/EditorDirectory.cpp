@@ -36,8 +36,13 @@ std::string socketOutside(const std::string& directory)
 
 void removeDirectory(const std::string& path)
 {
-    std::error_code ignored; // what cannot be removed now is swept another time
-    std::filesystem::remove_all(path, ignored);
+    // It gives up when somebody else removes an entry meanwhile, as libdbus does with its socket from its own thread.
+    std::error_code error;
+    for (int attempt = 0; attempt < 4; ++attempt) {
+        std::filesystem::remove_all(path, error);
+        if (!error)
+            break; // else: what cannot be removed at all is swept another time
+    }
     if (const std::string socket = socketOutside(path); !socket.empty())
         ::unlink(socket.c_str());
 }
