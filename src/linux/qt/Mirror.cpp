@@ -22,7 +22,7 @@ bool Mirror::commit()
     m_animating = false;
     m_showsVideo = false;
     m_now = m_clock.now();
-    visitView(m_window.window(), {&m_root, {}, 1, 0});
+    visitView(m_window.window(), {&m_root, {}, 1, 0, false});
     removeStrays();
     showFocus();
     m_stage.painted.clear();
@@ -82,17 +82,20 @@ QRectF Mirror::visitView(const std::shared_ptr<platform::View>& view, const Abov
     const double wholeAlpha = view->isHidden() ? 0 : above.alpha * alpha;
     const bool visible = wholeAlpha > 0;
     const QPointF origin = item.place(toQRectF(frame), above.origin);
-    item.setVisible(!view->isHidden());
-    item.setShownAlpha(alpha, !view->children().empty());
+    const bool isGroup = alpha > 0 && alpha < 1 && !view->children().empty();
+    item.setShown(view->isHidden(), alpha, above.inGroup);
     item.refresh(*view, visible);
     if (QColor color = toQColor(view->backgroundColor()); visible && color.alpha() > 0) {
         color.setAlphaF(color.alphaF() * static_cast<float>(wholeAlpha));
         m_stage.painted.push_back({item.windowRect(), color, nullptr});
     }
 
-    const QRectF below = visitChildren(*view, {&item, origin, wholeAlpha, 0});
+    const QRectF below = visitChildren(*view, {&item, origin, wholeAlpha, 0, above.inGroup || isGroup});
     const QRectF covered = view->clipsToBounds() ? item.windowRect() : item.drawnRect().united(below);
-    item.setGroupRect(covered.translated(-origin));
+    if (isGroup && visible && !above.inGroup)
+        item.showGroup(covered);
+    else
+        item.endGroup();
     return visible ? covered : QRectF();
 }
 
@@ -126,6 +129,7 @@ QRectF Mirror::visitLayer(const std::shared_ptr<platform::Layer>& layer, const A
     attach(*item, above);
     item->place(toQRectF(layer->frame()), above.origin);
     const bool visible = above.alpha > 0;
+    item->setShown(false, 1, above.inGroup);
     item->refresh(*playerLayer, visible);
     if (visible) {
         m_stage.painted.push_back({item->windowRect(), Qt::black, nullptr});

@@ -37,9 +37,10 @@ private:
     /// What a branch of the tree needs to know of what is above it.
     struct Above {
         QQuickItem* item;
-        QPointF origin;   ///< window coordinates
-        double alpha = 1; ///< of all that is above
-        double order = 0; ///< among its siblings
+        QPointF origin;       ///< window coordinates
+        double alpha = 1;     ///< of all that is above
+        double order = 0;     ///< among its siblings
+        bool inGroup = false; ///< something above draws it
     };
 
     /// Both give what the branch covers, in window coordinates; nothing when none of it can be seen.

@@ -12,20 +12,20 @@ namespace qtui {
 
 namespace {
 
-/// The node of one sprite, and which picture its texture was made from.
-class SpriteNode final : public QSGNode {
+/// The node of one sprite, and which picture its texture was made from. A transform node, though it moves nothing: the
+/// software renderer draws what joins a plain node later as if it stood in the window's corner.
+class SpriteNode final : public QSGTransformNode {
 public:
-    void show(const Sprite& sprite, QPointF offset, QQuickWindow& window)
+    void show(const Sprite& sprite, QQuickWindow& window)
     {
-        const QRectF rect = sprite.rect.translated(offset);
         if (sprite.isPicture())
-            showPicture(sprite, rect, window);
+            showPicture(sprite, window);
         else
-            showColor(sprite, rect, window);
+            showColor(sprite, window);
     }
 
 private:
-    void showPicture(const Sprite& sprite, const QRectF& rect, QQuickWindow& window)
+    void showPicture(const Sprite& sprite, QQuickWindow& window)
     {
         if (!m_picture) {
             clear();
@@ -41,14 +41,14 @@ private:
             m_picture->setSourceRect(QRectF(QPointF(), sprite.image.size()));
         }
         m_picture->setFiltering(sprite.smooth ? QSGTexture::Linear : QSGTexture::Nearest);
-        if (m_picture->rect() != rect)
-            m_picture->setRect(rect);
+        if (m_picture->rect() != sprite.rect)
+            m_picture->setRect(sprite.rect);
         // A node without a texture crashes the software backend, so it joins the tree only now.
         if (!m_picture->parent())
             appendChildNode(m_picture);
     }
 
-    void showColor(const Sprite& sprite, const QRectF& rect, QQuickWindow& window)
+    void showColor(const Sprite& sprite, QQuickWindow& window)
     {
         if (!m_rectangle) {
             clear();
@@ -56,15 +56,17 @@ private:
             m_rectangle->setFlag(QSGNode::OwnedByParent);
             appendChildNode(m_rectangle);
         }
-        if (m_rectangle->rect() != rect)
-            m_rectangle->setRect(rect);
+        if (m_rectangle->rect() != sprite.rect)
+            m_rectangle->setRect(sprite.rect);
         if (m_rectangle->color() != sprite.color)
             m_rectangle->setColor(sprite.color);
     }
 
     void clear()
     {
-        removeAllChildNodes();
+        // One by one: the software renderer never hears of what removeAllChildNodes() takes away.
+        while (firstChild())
+            removeChildNode(firstChild());
         delete m_picture;
         delete m_rectangle;
         m_picture = nullptr;
@@ -112,36 +114,37 @@ void SpriteItem::setSprites(std::vector<Sprite> sprites)
     update();
 }
 
-void SpriteItem::setSpriteOffset(QPointF offset)
+void SpriteItem::setStandIn(std::optional<Sprite> standIn)
 {
-    if (m_offset == offset)
+    if (!m_standIn && !standIn)
         return;
-    m_offset = offset;
+    m_standIn = std::move(standIn);
     update();
 }
 
 QSGNode* SpriteItem::updatePaintNode(QSGNode* node, UpdatePaintNodeData*)
 {
-    if (m_sprites.empty()) {
+    const std::vector<Sprite> shownSprites = m_standIn ? std::vector{*m_standIn} : m_sprites;
+    if (shownSprites.empty()) {
         delete node;
         return nullptr;
     }
     if (!node)
-        node = new QSGNode;
-    while (node->childCount() > static_cast<int>(m_sprites.size())) {
+        node = new QSGTransformNode; // like the sprites' nodes
+    while (node->childCount() > static_cast<int>(shownSprites.size())) {
         QSGNode* last = node->lastChild();
         node->removeChildNode(last);
         delete last;
     }
     QSGNode* child = node->firstChild();
-    for (const Sprite& sprite : m_sprites) {
+    for (const Sprite& sprite : shownSprites) {
         auto* shown = static_cast<SpriteNode*>(child);
         if (!shown) {
             shown = new SpriteNode;
             shown->setFlag(QSGNode::OwnedByParent);
             node->appendChildNode(shown);
         }
-        shown->show(sprite, m_offset, *window());
+        shown->show(sprite, *window());
         child = shown->nextSibling();
     }
     return node;

@@ -6,6 +6,7 @@
 #include <QQuickItem>
 
 #include <functional>
+#include <optional>
 #include <vector>
 
 class QPainter;
@@ -33,8 +34,8 @@ public:
     const std::vector<Sprite>& sprites() const { return m_sprites; }
     /// Draws them with the next picture.
     void setSprites(std::vector<Sprite> sprites);
-    /// Moves everything that is drawn, children aside.
-    void setSpriteOffset(QPointF offset);
+    /// Draws this instead of the sprites, until there is none again.
+    void setStandIn(std::optional<Sprite> standIn);
 
 protected:
     /// Runs on the render thread while the GUI thread stands still.
@@ -42,7 +43,7 @@ protected:
 
 private:
     std::vector<Sprite> m_sprites;
-    QPointF m_offset;
+    std::optional<Sprite> m_standIn;
 };
 
 } // namespace qtui

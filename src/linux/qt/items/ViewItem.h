@@ -27,27 +27,40 @@ public:
     /// What it covers and draws, in window coordinates; can reach beyond its frame.
     QRectF drawnRect() const;
 
-    /// Fades as one thing: children do not show through each other. Costs a texture while it is between 0 and 1.
-    void setShownAlpha(double alpha, bool hasChildren);
-    /// Takes children that reach beyond the frame into what fades.
-    void setGroupRect(const QRectF& rectInOwnCoordinates);
-    bool isGrouped() const { return m_grouped; }
+    /// Whether it takes part in the picture at all, and how opaque it is there.
+    void setShown(bool hidden, double alpha, bool standsInGroup);
+
+    /// Draws itself and all that is below as one picture, so that they fade as one thing: nothing shows through. The
+    /// items below are to be placed with `standsInGroup`. `windowRect` is what all of them cover.
+    void showGroup(const QRectF& windowRect);
+    void endGroup();
 
 protected:
     Stage& stage() const { return m_stage; }
     QRectF ownRect() const { return {QPointF(), m_size}; }
 
 private:
-    void setGrouped(bool grouped);
-    void applyGeometry();
-    QPointF shift() const;
+    /// Of something that was drawn into a group's picture.
+    struct Ingredient {
+        QRectF rect;
+        QRgb color = 0;
+        qint64 picture = 0;
+        double alpha = 1;
+        friend bool operator==(const Ingredient&, const Ingredient&) = default;
+    };
+
+    std::vector<PeerItem*> peersBelow() const;
+    void collect(std::vector<Ingredient>& ingredients) const;
+    void paint(QPainter& painter, const QRectF& windowRect) const;
+    void paintWithAlpha(QPainter& painter, const QRectF& windowRect) const;
+    QImage painted(const QRectF& windowRect) const;
 
     Stage& m_stage;
     QPointF m_origin;
-    QPointF m_position; ///< relative to the parent's origin
     QSizeF m_size;
-    QRectF m_groupRect; ///< own coordinates; null outside a group fade
-    bool m_grouped = false;
+    double m_alpha = 1;
+    bool m_hidden = false;
+    std::vector<Ingredient> m_ingredients; ///< of the group's picture, while there is one
 };
 
 class ViewItem : public PeerItem {
