@@ -2,7 +2,6 @@
 
 #include <cerrno>
 #include <fcntl.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 namespace ffmpeg {
@@ -25,6 +24,7 @@ base::Result<std::shared_ptr<OpenFile>> OpenFile::open(const std::string& path)
         return Error::fromErrno(EISDIR, doing);
     if (!S_ISREG(about.st_mode))
         return Error::fromErrno(EINVAL, doing);
+    file->m_identity = identityOf(about);
     return file;
 }
 
@@ -55,8 +55,12 @@ bool OpenFile::isStillAt(const std::string& path) const
     struct stat there {};
     if (stat(path.c_str(), &there) != 0)
         return errno == ENOENT || errno == ENOTDIR;
-    struct stat mine {};
-    return fstat(m_descriptor, &mine) == 0 && mine.st_dev == there.st_dev && mine.st_ino == there.st_ino;
+    return identityOf(there) == m_identity;
+}
+
+OpenFile::Identity OpenFile::identityOf(const struct stat& about)
+{
+    return {about.st_dev, about.st_ino, about.st_size, about.st_mtim.tv_sec, about.st_mtim.tv_nsec};
 }
 
 } // namespace ffmpeg

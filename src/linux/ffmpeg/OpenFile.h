@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <sys/stat.h>
 
 namespace ffmpeg {
 
@@ -22,14 +23,23 @@ public:
     std::int64_t size() const;
     /// Bytes read, 0 at the end, or a negative errno. Readers do not share a position.
     std::int64_t read(std::int64_t position, std::uint8_t* into, std::size_t count) const;
-    /// Whether `path` leads to this very file (or, when `path` leads nowhere any more, led to it).
+    /// Whether `path` leads to this very file as it was when it was opened, or leads nowhere any more.
     bool isStillAt(const std::string& path) const;
 
 private:
+    /// What changes when another file, or other content, takes its place.
+    struct Identity {
+        std::uint64_t device, inode;
+        std::int64_t size, seconds, nanoseconds;
+        bool operator==(const Identity&) const = default;
+    };
+
     OpenFile(int descriptor, std::string name) : m_descriptor(descriptor), m_name(std::move(name)) {}
+    static Identity identityOf(const struct stat& about);
 
     int m_descriptor;
     std::string m_name;
+    Identity m_identity{};
 };
 
 } // namespace ffmpeg

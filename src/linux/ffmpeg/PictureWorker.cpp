@@ -102,9 +102,7 @@ void PictureWorker::loop()
             request = m_request;
         }
         if (!source) {
-            m_answered = request.generation;
-            m_playedTo = kForever;
-            m_arrived(request.generation, nullptr);
+            give(request, std::nullopt);
         } else if (m_answered != request.generation) {
             answer(*source.value(), request);
         } else if (request.plays) {
@@ -122,6 +120,11 @@ void PictureWorker::answer(VideoSource& source, const Request& request)
     const auto shown = source.at(request.tick, want, [&] { return isOvertaken(request); });
     if (isOvertaken(request) || *m_cancelled)
         return;
+    give(request, shown);
+}
+
+void PictureWorker::give(const Request& request, const std::optional<ShownFrame>& shown)
+{
     m_answered = request.generation;
     m_unrefined = shown && shown->frame->isReduced();
     m_playedTo = shown ? shown->until : kForever;

@@ -52,6 +52,7 @@ private:
 
     void loop();
     void answer(VideoSource& source, const Request& request);
+    void give(const Request& request, const std::optional<ShownFrame>& shown);
     void refine(VideoSource& source, const Request& request);
     void playOn(VideoSource& source, const Request& request);
     void request(std::uint64_t generation, std::int64_t tick, bool plays);

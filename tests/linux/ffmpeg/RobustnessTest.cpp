@@ -1,0 +1,140 @@
+#include "support/EngineTest.h"
+
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <random>
+#include <unistd.h>
+
+namespace {
+
+using namespace std::chrono_literals;
+
+std::string bytesOf(const std::string& path)
+{
+    std::ifstream file(path, std::ios::binary);
+    return {std::istreambuf_iterator<char>(file), {}};
+}
+
+/// Opened, sought and played: whatever comes of it, it comes soon, and the player is still in order.
+class Robustness : public tests::EngineTest {
+protected:
+    void TearDown() override { std::filesystem::remove(path); }
+
+    void write(const std::string& bytes) { std::ofstream(path, std::ios::binary) << bytes; }
+    void use(const std::string& file)
+    {
+        if (open(file) != Status::ReadyToPlay) {
+            EXPECT_TRUE(item->error());
+            return;
+        }
+        ASSERT_TRUE(item->duration().isNumeric());
+        const double length = item->duration().seconds();
+        for (const double part : {0.9, 0.2, 1.0, 0.5}) {
+            player->seekToTime(at(std::min(length, 1e6) * part));
+            ASSERT_TRUE(waitFor([&] { return player->isSettled(); })) << file;
+        }
+        player->play();
+        ASSERT_TRUE(waitFor([&] { return player->isRunning() || !player->isPlaying(); }));
+        playOn(300ms, 50ms);
+    }
+
+    const std::string path = testing::TempDir() + "broken-" + std::to_string(getpid());
+};
+
+TEST_F(Robustness, ATruncatedMovieShowsWhatIsThere)
+{
+    ASSERT_EQ(open(movie("truncated.mp4")), Status::ReadyToPlay);
+    EXPECT_EQ(numberAt(at(1)), 30);
+    const int last = numberAt(at(3.9));
+    EXPECT_GT(last, 40);
+    EXPECT_LT(last, 80);
+    EXPECT_EQ(numberAt(at(1)), 30);
+    use(movie("truncated.mp4"));
+}
+
+TEST_F(Robustness, DamagedPacketsDoNotStopAMovie)
+{
+    ASSERT_EQ(open(movie("corrupt.mp4")), Status::ReadyToPlay);
+    EXPECT_EQ(numberAt(at(0.5)), 15);
+    player->seekToTime(at(2));
+    ASSERT_TRUE(waitFor([&] { return player->isSettled(); }));
+    player->seekToTime(at(3.9));
+    ASSERT_TRUE(waitFor([&] { return player->isSettled(); }));
+    EXPECT_NE(player->currentFrame(), nullptr);
+    use(movie("corrupt.mp4"));
+}
+
+TEST_F(Robustness, AnUnknownCodecFailsInWords)
+{
+    std::string bytes = bytesOf(movie("no-sound.mp4"));
+    const auto where = bytes.find("avc1", bytes.find("stsd"));
+    ASSERT_NE(where, std::string::npos);
+    bytes.replace(where, 4, "zzzz");
+    write(bytes);
+    EXPECT_EQ(open(path), Status::Failed);
+    EXPECT_NE(item->error()->description().find("cannot be decoded"), std::string::npos)
+        << item->error()->description();
+}
+
+TEST_F(Robustness, FilesCutAnywhereDoNoHarm)
+{
+    for (const auto* name : {"clock.mp4", "vfr.mkv", "vp9.webm", "size-change.ts"}) {
+        const std::string whole = bytesOf(movie(name));
+        for (const double part : {0.001, 0.01, 0.1, 0.35, 0.6, 0.97}) {
+            write(whole.substr(0, static_cast<std::size_t>(static_cast<double>(whole.size()) * part)));
+            use(path);
+            ASSERT_FALSE(HasFatalFailure()) << name << " cut at " << part;
+        }
+    }
+}
+
+TEST_F(Robustness, FlippedBytesDoNoHarm)
+{
+    std::mt19937 random(20);
+    for (const auto* name : {"clock.mp4", "edit-list.mp4", "vfr.mkv", "vp9.webm", "size-change.ts", "truncated.mp4"}) {
+        const std::string whole = bytesOf(movie(name));
+        for (int round = 0; round < 6; ++round) {
+            std::string bytes = whole;
+            // The header is where lies are told: at the front or at the back.
+            const std::size_t span = round % 3 == 0 ? bytes.size() : std::min<std::size_t>(bytes.size(), 6000);
+            const std::size_t from = round % 3 == 1 ? bytes.size() - span : 0;
+            for (int i = 0; i < 40; ++i)
+                bytes[from + random() % span] = static_cast<char>(random());
+            write(bytes);
+            use(path);
+            ASSERT_FALSE(HasFatalFailure()) << name << " round " << round;
+        }
+    }
+}
+
+TEST_F(Robustness, AFileThatIsEmptiedWhileItPlaysDoesNoHarm)
+{
+    std::filesystem::copy_file(movie("long-gop.mp4"), path);
+    ASSERT_EQ(open(path), Status::ReadyToPlay);
+    player->play();
+    ASSERT_TRUE(waitFor([&] { return player->isRunning(); }));
+    playOn(100ms);
+    std::filesystem::resize_file(path, 1000);
+    player->seekToTime(at(15));
+    ASSERT_TRUE(waitFor([&] { return player->isRunning(); }));
+    playOn(100ms);
+    player->pause();
+    player->seekToTime(at(1));
+    EXPECT_TRUE(waitFor([&] { return player->isSettled(); }));
+}
+
+TEST_F(Robustness, AFileThatIsRemovedWhileItPlaysPlaysOn)
+{
+    std::filesystem::copy_file(movie("long-gop.mp4"), path);
+    ASSERT_EQ(open(path), Status::ReadyToPlay);
+    player->play();
+    ASSERT_TRUE(waitFor([&] { return player->isRunning(); }));
+    std::filesystem::remove(path);
+    playOn(200ms);
+    EXPECT_EQ(tests::numberIn(player->currentFrame()), 12);
+    player->pause();
+    EXPECT_EQ(numberAt(MediaTime::make(900, 60)), 900);
+}
+
+} // namespace
