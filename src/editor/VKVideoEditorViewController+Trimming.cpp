@@ -9,6 +9,12 @@
 
 using platform::MovieScrubber;
 
+namespace {
+
+constexpr double kArrowStep = 1; // seconds, of an arrow key
+
+} // namespace
+
 void VKVideoEditorViewController::movieScrubberDidBeginEditing(MovieScrubber& /*scrubber*/)
 {
     editMode();
@@ -140,6 +146,16 @@ double VKVideoEditorViewController::movieScrubberThumbnailAspectRatio(MovieScrub
 {
     const base::Size size = getVideoSize();
     return size.width > 0 && size.height > 0 ? size.width / size.height : 1.0;
+}
+
+void VKVideoEditorViewController::seekBackward()
+{
+    avTrimmer()->scrubTo(avTrimmer()->value() - kArrowStep);
+}
+
+void VKVideoEditorViewController::seekForward()
+{
+    avTrimmer()->scrubTo(avTrimmer()->value() + kArrowStep);
 }
 
 void VKVideoEditorViewController::goToStart()

@@ -104,6 +104,8 @@ const runtime::Class& VKVideoEditorViewController::classObject()
             .method("doneAction", &Self::doneAction)
             .method("togglePlayback", &Self::togglePlayback)
             .method("leave", &Self::leave)
+            .method("seekBackward", &Self::seekBackward)
+            .method("seekForward", &Self::seekForward)
             .method("goToStart", &Self::goToStart)
             .method("goToEnd", &Self::goToEnd)
             .build();
@@ -273,6 +275,8 @@ std::vector<platform::KeyCommand> VKVideoEditorViewController::keyCommands() con
     using platform::Key;
     return {
         {Key::Space, 0, false, Selector("togglePlayback"), "Play or pause"},
+        {Key::Left, 0, false, Selector("seekBackward"), "One second back"},
+        {Key::Right, 0, false, Selector("seekForward"), "One second forward"},
         {Key::Home, 0, false, Selector("goToStart"), "To the start"},
         {Key::End, 0, false, Selector("goToEnd"), "To the end"},
         {Key::Escape, 0, false, Selector("leave"), "Leave trim mode, or close"},

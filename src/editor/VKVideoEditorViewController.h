@@ -113,6 +113,8 @@ public:
     // Keys: what has no button of its own.
     void togglePlayback();
     void leave();
+    void seekBackward();
+    void seekForward();
     void goToStart();
     void goToEnd();
 

@@ -178,3 +178,28 @@ TEST_F(Lifecycle, SpacePlaysAndPauses)
     EXPECT_TRUE(fake->window->keyDown(platform::Key::Space));
     EXPECT_FALSE(player().isPlaying());
 }
+
+TEST_F(Lifecycle, EveryKeyHasAnActionThatTheEditorAnswers)
+{
+    open();
+    for (const platform::KeyCommand& command : editor->keyCommands())
+        EXPECT_TRUE(editor->respondsTo(command.action)) << command.action.name();
+}
+
+TEST_F(Lifecycle, ArrowsMoveThePlayHeadByASecondAndHomeAndEndToTheEnds)
+{
+    open();
+    using platform::Key;
+    const auto press = [this](Key key) {
+        EXPECT_TRUE(fake->window->keyDown(key));
+        settle();
+        return player().currentTime().seconds();
+    };
+    EXPECT_NEAR(press(Key::Right), 1, 1e-9);
+    EXPECT_NEAR(press(Key::Right), 2, 1e-9);
+    EXPECT_NEAR(press(Key::Left), 1, 1e-9);
+    EXPECT_NEAR(press(Key::End), 10, 1e-9);
+    EXPECT_NEAR(press(Key::Right), 10, 1e-9);
+    EXPECT_NEAR(press(Key::Home), 0, 1e-9);
+    EXPECT_FALSE(editor->isScrubbing());
+}

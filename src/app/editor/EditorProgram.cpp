@@ -4,7 +4,7 @@
 #include "extension/VKVideoEditorExtensionContext.h"
 #include "extension/VKVideoEditorExtensionViewController.h"
 #include "linux/dbus/Chassis.h"
-#include "linux/ffmpeg/AudioOutput.h"
+#include "linux/ffmpeg/CubebOutput.h"
 #include "linux/xdg/Chassis.h"
 #include "linux/xdg/MountTable.h"
 
@@ -78,7 +78,7 @@ EditorProgram::EditorProgram(const EditorOptions& options)
       m_device(deviceValues(options), [this] { return m_window->bounds().width(); }),
       m_images([this] { return m_window->scale(); }), m_files(m_system, mounts(options)),
       m_media(m_system, m_notifications,
-              {[this](const std::string& path) { return m_files.resolvedPath(path); }, {}}),
+              {[this](const std::string& path) { return m_files.resolvedPath(path); }, ffmpeg::cubebOutput(m_log)}),
       m_platform{m_system, m_notifications, m_device, *m_window, m_images, m_files, m_calendar, m_media},
       m_presenter(m_window, m_clock), m_connection(std::make_shared<dbus::ExtensionConnection>(m_mainQueue)),
       m_payload(m_mainQueue, [this] { show(); })
@@ -167,7 +167,7 @@ void EditorProgram::disconnected()
     m_window->setRootViewController(nullptr);
     m_extension = {};
     m_connection->flush();
-    QGuiApplication::quit();
+    QGuiApplication::exit(m_exitStatus); // quit() would ask the window, which never closes by itself
 }
 
 } // namespace app

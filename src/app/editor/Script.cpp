@@ -11,6 +11,7 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <fstream>
 #include <sstream>
 
 namespace app {
@@ -101,7 +102,7 @@ void Script::next()
         fail("the script cannot go on at: " + line);
         return;
     }
-    m_program.system().mainQueue.postAfter(kRetry, [this, alive = std::weak_ptr(m_alive)] {
+    m_program.system().mainQueue.postAfter(m_trial ? base::Instant(0) : kRetry, [this, alive = std::weak_ptr(m_alive)] {
         if (!alive.expired())
             next();
     });
@@ -128,7 +129,7 @@ bool Script::carryOut(const Words& words)
             && m_program.system().clock.now() - *m_since > 2 * platform::Window::kTransitionDuration;
     }
     if (command == "wait")
-        return waitFor(argument(1));
+        return argument(1) == "frame" ? waitForFrame(words) : waitFor(argument(1));
     if (command == "tap")
         return tap(words);
     if (command == "drag")
@@ -143,9 +144,11 @@ bool Script::carryOut(const Words& words)
         return m_program.system().clock.now() - *m_since
             >= std::chrono::duration_cast<base::Instant>(std::chrono::duration<double, std::milli>(number(argument(1))));
     if (command == "picture")
-        return picture(argument(1));
+        return picture(words);
+    if (command == "transitions")
+        return transitions(words);
     if (command == "print") {
-        print(words);
+        print(words, 1);
         return true;
     }
     return false;
@@ -165,6 +168,19 @@ bool Script::waitFor(const std::string& what) const
         return editor->isUIHidden() == (what == "hidden")
             && m_program.system().clock.now() - *m_since > VKVideoEditorViewController::kFadeDuration;
     return false;
+}
+
+bool Script::waitForFrame(const Words& words) const
+{
+    constexpr double kLongestFrame = 0.5; // seconds: recordings stand still
+    const auto editor = m_program.editor();
+    const auto frame = editor ? editor->avPlayer()->currentFrame() : nullptr;
+    if (!frame)
+        return false;
+    if (words.size() > 2)
+        return frame->time().seconds() >= number(words[2]);
+    const double since = editor->avPlayer()->currentTime().seconds() - frame->time().seconds();
+    return since >= 0 && since < kLongestFrame;
 }
 
 bool Script::tap(const Words& words)
@@ -206,30 +222,72 @@ bool Script::key(const std::string& name)
     return SyntheticInput(m_program.presenter().quickWindow()).key(name);
 }
 
-bool Script::picture(const std::string& file)
+bool Script::picture(const Words& words)
 {
     const char* folder = std::getenv("CLIPSA_PICTURES");
-    const QString path = QString::fromStdString((folder ? std::string(folder) + "/" : std::string()) + file);
-    if (!m_program.presenter().grab().save(path))
-        fail("cannot write the picture " + path.toStdString());
+    const std::string path = (folder ? std::string(folder) + "/" : std::string()) + words.at(1);
+    if (!m_program.presenter().grab().save(QString::fromStdString(path)))
+        fail("cannot write the picture " + path);
+    if (words.size() > 2)
+        print(words, 0);
     return true;
 }
 
-void Script::print(const Words& words) const
+bool Script::transitions(const Words& words)
+{
+    if (!m_trial)
+        m_trial.emplace(m_program, static_cast<int>(number(words.at(1))));
+    const auto before = m_trial->count();
+    const bool done = m_trial->goOn();
+    if (m_trial->count() > before)
+        m_since = m_program.system().clock.now(); // it takes long, but moves
+    if (done) {
+        report(m_trial->result());
+        m_trial.reset();
+    }
+    return done;
+}
+
+void Script::print(const Words& words, std::size_t first) const
 {
     std::string line;
-    for (std::size_t i = 1; i < words.size(); ++i)
-        line += (i > 1 ? " " : "") + words[i];
-    if (const auto editor = m_program.editor()) {
-        replace(line, "{time}", seconds(editor->avPlayer()->currentTime().seconds()));
-        replace(line, "{duration}", seconds(editor->getPlayerDuration()));
-        const base::Size size = editor->getVideoSize();
-        replace(line, "{size}",
-                std::to_string(static_cast<int>(size.width)) + "x" + std::to_string(static_cast<int>(size.height)));
-        replace(line, "{chrome}", editor->isUIHidden() ? "hidden" : "shown");
+    for (std::size_t i = first; i < words.size(); ++i)
+        line += (i > first ? " " : "") + words[i];
+    report(filledIn(std::move(line)));
+}
+
+std::string Script::filledIn(std::string line) const
+{
+    replace(line, "{memory}", std::to_string(residentKilobytes()));
+    const auto editor = m_program.editor();
+    if (!editor)
+        return line;
+    const auto frame = editor->avPlayer()->currentFrame();
+    const base::Size size = editor->getVideoSize();
+    replace(line, "{time}", seconds(editor->avPlayer()->currentTime().seconds()));
+    replace(line, "{frame}", frame ? seconds(frame->time().seconds()) : "none");
+    replace(line, "{duration}", seconds(editor->getPlayerDuration()));
+    replace(line, "{size}",
+            std::to_string(static_cast<int>(size.width)) + "x" + std::to_string(static_cast<int>(size.height)));
+    replace(line, "{chrome}", editor->isUIHidden() ? "hidden" : "shown");
+    replace(line, "{layout}", editor->isPadMode() ? "pad" : "phone");
+    const auto lines = editor->titleLabel()->subviews();
+    const auto date = lines.empty() ? nullptr : std::dynamic_pointer_cast<platform::Label>(lines.front());
+    replace(line, "{date}", date ? date->text() : "");
+    replace(line, "{title}", editor->titleLabel()->text());
+    return line;
+}
+
+void Script::report(const std::string& line) const
+{
+    const char* path = std::getenv("CLIPSA_REPORT");
+    if (!path) {
+        std::printf("%s\n", line.c_str());
+        std::fflush(stdout);
+        return;
     }
-    std::printf("%s\n", line.c_str());
-    std::fflush(stdout);
+    std::ofstream file(path, std::ios::app);
+    file << line << '\n';
 }
 
 } // namespace app

@@ -4,16 +4,22 @@
 ///   size W H               resize the window, in points
 ///   wait picture|ready     until the movie's first picture is shown; until its item is ready (or failed)
 ///   wait hidden|shown      until the chrome has faded out or in
+///   wait frame [SECONDS]   until the picture of the present time is on the screen, or that of SECONDS or a later one
 ///   tap NAME  |  tap X Y   touch a control by its accessible name, or a place in points
 ///   drag X1 Y1 X2 Y2       touch, move in small steps, lift
 ///   key NAME               space, escape, return, left, right, home, end, tab, comma, period, undo
 ///   scheme light|dark
 ///   pause MILLISECONDS     let time pass
-///   picture FILE           write what is on the screen as a PNG, into $CLIPSA_PICTURES or here
-///   print WORDS            a line on standard output; {time}, {duration}, {size}, {chrome} are filled in
+///   picture FILE [WORDS]   write what is on the screen as a PNG, into $CLIPSA_PICTURES or here; with WORDS, say so
+///   print WORDS            a line at the end of the file $CLIPSA_REPORT, or on standard output; filled in are {time},
+///                          {frame} (the shown picture's time), {duration}, {size}, {title}, {date}, {chrome},
+///                          {layout} (phone or pad), {memory} (resident, in kB)
+///   transitions N          change the size N times, without waiting for it to settle; report what the first and the
+///                          last hundred took, and the memory
 /// A command that cannot be carried out within ten seconds ends the process with status 5. GUI thread.
 #pragma once
 
+#include "app/editor/TransitionTrial.h"
 #include "base/Clock.h"
 
 #include <functional>
@@ -41,11 +47,15 @@ private:
     /// Whether the command is done; if not, it is tried again a little later.
     bool carryOut(const Words& words);
     bool waitFor(const std::string& what) const;
+    bool waitForFrame(const Words& words) const;
     bool tap(const Words& words);
     bool drag(const Words& words);
     bool key(const std::string& name);
-    bool picture(const std::string& file);
-    void print(const Words& words) const;
+    bool picture(const Words& words);
+    bool transitions(const Words& words);
+    void print(const Words& words, std::size_t first) const;
+    std::string filledIn(std::string line) const;
+    void report(const std::string& line) const;
     void next();
     void fail(const std::string& why);
 
@@ -54,6 +64,7 @@ private:
     std::size_t m_next = 0;
     std::optional<base::Instant> m_since;
     bool m_pictureSeen = false;
+    std::optional<TransitionTrial> m_trial;
     std::shared_ptr<bool> m_alive = std::make_shared<bool>(true);
 };
 

@@ -167,6 +167,9 @@ void MovieScrubber::touchBegan(const Touch& touch)
         return;
     const auto keepAlive = shared_from_this();
     m_draggingTouch = touch.id;
+    // A thumb that takes the play head moves it from where it is; elsewhere the play head comes to the finger.
+    const double away = playHeadX() - convertFromRoot(touch.position).x;
+    m_grabOffset = std::abs(away) <= kGrabDistance ? away : 0;
     beginDrag();
     touchMoved(touch);
 }
@@ -174,7 +177,7 @@ void MovieScrubber::touchBegan(const Touch& touch)
 void MovieScrubber::touchMoved(const Touch& touch)
 {
     if (m_draggingTouch == touch.id)
-        dragTo(secondsAt(convertFromRoot(touch.position).x));
+        dragTo(secondsAt(convertFromRoot(touch.position).x + m_grabOffset));
 }
 
 void MovieScrubber::touchEnded(const Touch& touch)

@@ -48,6 +48,8 @@ class MovieScrubber final : public Control {
 public:
     /// The strip's own height in points.
     static constexpr double kHeight = 38;
+    /// How far from the play head, in points, a finger still takes it: half of what a thumb covers.
+    static constexpr double kGrabDistance = 22;
 
     MovieScrubber();
 
@@ -120,6 +122,7 @@ private:
     bool m_editing = false;
     bool m_dragging = false;
     std::optional<int> m_draggingTouch;
+    double m_grabOffset = 0; ///< points from the finger to the play head while it is dragged
     std::int32_t m_thumbnailCount = 0; ///< as last asked for
     std::vector<double> m_timestamps;
     std::map<double, ImageRef> m_thumbnails;

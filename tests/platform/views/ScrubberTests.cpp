@@ -104,6 +104,19 @@ TEST_F(Scrubbers, AFingerAnywhereMovesThePlayHead)
     EXPECT_THAT(movie->said, ElementsAre("begin 1", "value 10", "value 20", "value 30", "end 1"));
 }
 
+TEST_F(Scrubbers, AThumbThatTakesThePlayHeadMovesItFromWhereItIs)
+{
+    scrubber->reloadData();
+    scrubber->setValue(15);
+    const double x = scrubber->playHeadX();
+    window->touchDown({1, {x + 20, 110}, {}});
+    EXPECT_DOUBLE_EQ(scrubber->value(), 15);
+    window->touchMove({1, {x + 30, 110}, {}});
+    EXPECT_DOUBLE_EQ(scrubber->value(), 16);
+    window->touchUp({1, {x + 30, 110}, {}});
+    EXPECT_DOUBLE_EQ(scrubber->value(), 16);
+}
+
 TEST_F(Scrubbers, ASecondFingerIsIgnored)
 {
     scrubber->reloadData();
