@@ -3,6 +3,7 @@
 #include "app/host/CommandLine.h"
 #include "app/host/OpenMovie.h"
 #include "app/host/ServeRecorders.h"
+#include "app/host/TakeTour.h"
 #include "app/host/TerminationSignals.h"
 
 #include <QCoreApplication>
@@ -16,6 +17,11 @@ namespace {
 int run(const host::OpenCommand& command)
 {
     return host::openMovie(command);
+}
+
+int run(const host::TourCommand& command)
+{
+    return host::takeTour(command);
 }
 
 int run(const host::ServiceCommand& command)

@@ -126,7 +126,7 @@ bool Script::carryOut(const Words& words)
             window.resize(size);
         // And what the transition takes to settle.
         return m_program.window().View::bounds().size == base::Size{double(size.width()), double(size.height())}
-            && m_program.system().clock.now() - *m_since > 2 * platform::Window::kTransitionDuration;
+               && m_program.system().clock.now() - *m_since > 2 * platform::Window::kTransitionDuration;
     }
     if (command == "wait")
         return argument(1) == "frame" ? waitForFrame(words) : waitFor(argument(1));
@@ -141,8 +141,8 @@ bool Script::carryOut(const Words& words)
         return true;
     }
     if (command == "pause")
-        return m_program.system().clock.now() - *m_since
-            >= std::chrono::duration_cast<base::Instant>(std::chrono::duration<double, std::milli>(number(argument(1))));
+        return m_program.system().clock.now() - *m_since >= std::chrono::duration_cast<base::Instant>(
+                   std::chrono::duration<double, std::milli>(number(argument(1))));
     if (command == "picture")
         return picture(words);
     if (command == "transitions")
@@ -162,11 +162,10 @@ bool Script::waitFor(const std::string& what) const
     if (what == "picture")
         return m_pictureSeen;
     if (what == "ready")
-        return editor->currentItemLoaded()
-            || editor->avPlayerItem()->status() == platform::PlayerItem::Status::Failed;
+        return editor->currentItemLoaded() || editor->avPlayerItem()->status() == platform::PlayerItem::Status::Failed;
     if (what == "hidden" || what == "shown") // and what the fade takes
         return editor->isUIHidden() == (what == "hidden")
-            && m_program.system().clock.now() - *m_since > VKVideoEditorViewController::kFadeDuration;
+               && m_program.system().clock.now() - *m_since > VKVideoEditorViewController::kFadeDuration;
     return false;
 }
 

@@ -13,10 +13,11 @@ const char* const kHelpText = R"(Clipsa looks at, trims, saves and shares a scre
 
   clipsa open MOVIE [OPTION…]   open MOVIE in the editor; print what was done with it, one activity a line
   clipsa service                serve recorders on the session bus, as org.clipsa.Clipsa
-  clipsa tour MOVIE [OPTION…]   open MOVIE without a screen, and leave a picture of each step
+  clipsa tour MOVIE --output DIR [OPTION…]
+                                open MOVIE without a screen, and leave a picture of each step in DIR
   clipsa --help, --version
 
-Options of open:
+Options of open, and of tour:
   --app-name NAME           the recorded app, as the title shows it (default: the file's name)
   --bundle-id ID            the recorded app's desktop or AppStream id
   --attachment FILE         a file to share along with the movie
@@ -145,26 +146,56 @@ base::Result<void> takeOpenOption(OpenCommand& command, Words& words)
     return {};
 }
 
-base::Result<Command> parseOpen(Words words)
+/// Nothing when the words ask for help.
+base::Result<std::optional<TourCommand>> parseMovieCommand(Words words, bool isTour)
 {
-    OpenCommand command;
+    TourCommand command;
+    std::string& movie = command.open.movie;
     while (words.advance()) {
         if (words.isOption()) {
             if (words.word() == "--help" || words.word() == "-h")
-                return Command(HelpCommand{});
-            if (const auto taken = takeOpenOption(command, words); !taken)
+                return std::optional<TourCommand>();
+            if (isTour && words.word() == "--output") {
+                const auto value = words.value();
+                if (!value)
+                    return value.error();
+                command.output = value.value();
+            } else if (const auto taken = takeOpenOption(command.open, words); !taken) {
                 return taken.error();
-        } else if (!command.movie.empty()) {
-            return usageError("one movie at a time: both " + command.movie + " and " + words.word() + " are given");
+            }
+        } else if (!movie.empty()) {
+            return usageError("one movie at a time: both " + movie + " and " + words.word() + " are given");
         } else if (words.word().empty()) {
             return usageError("the movie's name is empty");
         } else {
-            command.movie = words.word();
+            movie = words.word();
         }
     }
-    if (command.movie.empty())
-        return usageError("open needs a movie");
-    return Command(std::move(command));
+    if (movie.empty())
+        return usageError(isTour ? "tour needs a movie" : "open needs a movie");
+    return std::optional(std::move(command));
+}
+
+base::Result<Command> parseOpen(Words words)
+{
+    auto command = parseMovieCommand(words, false);
+    if (!command)
+        return command.error();
+    return command.value() ? Command(std::move(command.value()->open)) : Command(HelpCommand{});
+}
+
+base::Result<Command> parseTour(Words words)
+{
+    auto command = parseMovieCommand(words, true);
+    if (!command)
+        return command.error();
+    if (!command.value())
+        return Command(HelpCommand{});
+    if (command.value()->output.empty())
+        return usageError("tour needs --output DIR, for its pictures");
+    if (command.value()->open.json)
+        return usageError("tour prints a summary for people, not --json");
+    return Command(std::move(*command.value()));
 }
 
 base::Result<Command> parseService(Words words)
@@ -199,6 +230,8 @@ base::Result<Command> parseCommandLine(const std::vector<std::string>& words)
         return Command(VersionCommand{});
     if (first == "open")
         return parseOpen(Words(words, 1));
+    if (first == "tour")
+        return parseTour(Words(words, 1));
     if (first == "service")
         return parseService(Words(words, 1));
     return usageError("there is no command " + first);

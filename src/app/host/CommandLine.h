@@ -24,6 +24,11 @@ struct OpenCommand {
     std::vector<std::string> editorArguments;
 };
 
+struct TourCommand {
+    OpenCommand open;
+    std::string output; ///< the directory for the pictures
+};
+
 struct ServiceCommand {
     /// How long it stays with nothing to do.
     std::chrono::seconds idle{30};
@@ -32,7 +37,7 @@ struct ServiceCommand {
 struct HelpCommand {};
 struct VersionCommand {};
 
-using Command = std::variant<OpenCommand, ServiceCommand, HelpCommand, VersionCommand>;
+using Command = std::variant<OpenCommand, TourCommand, ServiceCommand, HelpCommand, VersionCommand>;
 
 /// `words` without the program's name. The error is one line that says which word is wrong and what to do.
 base::Result<Command> parseCommandLine(const std::vector<std::string>& words);

@@ -11,6 +11,7 @@
 #include <QJsonObject>
 
 #include <cstdio>
+#include <utility>
 
 namespace host {
 
@@ -67,7 +68,13 @@ dbus::EditRequest requestFor(const OpenCommand& command)
 
 int openMovie(const OpenCommand& command)
 {
+    return openMovie(command, {});
+}
+
+int openMovie(const OpenCommand& command, OpenVariation variation)
+{
     dbus::EditRequest request = requestFor(command);
+    request.environment = std::move(variation.environment);
     if (const auto prepared = prepare(request); !prepared) {
         complain(prepared.error()->description());
         return kExitUsage;
@@ -82,7 +89,9 @@ int openMovie(const OpenCommand& command)
 
     int status = kExitFailed;
     EditorSession::Handlers handlers;
-    handlers.finished = [&](const std::vector<std::string>& types) { print(types, command, movie); };
+    handlers.finished = std::move(variation.finished);
+    if (!handlers.finished)
+        handlers.finished = [&](const std::vector<std::string>& types) { print(types, command, movie); };
     handlers.copying = [&](std::uint64_t bytes) {
         complain("copying " + movie + " (" + std::to_string(bytes / 1'000'000)
                  + " MB), because the editor's directory is on another file system");

@@ -3,6 +3,11 @@
 
 #include "app/host/CommandLine.h"
 
+#include <functional>
+#include <string>
+#include <utility>
+#include <vector>
+
 namespace host {
 
 enum ExitStatus { kExitDone = 0, kExitFailed = 1, kExitUsage = 2, kExitEditorEnded = 3 };
@@ -10,5 +15,12 @@ enum ExitStatus { kExitDone = 0, kExitFailed = 1, kExitUsage = 2, kExitEditorEnd
 /// Results go to standard output, all else to standard error. Needs a QCoreApplication, and a thread on which SIGINT,
 /// SIGTERM and SIGHUP have been blocked before any other was started; they close the editor.
 int openMovie(const OpenCommand& command);
+
+/// What a tour has differently.
+struct OpenVariation {
+    std::vector<std::pair<std::string, std::string>> environment;                ///< added to the editor's
+    std::function<void(const std::vector<std::string>& activityTypes)> finished; ///< in place of printing
+};
+int openMovie(const OpenCommand& command, OpenVariation variation);
 
 } // namespace host
