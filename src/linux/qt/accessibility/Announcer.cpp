@@ -22,6 +22,11 @@ void tell(ViewItem& item, QAccessible::Event kind)
 
 } // namespace
 
+Announcer::Announcer(std::function<void(QAccessibleEvent*)> tell)
+    : m_tell(tell ? std::move(tell) : QAccessible::updateAccessibility)
+{
+}
+
 void Announcer::announce(StageWindow& window)
 {
     const auto focused = window.views().focusedView();
@@ -33,10 +38,10 @@ void Announcer::announce(StageWindow& window)
     const double number = std::exchange(m_number, shown.number);
     if (previous.lock() != focused) {
         QAccessibleEvent event(item, QAccessible::Focus);
-        QAccessible::updateAccessibility(&event);
+        m_tell(&event);
     } else if (shown.role == platform::AccessibilityRole::Slider && number != shown.number) {
         QAccessibleValueChangeEvent event(item, shown.number);
-        QAccessible::updateAccessibility(&event);
+        m_tell(&event);
     }
 }
 

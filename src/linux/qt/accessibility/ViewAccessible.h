@@ -5,8 +5,11 @@
 
 #include "platform/views/View.h"
 
+#include <functional>
 #include <memory>
 #include <vector>
+
+class QAccessibleEvent;
 
 namespace qtui {
 
@@ -22,9 +25,13 @@ std::vector<std::shared_ptr<platform::View>> accessibleChildren(const platform::
 /// Tells who listens what a commit has changed.
 class Announcer {
 public:
+    /// `tell` hands an event to who listens; Qt does that unless a test wants to know.
+    explicit Announcer(std::function<void(QAccessibleEvent*)> tell = {});
+
     void announce(StageWindow& window);
 
 private:
+    std::function<void(QAccessibleEvent*)> m_tell;
     std::weak_ptr<platform::View> m_focused;
     double m_number = 0; ///< of the focused view, where it has one
 };

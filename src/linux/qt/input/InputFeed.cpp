@@ -94,7 +94,9 @@ void InputFeed::cancelTouches()
 void InputFeed::touch(const QTouchEvent& event)
 {
     for (const QEventPoint& point : event.points()) {
-        const base::Point position = toPoint(point.scenePosition());
+        // From the window system, the scene's position is the screen's: wrong by where the window stands. What the
+        // program makes itself has no other.
+        const base::Point position = toPoint(event.spontaneous() ? point.position() : point.scenePosition());
         switch (point.state()) {
         case QEventPoint::Pressed:
             down(point.id(), position);

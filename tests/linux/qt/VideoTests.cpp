@@ -1,0 +1,139 @@
+// A player's picture on the screen.
+#include "Stage.h"
+
+#include <QThread>
+
+#include <functional>
+
+namespace tests {
+
+namespace {
+
+using Quality = platform::VideoFrame::Quality;
+using ::testing::ElementsAre;
+
+class Video : public Stage {
+protected:
+    explicit Video(double atScale = 1) : Stage(atScale) {}
+};
+
+class VideoAtTwo : public Video {
+protected:
+    VideoAtTwo() : Video(2) {}
+};
+
+void expectLetterboxed(const std::function<QColor(double, double)>& colorAt)
+{
+    // 100 × 100 in 200 × 100: black on both sides.
+    EXPECT_EQ(colorAt(25, 50), QColor(0, 0, 0));
+    EXPECT_EQ(colorAt(175, 50), QColor(0, 0, 0));
+    EXPECT_EQ(colorAt(49, 50), QColor(0, 0, 0));
+    EXPECT_EQ(colorAt(50, 10), QColor(255, 0, 0));
+    EXPECT_EQ(colorAt(99, 10), QColor(255, 0, 0));
+    EXPECT_EQ(colorAt(100, 10), QColor(0, 255, 0));
+    EXPECT_EQ(colorAt(60, 90), QColor(0, 0, 255));
+    EXPECT_EQ(colorAt(149, 90), QColor(255, 255, 255));
+    EXPECT_EQ(colorAt(150, 90), QColor(0, 0, 0));
+}
+
+TEST_F(Video, KeepsItsProportionsOnBlack)
+{
+    addColor(base::Rect::make(0, 0, 200, 100), kGreen);
+    addPlayer(base::Rect::make(0, 0, 200, 100), std::make_shared<QuarteredFrame>(base::Size{640, 640}));
+    expectLetterboxed([this](double x, double y) { return colorAt(x, y); });
+}
+
+TEST_F(VideoAtTwo, KeepsItsProportionsAtTwoPixelsAPoint)
+{
+    addPlayer(base::Rect::make(0, 0, 200, 100), std::make_shared<QuarteredFrame>(base::Size{640, 640}));
+    expectLetterboxed([this](double x, double y) { return colorAt(x, y); });
+}
+
+TEST_F(Video, IsBlackWhileThereIsNoPicture)
+{
+    addColor(base::Rect::make(0, 0, 200, 100), kGreen);
+    addPlayer(base::Rect::make(0, 0, 100, 100), nullptr);
+    EXPECT_EQ(colorAt(50, 50), QColor(0, 0, 0));
+    EXPECT_EQ(colorAt(150, 50), QColor(0, 255, 0));
+}
+
+TEST_F(Video, APictureIsConvertedOnceForItsSize)
+{
+    const auto picture = std::make_shared<QuarteredFrame>(base::Size{640, 640});
+    addPlayer(base::Rect::make(0, 0, 200, 100), picture);
+    look();
+    addColor(base::Rect::make(0, 0, 10, 10), kGreen);
+    look();
+    EXPECT_THAT(picture->renders, ElementsAre(Quality::Exact));
+}
+
+TEST_F(Video, IsFastWhilePlayingAndExactAtRest)
+{
+    const auto picture = std::make_shared<QuarteredFrame>(base::Size{640, 640});
+    const auto player = addPlayer(base::Rect::make(0, 0, 200, 100), nullptr);
+    player->play();
+    player->show(picture);
+    look();
+    EXPECT_THAT(picture->renders, ElementsAre(Quality::Fast));
+    player->pause();
+    addColor(base::Rect::make(0, 0, 10, 10), kGreen);
+    look();
+    EXPECT_THAT(picture->renders, ElementsAre(Quality::Fast, Quality::Exact));
+    player->play();
+    addColor(base::Rect::make(10, 0, 10, 10), kGreen);
+    look();
+    EXPECT_EQ(picture->renders.size(), 2U) << "what is exact already stays";
+}
+
+TEST_F(Video, PicturesFollowEachOther)
+{
+    const auto player = addPlayer(base::Rect::make(0, 0, 200, 100), nullptr);
+    player->play();
+    for (std::uint32_t i = 1; i < 12; ++i) {
+        player->show(std::make_shared<FakeVideoFrame>(base::MediaTime::zero(), base::Size{2, 1}, 0xff000000 + i * 20));
+        ASSERT_EQ(colorAt(100, 50).blue(), static_cast<int>(i * 20));
+    }
+}
+
+TEST_F(Video, WhatNobodySeesIsNotConverted)
+{
+    const auto picture = std::make_shared<QuarteredFrame>(base::Size{640, 640});
+    const auto holder = add<platform::View>(base::Rect::make(0, 0, 200, 100));
+    const auto player = std::make_shared<FakePlayer>(mainQueue, center, nullptr);
+    const auto layer = platform::PlayerLayer::withPlayer(player);
+    layer->setFrame(base::Rect::make(0, 0, 200, 100));
+    holder->addSublayer(layer);
+    holder->setHidden(true);
+    player->show(picture);
+    look();
+    EXPECT_TRUE(picture->renders.empty());
+    holder->setHidden(false);
+    EXPECT_EQ(colorAt(60, 10), QColor(255, 0, 0));
+}
+
+TEST_F(Video, TheFirstPictureOnTheScreenIsAnnouncedOnce)
+{
+    int told = 0;
+    presenter->setFirstPictureHandler([&] { ++told; });
+    const auto player = addPlayer(base::Rect::make(0, 0, 200, 100), nullptr);
+    look();
+    settle();
+    EXPECT_EQ(told, 0);
+    player->show(std::make_shared<QuarteredFrame>(base::Size{640, 640}));
+    const auto wait = [&] {
+        for (int i = 0; i < 100 && told == 0; ++i) {
+            settle();
+            QThread::msleep(2);
+        }
+    };
+    wait();
+    EXPECT_EQ(told, 1);
+    player->show(std::make_shared<QuarteredFrame>(base::Size{640, 640}));
+    look();
+    settle();
+    EXPECT_EQ(told, 1);
+}
+
+} // namespace
+
+} // namespace tests
