@@ -423,3 +423,15 @@ TEST_F(Extension, TheFocusViewCanBecomeFirstResponder)
 {
     EXPECT_TRUE(VKVideoEditorExtensionViewControllerFocusView().canBecomeFirstResponder());
 }
+
+TEST_F(Extension, AppearingWithAnEditorAlreadyThereBuildsNoOther)
+{
+    offerRequired();
+    start();
+    deliverRequired();
+    fake.machine.mainQueue.drain();
+    const auto first = editor();
+    show();
+    EXPECT_EQ(editor(), first);
+    EXPECT_EQ(fake.media.playerCount(), 1U);
+}
