@@ -2,6 +2,7 @@
 
 #include "app/editor/EditorOptions.h"
 #include "app/editor/EditorProgram.h"
+#include "app/editor/StartTrace.h"
 
 #include <QGuiApplication>
 
@@ -9,12 +10,14 @@
 
 int main(int argc, char* argv[])
 {
+    app::markStart("main");
     const auto options = app::EditorOptions::parse({argv + 1, argv + argc});
     if (!options) {
         std::fprintf(stderr, "clipsa-editor: %s\n", options.error()->description().c_str());
         return 2;
     }
     QGuiApplication application(argc, argv);
+    app::markStart("application");
     QGuiApplication::setApplicationName("Clipsa");
     QGuiApplication::setDesktopFileName("org.clipsa.Clipsa");
     QGuiApplication::setQuitOnLastWindowClosed(false);

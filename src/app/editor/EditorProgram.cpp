@@ -1,6 +1,7 @@
 #include "app/editor/EditorProgram.h"
 
 #include "app/editor/Script.h"
+#include "app/editor/StartTrace.h"
 #include "extension/VKVideoEditorExtensionContext.h"
 #include "extension/VKVideoEditorExtensionViewController.h"
 #include "linux/dbus/Chassis.h"
@@ -72,8 +73,8 @@ base::StreamLog::Style logStyle()
 } // namespace
 
 EditorProgram::EditorProgram(const EditorOptions& options)
-    : m_options(options), m_log(stderr, logStyle(), options.verbose), m_mainQueue(m_clock), m_loop(m_mainQueue),
-      m_system{m_log, m_clock, m_mainQueue, m_backgroundQueue, m_defaultQueue},
+    : m_options(options), m_log(stderr, logStyle(), options.verbose), m_mainQueue(m_clock),
+      m_loop(m_mainQueue), m_system{m_log, m_clock, m_mainQueue, m_backgroundQueue, m_defaultQueue},
       m_window(std::make_shared<platform::Window>(m_mainQueue, firstWindowSize(options), 1.0)),
       m_device(deviceValues(options), [this] { return m_window->bounds().width(); }),
       m_images([this] { return m_window->scale(); }), m_files(m_system, mounts(options)),
@@ -92,6 +93,7 @@ EditorProgram::~EditorProgram() = default;
 
 int EditorProgram::run()
 {
+    markStart("platform");
     if (const auto started = start(); !started) {
         m_log.error(started.error()->description());
         return 4;
@@ -107,6 +109,7 @@ base::Result<void> EditorProgram::start()
     auto items = m_connection->inputItems();
     if (!items)
         return items.error();
+    markStart("connected");
 
     m_extension = platform::instantiateExtension(kDeclaration);
     m_connection->setHostInterface(m_extension.context->hostInterface());
@@ -116,6 +119,10 @@ base::Result<void> EditorProgram::start()
     m_presenter.setTitle("Clipsa");
     m_presenter.setCloseHandler([this] { closeRequested(); });
     m_presenter.setLiveBlur(m_device.graphicsQuality() != VKVideoOverlayButton::kGraphicsQualityWithoutBlur);
+    m_presenter.setFirstPictureHandler([this] {
+        m_pictureSeen = true;
+        markStart("first-picture");
+    });
     if (const char* script = std::getenv("CLIPSA_SCRIPT"))
         m_script = std::make_unique<Script>(*this, script);
 
@@ -131,19 +138,20 @@ void EditorProgram::show()
     if (m_shown || !m_extension.principal)
         return;
     m_shown = true;
+    markStart("payload");
     if (m_device.userInterfaceIdiom() == platform::InterfaceIdiom::Phone && !m_options.idiom
         && QGuiApplication::platformName() != "offscreen")
         m_presenter.showFullScreen();
     else
         m_presenter.show();
+    markStart("window");
     if (m_script)
         m_script->start();
 }
 
 std::shared_ptr<VKVideoEditorViewController> EditorProgram::editor() const
 {
-    const auto principal
-        = std::dynamic_pointer_cast<VKVideoEditorExtensionViewController>(m_extension.principal);
+    const auto principal = std::dynamic_pointer_cast<VKVideoEditorExtensionViewController>(m_extension.principal);
     return principal ? principal->videoEditorViewController() : nullptr;
 }
 

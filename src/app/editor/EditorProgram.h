@@ -39,6 +39,8 @@ public:
     const base::System& system() const { return m_system; }
     platform::Window& window() { return *m_window; }
     qtui::Presenter& presenter() { return m_presenter; }
+    /// Whether some of a movie has been on the screen.
+    bool hasShownPicture() const { return m_pictureSeen; }
     /// Null before the payload has come, and after the end.
     std::shared_ptr<VKVideoEditorViewController> editor() const;
 
@@ -73,6 +75,7 @@ private:
     PayloadWatch m_payload;
     std::unique_ptr<Script> m_script;
     bool m_shown = false;
+    bool m_pictureSeen = false;
     int m_exitStatus = 0;
 };
 

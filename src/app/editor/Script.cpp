@@ -68,7 +68,6 @@ Script::Script(EditorProgram& program, const std::string& path) : m_program(prog
         if (!words.empty())
             m_commands.push_back(std::move(words));
     }
-    program.presenter().setFirstPictureHandler([this] { m_pictureSeen = true; });
 }
 
 Script::~Script() = default;
@@ -160,7 +159,7 @@ bool Script::waitFor(const std::string& what) const
     if (!editor)
         return false;
     if (what == "picture")
-        return m_pictureSeen;
+        return m_program.hasShownPicture();
     if (what == "ready")
         return editor->currentItemLoaded() || editor->avPlayerItem()->status() == platform::PlayerItem::Status::Failed;
     if (what == "hidden" || what == "shown") // and what the fade takes

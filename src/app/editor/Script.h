@@ -63,7 +63,6 @@ private:
     std::vector<Words> m_commands;
     std::size_t m_next = 0;
     std::optional<base::Instant> m_since;
-    bool m_pictureSeen = false;
     std::optional<TransitionTrial> m_trial;
     std::shared_ptr<bool> m_alive = std::make_shared<bool>(true);
 };
