@@ -17,8 +17,7 @@ std::vector<AssetTrack> Asset::tracksWithMediaType(MediaType type) const
 
 PlayerLayer::~PlayerLayer()
 {
-    if (m_player)
-        m_player->setFrameHandler({});
+    unfollow();
 }
 
 std::shared_ptr<PlayerLayer> PlayerLayer::withPlayer(const std::shared_ptr<Player>& player)
@@ -32,16 +31,48 @@ void PlayerLayer::setPlayer(const std::shared_ptr<Player>& player)
 {
     if (m_player == player)
         return;
-    if (m_player)
-        m_player->setFrameHandler({});
+    unfollow();
+    follow(player);
+    setNeedsDisplay();
+}
+
+void PlayerLayer::follow(const std::shared_ptr<Player>& player)
+{
     m_player = player;
+    m_item = player ? player->currentItem() : nullptr;
+    if (m_item)
+        m_item->addObserver(*this, PlayerItem::kStatusKey);
     if (m_player) {
         m_player->setFrameHandler([weak = weakSelf<PlayerLayer>()] {
             if (const auto self = weak.lock())
                 self->setNeedsDisplay();
         });
     }
+}
+
+void PlayerLayer::unfollow()
+{
+    if (m_item)
+        m_item->removeObserver(*this, PlayerItem::kStatusKey);
+    if (m_player)
+        m_player->setFrameHandler({});
+    m_item = nullptr;
+    m_player = nullptr;
+}
+
+void PlayerLayer::observeValueForKeyPath_ofObject_change_context(std::string_view /*keyPath*/,
+                                                                 runtime::Object& /*object*/,
+                                                                 const runtime::KeyValueChange& /*change*/,
+                                                                 void* /*context*/)
+{
     setNeedsDisplay();
+}
+
+std::string PlayerLayer::failureText() const
+{
+    if (!m_item || m_item->status() != PlayerItem::Status::Failed)
+        return {};
+    return m_item->error() ? m_item->error()->description() : "This movie cannot be played.";
 }
 
 base::Rect PlayerLayer::videoRect(base::Rect bounds) const
@@ -54,8 +85,9 @@ base::Rect PlayerLayer::videoRect(base::Rect bounds) const
         return {};
     const double scale = std::min(bounds.width() / size.width, bounds.height() / size.height);
     const base::Size fitted{size.width * scale, size.height * scale};
-    return {{bounds.minX() + (bounds.width() - fitted.width) / 2, bounds.minY() + (bounds.height() - fitted.height) / 2},
-            fitted};
+    return {
+        {bounds.minX() + (bounds.width() - fitted.width) / 2, bounds.minY() + (bounds.height() - fitted.height) / 2},
+        fitted};
 }
 
 } // namespace platform

@@ -37,12 +37,10 @@ public:
 
     /// Called every `interval` while playing, and after each seek.
     [[nodiscard]] virtual ObserverToken addPeriodicTimeObserver(base::MediaTime interval,
-                                                                std::function<void(base::MediaTime)> callback)
-        = 0;
+                                                                std::function<void(base::MediaTime)> callback) = 0;
     /// Called whenever playing passes one of `times`.
     [[nodiscard]] virtual ObserverToken addBoundaryTimeObserver(std::vector<base::MediaTime> times,
-                                                                std::function<void()> callback)
-        = 0;
+                                                                std::function<void()> callback) = 0;
     virtual void removeTimeObserver(const ObserverToken& token) = 0;
 
     /// The picture to show now; null until there is one.

@@ -4,9 +4,12 @@
 #include "platform/media/Player.h"
 #include "platform/views/Layer.h"
 
+#include <string>
+#include <string_view>
+
 namespace platform {
 
-class PlayerLayer final : public Layer {
+class PlayerLayer final : public Layer, private runtime::KeyValueObserver {
 public:
     ~PlayerLayer() override;
 
@@ -17,13 +20,21 @@ public:
 
     /// Null when there is no player, or no picture yet.
     VideoFrameRef currentFrame() const { return m_player ? m_player->currentFrame() : nullptr; }
+    /// What to tell the user in place of a picture: why the item cannot be played. Empty while there is nothing to tell.
+    std::string failureText() const;
     /// Where the picture stands inside `bounds`; empty without a picture.
     base::Rect videoRect(base::Rect bounds) const;
 
 private:
     PlayerLayer() = default;
 
+    void observeValueForKeyPath_ofObject_change_context(std::string_view keyPath, runtime::Object& object,
+                                                        const runtime::KeyValueChange& change, void* context) override;
+    void follow(const std::shared_ptr<Player>& player);
+    void unfollow();
+
     std::shared_ptr<Player> m_player;
+    std::shared_ptr<PlayerItem> m_item; ///< the player's, as observed
 };
 
 } // namespace platform

@@ -23,8 +23,8 @@ public:
 
     /// Draws the whole picture, scaled to `width` × `height` pixels of blue, green, red, 255, one byte each.
     /// Colours are converted by the stream's own matrix and range. Any thread. False when that is impossible.
-    virtual bool render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int width, int height, Quality quality) const
-        = 0;
+    virtual bool render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int width, int height,
+                        Quality quality) const = 0;
 };
 
 using VideoFrameRef = std::shared_ptr<const VideoFrame>;
