@@ -121,8 +121,10 @@ DecodedFrame::DecodedFrame(Owned<AVFrame> picture, std::int64_t pts, base::Media
         m_aspect = m_picture->sample_aspect_ratio;
     const base::Size upright = squareSize(m_picture->width, m_picture->height, m_aspect);
     m_displaySize = orientation.transpose ? base::Size{upright.height, upright.width} : upright;
-    for (const AVBufferRef* buffer : m_picture->buf)
-        m_byteCount += buffer ? static_cast<std::size_t>(buffer->size) : 0;
+    constexpr int kAlignment = 32; // of rows, as decoders lay them out
+    const auto format = static_cast<AVPixelFormat>(m_picture->format);
+    m_byteCount = static_cast<std::size_t>(
+        std::max(0, av_image_get_buffer_size(format, m_picture->width, m_picture->height, kAlignment)));
 }
 
 bool DecodedFrame::render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int width, int height, Quality quality) const
