@@ -3,19 +3,20 @@
 
 #include <csignal>
 #include <cstdlib>
+#include <fcntl.h>
 #include <stdexcept>
 #include <string>
 #include <sys/types.h>
 #include <sys/wait.h>
 #include <unistd.h>
+#include <vector>
 
 namespace tests {
 
-/// Sets `variable`, and so must be made before anybody in this process asks for that bus.
+/// Sets environment variables, and so must be made before anybody in this process asks for a bus.
 class PrivateBus {
 public:
-    explicit PrivateBus(const char* variable = "DBUS_SESSION_BUS_ADDRESS",
-                        const std::string& configuration = "--session")
+    explicit PrivateBus(const std::vector<const char*>& variables = {"DBUS_SESSION_BUS_ADDRESS"})
     {
         int ends[2];
         if (::pipe(ends) != 0)
@@ -23,8 +24,9 @@ public:
         m_process = ::fork();
         if (m_process == 0) {
             ::close(ends[0]);
+            ::dup2(::open("/dev/null", O_WRONLY), STDERR_FILENO); // it complains about limits that nobody needs
             const std::string address = "--print-address=" + std::to_string(ends[1]);
-            ::execlp("dbus-daemon", "dbus-daemon", configuration.c_str(), "--nofork", "--nopidfile", address.c_str(),
+            ::execlp("dbus-daemon", "dbus-daemon", "--session", "--nofork", "--nopidfile", address.c_str(),
                      static_cast<char*>(nullptr));
             ::_exit(127);
         }
@@ -34,7 +36,8 @@ public:
         ::close(ends[0]);
         if (m_address.empty())
             throw std::runtime_error("dbus-daemon did not start");
-        ::setenv(variable, m_address.c_str(), 1);
+        for (const char* const variable : variables)
+            ::setenv(variable, m_address.c_str(), 1);
     }
     ~PrivateBus()
     {

@@ -18,10 +18,10 @@ std::optional<std::string> chassis(std::chrono::milliseconds limit)
     const QDBusMessage reply = bus.call(call, QDBus::Block, static_cast<int>(limit.count()));
     if (reply.type() != QDBusMessage::ReplyMessage || reply.signature() != QLatin1String("v"))
         return std::nullopt;
-    std::string word = reply.arguments().constFirst().value<QDBusVariant>().variant().toString().toStdString();
-    if (word.empty())
+    const QVariant value = reply.arguments().constFirst().value<QDBusVariant>().variant();
+    if (value.metaType() != QMetaType::fromType<QString>() || value.toString().isEmpty())
         return std::nullopt;
-    return word;
+    return value.toString().toStdString();
 }
 
 } // namespace dbus

@@ -15,7 +15,7 @@ namespace {
 
 base::ErrorRef badOption(std::string_view key, const std::string& what)
 {
-    return base::Error::make(kBadInputDomain, kBadArgument, "the option \"" + std::string(key) + "\" is " + what);
+    return base::Error::make(kBadInputDomain, kBadArgument, "the option \"" + std::string(key) + "\" must be " + what);
 }
 
 void setVariable(EditRequest& request, const char* name, const QVariant& value)

@@ -46,6 +46,8 @@ public:
         connect(&m_callers, &QDBusServiceWatcher::serviceUnregistered, this, &Bus::callerLeft);
     }
 
+    ~Bus() override { QDBusConnection::disconnectFromBus(m_connection.name()); }
+
     base::Result<void> start()
     {
         m_connection.registerVirtualObject(QLatin1String(kPath), this, QDBusConnection::SubPath);
@@ -291,7 +293,10 @@ base::Result<std::unique_ptr<RecorderService>> RecorderService::start(Launcher l
                                                                       std::function<void()> whenIdle)
 {
     registerWireTypes();
-    const auto connection = QDBusConnection::sessionBus();
+    // Of its own, so that the name goes when the service goes.
+    static int count = 0;
+    const auto connection =
+        QDBusConnection::connectToBus(QDBusConnection::SessionBus, QStringLiteral("clipsa-service-%1").arg(++count));
     if (!connection.isConnected())
         return base::Error::make(kErrorDomain, kNotConnected,
                                  "there is no session bus: " + fromQt(connection.lastError().message()));
