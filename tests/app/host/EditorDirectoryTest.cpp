@@ -1,0 +1,190 @@
+#include "app/host/EditorDirectory.h"
+
+#include "linux/dbus/HostConnection.h"
+#include "support/PrivateDirectory.h"
+
+#include <gmock/gmock.h>
+
+#include <fcntl.h>
+#include <optional>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <utime.h>
+
+using testing::HasSubstr;
+using testing::StartsWith;
+
+namespace {
+
+class EditorDirectories : public ::testing::Test {
+protected:
+    host::EditorDirectory make()
+    {
+        auto made = host::EditorDirectory::make(m_root);
+        EXPECT_TRUE(made) << made.error()->description();
+        return std::move(made).value();
+    }
+
+    /// As an editor leaves it that was killed along with its host.
+    std::filesystem::path dead(const std::string& name)
+    {
+        const auto path = m_root / name;
+        std::filesystem::create_directories(path / "private/Velkor");
+        std::ofstream(path / "private/Velkor/movie.mp4") << "trimmed";
+        std::ofstream(path / "lock");
+        return path;
+    }
+
+    int sweep() { return host::sweepEditorDirectories(m_root); }
+
+    tests::PrivateDirectory m_directory;
+    std::filesystem::path m_root = m_directory.path() / "cache/clipsa";
+};
+
+TEST_F(EditorDirectories, AreForTheUserAlone)
+{
+    const auto directory = make();
+    EXPECT_THAT(directory.path(), StartsWith(m_root.native() + "/editor-"));
+    for (const std::string& path : {directory.path(), directory.deviceRoot(), directory.movieDirectory()})
+        EXPECT_EQ(std::filesystem::status(path).permissions(), std::filesystem::perms::owner_all) << path;
+    EXPECT_EQ(directory.movieDirectory(), directory.path() + "/private/Velkor");
+}
+
+TEST_F(EditorDirectories, GoWithAllThatIsInThem)
+{
+    std::string path;
+    const auto outside = m_directory.write("outside/precious", "x");
+    {
+        const auto directory = make();
+        path = directory.path();
+        std::ofstream(directory.movieDirectory() + "/movie.mp4") << "x";
+        std::filesystem::create_symlink(outside.parent_path(), directory.path() + "/link");
+    }
+    EXPECT_FALSE(std::filesystem::exists(path));
+    EXPECT_TRUE(std::filesystem::exists(outside));
+}
+
+TEST_F(EditorDirectories, AreTwoForTwoEditors)
+{
+    const auto first = make();
+    const auto second = make();
+    EXPECT_NE(first.path(), second.path());
+}
+
+TEST_F(EditorDirectories, OfLivingEditorsAreNotSwept)
+{
+    const auto directory = make();
+    EXPECT_EQ(sweep(), 0);
+    EXPECT_TRUE(std::filesystem::exists(directory.path() + "/lock"));
+}
+
+TEST_F(EditorDirectories, LiveAsLongAsSomebodyHasTheLock)
+{
+    auto directory = std::make_optional(make());
+    const std::string path = directory->path();
+    // What an editor inherits, and keeps when its host is killed.
+    std::optional<dbus::FileDescriptor> inherited(dbus::FileDescriptor(::fcntl(directory->lock(), F_DUPFD_CLOEXEC, 3)));
+    std::filesystem::rename(path, path + "-kept"); // the host's end does not find it, as if it had been killed
+    directory.reset();
+    std::filesystem::rename(path + "-kept", path);
+
+    EXPECT_EQ(sweep(), 0);
+    inherited.reset();
+    EXPECT_EQ(sweep(), 1);
+    EXPECT_FALSE(std::filesystem::exists(path));
+}
+
+TEST_F(EditorDirectories, OfDeadEditorsAreSwept)
+{
+    const auto first = dead("editor-aaaaaa");
+    const auto second = dead("editor-bbbbbb");
+    EXPECT_EQ(sweep(), 2);
+    EXPECT_FALSE(std::filesystem::exists(first));
+    EXPECT_FALSE(std::filesystem::exists(second));
+    EXPECT_TRUE(std::filesystem::exists(m_root));
+}
+
+TEST_F(EditorDirectories, SweepingLeavesWhatIsNotAnEditors)
+{
+    std::filesystem::create_directories(m_root / "other");
+    std::ofstream(m_root / "other/lock");
+    std::ofstream(m_root / "editor-file") << "a file";
+    EXPECT_EQ(sweep(), 0);
+    EXPECT_TRUE(std::filesystem::exists(m_root / "other/lock"));
+    EXPECT_TRUE(std::filesystem::exists(m_root / "editor-file"));
+    EXPECT_EQ(host::sweepEditorDirectories(m_directory.path() / "missing"), 0);
+}
+
+TEST_F(EditorDirectories, SweepingFollowsNoLinks)
+{
+    const auto precious = m_directory.write("outside/precious", "x");
+    std::ofstream(precious.parent_path() / "lock");
+    std::filesystem::create_directories(m_root);
+    std::filesystem::create_symlink(precious.parent_path(), m_root / "editor-linked");
+    const auto withLink = dead("editor-withlink");
+    std::filesystem::create_directory_symlink(precious.parent_path(), withLink / "private/away");
+    const auto lockIsLink = dead("editor-locklink");
+    std::filesystem::remove(lockIsLink / "lock");
+    std::filesystem::create_symlink(precious, lockIsLink / "lock");
+
+    EXPECT_EQ(sweep(), 1);
+    EXPECT_TRUE(std::filesystem::exists(precious));
+    EXPECT_TRUE(std::filesystem::is_symlink(m_root / "editor-linked"));
+    EXPECT_FALSE(std::filesystem::exists(withLink));
+    EXPECT_TRUE(std::filesystem::exists(lockIsLink)) << "not made by us";
+}
+
+TEST_F(EditorDirectories, OneThatIsBeingMadeIsLeftForADay)
+{
+    const auto young = m_root / "editor-young";
+    std::filesystem::create_directories(young);
+    EXPECT_EQ(sweep(), 0);
+    const utimbuf longAgo = {1'000'000'000, 1'000'000'000};
+    ASSERT_EQ(::utime(young.c_str(), &longAgo), 0);
+    EXPECT_EQ(sweep(), 1);
+}
+
+TEST_F(EditorDirectories, ALongPathGetsItsSocketElsewhere)
+{
+    EXPECT_EQ(make().socketPath().value().rfind(m_root.native(), 0), 0U);
+
+    m_root = m_directory.path() / std::string(120, 'x') / "clipsa";
+    tests::PrivateDirectory runtime;
+    const char* const before = std::getenv("XDG_RUNTIME_DIR");
+    const std::string kept = before ? before : "";
+    ::setenv("XDG_RUNTIME_DIR", runtime.path().c_str(), 1);
+    std::string socket;
+    {
+        const auto directory = make();
+        socket = directory.socketPath().value();
+        EXPECT_THAT(socket, StartsWith(runtime.path().native()));
+        EXPECT_LE(socket.size(), dbus::HostConnection::kMaximumPathSize);
+        std::ofstream{socket};
+    }
+    EXPECT_FALSE(std::filesystem::exists(socket)) << "goes with the directory";
+
+    ::unsetenv("XDG_RUNTIME_DIR");
+    const auto directory = make();
+    EXPECT_THAT(directory.socketPath().error()->description(), HasSubstr("set XDG_RUNTIME_DIR"));
+    if (before)
+        ::setenv("XDG_RUNTIME_DIR", kept.c_str(), 1);
+}
+
+TEST_F(EditorDirectories, ARootThatCannotBeMadeIsAnError)
+{
+    const auto file = m_directory.write("file", "x");
+    const auto made = host::EditorDirectory::make(file.native() + "/below");
+    ASSERT_FALSE(made);
+    EXPECT_THAT(made.error()->description(), HasSubstr("cannot make a directory in"));
+}
+
+TEST_F(EditorDirectories, LieInTheCache)
+{
+    ::setenv("XDG_CACHE_HOME", "/elsewhere", 1);
+    EXPECT_EQ(host::editorDirectoriesRoot().value(), "/elsewhere/clipsa");
+    ::setenv("XDG_CACHE_HOME", "relative", 1);
+    ::setenv("HOME", "/home/somebody", 1);
+    EXPECT_EQ(host::editorDirectoriesRoot().value(), "/home/somebody/.cache/clipsa");
+}
+
+} // namespace
