@@ -17,8 +17,8 @@ struct ShownFrame {
 
 class FrameCache {
 public:
-    /// All cached pictures together: 80 at 1920 × 1080, 330 when scaled down to 960 × 540.
-    static constexpr std::size_t kMostBytes = 256u << 20;
+    /// All cached pictures together: 40 at 1920 × 1080, 165 when scaled down to 960 × 540.
+    static constexpr std::size_t kMostBytes = 128u << 20;
 
     explicit FrameCache(std::size_t mostBytes = kMostBytes) : m_mostBytes(mostBytes) {}
 

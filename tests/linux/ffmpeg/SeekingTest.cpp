@@ -2,6 +2,7 @@
 #include "support/EngineTest.h"
 
 #include <random>
+#include <semaphore>
 
 namespace {
 
@@ -75,6 +76,23 @@ TEST_F(Seeking, ANewerSeekOvertakesTheOlderOnes)
     for (int i = 0; i < 300; ++i)
         player->seekToTime(frame(i * 4, 60));
     EXPECT_EQ(numberAt(frame(17, 60)), 17);
+}
+
+TEST_F(Seeking, APictureThatComesAfterTheNextSeekIsNotShown)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    ASSERT_TRUE(waitFor([&] { return player->isSettled(); }));
+    std::vector<int> shown;
+    player->setFrameHandler([&] { shown.push_back(tests::numberIn(player->currentFrame())); });
+    std::counting_semaphore<> posted(0);
+    mainQueue.setWake([&] { posted.release(); });
+    player->seekToTime(at(1));
+    posted.acquire(); // the observers' call
+    ASSERT_TRUE(posted.try_acquire_for(std::chrono::seconds(20))) << "the picture, which nobody has taken yet";
+    mainQueue.setWake({});
+    player->seekToTime(at(2));
+    ASSERT_TRUE(waitFor([&] { return player->isSettled(); }));
+    EXPECT_EQ(shown, std::vector<int>{60});
 }
 
 TEST_F(Seeking, ASeekBeforeTheItemIsReadyIsKept)
