@@ -153,7 +153,7 @@ bool Script::carryOut(const Words& words)
     return false;
 }
 
-bool Script::waitFor(const std::string& what) const
+bool Script::waitFor(const std::string& what)
 {
     const auto editor = m_program.editor();
     if (!editor)
@@ -183,6 +183,7 @@ bool Script::waitForFrame(const Words& words) const
 
 bool Script::tap(const Words& words)
 {
+    m_program.presenter().commit(); // nobody touches what has not been on the screen
     base::Point at;
     if (words.size() == 3) {
         at = {number(words[1]), number(words[2])};

@@ -46,7 +46,7 @@ private:
 
     /// Whether the command is done; if not, it is tried again a little later.
     bool carryOut(const Words& words);
-    bool waitFor(const std::string& what) const;
+    bool waitFor(const std::string& what);
     bool waitForFrame(const Words& words) const;
     bool tap(const Words& words);
     bool drag(const Words& words);

@@ -1,0 +1,92 @@
+// What the editor looks like, in both arrangements and on both kinds of devices: as in docs/pictures, which
+// tools/make-pictures makes.
+#include "end_to_end/Machine.h"
+#include "end_to_end/Screenshot.h"
+
+#include <gmock/gmock.h>
+
+using namespace tests;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+namespace {
+
+namespace fs = std::filesystem;
+
+class Picture : public testing::TestWithParam<const char*> {};
+
+// Letters differ a little from one font renderer to the next; a bar that is missing or elsewhere is far more.
+constexpr double kMeanDifference = 1.5;
+constexpr double kDifferentShare = 0.01;
+
+} // namespace
+
+TEST_P(Picture, LooksAsItDid)
+{
+    const std::string name = GetParam();
+    const PrivateDirectory made;
+    Machine machine;
+    Child tool({fs::path(CLIPSA_SOURCE) / "tools/make-pictures", "--output", made.path(), "--only", name, "--clipsa",
+                fs::path(CLIPSA_BIN) / "clipsa", "--movies", fs::path(CLIPSA_TEST_MOVIES) / "pictures"},
+               machine.environment());
+    const auto end = tool.wait();
+    ASSERT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_THAT(end.err, IsEmpty());
+    for (const auto& file : fs::directory_iterator(made.path())) {
+        SCOPED_TRACE(file.path().filename());
+        const Screenshot now(file.path());
+        const Screenshot before(fs::path(CLIPSA_SOURCE) / "docs/pictures" / file.path().filename());
+        ASSERT_FALSE(before.isNull()) << "docs/pictures does not have it";
+        ASSERT_EQ(now.image().size(), before.image().size());
+        const auto difference = differenceOf(now.image(), before.image());
+        EXPECT_LT(difference.mean, kMeanDifference);
+        EXPECT_LT(difference.share, kDifferentShare);
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(EndToEnd, Picture,
+                         testing::Values("phone", "phone-landscape", "phone-without-home-button", "phone-dark", "pad",
+                                         "pad-without-home-button", "pad-flat", "pad-dark"),
+                         [](const auto& picture) { return testName(picture.param); });
+
+TEST(TurningAPhone, ToItsSideAndBackShowsWhatWasThere)
+{
+    for (const char* homeButton : {"yes", "no"}) {
+        SCOPED_TRACE(homeButton);
+        Machine machine;
+        machine.keepReport();
+        machine.setScript(R"(
+            wait picture
+            wait ready
+            size 390 760
+            picture before.png
+            print {layout}
+            size 760 390
+            picture on-its-side.png
+            print {layout}
+            size 390 760
+            picture after.png
+            print {layout}
+            tap Cancel)");
+        const auto end = machine.open(machine.movie("clock.mp4"), {"--device", "phone", "--home-button", homeButton});
+        ASSERT_EQ(end.exitStatus, 0) << end.err;
+        EXPECT_THAT(machine.report(), ElementsAre("phone", "pad", "phone"));
+        EXPECT_EQ(Screenshot(machine.picture("before.png")).image(), Screenshot(machine.picture("after.png")).image());
+        EXPECT_EQ(Screenshot(machine.picture("on-its-side.png")).image().size(), QSize(760, 390));
+    }
+}
+
+TEST(TurningAPad, KeepsOneBarHoweverItIsHeld)
+{
+    Machine machine;
+    machine.keepReport();
+    machine.setScript(R"(
+        wait ready
+        size 1024 700
+        print {layout}
+        size 700 1024
+        print {layout}
+        tap Cancel)");
+    EXPECT_EQ(machine.open(machine.movie("clock.mp4"), {"--device", "pad"}).exitStatus, 0);
+    EXPECT_THAT(machine.report(), ElementsAre("pad", "pad"));
+}
