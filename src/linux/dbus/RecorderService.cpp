@@ -1,6 +1,7 @@
 #include "linux/dbus/RecorderService.h"
 
 #include "base/Url.h"
+#include "linux/dbus/DisconnectWatch.h"
 #include "linux/dbus/EditOptions.h"
 #include "linux/dbus/Protocol.h"
 #include "linux/dbus/RecorderIntrospection.h"
@@ -40,7 +41,7 @@ public:
     {
         m_idle.setSingleShot(true);
         m_idle.setInterval(idle);
-        connect(&m_idle, &QTimer::timeout, this, &Bus::leaveIfIdle);
+        connect(&m_idle, &QTimer::timeout, this, &Bus::leave);
         m_callers.setConnection(m_connection);
         m_callers.setWatchMode(QDBusServiceWatcher::WatchForUnregistration);
         connect(&m_callers, &QDBusServiceWatcher::serviceUnregistered, this, &Bus::callerLeft);
@@ -53,17 +54,19 @@ public:
         m_connection.registerVirtualObject(QLatin1String(kPath), this, QDBusConnection::SubPath);
         if (!m_connection.registerService(QLatin1String(kName)))
             return base::Error::make(kErrorDomain, kRefused, "another clipsa service has the name org.clipsa.Clipsa");
+        m_busWatch.watch(m_connection);
         m_idle.start();
         return {};
     }
 
     void close()
     {
-        m_closing = true;
+        if (std::exchange(m_closing, true))
+            return;
         for (const auto& [number, session] : m_sessions)
             session.editor->close();
         if (m_sessions.empty())
-            m_whenIdle();
+            leave();
     }
 
     QString introspect(const QString& path) const override
@@ -215,7 +218,7 @@ private:
         if (!m_sessions.empty())
             return;
         if (m_closing)
-            m_whenIdle();
+            leave();
         else
             m_idle.start();
     }
@@ -260,9 +263,10 @@ private:
         return true;
     }
 
-    void leaveIfIdle()
+    /// Calls that reached us while we had the name are answered before we go; and what we sent has left when the bus
+    /// has answered.
+    void leave()
     {
-        // Calls that reached us while we had the name are answered before we go.
         m_connection.unregisterService(QLatin1String(kName));
         QMetaObject::invokeMethod(
             this,
@@ -280,6 +284,7 @@ private:
     std::function<void()> m_whenIdle;
     QTimer m_idle;
     QDBusServiceWatcher m_callers;
+    DisconnectWatch m_busWatch{[this] { close(); }}; // without a bus there is nobody to serve
     std::uint64_t m_lastSession = 0;
     bool m_closing = false;
     std::map<std::uint64_t, Session> m_sessions;

@@ -1,6 +1,7 @@
 // An editor without a window, for tests of hosts: loads its payload, writes down what it got, and does what FAKE_EDITOR
 // says, in order, words separated by spaces:
 //   report=FILE        writes the payload's texts there, one "title=value" a line, then arguments; FILE appears complete
+//   say=TEXT           prints TEXT
 //   finish=A,B         tells the host that the user has finished, with these activity types ("finish=" with none)
 //   exit=N   crash     ends at once
 //   wait               waits until the host closes the connection, then goes on
@@ -139,6 +140,9 @@ int main(int argc, char* argv[])
             writeWhole(value, payload);
         } else if (word == "tell") {
             std::ofstream(value) << payload;
+        } else if (word == "say") {
+            std::printf("%s\n", value.c_str());
+            std::fflush(stdout);
         } else if (word == "finish") {
             proxy->send(runtime::Selector("extensionDidFinishWithActivityTypes:"),
                         {runtime::toValue(split(value, ','))});

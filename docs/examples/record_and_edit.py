@@ -1,0 +1,58 @@
+#!/usr/bin/python3
+"""Edits a movie with Clipsa as a recorder does: hands in an open file, and waits until the user has finished.
+
+    record_and_edit.py MOVIE [APP-NAME]
+
+Prints the activity types, one a line. Needs python3-dbus and python3-gi.
+"""
+
+import sys
+
+import dbus
+from dbus.mainloop.glib import DBusGMainLoop
+from gi.repository import GLib
+
+DBusGMainLoop(set_as_default=True)
+bus = dbus.SessionBus()
+loop = GLib.MainLoop()
+status = 1
+
+
+def completed(activity_types):
+    global status
+    for activity_type in activity_types:
+        print(activity_type)
+    status = 0
+    loop.quit()
+
+
+def failed(message):
+    print(message, file=sys.stderr)
+    loop.quit()
+
+
+def service_left(owner):
+    # Clipsa itself has gone, and with it the session.
+    if not owner and loop.is_running():
+        failed("Clipsa ended unexpectedly")
+
+
+movie = sys.argv[1]
+options = {"name": movie.rsplit("/", 1)[-1]}
+if len(sys.argv) > 2:
+    options["app-name"] = sys.argv[2]
+
+# Listened to before the call, so that no answer can be missed; they come to us alone.
+SESSION = "org.clipsa.RecorderSession1"
+bus.add_signal_receiver(completed, "Completed", SESSION)
+bus.add_signal_receiver(failed, "Failed", SESSION)
+
+recorder = dbus.Interface(bus.get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"), "org.clipsa.Recorder1")
+try:
+    with open(movie, "rb") as file:
+        recorder.Edit(dbus.types.UnixFd(file), dbus.Dictionary(options, signature="sv"))
+except dbus.DBusException as error:
+    sys.exit(error.get_dbus_message())
+bus.watch_name_owner("org.clipsa.Clipsa", service_left)
+loop.run()
+sys.exit(status)

@@ -1,0 +1,305 @@
+// The program itself, with an editor that does what a test says.
+#include "app/host/EditorSession.h"
+#include "support/EventLoop.h"
+#include "support/Program.h"
+
+#include <gmock/gmock.h>
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+
+using testing::AllOf;
+using testing::Contains;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::StartsWith;
+
+namespace {
+
+const std::string kPrograms = CLIPSA_BIN;
+
+class OpeningAMovie : public ::testing::Test {
+protected:
+    using Words = std::vector<std::string>;
+
+    /// `script` is what the editor does; see fake_editor.cpp.
+    std::unique_ptr<tests::Program> start(const std::string& script, const Words& options = {})
+    {
+        Words words = {kPrograms + "/clipsa", "open", m_movie};
+        words.insert(words.end(), options.begin(), options.end());
+        return std::make_unique<tests::Program>(words,
+                                                tests::Program::Variables{{"FAKE_EDITOR", script},
+                                                                          {"CLIPSA_EDITOR", kPrograms + "/fake-editor"},
+                                                                          {"XDG_CACHE_HOME", m_cache}});
+    }
+
+    std::filesystem::path pipe(const char* name)
+    {
+        const auto path = m_directory.path() / name;
+        EXPECT_EQ(::mkfifo(path.c_str(), 0600), 0);
+        return path;
+    }
+
+    /// The editors' directories that are there.
+    Words directories() const
+    {
+        Words found;
+        if (std::filesystem::exists(m_cache / "clipsa"))
+            for (const auto& entry : std::filesystem::directory_iterator(m_cache / "clipsa"))
+                found.push_back(entry.path());
+        return found;
+    }
+
+    void expectUntouched() const
+    {
+        struct stat status = {};
+        ASSERT_EQ(::stat(m_movie.c_str(), &status), 0);
+        EXPECT_EQ(status.st_nlink, 1U);
+        EXPECT_EQ(tests::PrivateDirectory::read(m_movie), "moving pictures");
+    }
+
+    static Words lines(const std::string& text)
+    {
+        Words all;
+        std::istringstream stream(text);
+        for (std::string line; std::getline(stream, line);)
+            all.push_back(line);
+        return all;
+    }
+
+    tests::PrivateDirectory m_directory;
+    std::filesystem::path m_movie = std::filesystem::canonical(m_directory.write("Tux Racer.mp4", "moving pictures"));
+    std::filesystem::path m_cache = m_directory.path() / "cache";
+};
+
+TEST_F(OpeningAMovie, PrintsWhatWasDoneInOrder)
+{
+    const auto clipsa = start("finish=save,share,save wait");
+    EXPECT_EQ(clipsa->wait(), 0);
+    EXPECT_EQ(clipsa->output(), "save\nshare\nsave\n");
+    EXPECT_THAT(clipsa->errors(), IsEmpty());
+    EXPECT_THAT(directories(), IsEmpty());
+    expectUntouched();
+}
+
+TEST_F(OpeningAMovie, PrintsOneObjectOnRequest)
+{
+    const auto clipsa = start("finish=a,b wait", {"--json"});
+    EXPECT_EQ(clipsa->wait(), 0);
+    EXPECT_EQ(clipsa->output(), "{\"activityTypes\":[\"a\",\"b\"],\"movie\":\"" + m_movie.native() + "\"}\n");
+}
+
+TEST_F(OpeningAMovie, PrintsNothingWhenNothingWasDone)
+{
+    const auto clipsa = start("finish= wait");
+    EXPECT_EQ(clipsa->wait(), 0);
+    EXPECT_THAT(clipsa->output(), IsEmpty());
+}
+
+TEST_F(OpeningAMovie, HandsOverTheRequiredValuesLast)
+{
+    const auto attachment = m_directory.write("log.txt", "x");
+    const auto report = m_directory.path() / "report";
+    const auto clipsa =
+        start("report=" + report.native() + " finish= wait",
+              {"--app-name", "Racer", "--bundle-id", "org.racer", "--attachment", attachment, "--message", "look",
+               "--tint", "#ff0000", "--device", "pad", "--home-button", "no", "--graphics-quality", "10"});
+    EXPECT_EQ(clipsa->wait(), 0) << clipsa->errors();
+    const Words told = lines(tests::PrivateDirectory::read(report));
+    ASSERT_GE(told.size(), 6U);
+    EXPECT_THAT(
+        Words(told.begin(), told.begin() + 6),
+        ElementsAre("VKVideoEditorExtensionFileAttachmentKey=" + std::filesystem::canonical(attachment).native(),
+                    "VKVideoEditorExtensionOverrideShareMessageKey=look",
+                    "VKVideoEditorExtensionOverrideTintColorKey=1 0 0 1", "VKVideoEditorExtensionAppNameKey=Racer",
+                    "VKVideoEditorExtensionBundleIdentifierKey=org.racer",
+                    "VKVideoEditorExtensionMovieURLKey=/private/var/mobile/Library/Velkor/Tux Racer.mp4"));
+    for (const char* word : {"--device", "pad", "--home-button", "no", "--graphics-quality", "10"})
+        EXPECT_THAT(told, Contains(std::string("argument=") + word));
+}
+
+TEST_F(OpeningAMovie, HandsOverNoMoreThanIsNeeded)
+{
+    const auto report = m_directory.path() / "report";
+    EXPECT_EQ(start("report=" + report.native() + " finish= wait")->wait(), 0);
+    const Words told = lines(tests::PrivateDirectory::read(report));
+    EXPECT_EQ(told.at(0), "VKVideoEditorExtensionAppNameKey=Tux Racer");
+    EXPECT_EQ(told.at(1), "VKVideoEditorExtensionBundleIdentifierKey=org.clipsa.recording");
+    EXPECT_THAT(told.at(2), StartsWith("VKVideoEditorExtensionMovieURLKey="));
+    EXPECT_THAT(told.at(3), StartsWith("argument="));
+}
+
+TEST_F(OpeningAMovie, TheEditorMayRemoveWhatItWasGiven)
+{
+    EXPECT_EQ(start("remove-movie finish=save wait")->wait(), 0);
+    expectUntouched();
+}
+
+TEST_F(OpeningAMovie, SaysHowAnEditorEndedThatDidNotFinish)
+{
+    const std::pair<const char*, const char*> ways[] = {
+        {"crash", "by signal 6"}, {"exit=7", "with exit status 7"}, {"", "with exit status 0"}};
+    for (const auto& [script, words] : ways) {
+        const auto clipsa = start(script);
+        EXPECT_EQ(clipsa->wait(), 3);
+        EXPECT_THAT(clipsa->output(), IsEmpty());
+        EXPECT_THAT(clipsa->errors(),
+                    AllOf(HasSubstr(words), HasSubstr("your recording is untouched: " + m_movie.native())));
+        EXPECT_THAT(directories(), IsEmpty());
+        expectUntouched();
+    }
+}
+
+TEST_F(OpeningAMovie, ACrashAfterTheUserHasFinishedIsNoFailure)
+{
+    const auto clipsa = start("finish=save wait crash");
+    EXPECT_EQ(clipsa->wait(), 0);
+    EXPECT_EQ(clipsa->output(), "save\n");
+}
+
+TEST_F(OpeningAMovie, NeverLosesTheLastMessageOfAQuickExit)
+{
+    for (int i = 0; i < 100; ++i) {
+        const auto clipsa = start("finish=save exit=0");
+        ASSERT_EQ(clipsa->wait(), 0) << "in run " << i << ": " << clipsa->errors();
+        ASSERT_EQ(clipsa->output(), "save\n");
+        ASSERT_THAT(directories(), IsEmpty());
+    }
+}
+
+TEST_F(OpeningAMovie, KeepsTheEditorsWordsOutOfTheResult)
+{
+    const auto clipsa = start("say=noise finish=save wait");
+    EXPECT_EQ(clipsa->wait(), 0);
+    EXPECT_EQ(clipsa->output(), "save\n");
+    EXPECT_THAT(clipsa->errors(), HasSubstr("noise"));
+}
+
+TEST_F(OpeningAMovie, AnInterruptedHostClosesItsEditor)
+{
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP}) {
+        const auto there = pipe(std::to_string(signal).c_str());
+        const auto clipsa = start("tell=" + there.native() + " wait");
+        EXPECT_THAT(tests::readPipe(there), HasSubstr("MovieURLKey"));
+        EXPECT_EQ(directories().size(), 1U);
+        clipsa->signal(signal);
+        EXPECT_EQ(clipsa->wait(), 128 + signal);
+        EXPECT_THAT(directories(), IsEmpty());
+        expectUntouched();
+    }
+}
+
+TEST_F(OpeningAMovie, AnEditorEndsWithAHostThatWasKilledAndTheNextOneSweeps)
+{
+    const auto there = pipe("there");
+    const auto noticed = pipe("noticed");
+    const auto clipsa = start("tell=" + there.native() + " wait tell=" + noticed.native());
+    EXPECT_THAT(tests::readPipe(there), HasSubstr("MovieURLKey"));
+    clipsa->signal(SIGKILL);
+    EXPECT_EQ(clipsa->wait(), 128 + SIGKILL);
+
+    ASSERT_EQ(directories().size(), 1U);
+    const std::string left = directories().at(0);
+    EXPECT_EQ(start("finish= wait")->wait(), 0);
+    EXPECT_THAT(directories(), ElementsAre(left)) << "the editor still lives in it";
+
+    tests::readPipe(noticed);
+    {
+        const dbus::FileDescriptor lock(::open((left + "/lock").c_str(), O_RDWR | O_CLOEXEC));
+        ASSERT_EQ(::flock(lock.get(), LOCK_EX), 0) << "waits until the editor has gone";
+    }
+    EXPECT_EQ(start("finish= wait")->wait(), 0);
+    EXPECT_THAT(directories(), IsEmpty());
+    expectUntouched();
+}
+
+TEST_F(OpeningAMovie, BadInputIsOneLineAndTouchesNothing)
+{
+    const std::vector<std::vector<std::string>> wrong = {
+        {"--tint", "red"}, {"--nonsense"}, {"--attachment", "/nowhere/x"}, {"--device", "x"}, {"second.mp4"}};
+    for (const auto& options : wrong) {
+        const auto clipsa = start("finish= wait", options);
+        EXPECT_EQ(clipsa->wait(), 2);
+        EXPECT_EQ(lines(clipsa->errors()).size(), 1U) << clipsa->errors();
+        EXPECT_THAT(clipsa->errors(), StartsWith("clipsa: "));
+    }
+    for (const char* movie : {"/nowhere/movie.mp4", "/dev/null", "/"}) {
+        m_movie = movie;
+        const auto clipsa = start("finish= wait");
+        EXPECT_EQ(clipsa->wait(), 2);
+        EXPECT_THAT(clipsa->errors(), HasSubstr(movie));
+    }
+    EXPECT_FALSE(std::filesystem::exists(m_cache));
+}
+
+TEST_F(OpeningAMovie, ACacheThatCannotBeMadeIsSaid)
+{
+    m_cache = m_directory.write("file", "x");
+    const auto clipsa = start("finish= wait");
+    EXPECT_EQ(clipsa->wait(), 1);
+    EXPECT_THAT(clipsa->errors(), HasSubstr("cannot make a directory in " + m_cache.native()));
+    expectUntouched();
+}
+
+TEST_F(OpeningAMovie, TakesAMovieWhoseNameIsNoText)
+{
+    m_movie = m_directory.write("caf\xE9.mp4", "moving pictures");
+    const auto report = m_directory.path() / "report";
+    EXPECT_EQ(start("report=" + report.native() + " finish= wait")->wait(), 0);
+    EXPECT_THAT(tests::PrivateDirectory::read(report), HasSubstr("/Velkor/caf_.mp4\n"));
+}
+
+TEST_F(OpeningAMovie, TellsItsVersionAndHelp)
+{
+    tests::Program version({kPrograms + "/clipsa", "--version"}, {});
+    EXPECT_EQ(version.wait(), 0);
+    EXPECT_THAT(version.output(), StartsWith("clipsa "));
+    tests::Program help({kPrograms + "/clipsa", "--help"}, {});
+    EXPECT_EQ(help.wait(), 0);
+    EXPECT_THAT(help.output(), HasSubstr("clipsa open MOVIE"));
+}
+
+TEST_F(OpeningAMovie, AnEditorThatDoesNotGoIsMadeToGo)
+{
+    const auto there = pipe("there");
+    ::setenv("FAKE_EDITOR", ("tell=" + there.native() + " finish=save hang").c_str(), 1);
+    dbus::EditRequest request;
+    request.movie = dbus::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+    request.movieName = "movie.mp4";
+    std::optional<host::EditorOutcome> outcome;
+    host::EditorSession::Handlers handlers;
+    handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
+    auto session = host::EditorSession::start(
+        std::move(request), {kPrograms + "/fake-editor", m_cache / "clipsa", std::chrono::milliseconds(20)},
+        std::move(handlers));
+    ASSERT_TRUE(session) << session.error()->description();
+    EXPECT_THAT(tests::whilePumping([&] { return tests::readPipe(there); }), HasSubstr("MovieURLKey"));
+
+    EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
+    EXPECT_EQ(outcome->end.signal, SIGKILL);
+    EXPECT_THAT(outcome->activityTypes, testing::Optional(ElementsAre("save")));
+    session.value().reset();
+    EXPECT_THAT(directories(), IsEmpty());
+}
+
+TEST_F(OpeningAMovie, AMovieThatCannotBeHandedOverIsSaid)
+{
+    ::setenv("FAKE_EDITOR", "wait", 1);
+    dbus::EditRequest request;
+    request.movie = dbus::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+    request.movieName = "no/such/place.mp4";
+    std::optional<host::EditorOutcome> outcome;
+    host::EditorSession::Handlers handlers;
+    handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
+    const auto session =
+        host::EditorSession::start(std::move(request), {kPrograms + "/fake-editor", m_cache / "clipsa"}, handlers);
+    ASSERT_TRUE(session);
+    EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
+    ASSERT_TRUE(outcome->error);
+    EXPECT_THAT(outcome->error->description(), HasSubstr("cannot make"));
+    EXPECT_FALSE(outcome->activityTypes);
+}
+
+} // namespace

@@ -1,0 +1,145 @@
+"""Recorders as the service sees them, each with a bus connection of its own. Run by ServiceTest.cpp:
+
+    recorders.py MOVIE SCENARIO
+
+Fails with a traceback when the service does not keep a promise.
+"""
+
+import os
+import sys
+
+import dbus
+from dbus.bus import BusConnection
+from dbus.mainloop.glib import DBusGMainLoop
+from gi.repository import GLib
+
+DBusGMainLoop(set_as_default=True)
+ADDRESS = os.environ["DBUS_SESSION_BUS_ADDRESS"]
+MOVIE, SCENARIO = sys.argv[1:]
+loop = GLib.MainLoop()
+
+
+class Recorder:
+    def __init__(self):
+        self.bus = BusConnection(ADDRESS)
+        self.signals = []
+        for member in ("Completed", "Failed"):
+            self.bus.add_signal_receiver(self.arrived, member, "org.clipsa.RecorderSession1", path_keyword="path",
+                                         member_keyword="member")
+        self.recorder = dbus.Interface(self.bus.get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"),
+                                       "org.clipsa.Recorder1")
+
+    def arrived(self, value, path, member):
+        self.signals.append((path, member, [str(v) for v in value] if member == "Completed" else str(value)))
+
+    def edit(self, file=MOVIE, **options):
+        options = {key.replace("_", "-"): value for key, value in options.items()}
+        with open(file, "rb") as movie:
+            return self.recorder.Edit(dbus.types.UnixFd(movie), dbus.Dictionary(options, signature="sv"))
+
+    def error(self, *arguments, **options):
+        try:
+            self.edit(*arguments, **options)
+        except dbus.DBusException as error:
+            return error.get_dbus_name(), error.get_dbus_message()
+        raise AssertionError("was accepted")
+
+    def round_trip(self):
+        """Everything that was sent to us before has arrived afterwards."""
+        self.bus.get_object("org.freedesktop.DBus", "/org/freedesktop/DBus").GetId()
+        while GLib.MainContext.default().iteration(False):
+            pass
+
+
+def until(predicate):
+    while not predicate():
+        GLib.MainContext.default().iteration(True)
+
+
+def completed():
+    """Each session is told of its own end, and nobody else is."""
+    asker, bystander = Recorder(), Recorder()
+    sessions = [asker.edit(), asker.edit(app_name="Racer")]
+    assert sessions[0] != sessions[1]
+    until(lambda: len(asker.signals) == 2)
+    assert sorted(asker.signals) == sorted((s, "Completed", ["save", "share"]) for s in sessions), asker.signals
+    bystander.round_trip()
+    assert bystander.signals == [], bystander.signals
+
+
+def failed():
+    asker, bystander = Recorder(), Recorder()
+    session = asker.edit()
+    until(lambda: asker.signals)
+    assert asker.signals == [(session, "Failed", "the editor ended early, with exit status 9")], asker.signals
+    bystander.round_trip()
+    assert bystander.signals == []
+
+
+def vanish():
+    """The editor of a recorder that leaves is closed; that of another stays until it is asked to go."""
+    leaver, stayer = Recorder(), Recorder()
+    leaver.edit()
+    session = stayer.edit()
+    there = 0
+    while there < 2:
+        with open(os.environ["PIPE_THERE"]) as pipe:
+            there += pipe.read().count("MovieURLKey")
+    leaver.bus.close()
+    with open(os.environ["PIPE_CLOSED"]) as pipe:
+        assert "MovieURLKey" in pipe.read()
+    stayer.round_trip()
+    assert stayer.signals == []
+    dbus.Interface(stayer.bus.get_object("org.clipsa.Clipsa", session, introspect=False),
+                   "org.clipsa.RecorderSession1").Close(ignore_reply=True)
+    with open(os.environ["PIPE_CLOSED"]) as pipe:
+        pipe.read()
+    until(lambda: stayer.signals)
+    assert stayer.signals == [(session, "Failed", "the editor was closed")], stayer.signals
+
+
+def refused():
+    recorder = Recorder()
+    bad = "org.clipsa.Error.BadInput"
+    directory = os.path.dirname(MOVIE)
+    empty = os.path.join(directory, "empty.mp4")
+    open(empty, "w").close()
+    assert recorder.error(empty) == (bad, "the movie is empty; wait until the recorder has written it")
+    assert recorder.error("/dev/null")[0] == bad
+    assert recorder.error(tint="reddish")[0] == bad
+    assert recorder.error(app_name=1)[0] == bad
+    assert recorder.error(attachment="/nowhere")[0] == bad
+    assert recorder.error(message="x" * (1024 * 1024 + 1))[0] == bad
+    write_only = os.open(MOVIE, os.O_WRONLY)
+    for descriptor in (write_only, os.open(directory, os.O_RDONLY), os.pipe()[0]):
+        try:
+            recorder.recorder.Edit(dbus.types.UnixFd(descriptor), dbus.Dictionary({}, signature="sv"))
+        except dbus.DBusException as error:
+            assert error.get_dbus_name() == bad, error
+        else:
+            raise AssertionError("was accepted")
+
+
+def nameless():
+    """A file that has no name any more, and one sent along with it."""
+    recorder = Recorder()
+    path = MOVIE + ".unlinked"
+    with open(path, "wb") as file:
+        file.write(b"pictures")
+    movie = os.open(path, os.O_RDONLY)
+    os.unlink(path)
+    with open(MOVIE, "rb") as attachment:
+        recorder.recorder.Edit(dbus.types.UnixFd(movie),
+                               dbus.Dictionary({"attachment": dbus.types.UnixFd(attachment), "name": "../a.webm"},
+                                               signature="sv"))
+    until(lambda: recorder.signals)
+    assert recorder.signals[0][1] == "Completed", recorder.signals
+
+
+def open_uris():
+    application = dbus.Interface(BusConnection(ADDRESS).get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"),
+                                 "org.freedesktop.Application")
+    application.Open(["file://" + MOVIE.replace(" ", "%20")], dbus.Dictionary({}, signature="sv"))
+
+
+globals()[SCENARIO]()
