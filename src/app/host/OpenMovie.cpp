@@ -42,6 +42,8 @@ int exitStatus(const EditorOutcome& outcome, const std::string& movie)
 {
     if (outcome.activityTypes)
         return kExitDone;
+    if (outcome.closed)
+        return kExitEditorEnded; // whoever interrupted us knows
     const std::string untouched = "; your recording is untouched: " + movie;
     if (outcome.error) {
         complain(outcome.error->description() + untouched);

@@ -186,6 +186,7 @@ TEST_F(OpeningAMovie, AnInterruptedHostClosesItsEditor)
         EXPECT_EQ(directories().size(), 1U);
         clipsa->signal(signal);
         EXPECT_EQ(clipsa->wait(), 128 + signal);
+        EXPECT_THAT(clipsa->errors(), IsEmpty());
         EXPECT_THAT(directories(), IsEmpty());
         expectUntouched();
     }
