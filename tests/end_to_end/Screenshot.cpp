@@ -9,10 +9,10 @@ namespace {
 
 constexpr int kVisible = 40; // of 255
 
-int distance(const QColor& one, const QColor& other)
+int distance(QRgb one, QRgb other)
 {
-    return std::max({std::abs(one.red() - other.red()), std::abs(one.green() - other.green()),
-                     std::abs(one.blue() - other.blue())});
+    return std::max({std::abs(qRed(one) - qRed(other)), std::abs(qGreen(one) - qGreen(other)),
+                     std::abs(qBlue(one) - qBlue(other))});
 }
 
 } // namespace
@@ -42,7 +42,7 @@ int Screenshot::number(const Coded& coded) const
 
 bool isNear(const QColor& one, const QColor& other, int wanted)
 {
-    return distance(one, other) <= wanted;
+    return distance(one.rgb(), other.rgb()) <= wanted;
 }
 
 std::string words(const QColor& colour)
@@ -54,12 +54,15 @@ Difference differenceOf(const QImage& one, const QImage& other)
 {
     double sum = 0;
     double visible = 0;
-    for (int y = 0; y < one.height(); ++y)
+    for (int y = 0; y < one.height(); ++y) {
+        const auto* line = reinterpret_cast<const QRgb*>(one.constScanLine(y));
+        const auto* otherLine = reinterpret_cast<const QRgb*>(other.constScanLine(y));
         for (int x = 0; x < one.width(); ++x) {
-            const int here = distance(one.pixelColor(x, y), other.pixelColor(x, y));
+            const int here = distance(line[x], otherLine[x]);
             sum += here;
             visible += here > kVisible;
         }
+    }
     const double pixels = static_cast<double>(one.width()) * one.height();
     return {sum / pixels, visible / pixels};
 }

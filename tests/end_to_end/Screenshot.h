@@ -47,7 +47,7 @@ private:
 bool isNear(const QColor& one, const QColor& other, int distance);
 std::string words(const QColor& colour);
 
-/// How different two pictures of one size are.
+/// How different two pictures of one size are, both of four bytes a pixel.
 struct Difference {
     double mean = 0;  ///< of the largest difference of a colour in each pixel, 0 to 255
     double share = 0; ///< of pixels that a person sees the difference of
