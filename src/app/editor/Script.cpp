@@ -223,6 +223,9 @@ bool Script::key(const std::string& name)
 
 bool Script::picture(const Words& words)
 {
+    m_program.presenter().commit();
+    if (m_program.presenter().isAnimating())
+        return false;
     const char* folder = std::getenv("CLIPSA_PICTURES");
     const std::string path = (folder ? std::string(folder) + "/" : std::string()) + words.at(1);
     if (!m_program.presenter().grab().save(QString::fromStdString(path)))

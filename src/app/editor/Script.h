@@ -10,7 +10,8 @@
 ///   key NAME               space, escape, return, left, right, home, end, tab, comma, period, undo
 ///   scheme light|dark
 ///   pause MILLISECONDS     let time pass
-///   picture FILE [WORDS]   write what is on the screen as a PNG, into $CLIPSA_PICTURES or here; with WORDS, say so
+///   picture FILE [WORDS]   once nothing moves or fades, write what is on the screen as a PNG, into $CLIPSA_PICTURES or
+///                          here; with WORDS, say so
 ///   print WORDS            a line at the end of the file $CLIPSA_REPORT, or on standard output; filled in are {time},
 ///                          {frame} (the shown picture's time), {duration}, {size}, {title}, {date}, {chrome},
 ///                          {layout} (phone or pad), {memory} (resident, in kB)

@@ -30,7 +30,7 @@ public:
     std::uint64_t count() const { return m_times.size(); }
 
     /// "transitions 1000 first 0.512 last 0.530 memory 81234 81300": means of the first and the last hundred in
-    /// milliseconds, kilobytes after the warm-up and at the end.
+    /// milliseconds of processor time, kilobytes after the warm-up and at the end.
     std::string result() const;
 
 private:

@@ -49,6 +49,8 @@ public:
 
     /// Mirrors the tree now, instead of with the next picture. Does nothing when nothing has changed.
     void commit();
+    /// Whether something was still on its way at the last commit: moving, growing or fading.
+    bool isAnimating() const { return m_animating; }
     /// Commits, and gives what stands on the screen, in pixels.
     QImage grab();
 
