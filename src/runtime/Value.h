@@ -16,8 +16,10 @@ using Arguments = std::vector<Value>;
 
 namespace detail {
 
-template <typename T> struct IsSharedObject : std::false_type { };
-template <typename T> struct IsSharedObject<std::shared_ptr<T>> : std::is_base_of<Object, T> { };
+template <typename T> struct IsSharedObject : std::false_type {
+};
+template <typename T> struct IsSharedObject<std::shared_ptr<T>> : std::is_base_of<Object, T> {
+};
 
 } // namespace detail
 

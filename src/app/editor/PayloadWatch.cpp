@@ -31,12 +31,11 @@ public:
     void loadItemForTypeIdentifier(std::string_view type, LoadCompletion completion) override
     {
         ++m_state->underWay;
-        m_inner->loadItemForTypeIdentifier(
-            type, [state = m_state, completion = std::move(completion)](const runtime::Value& item,
-                                                                        const base::ErrorRef& error) {
-                completion(item, error);
-                state->end();
-            });
+        m_inner->loadItemForTypeIdentifier(type, [state = m_state, completion = std::move(completion)](
+                                                     const runtime::Value& item, const base::ErrorRef& error) {
+            completion(item, error);
+            state->end();
+        });
     }
 
 private:

@@ -6,8 +6,8 @@ namespace platform {
 
 const runtime::Class& ExtensionContext::classObject()
 {
-    static const runtime::Class& instance
-        = runtime::ClassBuilder<ExtensionContext>("ExtensionContext", &Object::classObject()).build();
+    static const runtime::Class& instance =
+        runtime::ClassBuilder<ExtensionContext>("ExtensionContext", &Object::classObject()).build();
     return instance;
 }
 
@@ -26,9 +26,9 @@ void ExtensionContext::setUp(const Platform& platform, std::vector<InputItem> in
 
 const runtime::Class& ExtensionViewController::classObject()
 {
-    static const runtime::Class& instance
-        = runtime::ClassBuilder<ExtensionViewController>("ExtensionViewController", &ViewController::classObject())
-              .build();
+    static const runtime::Class& instance =
+        runtime::ClassBuilder<ExtensionViewController>("ExtensionViewController", &ViewController::classObject())
+            .build();
     return instance;
 }
 

@@ -122,7 +122,7 @@ private:
     bool m_editing = false;
     bool m_dragging = false;
     std::optional<int> m_draggingTouch;
-    double m_grabOffset = 0; ///< points from the finger to the play head while it is dragged
+    double m_grabOffset = 0;           ///< points from the finger to the play head while it is dragged
     std::int32_t m_thumbnailCount = 0; ///< as last asked for
     std::vector<double> m_timestamps;
     std::map<double, ImageRef> m_thumbnails;
