@@ -1,8 +1,6 @@
 // Values on their way: driven by a clock that stands still until a test moves it.
 #include "Stage.h"
 
-#include <QThread>
-
 #include <chrono>
 #include <functional>
 
@@ -116,11 +114,10 @@ TEST_F(Animations, TheyMoveWithoutBeingAskedFor)
     look();
     animate(200ms, [&] { view->setAlpha(0); });
     const auto commits = presenter->statistics().commits;
-    for (int i = 0; i < 200 && presenter->statistics().commits < commits + 3; ++i) {
+    settleUntil([&] {
         clock.advance(5ms);
-        settle();
-        QThread::msleep(2);
-    }
+        return presenter->statistics().commits >= commits + 3;
+    });
     EXPECT_GE(presenter->statistics().commits, commits + 3);
 }
 

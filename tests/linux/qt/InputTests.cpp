@@ -247,8 +247,7 @@ TEST_F(Input, SizesArriveOnceHoweverOftenTheyChange)
     const auto before = window->transitionCount();
     for (const int width : {210, 250, 300, 320})
         presenter->quickWindow().resize(width, 150);
-    settle();
-    EXPECT_EQ(window->bounds().size, (base::Size{320, 150}));
+    EXPECT_TRUE(settleUntil([&] { return window->View::bounds().size == base::Size{320, 150}; }));
     EXPECT_EQ(window->transitionCount(), before + 1);
     clock.advance(std::chrono::seconds(1));
     EXPECT_EQ(look().size(), QSize(320, 150));

@@ -1,8 +1,6 @@
 // What views look like on the screen, at one and two pixels a point.
 #include "Stage.h"
 
-#include <QThread>
-
 #include <algorithm>
 #include <array>
 
@@ -128,10 +126,7 @@ TEST_F(Looks, AChangeIsOnTheScreenWithoutBeingAskedFor)
 {
     addColor(base::Rect::make(0, 0, 50, 50), kRed);
     const auto commits = presenter->statistics().commits;
-    for (int i = 0; i < 100 && presenter->statistics().commits == commits; ++i) {
-        settle();
-        QThread::msleep(2);
-    }
+    settleUntil([&] { return presenter->statistics().commits > commits; });
     EXPECT_EQ(presenter->statistics().commits, commits + 1);
     EXPECT_EQ(presenter->quickWindow().grabWindow().pixelColor(25, 25), QColor(255, 0, 0));
 }

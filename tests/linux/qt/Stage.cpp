@@ -1,6 +1,7 @@
 #include "Stage.h"
 
 #include <QDir>
+#include <QThread>
 
 #include <cmath>
 #include <cstdlib>
@@ -10,21 +11,22 @@ namespace tests {
 
 namespace {
 
+std::unique_ptr<QGuiApplication> s_application;
+double s_scale = 0;
+
 /// One application at a time: another scale needs another one.
 void haveApplication(double scale)
 {
-    static std::unique_ptr<QGuiApplication> application;
-    static double current = 0;
-    if (current == scale)
+    if (s_scale == scale)
         return;
-    application.reset();
+    s_application.reset();
     qputenv("QT_SCALE_FACTOR", QByteArray::number(scale));
     static int argc = 1;
     static char name[] = "tests-linux-qt";
     static char* argv[] = {name, nullptr};
-    application = std::make_unique<QGuiApplication>(argc, argv);
+    s_application = std::make_unique<QGuiApplication>(argc, argv);
     QGuiApplication::setQuitOnLastWindowClosed(false);
-    current = scale;
+    s_scale = scale;
 }
 
 double luminance(const QColor& color)
@@ -36,6 +38,11 @@ double luminance(const QColor& color)
 }
 
 } // namespace
+
+void endApplication()
+{
+    s_application.reset();
+}
 
 bool QuarteredFrame::render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int width, int height,
                             Quality quality) const
@@ -111,6 +118,21 @@ void Stage::settle()
         mainQueue.drain();
         QCoreApplication::processEvents();
     }
+}
+
+bool Stage::settleUntil(const std::function<bool()>& done)
+{
+    for (int i = 0; i < 500 && !done(); ++i) {
+        settle();
+        QThread::msleep(2);
+    }
+    return done();
+}
+
+void Stage::resize(base::Size size)
+{
+    presenter->quickWindow().resize(static_cast<int>(size.width), static_cast<int>(size.height));
+    settleUntil([&] { return window->View::bounds().size == size; });
 }
 
 QImage Stage::look()

@@ -20,11 +20,15 @@
 
 #include <gmock/gmock.h>
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
 
 namespace tests {
+
+/// Before main() returns: an application that ends with the statics comes after what it needs.
+void endApplication();
 
 /// Four colours: red and green above, blue and white below. Counts how often it was drawn, and how.
 class QuarteredFrame final : public platform::VideoFrame {
@@ -109,6 +113,9 @@ protected:
 
     /// Delivers what waits: events, tasks, pictures.
     void settle();
+    /// The same until `done`, or too long: a display answers when it likes.
+    bool settleUntil(const std::function<bool()>& done);
+    void resize(base::Size size);
     QImage look();
     /// The middle of the pixel at a place in points.
     QColor colorAt(double x, double y);

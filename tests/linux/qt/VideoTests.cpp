@@ -1,8 +1,6 @@
 // A player's picture on the screen.
 #include "Stage.h"
 
-#include <QThread>
-
 #include <functional>
 
 namespace tests {
@@ -120,13 +118,7 @@ TEST_F(Video, TheFirstPictureOnTheScreenIsAnnouncedOnce)
     settle();
     EXPECT_EQ(told, 0);
     player->show(std::make_shared<QuarteredFrame>(base::Size{640, 640}));
-    const auto wait = [&] {
-        for (int i = 0; i < 100 && told == 0; ++i) {
-            settle();
-            QThread::msleep(2);
-        }
-    };
-    wait();
+    settleUntil([&] { return told > 0; });
     EXPECT_EQ(told, 1);
     player->show(std::make_shared<QuarteredFrame>(base::Size{640, 640}));
     look();

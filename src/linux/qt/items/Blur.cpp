@@ -12,10 +12,10 @@ namespace qtui {
 namespace {
 
 /// One pixel of the blur stands for about so many points.
-constexpr double kCell = 8;
-constexpr double kMostCells = 48;
-/// The stretch from few pixels to many is done in two steps; the first, here, rounds the corners that one step leaves.
-constexpr int kFirstStretch = 4;
+constexpr double kCell = 20;
+constexpr double kMostCells = 64;
+/// The stretch from few pixels to many is done in steps of two: each one rounds the corners that the last one left.
+constexpr int kStretches = 3;
 
 QSize cellsFor(const QSizeF& size)
 {
@@ -89,7 +89,9 @@ void Blur::update(Stage& stage, const QRectF& windowRect, const QColor& tint)
     }
     painter.fillRect(windowRect, tint);
     painter.end();
-    m_image = image.scaled(cells * kFirstStretch, Qt::IgnoreAspectRatio, Qt::SmoothTransformation);
+    for (int i = 0; i < kStretches; ++i)
+        image = image.scaled(image.size() * 2, Qt::IgnoreAspectRatio, Qt::SmoothTransformation);
+    m_image = image;
 }
 
 } // namespace qtui

@@ -79,8 +79,8 @@ Sprite ScrubberItem::drawTrack(const TrackState& state) const
             if (found == state.thumbnails.end())
                 continue;
             const QImage picture = toQImage(found->second);
-            const double left = state.rect.width() * static_cast<double>(i) / count;
-            const double right = state.rect.width() * static_cast<double>(i + 1) / count;
+            const double left = stage().snapped(state.rect.width() * static_cast<double>(i) / count);
+            const double right = stage().snapped(state.rect.width() * static_cast<double>(i + 1) / count);
             const QRectF slot(state.rect.left() + left, state.rect.top(), right - left, state.rect.height());
             if (!picture.isNull())
                 painter.drawImage(slot, picture, coveringPart(picture.size(), slot.size()));
