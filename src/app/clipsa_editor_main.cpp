@@ -1,5 +1,6 @@
 // The extension's process. It is started by its host, gets the payload through a private connection, and ends with it.
 
+#include "app/editor/Drawing.h"
 #include "app/editor/EditorOptions.h"
 #include "app/editor/EditorProgram.h"
 #include "app/editor/StartTrace.h"
@@ -16,6 +17,7 @@ int main(int argc, char* argv[])
         std::fprintf(stderr, "clipsa-editor: %s\n", options.error()->description().c_str());
         return 2;
     }
+    app::chooseDrawing();
     QGuiApplication application(argc, argv);
     app::markStart("application");
     QGuiApplication::setApplicationName("Clipsa");
