@@ -15,9 +15,9 @@ namespace fs = std::filesystem;
 
 class Picture : public testing::TestWithParam<const char*> {};
 
-// Letters differ a little from one font renderer to the next; a bar that is missing or elsewhere is far more.
-constexpr double kMeanDifference = 1.5;
-constexpr double kDifferentShare = 0.01;
+// The next font renderer draws letters a little otherwise; a button that is missing or elsewhere, even one that is pale
+// because it is disabled, makes a difference of 10 or more.
+constexpr double kLargestDifference = 7;
 constexpr const char* kRemedy = "if it is meant to look different now, run tools/make-pictures and look at them";
 
 } // namespace
@@ -39,9 +39,7 @@ TEST_P(Picture, LooksAsItDid)
         const Screenshot before(fs::path(CLIPSA_SOURCE) / "docs/pictures" / file.path().filename());
         ASSERT_FALSE(before.isNull()) << "docs/pictures does not have it";
         ASSERT_EQ(now.image().size(), before.image().size());
-        const auto difference = differenceOf(now.image(), before.image());
-        EXPECT_LT(difference.mean, kMeanDifference) << kRemedy;
-        EXPECT_LT(difference.share, kDifferentShare) << kRemedy;
+        EXPECT_LT(differenceOf(now.image(), before.image()), kLargestDifference) << kRemedy;
     }
 }
 
