@@ -4,10 +4,12 @@
 #include "app/editor/EditorOptions.h"
 #include "app/editor/EditorProgram.h"
 #include "app/editor/StartTrace.h"
+#include "linux/dbus/ExtensionConnection.h"
 
 #include <QGuiApplication>
 
 #include <cstdio>
+#include <fcntl.h>
 
 int main(int argc, char* argv[])
 {
@@ -17,6 +19,8 @@ int main(int argc, char* argv[])
         std::fprintf(stderr, "clipsa-editor: %s\n", options.error()->description().c_str());
         return 2;
     }
+    // Keeps our directory alive as long as we live, but not as long as programs that we start.
+    fcntl(dbus::kEditorLockDescriptor, F_SETFD, FD_CLOEXEC);
     app::chooseDrawing();
     QGuiApplication application(argc, argv);
     app::markStart("application");

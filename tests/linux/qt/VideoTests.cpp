@@ -55,6 +55,23 @@ TEST_F(Video, IsBlackWhileThereIsNoPicture)
     EXPECT_EQ(colorAt(150, 50), QColor(0, 255, 0));
 }
 
+TEST_F(Video, AMovieThatCannotBePlayedSaysWhyWhereItsPictureWouldBe)
+{
+    const auto player = addPlayer(base::Rect::make(0, 0, 300, 300), nullptr);
+    const auto lightPixels = [this] {
+        const QImage screen = look();
+        int light = 0;
+        for (int y = 0; y < std::min(300, screen.height()); ++y)
+            for (int x = 0; x < std::min(300, screen.width()); ++x)
+                light += screen.pixelColor(x, y).lightness() > 150;
+        return light;
+    };
+    EXPECT_EQ(lightPixels(), 0);
+    std::dynamic_pointer_cast<FakePlayerItem>(player->currentItem())
+        ->fail(base::Error::make("test", 1, "“holiday.mp4” is not a movie that can be opened."));
+    EXPECT_GT(lightPixels(), 200);
+}
+
 TEST_F(Video, APictureIsConvertedOnceForItsSize)
 {
     const auto picture = std::make_shared<QuarteredFrame>(base::Size{640, 640});

@@ -15,6 +15,10 @@ namespace {
 /// Over the blur where a glyph is opaque. The glyph view's own faint picture comes on top.
 const QColor kGlyphShade(0, 0, 0, 176);
 
+/// Around a cut-out shape, so that a light disc shows on a white page, too.
+const QColor kRim(0, 0, 0, 56);
+constexpr double kRimWidth = 1; // points
+
 platform::ImageRef maskImage(const platform::View& view)
 {
     if (const auto* picture = dynamic_cast<const platform::ImageView*>(&view))
@@ -126,9 +130,15 @@ QImage BackdropItem::masked(const QImage& blur) const
             if (has(mask, kBackdropMaskShape))
                 painter.drawImage(toQRectF(mask.frame), toQImage(mask.image));
     });
+    const QImage rim = layer([&](QPainter& painter) {
+        painter.fillRect(ownRect(), shaped ? kRim : QColor(Qt::transparent));
+        painter.setCompositionMode(QPainter::CompositionMode_DestinationOut);
+        painter.drawImage(ownRect().adjusted(kRimWidth, kRimWidth, -kRimWidth, -kRimWidth), shape);
+    });
     return layer([&](QPainter& painter) {
         painter.drawImage(ownRect(), blur);
         painter.drawImage(ownRect(), shade);
+        painter.drawImage(ownRect(), rim);
         painter.setCompositionMode(QPainter::CompositionMode_DestinationIn);
         painter.drawImage(ownRect(), shape);
     });

@@ -1,11 +1,26 @@
 #include "linux/qt/items/VideoItem.h"
 
+#include "linux/qt/items/Text.h"
+
+#include <QPainter>
+
 #include <algorithm>
 #include <cmath>
 
 namespace qtui {
 
 using Quality = platform::VideoFrame::Quality;
+
+namespace {
+
+// What is said in place of a picture, in points.
+constexpr double kWordsWidth = 420;
+constexpr double kWordsHeight = 120;
+constexpr double kWordsMargin = 24;
+constexpr double kWordsSize = 15;
+const QColor kWordsColor(255, 255, 255, 222);
+
+} // namespace
 
 void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
 {
@@ -21,7 +36,8 @@ void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
     const bool showable = frame && !size.isEmpty();
     // A picture that rests is worth converting again when it was converted in haste.
     const bool good = m_frame == frame && m_picture.size() == size && m_quality >= quality;
-    if (good && m_pictureRect == rect && m_shownSize == shownSize())
+    const QString words = frame ? QString() : QString::fromStdString(layer.failureText());
+    if (good && m_pictureRect == rect && m_shownSize == shownSize() && m_words == words)
         return;
     if (!good) {
         m_frame = frame;
@@ -31,7 +47,22 @@ void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
     }
     m_pictureRect = m_picture.isNull() ? QRectF() : rect;
     m_shownSize = shownSize();
-    setSprites({{ownRect(), Qt::black, {}, false}, {m_pictureRect, {}, m_picture, false}});
+    m_words = words;
+    std::vector<Sprite> sprites{{ownRect(), Qt::black, {}, false}, {m_pictureRect, {}, m_picture, false}};
+    if (!words.isEmpty())
+        sprites.push_back(paintedSprite(ownRect(), stage().scale, [&](QPainter& painter) { drawWords(painter); }));
+    setSprites(std::move(sprites));
+}
+
+void VideoItem::drawWords(QPainter& painter) const
+{
+    const double width = std::min(kWordsWidth, ownRect().width() - 2 * kWordsMargin);
+    QRectF column(0, 0, std::max(0.0, width), kWordsHeight);
+    // Above the middle, where the play button may stand.
+    column.moveCenter({ownRect().center().x(), ownRect().center().y() - kWordsHeight});
+    painter.setFont(systemFont(kWordsSize));
+    painter.setPen(kWordsColor);
+    painter.drawText(column, Qt::AlignHCenter | Qt::AlignBottom | Qt::TextWrapAnywhere | Qt::TextWordWrap, m_words);
 }
 
 bool VideoItem::convert(const platform::VideoFrame& frame, QSize size, Quality quality)

@@ -1,5 +1,6 @@
 /// Shows a player's picture, fitted into the layer's frame, black around it. GUI thread.
 ///
+/// Where there is no picture because the movie cannot be played, it says why.
 /// A picture is converted once for each size that it is shown in: quickly while it plays, exactly when it rests.
 #pragma once
 
@@ -27,6 +28,7 @@ public:
 private:
     bool convert(const platform::VideoFrame& frame, QSize size, platform::VideoFrame::Quality quality);
     QImage& freeBuffer(QSize size);
+    void drawWords(QPainter& painter) const;
 
     std::weak_ptr<platform::PlayerLayer> m_layer;
     platform::VideoFrameRef m_frame; ///< of the picture
@@ -34,6 +36,7 @@ private:
     QImage m_picture;
     QRectF m_pictureRect;
     QSizeF m_shownSize;
+    QString m_words; ///< what is said in place of a picture
     /// The scene still reads the last picture while the next one is converted.
     std::array<QImage, 3> m_buffers;
 };
