@@ -11,6 +11,11 @@ namespace {
 class Looks : public Stage {};
 class LooksAtTwo : public StageAtTwo {};
 
+class LooksAtOneAndAHalf : public Stage {
+protected:
+    LooksAtOneAndAHalf() : Stage(1.5) {}
+};
+
 platform::ImageRef solid(int width, int height, std::array<std::uint8_t, 4> rgba, double imageScale = 1)
 {
     platform::Bitmap bitmap = platform::Bitmap::transparent(width, height);
@@ -37,6 +42,21 @@ TEST_F(LooksAtTwo, APointIsTwoPixels)
     EXPECT_EQ(image.pixelColor(20, 40), QColor(255, 0, 0));
     EXPECT_EQ(image.pixelColor(21, 40), QColor(0, 0, 0));
     EXPECT_EQ(window->scale(), 2);
+}
+
+TEST_F(LooksAtOneAndAHalf, FramesLandOnWholePixels)
+{
+    const auto parent = addColor(base::Rect::make(3, 5, 101, 61), kRed);
+    const auto child = std::make_shared<platform::View>(base::Rect::make(7, 9, 33, 21));
+    child->setBackgroundColor(kBlue);
+    parent->addSubview(child);
+    addPlayer(base::Rect::make(121, 3, 41, 41), std::make_shared<QuarteredFrame>(base::Size{10, 10}));
+    const QImage image = look();
+    EXPECT_EQ(image.size(), QSize(300, 150));
+    for (int y = 0; y < image.height(); ++y)
+        for (int x = 0; x < image.width(); ++x)
+            for (const int part : {qRed(image.pixel(x, y)), qGreen(image.pixel(x, y)), qBlue(image.pixel(x, y))})
+                ASSERT_TRUE(part <= 2 || part >= 253) << x << "," << y << ": nothing is mixed at the edges";
 }
 
 TEST_F(Looks, LaterSiblingsStandInFront)

@@ -104,7 +104,7 @@ std::shared_ptr<platform::View> Stage::addColor(base::Rect frame, platform::Colo
 
 std::shared_ptr<FakePlayer> Stage::addPlayer(base::Rect frame, platform::VideoFrameRef picture)
 {
-    auto player = std::make_shared<FakePlayer>(mainQueue, center, nullptr);
+    auto player = std::make_shared<FakePlayer>(mainQueue, center, std::make_shared<FakePlayerItem>(nullptr));
     const auto layer = platform::PlayerLayer::withPlayer(player);
     layer->setFrame(frame);
     window->addSublayer(layer);
