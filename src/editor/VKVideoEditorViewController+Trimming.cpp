@@ -158,6 +158,18 @@ void VKVideoEditorViewController::seekForward()
     avTrimmer()->scrubTo(avTrimmer()->value() + kArrowStep);
 }
 
+void VKVideoEditorViewController::stepBackward()
+{
+    pauseAction();
+    avPlayer()->stepByCount(-1);
+}
+
+void VKVideoEditorViewController::stepForward()
+{
+    pauseAction();
+    avPlayer()->stepByCount(1);
+}
+
 void VKVideoEditorViewController::goToStart()
 {
     avTrimmer()->scrubTo(0);

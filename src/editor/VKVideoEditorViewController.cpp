@@ -106,6 +106,8 @@ const runtime::Class& VKVideoEditorViewController::classObject()
             .method("leave", &Self::leave)
             .method("seekBackward", &Self::seekBackward)
             .method("seekForward", &Self::seekForward)
+            .method("stepBackward", &Self::stepBackward)
+            .method("stepForward", &Self::stepForward)
             .method("goToStart", &Self::goToStart)
             .method("goToEnd", &Self::goToEnd)
             .build();
@@ -277,6 +279,8 @@ std::vector<platform::KeyCommand> VKVideoEditorViewController::keyCommands() con
         {Key::Space, 0, false, Selector("togglePlayback"), "Play or pause"},
         {Key::Left, 0, false, Selector("seekBackward"), "One second back"},
         {Key::Right, 0, false, Selector("seekForward"), "One second forward"},
+        {Key::Comma, 0, false, Selector("stepBackward"), "One picture back"},
+        {Key::Period, 0, false, Selector("stepForward"), "One picture forward"},
         {Key::Home, 0, false, Selector("goToStart"), "To the start"},
         {Key::End, 0, false, Selector("goToEnd"), "To the end"},
         {Key::Escape, 0, false, Selector("leave"), "Leave trim mode, or close"},

@@ -115,6 +115,8 @@ public:
     void leave();
     void seekBackward();
     void seekForward();
+    void stepBackward();
+    void stepForward();
     void goToStart();
     void goToEnd();
 

@@ -203,3 +203,22 @@ TEST_F(Lifecycle, ArrowsMoveThePlayHeadByASecondAndHomeAndEndToTheEnds)
     EXPECT_NEAR(press(Key::Home), 0, 1e-9);
     EXPECT_FALSE(editor->isScrubbing());
 }
+
+TEST_F(Lifecycle, CommaAndPeriodGoPictureByPicture)
+{
+    open();
+    using platform::Key;
+    const auto press = [this](Key key) {
+        EXPECT_TRUE(fake->window->keyDown(key));
+        settle();
+        EXPECT_NEAR(editor->avTrimmer()->value(), player().currentTime().seconds(), 1e-9);
+        return player().currentTime().seconds() * 30;
+    };
+    EXPECT_NEAR(press(Key::Period), 1, 1e-9);
+    EXPECT_NEAR(press(Key::Period), 2, 1e-9);
+    EXPECT_NEAR(press(Key::Comma), 1, 1e-9);
+    EXPECT_TRUE(fake->window->keyDown(Key::Space));
+    EXPECT_TRUE(player().isPlaying());
+    EXPECT_NEAR(press(Key::Period), 2, 1e-9);
+    EXPECT_FALSE(player().isPlaying());
+}

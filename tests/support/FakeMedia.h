@@ -139,8 +139,9 @@ private:
 class FakePlayer final : public platform::Player {
 public:
     struct Call {
-        enum class Kind { Play, Pause, Seek } kind;
+        enum class Kind { Play, Pause, Seek, Step } kind;
         base::MediaTime time; ///< of a seek, as it was asked for
+        int frames = 0;       ///< of a step
     };
 
     FakePlayer(base::MainQueue& mainQueue, runtime::NotificationCenter& center, std::shared_ptr<FakePlayerItem> item)
@@ -166,11 +167,21 @@ public:
         calls.push_back({Call::Kind::Seek, time});
         if (!time.isNumeric() || !m_item)
             return;
-        m_item->time = clamped(time);
-        m_mainQueue.post([weak = weakSelf<FakePlayer>()] {
-            if (const auto self = weak.lock())
-                self->m_observers.jumped(self->currentTime());
-        });
+        jumpTo(clamped(time));
+    }
+    /// There are thirty pictures a second.
+    void stepByCount(int frames) override
+    {
+        calls.push_back({Call::Kind::Step, {}, frames});
+        m_playing = false;
+        if (!m_item || !m_item->duration().isNumeric())
+            return;
+        constexpr std::int32_t kRate = 30;
+        const base::MediaTime now = currentTime();
+        const base::MediaTime end = m_item->duration();
+        const std::int64_t last = std::max<std::int64_t>(0, (end.value * kRate - 1) / end.timescale);
+        const std::int64_t shown = std::min(last, now.value * kRate / now.timescale);
+        jumpTo(clamped(base::MediaTime::make(std::clamp<std::int64_t>(shown + frames, 0, last), kRate)));
     }
     void setActionAtItemEnd(platform::ActionAtItemEnd action) override { actionAtItemEnd = action; }
     ObserverToken addPeriodicTimeObserver(base::MediaTime interval,
@@ -236,6 +247,14 @@ public:
     }
 
 private:
+    void jumpTo(base::MediaTime time)
+    {
+        m_item->time = time;
+        m_mainQueue.post([weak = weakSelf<FakePlayer>()] {
+            if (const auto self = weak.lock())
+                self->m_observers.jumped(self->currentTime());
+        });
+    }
     base::MediaTime clamped(base::MediaTime time) const
     {
         const base::MediaTime end = m_item->duration();

@@ -1,21 +1,12 @@
 #include "linux/ffmpeg/FFmpegPlayer.h"
 
 #include <algorithm>
-#include <chrono>
+#include <cstdlib>
 #include <utility>
 
 namespace ffmpeg {
 
 using base::MediaTime;
-
-namespace {
-
-/// A sound server that does not answer for so long is not waited for.
-constexpr base::Instant kPatience = std::chrono::seconds(2);
-/// The device's time is not the clock's; it is asked again at most this often.
-constexpr base::Instant kShortestWait = std::chrono::milliseconds(1);
-
-} // namespace
 
 std::shared_ptr<FFmpegPlayer> FFmpegPlayer::make(const std::shared_ptr<Engine>& engine,
                                                  std::shared_ptr<FFmpegPlayerItem> item)
@@ -40,6 +31,7 @@ FFmpegPlayer::~FFmpegPlayer()
 {
     if (m_item)
         m_item->setTimeSource({});
+    *m_left = true;
     m_output = nullptr;
     if (m_pictures)
         m_pictures->cancel();
@@ -60,10 +52,14 @@ void FFmpegPlayer::movieLoaded()
     if (const auto& video = m_movie->video()) {
         base::MainQueue& main = m_engine->system.mainQueue;
         m_pictures = std::make_unique<PictureWorker>(
-            m_movie, [weak = weakSelf<FFmpegPlayer>(), &main](std::uint64_t generation, FrameRef frame) {
-                main.post([weak, generation, frame = std::move(frame)] {
+            m_movie, [weak = weakSelf<FFmpegPlayer>(), &main](std::uint64_t generation, FrameRef frame,
+                                                              PictureWorker::What what) {
+                main.post([weak, generation, frame = std::move(frame), what] {
                     // Locked here: see FFmpegAsset::load().
-                    if (const auto self = weak.lock())
+                    const auto self = weak.lock();
+                    if (self && what == PictureWorker::What::Glimpse)
+                        self->glimpsed(generation, frame);
+                    else if (self)
                         self->picturesArrived(generation, frame);
                 });
             });
@@ -71,6 +67,7 @@ void FFmpegPlayer::movieLoaded()
             setFrame(m_movie->firstFrame());
     }
     goTo(m_target);
+    takeSteps();
 }
 
 base::MediaTime FFmpegPlayer::currentTime() const
@@ -97,6 +94,7 @@ void FFmpegPlayer::play()
     if (m_playing)
         return;
     m_playing = true;
+    m_steps = 0;
     if (m_movie)
         start();
 }
@@ -115,7 +113,66 @@ void FFmpegPlayer::seekToTime(MediaTime time)
 {
     if (!time.isNumeric())
         return;
-    goTo(clamped(time));
+    m_steps = 0;
+    jumpTo(clamped(time));
+}
+
+void FFmpegPlayer::stepByCount(int frames)
+{
+    pause();
+    m_steps += frames;
+    if (m_movie)
+        takeSteps();
+}
+
+void FFmpegPlayer::takeSteps()
+{
+    if (m_steps == 0)
+        return;
+    if (!m_pictures) {
+        m_steps = 0;
+        return;
+    }
+    if (!m_index) {
+        fetchIndex();
+        return;
+    }
+    const VideoTrack& video = *m_movie->video();
+    const auto picture = m_index->pictureFrom(video.tickAt(m_target), std::exchange(m_steps, 0));
+    if (!picture)
+        return;
+    jumpTo(clamped(video.timeOf(*picture)));
+}
+
+void FFmpegPlayer::fetchIndex()
+{
+    if (std::exchange(m_fetchesIndex, true))
+        return;
+    base::MainQueue& main = m_engine->system.mainQueue;
+    m_engine->opener.post([weak = weakSelf<FFmpegPlayer>(), &main, movie = m_movie, left = m_left]() mutable {
+        auto index = *left ? nullptr : movie->packetIndex(left);
+        main.post([weak, index = std::move(index), movie = std::move(movie)] {
+            // Locked here: see FFmpegAsset::load().
+            if (const auto self = weak.lock())
+                self->indexArrived(index);
+        });
+    });
+}
+
+void FFmpegPlayer::indexArrived(std::shared_ptr<const PacketIndex> index)
+{
+    m_fetchesIndex = false;
+    m_index = std::move(index);
+    if (m_index)
+        takeSteps();
+    else
+        m_steps = 0; // the file cannot be read any more
+}
+
+/// Stands there, as goTo() does, and tells the observers later.
+void FFmpegPlayer::jumpTo(MediaTime time)
+{
+    goTo(time);
     m_engine->system.mainQueue.post([weak = weakSelf<FFmpegPlayer>()] {
         if (const auto self = weak.lock())
             self->m_observers.jumped(self->currentTime());
@@ -144,183 +201,14 @@ void FFmpegPlayer::showPicture()
         m_pictures->show(++m_generation, m_movie->video()->tickAt(m_target));
 }
 
-void FFmpegPlayer::start()
+/// What is nearer to the time that was asked for than what is shown takes its place for a moment.
+void FFmpegPlayer::glimpsed(std::uint64_t generation, const FrameRef& frame)
 {
-    silence();
-    ++m_generation;
-    ++m_tickSerial;
-    m_running = false;
-    m_awaitsPictures = m_pictures != nullptr;
-    if (m_pictures) {
-        m_pictures->play(m_generation, m_movie->video()->tickAt(m_target));
+    if (generation != m_generation || m_playing)
         return;
-    }
-    m_engine->system.mainQueue.post([weak = weakSelf<FFmpegPlayer>(), generation = m_generation] {
-        const auto self = weak.lock();
-        if (self && self->m_generation == generation)
-            self->startSound();
-    });
-}
-
-void FFmpegPlayer::picturesArrived(std::uint64_t generation, const FrameRef& frame)
-{
-    if (generation != m_generation)
-        return;
-    const auto keepAlive = shared_from_this();
-    if (frame) {
+    const std::int64_t tick = m_movie->video()->tickAt(m_target);
+    if (!m_frame || std::abs(frame->pts() - tick) < std::abs(m_frame->pts() - tick))
         setFrame(frame);
-        if (generation != m_generation)
-            return;
-    }
-    if (m_running) {
-        tick();
-    } else if (m_playing) {
-        if (std::exchange(m_awaitsPictures, false))
-            startSound();
-    } else {
-        m_settled = !frame || !frame->isReduced();
-    }
-}
-
-bool FFmpegPlayer::hasPictures() const
-{
-    return !m_pictures || m_pictures->isAhead();
-}
-
-/// Pictures are there. Sound starts behind them, so that time never has to jump.
-void FFmpegPlayer::startSound()
-{
-    base::MainQueue& main = m_engine->system.mainQueue;
-    if (m_movie->audioStreams().empty() || !m_engine->options.audioOutput) {
-        run();
-        return;
-    }
-    const auto weak = weakSelf<FFmpegPlayer>();
-    if (!m_sound) {
-        const auto started = [weak, &main](std::uint64_t generation, const std::shared_ptr<const AudioOutput>& output) {
-            // The output weakly: a message that is never delivered must not keep it, because it calls the worker.
-            main.post([weak, generation, silent = !output, device = std::weak_ptr(output)] {
-                const auto self = weak.lock();
-                if (self && (silent || !device.expired()))
-                    self->soundStarted(generation, device.lock());
-            });
-        };
-        m_sound = std::make_unique<SoundWorker>(m_movie, m_engine->options.audioOutput, started);
-    }
-    m_sound->start(m_generation, m_position.convertedTo(kSampleRate).value);
-    main.postAfter(kPatience, [weak, generation = m_generation] {
-        const auto self = weak.lock();
-        if (self && generation == self->m_generation && self->m_playing && !self->m_running) {
-            self->silence();
-            self->run();
-        }
-    });
-}
-
-void FFmpegPlayer::soundStarted(std::uint64_t generation, std::shared_ptr<const AudioOutput> output)
-{
-    if (generation != m_generation || !m_playing || m_running)
-        return;
-
-    m_output = std::move(output);
-    run();
-}
-
-void FFmpegPlayer::silence()
-{
-    m_output = nullptr;
-    if (m_sound)
-        m_sound->stop();
-}
-
-void FFmpegPlayer::run()
-{
-    m_startedAt = m_engine->system.clock.now();
-    m_toldTo = m_position;
-    m_running = true;
-    tick();
-}
-
-/// Stops time where it is. Whoever calls then says what the workers do.
-void FFmpegPlayer::halt()
-{
-    m_target = m_position = currentTime();
-    m_running = false;
-    silence();
-    ++m_generation;
-    ++m_tickSerial;
-}
-
-void FFmpegPlayer::tick()
-{
-    const auto keepAlive = shared_from_this();
-    const std::uint64_t generation = m_generation;
-    // Whoever is called can pause or seek: then this run is over.
-    const auto isOver = [&] { return generation != m_generation || !m_running; };
-    const MediaTime now = currentTime();
-    if (m_pictures) {
-        if (const FrameRef due = m_pictures->takeDue(m_movie->video()->tickAt(now))) {
-            setFrame(due);
-            if (isOver())
-                return;
-        }
-    }
-    m_observers.played(std::exchange(m_toldTo, now), now);
-    if (isOver())
-        return;
-    if (now >= m_movie->duration())
-        reachEnd();
-    else
-        scheduleTick();
-}
-
-void FFmpegPlayer::scheduleTick()
-{
-    const MediaTime now = currentTime();
-    MediaTime next = m_movie->duration();
-    const auto consider = [&](MediaTime time) {
-        if (time < next)
-            next = time;
-    };
-    if (m_pictures) {
-        if (const auto due = m_pictures->nextDue())
-            consider(m_movie->video()->timeOf(*due));
-    }
-    if (const auto due = m_observers.nextAfter(m_toldTo))
-        consider(*due);
-    if (next < now)
-        next = now;
-    m_engine->system.mainQueue.postAfter(untilTick(next), [weak = weakSelf<FFmpegPlayer>(), serial = ++m_tickSerial] {
-        const auto self = weak.lock();
-        if (self && self->m_running && self->m_tickSerial == serial)
-            self->tick();
-    });
-}
-
-/// Rounded up in both units, so that the time is there when the tick comes: a tick too early would have to come again.
-base::Instant FFmpegPlayer::untilTick(MediaTime next) const
-{
-    const std::int32_t timescale = m_movie->timescale();
-    MediaTime ticks = next.convertedTo(timescale);
-    if (ticks < next)
-        ++ticks.value;
-    if (m_output) {
-        const MediaTime wait = ticks - currentTime();
-        return std::max(kShortestWait, base::Instant(wait.convertedTo(1'000'000'000).value));
-    }
-    const std::int64_t fromStart = ticks.value - m_position.convertedTo(timescale).value;
-    const base::Instant due(av_rescale_rnd(fromStart, 1'000'000'000, timescale, AV_ROUND_UP));
-    return std::max(base::Instant(0), m_startedAt + due - m_engine->system.clock.now());
-}
-
-void FFmpegPlayer::reachEnd()
-{
-    halt();
-    m_target = m_position = m_movie->duration();
-    if (m_actionAtItemEnd == platform::ActionAtItemEnd::Pause)
-        m_playing = false;
-    showPicture(); // the last one, which may not have come in time
-    m_engine->center.post(platform::kPlayerItemDidPlayToEndNotification, m_item);
 }
 
 void FFmpegPlayer::setFrame(const FrameRef& frame)

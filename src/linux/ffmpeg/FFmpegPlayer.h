@@ -11,6 +11,7 @@
 #include "platform/media/Player.h"
 #include "platform/media/TimeObservers.h"
 
+#include <atomic>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -31,6 +32,7 @@ public:
     bool isPlaying() const override { return m_playing; }
     base::MediaTime currentTime() const override;
     void seekToTime(base::MediaTime time) override;
+    void stepByCount(int frames) override;
     void setActionAtItemEnd(platform::ActionAtItemEnd action) override { m_actionAtItemEnd = action; }
     ObserverToken addPeriodicTimeObserver(base::MediaTime interval,
                                           std::function<void(base::MediaTime)> callback) override;
@@ -42,7 +44,7 @@ public:
     /// Whether time goes on: playing, and neither picture nor sound is waited for.
     bool isRunning() const { return m_running; }
     /// Paused, and the full picture for where it stands is shown (or there is none).
-    bool isSettled() const { return !m_playing && m_movie && m_settled; }
+    bool isSettled() const { return !m_playing && m_movie && m_settled && m_steps == 0; }
     /// While running: whether the next picture has been decoded, or there is none any more.
     bool hasPictures() const;
 
@@ -52,8 +54,15 @@ private:
     // Loading and positions.
     void movieLoaded();
     base::MediaTime clamped(base::MediaTime time) const;
+    void jumpTo(base::MediaTime time);
     void goTo(base::MediaTime time);
     void showPicture();
+    void glimpsed(std::uint64_t generation, const FrameRef& frame);
+
+    // Steps: they wait until it is known where the pictures are.
+    void takeSteps();
+    void fetchIndex();
+    void indexArrived(std::shared_ptr<const PacketIndex> index);
 
     // From play() to running, and back.
     void start();
@@ -84,6 +93,11 @@ private:
     FrameRef m_frame;
     std::function<void()> m_frameHandler;
     platform::ActionAtItemEnd m_actionAtItemEnd = platform::ActionAtItemEnd::Pause;
+
+    std::shared_ptr<const PacketIndex> m_index; ///< null until steps need it
+    bool m_fetchesIndex = false;
+    int m_steps = 0; ///< asked for, and not taken yet
+    const std::shared_ptr<std::atomic<bool>> m_left = std::make_shared<std::atomic<bool>>(false); ///< is going
 
     bool m_playing = false;
     bool m_running = false;

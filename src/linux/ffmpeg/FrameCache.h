@@ -17,24 +17,37 @@ struct ShownFrame {
 
 class FrameCache {
 public:
-    /// All cached pictures together: 40 at 1920 × 1080, 165 when scaled down to 960 × 540.
+    /// All cached pictures together: 40 at 1920 × 1080, 140 when all but a few are scaled down to 960 × 540.
     static constexpr std::size_t kMostBytes = 128u << 20;
+
+    enum class Overflow { Drop, Reduce };
 
     explicit FrameCache(std::size_t mostBytes = kMostBytes) : m_mostBytes(mostBytes) {}
 
-    /// Keeps `shown`; drops the pictures farthest from `focus` when the bound is passed. A full picture is not replaced
-    /// by a reduced one.
-    void insert(const ShownFrame& shown, std::int64_t focus);
+    /// Keeps `shown` as it is. When the bound is passed, the pictures farthest from `focus` are dropped; or are reduced
+    /// first, as long as more than a few are full. A full picture is not replaced by a reduced one.
+    void insert(const ShownFrame& shown, std::int64_t focus, Overflow overflow = Overflow::Drop);
     /// The picture that is visible at `tick`, if it is here.
     std::optional<ShownFrame> at(std::int64_t tick) const;
+    /// The picture that is nearest to `tick`; null when there is none.
+    FrameRef nearest(std::int64_t tick) const;
     std::size_t byteCount() const { return m_bytes; }
+    /// How many pictures like `full` there is room for.
+    std::int64_t capacity(const DecodedFrame& full, Overflow overflow) const;
 
 private:
+    static constexpr int kReducedLimit = 960;   ///< pixels
+    static constexpr std::size_t kKeptFull = 8; ///< pictures, when others are reduced
+
     using Entries = std::map<std::int64_t, ShownFrame>; ///< by the tick of the picture
     void erase(Entries::iterator entry);
+    void reduceFarthest(std::int64_t focus);
+    static bool isReducible(const DecodedFrame& frame);
+    static Entries::iterator farther(Entries::iterator first, Entries::iterator last, std::int64_t focus);
 
     std::size_t m_mostBytes;
     std::size_t m_bytes = 0;
+    std::size_t m_fullCount = 0; ///< pictures that could be reduced
     Entries m_entries;
 };
 

@@ -34,7 +34,21 @@ std::shared_ptr<const PacketIndex> PacketIndex::build(Demuxer& demuxer, int vide
                      [](const PacketEntry& a, const PacketEntry& b) { return a.pts < b.pts; });
     std::copy_if(index->m_packets.begin(), index->m_packets.end(), std::back_inserter(index->m_keyframes),
                  [](const PacketEntry& each) { return each.isKey; });
+    for (const PacketEntry& each : index->m_packets) {
+        if (!each.isHidden && (index->m_shown.empty() || index->m_shown.back() != each.pts))
+            index->m_shown.push_back(each.pts);
+    }
     return index;
+}
+
+std::optional<std::int64_t> PacketIndex::pictureFrom(std::int64_t tick, int count) const
+{
+    if (m_shown.empty())
+        return std::nullopt;
+    const auto behind = std::upper_bound(m_shown.begin(), m_shown.end(), tick);
+    const std::int64_t visible = std::max<std::int64_t>(0, behind - m_shown.begin() - 1);
+    const auto last = static_cast<std::int64_t>(m_shown.size()) - 1;
+    return m_shown[static_cast<std::size_t>(std::clamp<std::int64_t>(visible + count, 0, last))];
 }
 
 const PacketEntry* PacketIndex::keyframeAt(std::int64_t pts) const

@@ -30,12 +30,16 @@ public:
     const std::vector<PacketEntry>& packets() const { return m_packets; }
     /// The last keyframe at or before `pts`; null when there is none.
     const PacketEntry* keyframeAt(std::int64_t pts) const;
+    /// When the picture is shown that is so many behind (before, when negative) the one visible at `tick`; ends clamp.
+    /// Nothing without pictures.
+    std::optional<std::int64_t> pictureFrom(std::int64_t tick, int count) const;
     /// Where the last packet of any stream ends, in microseconds of the file's own time. Nothing without packets.
     std::optional<std::int64_t> end() const { return m_end; }
 
 private:
     std::vector<PacketEntry> m_packets;
     std::vector<PacketEntry> m_keyframes;
+    std::vector<std::int64_t> m_shown; ///< when each picture is shown; none twice
     std::optional<std::int64_t> m_end;
 };
 

@@ -115,9 +115,12 @@ void PictureWorker::loop()
 
 void PictureWorker::answer(VideoSource& source, const Request& request)
 {
-    source.setReducing(!request.plays);
     const auto want = request.plays ? VideoSource::Want::Full : VideoSource::Want::Any;
-    const auto shown = source.at(request.tick, want, [&] { return isOvertaken(request); });
+    VideoSource::Glimpse glimpse;
+    if (!request.plays)
+        glimpse = [&](FrameRef frame) { m_arrived(request.generation, std::move(frame), What::Glimpse); };
+    const auto shown = source.at(
+        request.tick, want, [&] { return isOvertaken(request); }, glimpse);
     if (isOvertaken(request) || *m_cancelled)
         return;
     give(request, shown);
@@ -132,7 +135,7 @@ void PictureWorker::give(const Request& request, const std::optional<ShownFrame>
         const std::lock_guard lock(m_mutex);
         m_exhausted = true;
     }
-    m_arrived(request.generation, shown ? shown->frame : nullptr);
+    m_arrived(request.generation, shown ? shown->frame : nullptr, What::Picture);
 }
 
 void PictureWorker::refine(VideoSource& source, const Request& request)
@@ -140,7 +143,7 @@ void PictureWorker::refine(VideoSource& source, const Request& request)
     const auto shown = source.at(request.tick, VideoSource::Want::Full, [&] { return isOvertaken(request); });
     m_unrefined = false;
     if (!isOvertaken(request))
-        m_arrived(request.generation, shown ? shown->frame : nullptr);
+        m_arrived(request.generation, shown ? shown->frame : nullptr, What::Picture);
 }
 
 void PictureWorker::playOn(VideoSource& source, const Request& request)
@@ -160,7 +163,7 @@ void PictureWorker::playOn(VideoSource& source, const Request& request)
         m_exhausted = m_playedTo == kForever;
     }
     if (tells)
-        m_arrived(request.generation, nullptr);
+        m_arrived(request.generation, nullptr, What::Picture);
 }
 
 } // namespace ffmpeg

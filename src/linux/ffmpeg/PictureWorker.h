@@ -20,8 +20,10 @@ namespace ffmpeg {
 class PictureWorker {
 public:
     /// Called on the worker's thread with the picture that a request asked for (null when there is none), and while
-    /// playing with null whenever pictures have come to an empty queue, or no more will come.
-    using Arrived = std::function<void(std::uint64_t generation, FrameRef frame)>;
+    /// playing with null whenever pictures have come to an empty queue, or no more will come. A glimpse is a picture of
+    /// another moment, to be shown until the one that was asked for comes.
+    enum class What { Picture, Glimpse };
+    using Arrived = std::function<void(std::uint64_t generation, FrameRef frame, What what)>;
 
     PictureWorker(std::shared_ptr<const Movie> movie, Arrived arrived);
     /// Waits for the thread, which ends soon after cancel().

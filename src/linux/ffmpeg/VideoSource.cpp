@@ -1,6 +1,7 @@
 #include "linux/ffmpeg/VideoSource.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <utility>
 
 namespace ffmpeg {
@@ -11,6 +12,13 @@ VideoSource::VideoSource(std::shared_ptr<const Movie> movie, std::unique_ptr<Dem
       m_decoder(std::move(decoder)), m_cancelled(std::move(cancelled)), m_packet(newPacket())
 {
     m_demuxer->select({m_track.stream});
+    const double rate = std::clamp(av_q2d(m_demuxer->stream(m_track.stream).avg_frame_rate), 1.0, 240.0);
+    const auto ticksOf = [&](std::int64_t pictures) {
+        return static_cast<std::int64_t>(static_cast<double>(pictures) / rate / av_q2d(m_track.timeBase));
+    };
+    const DecodedFrame& picture = *m_movie->firstFrame();
+    m_shortReach = ticksOf(m_cache.capacity(picture, FrameCache::Overflow::Drop) / 3);
+    m_longReach = ticksOf(m_cache.capacity(picture, FrameCache::Overflow::Reduce));
 }
 
 base::Result<std::unique_ptr<VideoSource>> VideoSource::open(std::shared_ptr<const Movie> movie, Cancelled cancelled,
@@ -29,21 +37,41 @@ base::Result<std::unique_ptr<VideoSource>> VideoSource::open(std::shared_ptr<con
                                                         std::move(decoder).value(), std::move(cancelled)));
 }
 
-std::optional<ShownFrame> VideoSource::at(std::int64_t tick, Want want, const std::function<bool()>& stopped)
+std::optional<ShownFrame> VideoSource::at(std::int64_t tick, Want want, const Stopped& stopped, const Glimpse& glimpse)
 {
+    const std::int64_t before = std::exchange(m_lastTick, tick).value_or(kNever);
     const auto cached = m_cache.at(tick);
     if (cached && (want == Want::Any || !cached->frame->isReduced()))
         return cached;
-    if (!goesOnTo(tick))
+    plan(tick, before, want);
+    const auto showsFarAhead = [&](const FrameRef& frame) {
+        if (glimpse && frame && frame->pts() < tick - m_shortReach)
+            glimpse(frame);
+    };
+    bool starts = false;
+    bool isRepeated = false;
+    if (!goesOnTo(tick)) {
         seek(tick);
+        starts = true;
+        if (glimpse && !cached && keyframeBefore(tick).value_or(tick) < tick - m_shortReach) {
+            if (FrameRef nearest = m_cache.nearest(tick))
+                glimpse(std::move(nearest));
+        }
+    }
     while (!stopped() && !*m_cancelled) {
         if (m_next && m_next->pts() <= tick) {
-            advance(tick);
+            if (std::exchange(starts, false))
+                showsFarAhead(m_next);
+            advance();
         } else if (!m_next && !m_ended) {
             decodeSome();
+        } else if (m_current && m_current->pts() < m_skippedTo) {
+            // One that was left out stands between: so long a gap between two pictures was not expected.
+            m_skipBefore = std::exchange(isRepeated, true) ? kNever : m_current->pts();
+            seek(tick);
         } else if (m_current) {
             const ShownFrame shown{m_current, m_next ? m_next->pts() : kForever};
-            m_cache.insert(shown, tick);
+            m_cache.insert(shown, tick, m_overflow);
             return shown;
         } else if (!m_fromStart) {
             seekFarther();
@@ -56,9 +84,24 @@ std::optional<ShownFrame> VideoSource::at(std::int64_t tick, Want want, const st
     return std::nullopt;
 }
 
+/// Who moves about a place will want what lies beside: all that is passed is kept then. Who comes to a new place gets
+/// there sooner with less.
+void VideoSource::plan(std::int64_t tick, std::int64_t before, Want want)
+{
+    const bool movesAbout = want == Want::Any && before != kNever && std::abs(tick - before) <= m_longReach;
+    const bool goesBack = movesAbout && tick < before;
+    m_overflow = movesAbout ? FrameCache::Overflow::Reduce : FrameCache::Overflow::Drop;
+    m_skipBefore = tick - (movesAbout ? m_longReach : m_shortReach);
+    m_focus = goesBack ? tick - m_longReach / 2 : tick;
+}
+
 bool VideoSource::goesOnTo(std::int64_t tick) const
 {
-    if (!m_positioned || (m_current ? m_current->pts() : m_next ? m_next->pts() : kForever) > tick)
+    if (!m_positioned || tick < m_skippedTo
+        || (m_current ? m_current->pts()
+            : m_next  ? m_next->pts()
+                      : kForever)
+               > tick)
         return false;
     const std::int64_t head = m_next ? m_next->pts() : m_current->pts();
     const std::int64_t near = av_rescale_q(250, {1, 1000}, m_track.timeBase);
@@ -84,6 +127,7 @@ void VideoSource::seek(std::int64_t tick)
     m_positioned = m_awaitsKeyframe = true;
     m_finishing = m_ended = false;
     m_soughtTick = tick;
+    m_skippedTo = kNever;
     m_stepBack = 0;
     if (!m_demuxer->seeksByTable()) {
         if (!m_index)
@@ -137,16 +181,17 @@ void VideoSource::decodeSome()
     if (m_awaitsKeyframe && !(m_packet->flags & AV_PKT_FLAG_KEY) && !m_fromStart)
         return;
     m_awaitsKeyframe = false;
+    const bool skips = m_packet->pts != AV_NOPTS_VALUE && m_packet->pts < m_skipBefore;
+    if (skips)
+        m_skippedTo = std::max(m_skippedTo, m_packet->pts);
+    m_decoder->setSkipsUnreferenced(skips);
     m_decoder->send(*m_packet);
 }
 
-void VideoSource::advance(std::int64_t focus)
+void VideoSource::advance()
 {
-    if (m_current && !m_cache.at(m_current->pts())) {
-        const FrameRef kept = m_reducing ? DecodedFrame::reduced(m_current, kReducedLimit) : m_current;
-        if (kept)
-            m_cache.insert({kept, m_next->pts()}, focus);
-    }
+    if (m_current && m_current->pts() >= m_skippedTo && !m_cache.at(m_current->pts()))
+        m_cache.insert({m_current, m_next->pts()}, m_focus, m_overflow);
     m_current = std::move(m_next);
     m_next = nullptr;
 }

@@ -1,7 +1,8 @@
 /// Gives the picture that is visible at any tick of a movie, with as little decoding as possible. One thread.
 ///
-/// Decoding goes on where it stands whenever the tick lies ahead and no keyframe is nearer; what it passes is cached, so
-/// that each group of pictures is decoded once, and stepping back finds its pictures there.
+/// Decoding goes on where it stands whenever the tick lies ahead and no keyframe is nearer. Far before the tick, pictures
+/// that no other refers to are left out. What is passed near it is cached as it is; while the ticks move about a place,
+/// as under a finger, all that is passed is cached, so that each group of pictures is decoded once or twice.
 #pragma once
 
 #include "linux/ffmpeg/Demuxer.h"
@@ -9,7 +10,9 @@
 #include "linux/ffmpeg/Movie.h"
 #include "linux/ffmpeg/VideoDecoder.h"
 
+#include <cstdint>
 #include <functional>
+#include <limits>
 #include <memory>
 #include <optional>
 
@@ -23,28 +26,31 @@ public:
 
     enum class Want { Any, Full }; ///< a picture that was reduced will do; or not
 
-    /// The last picture at or before `tick`; before all pictures, the first. Nothing when `stopped` said so (it is asked
-    /// between packets), or when the movie gives no picture.
-    std::optional<ShownFrame> at(std::int64_t tick, Want want, const std::function<bool()>& stopped);
+    using Stopped = std::function<bool()>;
+    using Glimpse = std::function<void(FrameRef)>;
 
-    /// Whether pictures that are passed on the way are kept in a reduced form (while scrubbing) or as they are.
-    void setReducing(bool reducing) { m_reducing = reducing; }
+    /// The last picture at or before `tick`; before all pictures, the first. Nothing when `stopped` said so (it is asked
+    /// between packets), or when the movie gives no picture. What takes long gives `glimpse` one or two other pictures on
+    /// the way: the nearest that is at hand, and the one from which decoding starts.
+    std::optional<ShownFrame> at(std::int64_t tick, Want want, const Stopped& stopped, const Glimpse& glimpse = {});
+
     const FrameCache& cache() const { return m_cache; }
     /// Pictures decoded so far, for tests and measurements.
     std::int64_t decodedCount() const { return m_decodedCount; }
 
 private:
-    static constexpr int kReducedLimit = 960; ///< pixels
+    static constexpr std::int64_t kNever = std::numeric_limits<std::int64_t>::min();
 
     VideoSource(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer,
                 std::unique_ptr<VideoDecoder> decoder, Cancelled cancelled);
 
+    void plan(std::int64_t tick, std::int64_t before, Want want);
     bool goesOnTo(std::int64_t tick) const;
     std::optional<std::int64_t> keyframeBefore(std::int64_t tick) const;
     void seek(std::int64_t tick);
     void seekFarther();
     void decodeSome();
-    void advance(std::int64_t focus);
+    void advance();
 
     std::shared_ptr<const Movie> m_movie;
     VideoTrack m_track;
@@ -64,8 +70,17 @@ private:
     bool m_ended = false;
     std::int64_t m_soughtTick = 0;
     std::int64_t m_stepBack = 0;
-    bool m_reducing = true;
     std::int64_t m_decodedCount = 0;
+
+    // How far before a tick pictures are wanted too, in ticks: at a new place, and where a finger moves.
+    std::int64_t m_shortReach = 0;
+    std::int64_t m_longReach = 0;
+    // The same for the tick that is looked for, and what is to be kept.
+    std::optional<std::int64_t> m_lastTick;
+    std::int64_t m_focus = 0;
+    FrameCache::Overflow m_overflow = FrameCache::Overflow::Drop;
+    std::int64_t m_skipBefore = kNever;
+    std::int64_t m_skippedTo = kNever; ///< up to here pictures can be missing
 };
 
 } // namespace ffmpeg

@@ -32,10 +32,13 @@ public:
     /// Shows the picture that is visible at `time`, exactly. Both ends clamp; a newer seek overtakes an older one.
     /// A time that is not numeric is ignored.
     virtual void seekToTime(base::MediaTime time) = 0;
+    /// Pauses, and shows the picture that many pictures behind (or before, when negative) the one that is shown; ends
+    /// clamp. Several calls add up.
+    virtual void stepByCount(int frames) = 0;
 
     virtual void setActionAtItemEnd(ActionAtItemEnd action) = 0;
 
-    /// Called every `interval` while playing, and after each seek.
+    /// Called every `interval` while playing, and after each seek and step.
     [[nodiscard]] virtual ObserverToken addPeriodicTimeObserver(base::MediaTime interval,
                                                                 std::function<void(base::MediaTime)> callback) = 0;
     /// Called whenever playing passes one of `times`.

@@ -217,6 +217,65 @@ TEST_P(PlayerContract, ABoundaryThatPausesEndsTheRunThere)
     EXPECT_NEAR(player->currentTime().seconds(), 0.2, 0.006);
 }
 
+TEST_P(PlayerContract, StepsGoPictureByPictureAndAddUp)
+{
+    becomeReady();
+    const auto stands = [&](int picture) {
+        return rig->waitFor([&] { return player->currentTime() == MediaTime::make(picture, 30); });
+    };
+    player->seekToTime(at(1.01));
+    player->stepByCount(1);
+    EXPECT_TRUE(stands(31));
+    player->stepByCount(-2);
+    EXPECT_TRUE(stands(29));
+    for (const int count : {1, 1, -3, 6})
+        player->stepByCount(count);
+    EXPECT_TRUE(stands(34));
+    EXPECT_EQ(player->currentTime().timescale, item->duration().timescale);
+}
+
+TEST_P(PlayerContract, StepsStopAtBothEnds)
+{
+    becomeReady();
+    const auto stands = [&](int picture) {
+        return rig->waitFor([&] { return player->currentTime() == MediaTime::make(picture, 30); });
+    };
+    player->stepByCount(1000);
+    EXPECT_TRUE(stands(119));
+    player->stepByCount(1);
+    player->stepByCount(-1);
+    EXPECT_TRUE(stands(118));
+    player->seekToTime(at(4));
+    player->stepByCount(-1);
+    EXPECT_TRUE(stands(118)) << "at the end the last picture is shown";
+    player->stepByCount(-1000);
+    EXPECT_TRUE(stands(0));
+}
+
+TEST_P(PlayerContract, AStepPausesAndCallsPeriodicObserversLater)
+{
+    becomeReady();
+    player->seekToTime(at(2));
+    rig->mainQueue.drain();
+    std::vector<MediaTime> told;
+    const auto token = player->addPeriodicTimeObserver(at(1000), [&](MediaTime time) { told.push_back(time); });
+    player->play();
+    player->stepByCount(1);
+    EXPECT_FALSE(player->isPlaying());
+    EXPECT_TRUE(told.empty());
+    ASSERT_TRUE(rig->waitFor([&] { return !told.empty(); }));
+    EXPECT_EQ(told, std::vector<MediaTime>{MediaTime::make(61, 30)});
+}
+
+TEST_P(PlayerContract, ASeekOvertakesTheStepsBeforeIt)
+{
+    becomeReady();
+    player->stepByCount(5);
+    player->seekToTime(at(3));
+    player->stepByCount(1);
+    EXPECT_TRUE(rig->waitFor([&] { return player->currentTime() == MediaTime::make(91, 30); }));
+}
+
 TEST_P(PlayerContract, NobodyIsCalledAfterThePlayerIsGone)
 {
     becomeReady();
