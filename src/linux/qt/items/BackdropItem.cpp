@@ -64,7 +64,7 @@ std::vector<BackdropItem::Mask> BackdropItem::masksOf(const platform::BackdropVi
 
 QColor BackdropItem::tint(const platform::BackdropView& backdrop) const
 {
-    return backdrop.maskViews().empty() ? stage().theme.chrome : stage().theme.disc;
+    return stage().material(backdrop.maskViews().empty() ? stage().theme.chrome : stage().theme.disc);
 }
 
 bool BackdropItem::needsDrawing(platform::View& view, bool visible)

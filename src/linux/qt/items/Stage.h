@@ -7,6 +7,7 @@
 
 #include <QRectF>
 
+#include <algorithm>
 #include <cstdint>
 #include <vector>
 
@@ -38,6 +39,15 @@ struct Stage {
     Icons icons;
     Statistics statistics;
     std::vector<Painted> painted; ///< in the commit that is running, back to front
+
+    /// What stands over the content: a tint that the blur shines through or, without a blur, one that hides all text.
+    QColor material(QColor tint) const
+    {
+        constexpr int kOpaqueEnough = 247;
+        if (!liveBlur)
+            tint.setAlpha(std::max(tint.alpha(), kOpaqueEnough));
+        return tint;
+    }
 
     /// To whole pixels, so that what is drawn there is sharp.
     double snapped(double points) const;

@@ -4,13 +4,13 @@ namespace qtui {
 
 bool ToolbarItem::needsDrawing(platform::View&, bool visible)
 {
-    return visible && stage().liveBlur && m_blur.isStale(stage(), windowRect(), stage().theme.bar);
+    return visible && stage().liveBlur && m_blur.isStale(stage(), windowRect(), stage().material(stage().theme.bar));
 }
 
 std::vector<Sprite> ToolbarItem::draw(platform::View& view)
 {
     std::vector<Sprite> sprites;
-    const QColor bar = stage().theme.bar;
+    const QColor bar = stage().material(stage().theme.bar);
     if (stage().liveBlur) {
         if (m_blur.isStale(stage(), windowRect(), bar))
             m_blur.update(stage(), windowRect(), bar);
