@@ -8,17 +8,6 @@
 #include <cassert>
 #include <utility>
 
-#if defined(__SANITIZE_THREAD__)
-// The distribution's FFmpeg is not instrumented: the atomics with which its decoding threads hand over their pictures
-// cannot be seen. (With one decoding thread nothing has to be suppressed.)
-extern "C" __attribute__((visibility("default"))) const char* __tsan_default_suppressions();
-extern "C" const char* __tsan_default_suppressions()
-{
-    return "called_from_lib:libavcodec.so\ncalled_from_lib:libavutil.so\n"
-           "race:libavcodec.so\nrace:libavutil.so\n";
-}
-#endif
-
 namespace ffmpeg {
 
 FFmpegMediaFramework::FFmpegMediaFramework(const base::System& system, runtime::NotificationCenter& center,
