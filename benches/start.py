@@ -86,6 +86,6 @@ def stages(runs):
     parts, last = [], 0.0
     for mark in MARKS:
         at = statistics.median(run.marks[mark] for run in runs)
-        parts.append(f"{mark} +{(at - last) / whole:.0%}")
+        parts.append(f"{mark} {(at - last) / whole:.0%}")
         last = at
     return ", ".join(parts)
