@@ -39,7 +39,7 @@ public:
     /// Follows the desktop until this is called.
     void setScheme(Scheme scheme);
     Scheme scheme() const;
-    /// False spares weak devices the blurs: plain translucent bars instead. True at first.
+    /// False spares weak devices the blurs: plain bars that let next to nothing through. True at first.
     void setLiveBlur(bool live);
 
     /// Makes the window's views appear, too.
