@@ -1,12 +1,12 @@
 // Files that are no movies, or no longer: refused in one line, or shown as far as they go. Never a crash, never a loss.
 #include "end_to_end/Machine.h"
+#include "support/WithoutPrivileges.h"
 
 #include <gmock/gmock.h>
 
 #include <algorithm>
 #include <ostream>
 #include <sys/stat.h>
-#include <unistd.h>
 
 using namespace tests;
 using testing::AllOf;
@@ -60,8 +60,7 @@ TEST_F(BadInput, AnEmptyFileIsRefused)
 
 TEST_F(BadInput, AFileThatMayNotBeReadIsRefused)
 {
-    if (::geteuid() == 0)
-        GTEST_SKIP() << "root may read everything";
+    const tests::WithoutPrivileges here;
     const auto file = m_machine.movie("clock.mp4");
     ::chmod(file.c_str(), 0);
     expectRefused(file);
