@@ -25,6 +25,10 @@ bool isSound(const AVStream& stream)
     return stream.codecpar->codec_type == AVMEDIA_TYPE_AUDIO;
 }
 
+constexpr std::int64_t kFar = AV_TIME_BASE; ///< a movie that starts later than this is taken to start at 0
+constexpr int kPacketsToOrigin = 64;
+constexpr std::int64_t kRunUp = AV_TIME_BASE / 10;
+
 } // namespace
 
 base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file, Cancelled cancelled)
@@ -45,7 +49,7 @@ base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file,
     if (!movie->m_video && movie->m_audioStreams.empty())
         return failed(Error::make("ffmpeg", AVERROR_STREAM_NOT_FOUND, "it has neither pictures nor sound"));
     if (movie->m_video) {
-        if (const auto decoded = movie->decodeFirstFrame(); !decoded)
+        if (const auto decoded = movie->decodeFirstFrame(cancelled); !decoded)
             return failed(decoded.error());
     }
     if (const auto found = movie->findDuration(cancelled); !found)
@@ -86,7 +90,7 @@ void Movie::describeVideo(const AVStream& stream)
     m_video = track;
 }
 
-base::Result<void> Movie::decodeFirstFrame()
+base::Result<void> Movie::decodeFirstFrame(const Cancelled& cancelled)
 {
     const int stream = m_video->stream;
     const auto decoder = VideoDecoder::open(m_spare->stream(stream), *m_video, 1);
@@ -124,9 +128,11 @@ base::Result<void> Movie::decodeFirstFrame()
     const base::Size natural = squareSize(picture->width, picture->height, m_video->aspect);
     const base::AffineTransform transform = preferredTransform(about, natural);
     m_video->orientation = Orientation::fromTransform(transform);
+    findOrigin(m_firstFrame->pts(), cancelled);
     Owned<AVFrame> again(av_frame_clone(picture));
-    m_firstFrame = std::make_shared<DecodedFrame>(std::move(again), m_firstFrame->pts(), m_firstFrame->time(),
-                                                  m_video->orientation, m_video->aspect);
+    const std::int64_t pts = m_firstFrame->pts();
+    m_firstFrame = std::make_shared<DecodedFrame>(std::move(again), pts, m_video->timeOf(pts), m_video->orientation,
+                                                  m_video->aspect);
     const auto track = std::find_if(m_tracks.begin(), m_tracks.end(),
                                     [](const auto& each) { return each.type == platform::MediaType::Video; });
     track->naturalSize = natural;
@@ -134,11 +140,36 @@ base::Result<void> Movie::decodeFirstFrame()
     return {};
 }
 
+/// Matroska that was cut from something longer, or that goes by the clock on the wall, starts far from 0. Whoever plays
+/// it does not want to wait.
+void Movie::findOrigin(std::int64_t firstPts, const Cancelled& cancelled)
+{
+    const AVRational timeBase = m_video->timeBase;
+    if (m_spare->isMov() || !m_spare->seeksByTable() || av_compare_ts(firstPts, timeBase, kFar, AV_TIME_BASE_Q) < 0)
+        return;
+    auto reader = Demuxer::open(m_file, cancelled);
+    if (!reader)
+        return;
+    const std::int64_t picture = av_rescale_q(firstPts, timeBase, AV_TIME_BASE_Q);
+    std::int64_t first = picture;
+    // Its packets stand in the order of time but for a few.
+    const auto packet = newPacket();
+    for (int read = 0; read < kPacketsToOrigin && reader.value()->read(*packet) == 0; ++read) {
+        const AVRational ticks = reader.value()->stream(packet->stream_index).time_base;
+        if (packet->pts != AV_NOPTS_VALUE)
+            first = std::min(first, av_rescale_q(packet->pts, ticks, AV_TIME_BASE_Q));
+    }
+    // A little sound before the first picture is only what the decoder needs to start.
+    m_origin = picture - first < kRunUp ? picture : first;
+    m_video->origin = av_rescale_q(m_origin, AV_TIME_BASE_Q, timeBase);
+}
+
 base::Result<void> Movie::findDuration(const Cancelled& cancelled)
 {
     AVFormatContext& context = m_spare->context();
     std::int64_t length = context.duration; // microseconds
-    if (length == AV_NOPTS_VALUE || length <= 0) {
+    // What the header of a file says that does not start at 0 is sometimes its length, sometimes its end.
+    if (length == AV_NOPTS_VALUE || length <= 0 || (m_origin != 0 && m_spare->seeksByTable())) {
         const auto index = packetIndex(cancelled);
         if (!index)
             return Error::make("ffmpeg", AVERROR_EXIT, "it cannot be read to its end");

@@ -46,8 +46,9 @@ private:
     static constexpr std::int32_t kSoundTimescale = 90000;
 
     void describe();
-    base::Result<void> decodeFirstFrame();
+    base::Result<void> decodeFirstFrame(const Cancelled& cancelled);
     void describeVideo(const AVStream& stream);
+    void findOrigin(std::int64_t firstPts, const Cancelled& cancelled);
     base::Result<void> findDuration(const Cancelled& cancelled);
 
     std::shared_ptr<OpenFile> m_file;

@@ -24,7 +24,7 @@ VideoDecoder::VideoDecoder(Owned<AVCodecContext> context, const VideoTrack& trac
 }
 
 base::Result<std::unique_ptr<VideoDecoder>> VideoDecoder::open(const AVStream& stream, const VideoTrack& track,
-                                                               int threads)
+                                                               int threads, const HardwareDevice* hardware)
 {
     const AVCodec* codec = avcodec_find_decoder(stream.codecpar->codec_id);
     if (!codec)
@@ -35,6 +35,8 @@ base::Result<std::unique_ptr<VideoDecoder>> VideoDecoder::open(const AVStream& s
     context->thread_count = threads;
     context->thread_type = FF_THREAD_FRAME;
     context->max_pixels = kMostPixels;
+    if (hardware)
+        hardware->offerTo(*context);
     if (error >= 0)
         error = avcodec_open2(context.get(), codec, nullptr);
     if (error < 0)
@@ -61,14 +63,17 @@ FrameRef VideoDecoder::receive()
             return nullptr;
         if (result < 0)
             continue; // a damaged picture; the decoder reports each once
-        std::int64_t pts = m_frame->best_effort_timestamp;
+        Owned<AVFrame> picture = HardwareDevice::inMemory(std::exchange(m_frame, newFrame()));
+        if (!picture)
+            continue;
+        std::int64_t pts = picture->best_effort_timestamp;
         if (pts == AV_NOPTS_VALUE)
             pts = m_lastPts == AV_NOPTS_VALUE ? m_track.origin : m_lastPts + m_step;
         if (m_lastPts != AV_NOPTS_VALUE && pts > m_lastPts)
             m_step = pts - m_lastPts;
         m_lastPts = pts;
-        return std::make_shared<DecodedFrame>(std::exchange(m_frame, newFrame()), pts, m_track.timeOf(pts),
-                                              m_track.orientation, m_track.aspect);
+        return std::make_shared<DecodedFrame>(std::move(picture), pts, m_track.timeOf(pts), m_track.orientation,
+                                              m_track.aspect);
     }
 }
 

@@ -5,6 +5,7 @@
 
 #include "base/Result.h"
 #include "linux/ffmpeg/DecodedFrame.h"
+#include "linux/ffmpeg/HardwareDevice.h"
 #include "linux/ffmpeg/VideoTrack.h"
 
 #include <memory>
@@ -13,9 +14,9 @@ namespace ffmpeg {
 
 class VideoDecoder {
 public:
-    /// Two threads decode at half the latency of one; more cost memory and bring little.
+    /// Two threads decode at half the latency of one; more cost memory and bring little. `hardware` can be null.
     static base::Result<std::unique_ptr<VideoDecoder>> open(const AVStream& stream, const VideoTrack& track,
-                                                            int threads);
+                                                            int threads, const HardwareDevice* hardware = nullptr);
 
     void send(const AVPacket& packet);
     /// No packet comes any more: the pictures that are still inside come out.

@@ -30,7 +30,7 @@ base::Result<std::unique_ptr<VideoSource>> VideoSource::open(std::shared_ptr<con
     const VideoTrack& track = *movie->video();
     if (track.stream >= demuxer.value()->streamCount())
         return base::Error::make("ffmpeg", AVERROR_INVALIDDATA, "the file has changed");
-    auto decoder = VideoDecoder::open(demuxer.value()->stream(track.stream), track, threads);
+    auto decoder = VideoDecoder::open(demuxer.value()->stream(track.stream), track, threads, HardwareDevice::shared());
     if (!decoder)
         return decoder.error();
     return std::unique_ptr<VideoSource>(new VideoSource(std::move(movie), std::move(demuxer).value(),

@@ -53,6 +53,37 @@ TEST_F(Robustness, ATruncatedMovieShowsWhatIsThere)
     use(movie("truncated.mp4"));
 }
 
+TEST_F(Robustness, ATruncatedMoviePlaysToTheEndThatItsHeaderTells)
+{
+    ASSERT_EQ(open(movie("truncated.mp4")), Status::ReadyToPlay);
+    player->seekToTime(at(1));
+    player->play();
+    playOn(3100ms, 50ms);
+    EXPECT_FALSE(player->isPlaying());
+    EXPECT_EQ(player->currentTime(), item->duration());
+    EXPECT_TRUE(waitFor([&] { return player->isSettled(); }));
+    EXPECT_GT(tests::numberIn(player->currentFrame()), 40);
+}
+
+TEST_F(Robustness, NothingIsToDoWhilePausedAndSettled)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    int calls = 0;
+    const auto token = player->addPeriodicTimeObserver(at(0.1), [&](MediaTime) { ++calls; });
+    player->play();
+    ASSERT_TRUE(waitFor([&] { return player->isRunning(); }));
+    playOn(200ms);
+    player->pause();
+    ASSERT_TRUE(waitFor([&] { return player->isSettled(); }));
+    clock.advance(1h); // what was left from playing
+    mainQueue.drain();
+    const int before = calls;
+    clock.advance(1h);
+    EXPECT_EQ(mainQueue.runDue(), 0u);
+    EXPECT_FALSE(mainQueue.untilNext());
+    EXPECT_EQ(calls, before);
+}
+
 TEST_F(Robustness, DamagedPacketsDoNotStopAMovie)
 {
     ASSERT_EQ(open(movie("corrupt.mp4")), Status::ReadyToPlay);

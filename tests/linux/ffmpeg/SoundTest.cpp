@@ -1,8 +1,8 @@
 #include "linux/ffmpeg/SoundMixer.h"
+#include "support/DrivenDevice.h"
 #include "support/EngineTest.h"
 
 #include <cmath>
-#include <mutex>
 #include <numbers>
 
 namespace {
@@ -22,58 +22,6 @@ double toneIn(const std::vector<float>& samples, double frequency, std::size_t c
     }
     return 2 * std::hypot(sine, cosine) / static_cast<double>(frames);
 }
-
-/// A device that plays when the test says so.
-class Device {
-public:
-    ffmpeg::MakeAudioOutput maker()
-    {
-        return [this](ffmpeg::AudioOutput::Fill fill) -> std::unique_ptr<ffmpeg::AudioOutput> {
-            const std::lock_guard lock(m_mutex);
-            ++made;
-            if (isMissing)
-                return nullptr;
-            m_fill = std::move(fill);
-            m_heard = 0;
-            return std::make_unique<Output>(*this);
-        };
-    }
-    /// What was heard: nothing when nobody plays.
-    std::vector<float> play(std::size_t frames)
-    {
-        const std::lock_guard lock(m_mutex);
-        std::vector<float> samples(frames * 2);
-        if (!m_fill)
-            return {};
-        m_fill(samples.data(), frames);
-        m_heard += static_cast<std::int64_t>(frames);
-        return samples;
-    }
-    bool isPlaying() const
-    {
-        const std::lock_guard lock(m_mutex);
-        return m_fill != nullptr;
-    }
-
-    std::atomic<int> made = 0;
-    std::atomic<bool> isMissing = false;
-
-private:
-    struct Output final : ffmpeg::AudioOutput {
-        explicit Output(Device& theDevice) : device(theDevice) {}
-        ~Output() override
-        {
-            const std::lock_guard lock(device.m_mutex);
-            device.m_fill = nullptr;
-        }
-        std::int64_t framesHeard() const override { return device.m_heard; }
-        Device& device;
-    };
-
-    mutable std::mutex m_mutex;
-    ffmpeg::AudioOutput::Fill m_fill;
-    std::atomic<std::int64_t> m_heard = 0;
-};
 
 class Sound : public tests::EngineTest {
 protected:
@@ -97,7 +45,7 @@ protected:
         ASSERT_TRUE(waitFor([&] { return player->isRunning(); }));
     }
 
-    Device device; // outlives the players
+    tests::DrivenDevice device; // outlives the players
 };
 
 TEST_F(Sound, AllTracksAreHeardAtOnceEachAtItsOwnLevel)
