@@ -1,5 +1,6 @@
 #include "linux/ffmpeg/PictureWorker.h"
 
+#include <algorithm>
 #include <chrono>
 #include <utility>
 
@@ -7,7 +8,12 @@ namespace ffmpeg {
 
 namespace {
 
-constexpr int kThreads = 2;
+/// One more than there are cores keeps them all busy while a finished picture is fetched; beyond that only memory grows.
+int threadCount()
+{
+    return static_cast<int>(std::clamp(std::thread::hardware_concurrency() + 1, 2u, 5u));
+}
+
 /// A finger that has not moved for so long rests.
 constexpr std::chrono::milliseconds kRest{80};
 
@@ -84,7 +90,7 @@ bool PictureWorker::isAhead() const
 
 void PictureWorker::loop()
 {
-    const auto source = VideoSource::open(m_movie, m_cancelled, kThreads);
+    const auto source = VideoSource::open(m_movie, m_cancelled, threadCount());
     for (;;) {
         Request request;
         {

@@ -14,7 +14,7 @@ namespace ffmpeg {
 
 class VideoDecoder {
 public:
-    /// Two threads decode at half the latency of one; more cost memory and bring little. `hardware` can be null.
+    /// `hardware` can be null.
     static base::Result<std::unique_ptr<VideoDecoder>> open(const AVStream& stream, const VideoTrack& track,
                                                             int threads, const HardwareDevice* hardware = nullptr);
 

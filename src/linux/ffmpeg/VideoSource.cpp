@@ -17,7 +17,7 @@ VideoSource::VideoSource(std::shared_ptr<const Movie> movie, std::unique_ptr<Dem
         return static_cast<std::int64_t>(static_cast<double>(pictures) / rate / av_q2d(m_track.timeBase));
     };
     const DecodedFrame& picture = *m_movie->firstFrame();
-    m_shortReach = ticksOf(m_cache.capacity(picture, FrameCache::Overflow::Drop) / 3);
+    m_shortReach = ticksOf(m_cache.capacity(picture, FrameCache::Overflow::Drop) / 4);
     m_longReach = ticksOf(m_cache.capacity(picture, FrameCache::Overflow::Reduce));
 }
 
