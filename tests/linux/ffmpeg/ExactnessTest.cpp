@@ -19,7 +19,12 @@ using namespace std::chrono_literals;
 
 class Exactness : public tests::EngineTest {
 protected:
-    void TearDown() override { std::filesystem::remove(path); }
+    void TearDown() override
+    {
+        player = nullptr;
+        item = nullptr; // the last of the engine whose threads use the device
+        std::filesystem::remove(path);
+    }
 
     /// A movie of `options`, made by FFmpeg.
     void make(const std::string& extension, const std::string& options)
@@ -28,7 +33,7 @@ protected:
         ASSERT_EQ(std::system(("ffmpeg -nostdin -v error -y " + options + " " + path).c_str()), 0);
     }
 
-    tests::DrivenDevice device; // outlives the players
+    tests::DrivenDevice device;
     std::string path;
 };
 
@@ -106,7 +111,6 @@ TEST_F(Exactness, SoundAndPicturesDoNotDriftApartInTenMinutes)
         clock.advance(201ms);
         ASSERT_TRUE(waitFor([&] { return player->currentFrame()->time() == MediaTime::make(shown, 5); })) << shown;
     }
-    player = nullptr;
 }
 
 TEST_F(Exactness, MatroskaThatStartsFarFromZeroStartsAtZero)

@@ -25,6 +25,11 @@ double toneIn(const std::vector<float>& samples, double frequency, std::size_t c
 
 class Sound : public tests::EngineTest {
 protected:
+    void TearDown() override
+    {
+        player = nullptr;
+        item = nullptr; // the last of the engine whose threads use the device
+    }
     std::unique_ptr<ffmpeg::SoundMixer> mixer(const std::string& name)
     {
         auto file = ffmpeg::OpenFile::open(movie(name));
@@ -45,7 +50,7 @@ protected:
         ASSERT_TRUE(waitFor([&] { return player->isRunning(); }));
     }
 
-    tests::DrivenDevice device; // outlives the players
+    tests::DrivenDevice device;
 };
 
 TEST_F(Sound, AllTracksAreHeardAtOnceEachAtItsOwnLevel)
