@@ -16,12 +16,20 @@ void FrameCache::insert(const ShownFrame& shown, std::int64_t focus, Overflow ov
     m_entries.emplace(pts, shown);
     m_bytes += shown.frame->byteCount();
     m_fullCount += isReducible(*shown.frame);
-    while (m_bytes > m_mostBytes && m_entries.size() > 1) {
-        if (overflow == Overflow::Reduce && m_fullCount > kKeptFull)
-            reduceFarthest(focus);
+    while (m_fullCount > fullLimit(*shown.frame)) {
+        const auto entry = farthestFull(focus);
+        if (overflow == Overflow::Reduce)
+            reduce(entry);
         else
-            erase(farther(m_entries.begin(), std::prev(m_entries.end()), focus));
+            erase(entry);
     }
+    while (m_bytes > m_mostBytes && m_entries.size() > 1)
+        erase(farther(m_entries.begin(), std::prev(m_entries.end()), focus));
+}
+
+std::size_t FrameCache::fullLimit(const DecodedFrame& picture) const
+{
+    return std::max(kKeptFull, m_mostBytes / 3 / std::max<std::size_t>(1, picture.byteCount()));
 }
 
 std::optional<ShownFrame> FrameCache::at(std::int64_t tick) const
@@ -46,11 +54,15 @@ FrameRef FrameCache::nearest(std::int64_t tick) const
 std::int64_t FrameCache::capacity(const DecodedFrame& full, Overflow overflow) const
 {
     const std::size_t bytes = std::max<std::size_t>(1, full.byteCount());
-    if (overflow == Overflow::Drop || !isReducible(full) || m_mostBytes < kKeptFull * bytes)
+    if (!isReducible(full))
         return static_cast<std::int64_t>(m_mostBytes / bytes);
+    const std::size_t kept = fullLimit(full);
+    if (overflow == Overflow::Drop || m_mostBytes < kept * bytes)
+        return static_cast<std::int64_t>(kept);
     const double side = static_cast<double>(kReducedLimit) / std::max(full.picture().width, full.picture().height);
     const double reduced = static_cast<double>(bytes) * side * side;
-    return static_cast<std::int64_t>(static_cast<double>(m_mostBytes - kKeptFull * bytes) / reduced + kKeptFull);
+    return static_cast<std::int64_t>(static_cast<double>(m_mostBytes - kept * bytes) / reduced)
+           + static_cast<std::int64_t>(kept);
 }
 
 bool FrameCache::isReducible(const DecodedFrame& frame)
@@ -65,12 +77,16 @@ void FrameCache::erase(Entries::iterator entry)
     m_entries.erase(entry);
 }
 
-void FrameCache::reduceFarthest(std::int64_t focus)
+FrameCache::Entries::iterator FrameCache::farthestFull(std::int64_t focus)
 {
     const auto isFull = [](const auto& entry) { return isReducible(*entry.second.frame); };
     const auto first = std::find_if(m_entries.begin(), m_entries.end(), isFull);
     const auto last = std::find_if(m_entries.rbegin(), m_entries.rend(), isFull);
-    const auto entry = farther(first, std::prev(last.base()), focus);
+    return farther(first, std::prev(last.base()), focus);
+}
+
+void FrameCache::reduce(Entries::iterator entry)
+{
     const ShownFrame full = entry->second;
     FrameRef small = DecodedFrame::reduced(full.frame, kReducedLimit);
     erase(entry);

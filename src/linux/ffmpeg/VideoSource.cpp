@@ -12,12 +12,16 @@ VideoSource::VideoSource(std::shared_ptr<const Movie> movie, std::unique_ptr<Dem
       m_decoder(std::move(decoder)), m_cancelled(std::move(cancelled)), m_packet(newPacket())
 {
     m_demuxer->select({m_track.stream});
-    const double rate = std::clamp(av_q2d(m_demuxer->stream(m_track.stream).avg_frame_rate), 1.0, 240.0);
+    const AVRational told = m_demuxer->stream(m_track.stream).avg_frame_rate;
+    const double rate = told.num > 0 && told.den > 0 ? std::clamp(av_q2d(told), 1.0, 240.0) : 60;
     const auto ticksOf = [&](std::int64_t pictures) {
-        return static_cast<std::int64_t>(static_cast<double>(pictures) / rate / av_q2d(m_track.timeBase));
+        constexpr double kMost = 1e12; // broken files have ticks of any length
+        const double ticks = static_cast<double>(pictures) / rate / av_q2d(m_track.timeBase);
+        return ticks >= 0 && ticks < kMost ? static_cast<std::int64_t>(ticks) : static_cast<std::int64_t>(kMost);
     };
     const DecodedFrame& picture = *m_movie->firstFrame();
-    m_shortReach = ticksOf(m_cache.capacity(picture, FrameCache::Overflow::Drop) / 4);
+    const std::int64_t full = m_cache.capacity(picture, FrameCache::Overflow::Drop);
+    m_shortReach = ticksOf(std::max(full / 4, std::min<std::int64_t>(full, 10)));
     m_longReach = ticksOf(m_cache.capacity(picture, FrameCache::Overflow::Reduce));
 }
 
