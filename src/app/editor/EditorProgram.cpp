@@ -61,6 +61,9 @@ xdg::MountTable mounts(const EditorOptions& options)
 {
     xdg::MountTable table;
     table.mount(xdg::kPrivateLibraryPrefix, options.deviceRoot);
+    // Where the programs are installed, their resources are beside them.
+    table.mount(xdg::kSystemLibraryPrefix,
+                QCoreApplication::applicationDirPath().toStdString() + "/../share/clipsa/System/Library");
     return table;
 }
 
