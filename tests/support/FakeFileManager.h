@@ -162,7 +162,7 @@ public:
             return failed(number, calls.back());
         for (auto& [path, item] : m_items)
             if (isWithin(path, source))
-                path = destination + path.substr(source.size());
+                path.replace(0, source.size(), destination);
         return {};
     }
 

@@ -33,7 +33,7 @@ public:
     /// Writes a file and gives its path; the directories above it are made.
     std::filesystem::path write(const std::filesystem::path& relative, const std::string& contents) const
     {
-        const std::filesystem::path file = m_path / relative;
+        std::filesystem::path file = m_path / relative;
         std::filesystem::create_directories(file.parent_path());
         std::ofstream(file, std::ios::binary) << contents;
         return file;

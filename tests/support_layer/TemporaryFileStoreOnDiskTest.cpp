@@ -29,7 +29,7 @@ class TheStoreOnDisk : public testing::Test {
 protected:
     tests::TestSystem machine{base::Date{kNow}};
     tests::PrivateDirectory library;
-    const intl::StringFolding folding;
+    const intl::StringFolding folding{};
     xdg::FileManager files{machine.system, mounts()};
 
     void SetUp() override { _srSetupTempDirectory(files); }

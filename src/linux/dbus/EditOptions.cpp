@@ -71,7 +71,7 @@ base::Result<void> takeOptions(const QVariantMap& options, EditRequest& request)
             continue;
         if (value.metaType() != QMetaType::fromType<QString>())
             return badOption(key, "a text");
-        if (const auto taken = takeText(key, fromQt(value.toString()), request); !taken)
+        if (auto taken = takeText(key, fromQt(value.toString()), request); !taken)
             return taken;
     }
     takePlatformData(options, request);

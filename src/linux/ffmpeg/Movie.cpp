@@ -31,7 +31,7 @@ constexpr std::int64_t kRunUp = AV_TIME_BASE / 10;
 
 } // namespace
 
-base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file, Cancelled cancelled)
+base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file, const Cancelled& cancelled)
 {
     auto demuxer = Demuxer::open(file, cancelled);
     if (!demuxer)

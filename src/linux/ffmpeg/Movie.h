@@ -21,7 +21,7 @@ class Movie {
 public:
     /// Reads the header and decodes the first picture; nothing more, because somebody waits for that picture.
     /// A movie that has neither picture nor sound, or whose pictures cannot be decoded, is an error.
-    static base::Result<std::shared_ptr<Movie>> open(std::shared_ptr<OpenFile> file, Cancelled cancelled);
+    static base::Result<std::shared_ptr<Movie>> open(std::shared_ptr<OpenFile> file, const Cancelled& cancelled);
 
     const std::shared_ptr<OpenFile>& file() const { return m_file; }
     const std::vector<platform::AssetTrack>& tracks() const { return m_tracks; }

@@ -35,10 +35,10 @@ TEST_F(Seeking, EveryPictureOfALongGroupIsFoundInAnyOrder)
 TEST_F(Seeking, APictureIsVisibleFromItsTimeUntilTheNext)
 {
     ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
-    EXPECT_EQ(numberAt(MediaTime::make(60 * 512, 15360)), 60);
-    EXPECT_EQ(numberAt(MediaTime::make(61 * 512 - 1, 15360)), 60);
-    EXPECT_EQ(numberAt(MediaTime::make(61 * 512, 15360)), 61);
-    EXPECT_EQ(numberAt(MediaTime::make(60 * 512 - 1, 15360)), 59);
+    EXPECT_EQ(numberAt(MediaTime::make(60LL * 512, 15360)), 60);
+    EXPECT_EQ(numberAt(MediaTime::make(61LL * 512 - 1, 15360)), 60);
+    EXPECT_EQ(numberAt(MediaTime::make(61LL * 512, 15360)), 61);
+    EXPECT_EQ(numberAt(MediaTime::make(60LL * 512 - 1, 15360)), 59);
 }
 
 TEST_F(Seeking, IrregularTimesAreKept)
@@ -262,15 +262,15 @@ TEST_F(Scrubbing, TheCacheKeepsItsBound)
         until = shown->until;
     }
     EXPECT_FALSE(cache.at(0)) << "the farthest goes first";
-    EXPECT_TRUE(cache.at(99 * 256));
-    EXPECT_FALSE(cache.at(100 * 256)) << "nobody knows what comes there";
+    EXPECT_TRUE(cache.at(99LL * 256));
+    EXPECT_FALSE(cache.at(100LL * 256)) << "nobody knows what comes there";
 }
 
 TEST_F(Scrubbing, AStoppedSearchGivesNothingAndTheNextOneStillWorks)
 {
     const auto movie = source("long-gop.mp4");
     int asked = 0;
-    EXPECT_FALSE(movie->at(1000 * 256, ffmpeg::VideoSource::Want::Any, [&] { return ++asked > 50; }));
+    EXPECT_FALSE(movie->at(1000LL * 256, ffmpeg::VideoSource::Want::Any, [&] { return ++asked > 50; }));
     EXPECT_EQ(number(*movie, 5), 5);
     EXPECT_EQ(number(*movie, 700), 700);
 }

@@ -6,7 +6,7 @@ namespace {
 
 class AFoldedPrefix : public testing::Test {
 protected:
-    const intl::StringFolding folding;
+    const intl::StringFolding folding{};
     bool begins(std::string_view text, std::string_view prefix) const { return folding.hasPrefix(text, prefix); }
 };
 
