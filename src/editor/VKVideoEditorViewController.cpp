@@ -29,7 +29,7 @@ constexpr std::int32_t kNoHomeButton = 2;  // the capability service's answer on
 
 std::shared_ptr<Label> titleLine(double y, double fontSize, const std::string& text)
 {
-    const auto label = std::make_shared<Label>(base::Rect::make(0, y, kTitleWidth, kTitleLineHeight));
+    auto label = std::make_shared<Label>(base::Rect::make(0, y, kTitleWidth, kTitleLineHeight));
     label->setFontSize(fontSize);
     label->setBackgroundColor(Color::clear());
     label->setTextColor(Color::black());
@@ -45,7 +45,7 @@ VKVideoEditorViewController::initWithBundleIdentifier_URL_applicationName_overri
     const platform::Platform& platform, std::optional<std::string> bundleIdentifier, std::optional<base::Url> url,
     std::optional<std::string> applicationName, std::optional<Color> overrideTintColor, base::Rect size)
 {
-    const std::shared_ptr<VKVideoEditorViewController> editor(new VKVideoEditorViewController(platform));
+    std::shared_ptr<VKVideoEditorViewController> editor(new VKVideoEditorViewController(platform));
     if (!size.isEmpty())
         editor->view()->setFrame(size);
     editor->setActivityTypes(std::make_shared<ActivityTypes>());

@@ -16,7 +16,7 @@ struct MainQueueTests : testing::Test {
     base::MainQueue queue{clock};
     std::vector<std::string> said;
 
-    base::Task say(std::string text)
+    base::Task say(const std::string& text)
     {
         return [this, text] { said.push_back(text); };
     }

@@ -32,7 +32,7 @@ inline Pixels pixelsOf(const platform::VideoFrame& frame, int width, int height,
                        platform::VideoFrame::Quality quality = platform::VideoFrame::Quality::Exact)
 {
     Pixels pixels{width, height, std::vector<std::uint8_t>(static_cast<std::size_t>(width * height) * 4)};
-    if (!frame.render(pixels.bytes.data(), width * 4, width, height, quality))
+    if (!frame.render(pixels.bytes.data(), std::ptrdiff_t{4} * width, width, height, quality))
         return {};
     return pixels;
 }

@@ -14,7 +14,7 @@ constexpr std::int64_t kPreroll = kSampleRate / 5;
 /// Files round times to a millisecond or so; that is no gap.
 constexpr std::int64_t kJitter = kSampleRate / 50;
 /// A longer gap than this is not filled with silence in memory.
-constexpr std::int64_t kLongestGap = kSampleRate * 10;
+constexpr std::int64_t kLongestGap = std::int64_t{10} * kSampleRate;
 
 } // namespace
 

@@ -44,14 +44,14 @@ protected:
 
     std::shared_ptr<Keyboard> addKeyboard()
     {
-        const auto keyboard = std::make_shared<Keyboard>();
+        auto keyboard = std::make_shared<Keyboard>();
         window->setRootViewController(keyboard);
         keyboard->becomeFirstResponder();
         return keyboard;
     }
     std::shared_ptr<platform::Button> addButton(base::Rect frame, const std::shared_ptr<Target>& target)
     {
-        const auto button = add<platform::Button>(frame);
+        auto button = add<platform::Button>(frame);
         button->setTitle("OK");
         button->addTarget(target, Target::action(), platform::kTouchUpInside);
         return button;

@@ -3,6 +3,7 @@
 #include <QDir>
 #include <QThread>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdlib>
 #include <cstring>
@@ -53,7 +54,7 @@ bool QuarteredFrame::render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int 
             const bool left = x < width / 2;
             const bool top = y < height / 2;
             const std::uint32_t color = top ? (left ? 0xffff0000U : 0xff00ff00U) : (left ? 0xff0000ffU : 0xffffffffU);
-            std::memcpy(bgra + y * bytesPerRow + x * 4, &color, 4);
+            std::memcpy(bgra + y * bytesPerRow + std::ptrdiff_t{4} * x, &color, 4);
         }
     return true;
 }
@@ -78,6 +79,7 @@ std::vector<double> Movie::movieScrubber_evenlySpacedTimestamps_startingAt_endin
                                                                                     double end)
 {
     std::vector<double> timestamps;
+    timestamps.reserve(static_cast<std::size_t>(std::max(count, 0)));
     for (std::int32_t i = 0; i < count; ++i)
         timestamps.push_back(start + (end - start) * i / count);
     return timestamps;
