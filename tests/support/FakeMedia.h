@@ -16,6 +16,7 @@
 #include "platform/media/MediaFramework.h"
 #include "platform/media/TimeObservers.h"
 #include "runtime/NotificationCenter.h"
+#include "support/FakeExporting.h"
 
 #include <algorithm>
 #include <functional>
@@ -78,17 +79,38 @@ struct FakeMovie {
 
 class FakeAsset final : public platform::Asset {
 public:
-    explicit FakeAsset(std::optional<base::Url> url) : m_url(std::move(url)) {}
+    FakeAsset(base::MainQueue& mainQueue, std::optional<base::Url> url) : m_mainQueue(mainQueue), m_url(std::move(url))
+    {
+    }
 
     const std::optional<base::Url>& url() const override { return m_url; }
     base::ErrorRef error() const override { return movie.error; }
     base::MediaTime duration() const override { return movie.duration; }
     std::vector<platform::AssetTrack> tracks() const override { return movie.tracks; }
+    void whenLoaded(std::function<void()> then) override
+    {
+        if (!movie.error && movie.tracks.empty()) {
+            m_waiting.push_back(std::move(then));
+            return;
+        }
+        m_mainQueue.post([weak = weakSelf<FakeAsset>(), then = std::move(then)] {
+            if (const auto self = weak.lock())
+                then();
+        });
+    }
+    void load(FakeMovie known)
+    {
+        movie = std::move(known);
+        for (const auto& then : std::exchange(m_waiting, {}))
+            then();
+    }
 
     FakeMovie movie; ///< as known so far
 
 private:
+    base::MainQueue& m_mainQueue;
     std::optional<base::Url> m_url;
+    std::vector<std::function<void()>> m_waiting;
 };
 
 class FakePlayerItem final : public platform::PlayerItem {
@@ -105,7 +127,7 @@ public:
     void becomeReady(const FakeMovie& movie)
     {
         if (const auto asset = std::dynamic_pointer_cast<FakeAsset>(m_asset))
-            asset->movie = movie;
+            asset->load(movie);
         m_duration = movie.duration;
         m_error = nullptr;
         time = base::MediaTime::make(time.convertedTo(movie.duration.timescale).value, movie.duration.timescale);
@@ -290,12 +312,12 @@ public:
     std::shared_ptr<platform::Asset> assetWithURL(const std::optional<base::Url>& url) override
     {
         urls.push_back(url);
-        const auto asset = std::make_shared<FakeAsset>(url);
+        const auto asset = std::make_shared<FakeAsset>(m_mainQueue, url);
         m_assets.push_back(asset);
         if (const auto movie = scripted(asset)) {
             m_mainQueue.post([weak = asset->weakSelf<FakeAsset>(), movie = *movie] {
                 if (const auto self = weak.lock())
-                    self->movie = movie;
+                    self->load(movie);
             });
         }
         return asset;
@@ -326,6 +348,21 @@ public:
         return player;
     }
 
+    std::shared_ptr<platform::ImageGenerator>
+    imageGeneratorWithAsset(const std::shared_ptr<platform::Asset>& asset) override
+    {
+        const auto generator = std::make_shared<FakeImageGenerator>(asset);
+        m_generators.push_back(generator);
+        return generator;
+    }
+    std::shared_ptr<platform::ExportSession> exportSessionWithAsset(const std::shared_ptr<platform::Asset>& asset,
+                                                                    platform::ExportPreset /*preset*/) override
+    {
+        const auto session = std::make_shared<FakeExportSession>(asset);
+        m_sessions.push_back(session);
+        return session;
+    }
+
     std::map<std::string, FakeMovie> movies;    ///< by path
     std::vector<std::optional<base::Url>> urls; ///< of all assets that were asked for
 
@@ -333,7 +370,11 @@ public:
     std::shared_ptr<FakeAsset> asset() const { return latest(m_assets); }
     std::shared_ptr<FakePlayerItem> item() const { return latest(m_items); }
     std::shared_ptr<FakePlayer> player() const { return latest(m_players); }
-    std::size_t playerCount() const { return m_players.size(); } ///< ever made
+    std::shared_ptr<FakeImageGenerator> imageGenerator() const { return latest(m_generators); }
+    std::shared_ptr<FakeExportSession> exportSession() const { return latest(m_sessions); }
+    std::size_t imageGeneratorCount() const { return m_generators.size(); } ///< ever made
+    std::size_t exportSessionCount() const { return m_sessions.size(); }    ///< ever made
+    std::size_t playerCount() const { return m_players.size(); }            ///< ever made
 
 private:
     template <typename T> static std::shared_ptr<T> latest(const std::vector<std::weak_ptr<T>>& all)
@@ -353,6 +394,8 @@ private:
     std::vector<std::weak_ptr<FakeAsset>> m_assets;
     std::vector<std::weak_ptr<FakePlayerItem>> m_items;
     std::vector<std::weak_ptr<FakePlayer>> m_players;
+    std::vector<std::weak_ptr<FakeImageGenerator>> m_generators;
+    std::vector<std::weak_ptr<FakeExportSession>> m_sessions;
 };
 
 } // namespace tests

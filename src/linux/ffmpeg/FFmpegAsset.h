@@ -19,12 +19,10 @@ public:
     base::ErrorRef error() const override { return m_error; }
     base::MediaTime duration() const override;
     std::vector<platform::AssetTrack> tracks() const override;
+    void whenLoaded(std::function<void()> then) override;
 
     /// Null while loading, and when it failed. Everything that reads the movie starts here: see Movie::demuxer.
     const std::shared_ptr<Movie>& movie() const { return m_movie; }
-    /// Calls `then` on the main queue, not before this returns, when the movie is known or the error is.
-    /// Not when the asset goes first.
-    void whenLoaded(std::function<void()> then);
 
 private:
     FFmpegAsset(std::shared_ptr<Engine> engine, std::optional<base::Url> url);

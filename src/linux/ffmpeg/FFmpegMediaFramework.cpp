@@ -2,8 +2,10 @@
 
 #include "linux/ffmpeg/Engine.h"
 #include "linux/ffmpeg/FFmpegAsset.h"
+#include "linux/ffmpeg/FFmpegImageGenerator.h"
 #include "linux/ffmpeg/FFmpegPlayer.h"
 #include "linux/ffmpeg/FFmpegPlayerItem.h"
+#include "linux/ffmpeg/exporting/FFmpegExportSession.h"
 
 #include <cassert>
 #include <utility>
@@ -28,14 +30,33 @@ std::shared_ptr<platform::Asset> FFmpegMediaFramework::assetWithURL(const std::o
 std::shared_ptr<platform::PlayerItem>
 FFmpegMediaFramework::playerItemWithAsset(const std::shared_ptr<platform::Asset>& asset)
 {
-    auto own = std::dynamic_pointer_cast<FFmpegAsset>(asset);
-    return FFmpegPlayerItem::make(own ? std::move(own) : FFmpegAsset::make(m_engine, std::nullopt));
+    return FFmpegPlayerItem::make(ours(asset));
 }
 
 std::shared_ptr<platform::Player>
 FFmpegMediaFramework::playerWithPlayerItem(const std::shared_ptr<platform::PlayerItem>& item)
 {
     return FFmpegPlayer::make(m_engine, std::dynamic_pointer_cast<FFmpegPlayerItem>(item));
+}
+
+std::shared_ptr<platform::ImageGenerator>
+FFmpegMediaFramework::imageGeneratorWithAsset(const std::shared_ptr<platform::Asset>& asset)
+{
+    return FFmpegImageGenerator::make(m_engine, ours(asset));
+}
+
+std::shared_ptr<platform::ExportSession>
+FFmpegMediaFramework::exportSessionWithAsset(const std::shared_ptr<platform::Asset>& asset,
+                                             platform::ExportPreset /*preset: there is one*/)
+{
+    return FFmpegExportSession::make(m_engine, ours(asset));
+}
+
+/// One that fails in place of one of another framework.
+std::shared_ptr<FFmpegAsset> FFmpegMediaFramework::ours(const std::shared_ptr<platform::Asset>& asset) const
+{
+    auto own = std::dynamic_pointer_cast<FFmpegAsset>(asset);
+    return own ? std::move(own) : FFmpegAsset::make(m_engine, std::nullopt);
 }
 
 } // namespace ffmpeg

@@ -16,6 +16,7 @@
 namespace ffmpeg {
 
 struct Engine;
+class FFmpegAsset;
 
 struct Options {
     /// From the path that a URL names to the one that is opened; called on a worker. The path itself when empty.
@@ -33,8 +34,14 @@ public:
     /// `asset` must be one of this framework's.
     std::shared_ptr<platform::PlayerItem> playerItemWithAsset(const std::shared_ptr<platform::Asset>& asset) override;
     std::shared_ptr<platform::Player> playerWithPlayerItem(const std::shared_ptr<platform::PlayerItem>& item) override;
+    std::shared_ptr<platform::ImageGenerator>
+    imageGeneratorWithAsset(const std::shared_ptr<platform::Asset>& asset) override;
+    std::shared_ptr<platform::ExportSession> exportSessionWithAsset(const std::shared_ptr<platform::Asset>& asset,
+                                                                    platform::ExportPreset preset) override;
 
 private:
+    std::shared_ptr<FFmpegAsset> ours(const std::shared_ptr<platform::Asset>& asset) const;
+
     std::shared_ptr<Engine> m_engine;
 };
 

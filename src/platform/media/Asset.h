@@ -9,6 +9,7 @@
 #include "base/Url.h"
 #include "runtime/Object.h"
 
+#include <functional>
 #include <memory>
 #include <optional>
 #include <vector>
@@ -39,6 +40,9 @@ public:
     /// In the file's order; empty until known.
     virtual std::vector<AssetTrack> tracks() const = 0;
     std::vector<AssetTrack> tracksWithMediaType(MediaType type) const;
+    /// Calls `then` on the main queue, not before this returns, when the above is known or the error is.
+    /// Not when the asset goes first.
+    virtual void whenLoaded(std::function<void()> then) = 0;
 };
 
 } // namespace platform
