@@ -1,0 +1,86 @@
+#include "publishing/VKAudioMixUtility.h"
+
+#include "support/TempMovieNames.h"
+#include "support/VKErrorExtensions.h"
+#include "support/VKFileManagerExtensions.h"
+
+#include <utility>
+
+using platform::ExportSession;
+
+/// One mix under way. The asset and the session live on the main queue, and so they go there.
+struct VKAudioMixUtility::Export {
+    const platform::Platform& platform;
+    base::Url output;
+    Completion completion;
+    std::shared_ptr<platform::Asset> asset;
+    std::shared_ptr<ExportSession> session;
+};
+
+void VKAudioMixUtility::mixAudioForMovie_withCompletionHandler(const platform::Platform& platform,
+                                                               const std::optional<base::Url>& movie,
+                                                               Completion completion)
+{
+    if (!movie) {
+        completion(std::nullopt, VKExtensions::_vkUserErrorForCode_userInfo(VKErrorNoMovie));
+        return;
+    }
+    const auto work =
+        std::make_shared<Export>(Export{platform, tempFileURL(platform), std::move(completion), nullptr, nullptr});
+    base::MainQueue& main = platform.system.mainQueue;
+    if (main.isCurrent())
+        setUp(work, *movie);
+    else
+        main.post([work, movie = *movie] { setUp(work, movie); });
+}
+
+void VKAudioMixUtility::setUp(const std::shared_ptr<Export>& work, const base::Url& movie)
+{
+    work->asset = work->platform.media.assetWithURL(movie);
+    work->session = work->platform.media.exportSessionWithAsset(work->asset, platform::ExportPreset::HighestQuality);
+    work->session->setOutputURL(work->output);
+    work->session->setOutputFileType(platform::FileType::Mpeg4);
+    // The file is being opened: its tracks are known in a moment. The work keeps the asset until then.
+    work->asset->whenLoaded([work] { start(work); });
+}
+
+void VKAudioMixUtility::start(const std::shared_ptr<Export>& work)
+{
+    platform::AudioMix mix;
+    for (const platform::AssetTrack& track : work->asset->tracksWithMediaType(platform::MediaType::Audio))
+        mix.inputs.push_back({track.trackID});
+    work->session->setAudioMix(std::move(mix));
+    work->session->exportAsynchronously([work] { finish(work); });
+}
+
+/// On the session's thread.
+void VKAudioMixUtility::finish(const std::shared_ptr<Export>& work)
+{
+    const base::System& system = work->platform.system;
+    const auto fail = [&](const char* text) {
+        system.log.console(text);
+        work->completion(std::nullopt, VKExtensions::_vkUserErrorForCode_userInfo(VKErrorExportFailed));
+    };
+    switch (work->session->status()) {
+    case ExportSession::Status::Cancelled:
+        fail("VKAudioMixUtility: MovieWriterStatusCancelled");
+        break;
+    case ExportSession::Status::Failed:
+        fail("VKAudioMixUtility: MovieWriterFailed");
+        break;
+    default:
+        work->completion(work->session->outputURL(), nullptr);
+    }
+    work->completion = nullptr;
+    system.mainQueue.post([work] {
+        work->session = nullptr;
+        work->asset = nullptr;
+    });
+}
+
+base::Url VKAudioMixUtility::tempFileURL(const platform::Platform& platform)
+{
+    const std::string stem =
+        support::tempMovieStem(VKExtensions::_srTempPath(platform.files), support::kMixedMovieName);
+    return support::tempMovieUrl(stem, platform.system.clock.date());
+}
