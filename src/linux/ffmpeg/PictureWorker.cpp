@@ -55,6 +55,7 @@ void PictureWorker::request(std::uint64_t generation, std::int64_t tick, bool pl
         const std::lock_guard lock(m_mutex);
         m_request = {generation, tick, plays};
         m_generation = generation;
+        m_dueTick = tick;
         m_queue.clear();
         m_exhausted = false;
     }
@@ -66,6 +67,7 @@ FrameRef PictureWorker::takeDue(std::int64_t tick)
     FrameRef due;
     {
         const std::lock_guard lock(m_mutex);
+        m_dueTick = std::max(m_dueTick, tick);
         while (!m_queue.empty() && m_queue.front()->pts() <= tick) {
             due = std::move(m_queue.front());
             m_queue.pop_front();
@@ -152,9 +154,16 @@ void PictureWorker::refine(VideoSource& source, const Request& request)
         m_arrived(request.generation, shown ? shown->frame : nullptr, What::Picture);
 }
 
+/// A picture that comes too late is queued all the same: a machine that is too slow for the movie shows what it can.
+/// But it is the only one; the next is what was due when it was begun.
 void PictureWorker::playOn(VideoSource& source, const Request& request)
 {
-    const auto shown = source.at(m_playedTo, VideoSource::Want::Full, [&] { return isOvertaken(request); });
+    std::int64_t tick = m_playedTo;
+    {
+        const std::lock_guard lock(m_mutex);
+        tick = std::max(tick, m_dueTick);
+    }
+    const auto shown = source.at(tick, VideoSource::Want::Full, [&] { return isOvertaken(request); });
     if (isOvertaken(request) || *m_cancelled)
         return;
     bool tells = false;

@@ -37,6 +37,7 @@ public:
     void play(std::uint64_t generation, std::int64_t tick);
 
     /// The latest queued picture at or before `tick`; it and those before it leave the queue. Null when there is none.
+    /// From now on pictures that are over by `tick` are not looked for: who is late goes straight to what is due.
     FrameRef takeDue(std::int64_t tick);
     /// When the next queued picture is due.
     std::optional<std::int64_t> nextDue() const;
@@ -69,7 +70,8 @@ private:
     std::atomic<std::uint64_t> m_generation{0};
     Request m_request;
     std::deque<FrameRef> m_queue;
-    bool m_exhausted = false; ///< no more pictures come to the queue
+    std::int64_t m_dueTick = 0; ///< what is played has come so far
+    bool m_exhausted = false;   ///< no more pictures come to the queue
 
     // The thread's own.
     std::uint64_t m_answered = 0;

@@ -88,7 +88,20 @@ TEST_F(Playback, PicturesThatAreLateAreDropped)
     clock.advance(200ms);
     mainQueue.drain();
     ASSERT_TRUE(waitFor([&] { return tests::numberIn(player->currentFrame()) == 6; }));
-    EXPECT_LE(changes, 3);
+    EXPECT_LE(changes, 3) << "one that was ready, one that was being decoded, and the one that is due";
+}
+
+TEST_F(Playback, WhoIsFarBehindGoesStraightToWhatIsDue)
+{
+    playFile("long-gop.mp4");
+    std::vector<int> shown;
+    player->setFrameHandler([&] { shown.push_back(tests::numberIn(player->currentFrame())); });
+    clock.advance(10s);
+    mainQueue.drain();
+    ASSERT_TRUE(waitFor([&] { return tests::numberIn(player->currentFrame()) == 600; }));
+    EXPECT_LE(shown.size(), 3u);
+    playOn(100ms);
+    EXPECT_EQ(shown.back(), 606) << "and goes on from there";
 }
 
 TEST_F(Playback, PlayBeforeTheItemIsReadyStartsWhenItIs)
