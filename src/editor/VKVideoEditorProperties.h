@@ -2,8 +2,11 @@
 /// the two atomic flags.
 #pragma once
 
+#include "base/SharedDictionary.h"
 #include "overlay/VKVideoOverlayButton.h"
 #include "platform/media/Asset.h"
+#include "platform/media/ExportSession.h"
+#include "platform/media/ImageGenerator.h"
 #include "platform/media/Player.h"
 #include "platform/media/PlayerItem.h"
 #include "platform/media/PlayerLayer.h"
@@ -20,6 +23,9 @@
 
 /// Activity types that the user completed, in order; the same one can stand there twice.
 using ActivityTypes = std::vector<std::string>;
+
+/// Pictures for the scrubber's strip by the timestamp that it asked for; written by the generator's thread.
+using ThumbnailCache = base::SharedDictionary<double, platform::ImageRef>;
 
 class VKVideoEditorProperties {
 public:
@@ -192,6 +198,24 @@ public:
     /// Where a trim writes its result.
     const std::optional<base::Url>& trimFilePath() const { return m_trimFilePath; }
     void setTrimFilePath(std::optional<base::Url> trimFilePath) { m_trimFilePath = std::move(trimFilePath); }
+    /// The running trim export, or the last one.
+    const std::shared_ptr<platform::ExportSession>& exportSession() const { return m_exportSession; }
+    void setExportSession(std::shared_ptr<platform::ExportSession> exportSession)
+    {
+        m_exportSession = std::move(exportSession);
+    }
+    /// Of the item's asset; null until the scrubber asks for a picture.
+    const std::shared_ptr<platform::ImageGenerator>& thumbnailGenerator() const { return m_thumbnailGenerator; }
+    void setThumbnailGenerator(std::shared_ptr<platform::ImageGenerator> thumbnailGenerator)
+    {
+        m_thumbnailGenerator = std::move(thumbnailGenerator);
+    }
+    /// All pictures that `thumbnailGenerator` made; null before the first was asked for.
+    const std::shared_ptr<ThumbnailCache>& cachedTimeStamps() const { return m_cachedTimeStamps; }
+    void setCachedTimeStamps(std::shared_ptr<ThumbnailCache> cachedTimeStamps)
+    {
+        m_cachedTimeStamps = std::move(cachedTimeStamps);
+    }
     /// Completed share activities, in order; handed on by reference.
     const std::shared_ptr<ActivityTypes>& activityTypes() const { return m_activityTypes; }
     void setActivityTypes(std::shared_ptr<ActivityTypes> activityTypes) { m_activityTypes = std::move(activityTypes); }
@@ -245,5 +269,8 @@ private:
     std::shared_ptr<VKVideoOverlayButton> m_videoOverlayPlayButton;
     std::shared_ptr<platform::Label> m_titleLabel;
     std::optional<base::Url> m_trimFilePath;
+    std::shared_ptr<platform::ExportSession> m_exportSession;
+    std::shared_ptr<platform::ImageGenerator> m_thumbnailGenerator;
+    std::shared_ptr<ThumbnailCache> m_cachedTimeStamps;
     std::shared_ptr<ActivityTypes> m_activityTypes;
 };

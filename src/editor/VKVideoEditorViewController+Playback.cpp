@@ -71,6 +71,7 @@ void VKVideoEditorViewController::observeValueForKeyPath_ofObject_change_context
     if (item->status() != PlayerItem::Status::ReadyToPlay || !item->duration().isNumeric() || currentItemLoaded())
         return;
     setCurrentItemLoaded(true);
+    dropThumbnails();
     avTrimmer()->setDelegate(self<VKVideoEditorViewController>());
     avTrimmer()->setDataSource(self<VKVideoEditorViewController>());
     setEditStartTime(0.0);
@@ -129,6 +130,7 @@ void VKVideoEditorViewController::refreshAVRotation()
     avPlayerLayer()->setFrame(view()->bounds());
     topToolBar()->setFrame(topToolBarFrame());
     bottomToolBar()->setFrame(bottomToolBarFrame());
+    dropThumbnails();
     avTrimmer()->reloadData();
 }
 

@@ -2,12 +2,12 @@
 
 #include "editor/VKVideoEditorViewController.h"
 
+#include "base/HandBack.h"
 #include "support/TempMovieNames.h"
 #include "support/VKFileManagerExtensions.h"
 
-#include <cmath>
-
 using platform::MovieScrubber;
+using runtime::Selector;
 
 namespace {
 
@@ -131,21 +131,50 @@ base::Url VKVideoEditorViewController::trimFileURL() const
                                  m_platform.system.clock.date());
 }
 
-base::Size VKVideoEditorViewController::getVideoSize() const
+void VKVideoEditorViewController::trimVideo()
 {
-    const auto item = avPlayer()->currentItem();
-    const auto tracks =
-        item ? item->asset()->tracksWithMediaType(platform::MediaType::Video) : std::vector<platform::AssetTrack>{};
-    if (tracks.empty())
-        return {};
-    const base::Size size = tracks.front().preferredTransform.apply(tracks.front().naturalSize);
-    return {std::abs(size.width), std::abs(size.height)};
+    // After an earlier trim this is the file that the export below reads. It stays readable: the player has it open.
+    if (trimFilePath())
+        VKExtensions::_srRemoveFile_completion(m_platform.files, *trimFilePath(), {});
+    setExporting(true);
+    setExportSession(m_platform.media.exportSessionWithAsset(m_platform.media.assetWithURL(videoURL()),
+                                                             platform::ExportPreset::HighestQuality));
+    setTrimFilePath(trimFileURL());
+    exportSession()->setOutputURL(trimFilePath());
+    exportSession()->setOutputFileType(platform::FileType::Mpeg4);
+    // The duration is the end itself, not its distance from the start: a late start runs past the end handle.
+    exportSession()->setTimeRange(base::MediaTimeRange{mediaTime(editStartTime()), mediaTime(editEndTime())});
+    // A session lives until it has told its end, so that the callback need not hold it, which would be a circle.
+    exportSession()->exportAsynchronously(
+        [self = base::handedBackTo(m_platform.system.mainQueue, this->self<VKVideoEditorViewController>()),
+         &session = *exportSession()] { self->exportEnded(session); });
 }
 
-double VKVideoEditorViewController::movieScrubberThumbnailAspectRatio(MovieScrubber& /*scrubber*/)
+void VKVideoEditorViewController::exportEnded(const platform::ExportSession& session)
 {
-    const base::Size size = getVideoSize();
-    return size.width > 0 && size.height > 0 ? size.width / size.height : 1.0;
+    // On the session's thread.
+    switch (session.status()) {
+    case platform::ExportSession::Status::Failed: {
+        const auto error = session.error();
+        m_platform.system.log.error("VQVideoEditorViewController: Export Trim Video Failed, due to error: "
+                                    + std::to_string(error ? error->code32() : 0));
+        break;
+    }
+    case platform::ExportSession::Status::Cancelled:
+        m_platform.system.log.error("VQVideoEditorViewController: Export Trim Video Cancelled");
+        break;
+    default:
+        m_platform.system.mainQueue.run([&] { showTrimmedMovie(session.outputURL()); });
+    }
+}
+
+void VKVideoEditorViewController::showTrimmedMovie(const std::optional<base::Url>& url)
+{
+    setExporting(false);
+    m_platform.notifications.removeObserver(*this);
+    reloadAVLayerWithURL(url);
+    m_platform.notifications.addObserver(self<runtime::Object>(), Selector("itemDidFinishPlaying:"),
+                                         platform::kPlayerItemDidPlayToEndNotification, avPlayerItem());
 }
 
 void VKVideoEditorViewController::seekBackward()

@@ -2,7 +2,7 @@
 /// activities the user completed. Main queue only.
 ///
 /// Split by concern: construction and lifecycle here and in the .cpp of this name, the two arrangements in +Layout,
-/// playing in +Playback, the scrubber and trim mode in +Trimming, finishing in +Finish.
+/// playing in +Playback, the scrubber and trim mode in +Trimming, its pictures in +Thumbnails, finishing in +Finish.
 #pragma once
 
 #include "editor/VKVideoEditorProperties.h"
@@ -98,17 +98,30 @@ public:
     std::vector<double> movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(platform::MovieScrubber& scrubber,
                                                                                  std::int32_t count, double start,
                                                                                  double end) override;
-    double movieScrubberThumbnailAspectRatio(platform::MovieScrubber& scrubber) override;
     void editMode();
     void previewMode();
+    /// Leaves trim mode, unless a trim is being exported.
     void undoAction();
+    /// Exports the chosen range into a new file, which then becomes the movie. The former trim, which may be the movie
+    /// being read, is removed first.
+    void trimVideo();
     /// A new place in the temporary store, named after the app and the second.
     base::Url trimFileURL() const;
+
+    // The strip's pictures.
+    double movieScrubberThumbnailAspectRatio(platform::MovieScrubber& scrubber) override;
+    void movieScrubber_requestThumbnailImageForTimestamp(platform::MovieScrubber& scrubber, double timestamp) override;
+    /// Hands the picture to the scrubber, on the main queue's next turn.
+    void setThumbnailFromCacheWithTimeStamp(double timestamp);
+    /// What a picture is fitted into, in pixels; the width carries the screen's scale twice.
+    base::Size getThumbnailSize() const;
     /// The upright size of the item's first video track; zero without one.
     base::Size getVideoSize() const;
 
     // Finishing.
     void doneAction();
+    /// Saves and finishes; in trim mode it applies the trim instead.
+    void saveAction();
 
     // Keys: what has no button of its own.
     void togglePlayback();
@@ -138,6 +151,12 @@ private:
     void buildPlayer();
     void observePlayerItem();
     void addPlayHeadObserver();
+    /// Any thread.
+    static void handThumbnailOver(base::MainQueue& mainQueue, const std::weak_ptr<VKVideoEditorViewController>& editor,
+                                  double timestamp);
+    void dropThumbnails();
+    void exportEnded(const platform::ExportSession& session);
+    void showTrimmedMovie(const std::optional<base::Url>& url);
     void layOutBars(const std::shared_ptr<platform::BarButtonItem>& playOrPause);
     void fadeChromeTo(double alpha);
     base::MediaTime mediaTime(double seconds) const;

@@ -40,12 +40,18 @@ protected:
     std::shared_ptr<FinishRecorder> delegate = std::make_shared<FinishRecorder>();
 
     void SetUp() override { makePlatform(tests::FakePlatform::kPhone); }
-    void TearDown() override
+    void TearDown() override { close(); }
+
+    void close()
     {
+        // An export that runs on keeps its editor.
+        if (const auto session = fake->media.exportSession(); session && session->isRunning())
+            session->finish(platform::ExportSession::Status::Cancelled);
         editor.reset();
         if (container)
             fake->window->setRootViewController(nullptr);
         container.reset();
+        fake->machine.drain();
     }
 
     void makePlatform(base::Size size)
