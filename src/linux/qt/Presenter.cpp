@@ -3,7 +3,9 @@
 #include "linux/qt/Mirror.h"
 #include "linux/qt/StageWindow.h"
 #include "linux/qt/accessibility/ViewAccessible.h"
+#include "linux/qt/accessibility/WorkAccessible.h"
 #include "linux/qt/items/Text.h"
+#include "linux/qt/items/WorkLine.h"
 
 #include <QGuiApplication>
 
@@ -21,6 +23,8 @@ Presenter::Presenter(std::shared_ptr<platform::Window> window, const base::Clock
     m_quickWindow->input().setCloseHandler([this] { closeRequested(); });
     m_mirror = std::make_unique<Mirror>(*m_window, m_quickWindow->root(), *m_stage, m_clock);
     m_announcer = std::make_unique<Announcer>();
+    m_workLine = std::make_unique<WorkLine>(*m_stage);
+    m_workLine->setParentItem(&m_quickWindow->root());
     m_window->setNeedsCommitHandler([this] {
         m_needsCommit = true;
         scheduleFrame();
@@ -35,6 +39,7 @@ Presenter::~Presenter()
     m_window->setNeedsCommitHandler({});
     m_quickWindow->hide();
     // The items go before the window that they are in.
+    m_workLine.reset();
     m_mirror.reset();
 }
 
@@ -89,6 +94,28 @@ void Presenter::hide()
     m_window->setVisible(false);
 }
 
+void Presenter::showWork(std::optional<double> progress)
+{
+    const bool begins = !m_workLine->isUnderWay();
+    m_workLine->begin(progress);
+    if (begins)
+        announceWorkBegun(*m_workLine);
+    else
+        announceWorkProgress(*m_workLine);
+    m_needsCommit = true;
+    scheduleFrame();
+}
+
+void Presenter::hideWork()
+{
+    if (!m_workLine->isUnderWay())
+        return;
+    m_workLine->end();
+    announceWorkEnded(*m_workLine);
+    m_needsCommit = true;
+    scheduleFrame();
+}
+
 void Presenter::commit()
 {
     takeScale();
@@ -136,6 +163,7 @@ void Presenter::mirrorTree()
     m_window->commit();
     m_animating = m_mirror->commit();
     m_quickWindow->root().setSize(m_quickWindow->contentItem()->size());
+    m_workLine->showIn(QRectF(QPointF(), m_quickWindow->root().size()));
     m_announcer->announce(*m_quickWindow);
 }
 

@@ -12,6 +12,7 @@
 
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 
 class QQuickWindow;
@@ -21,6 +22,7 @@ namespace qtui {
 class Announcer;
 class Mirror;
 class StageWindow;
+class WorkLine;
 struct Stage;
 struct Statistics;
 
@@ -47,6 +49,11 @@ public:
     void showFullScreen();
     void hide();
 
+    /// Tells the user that something is under way in the background, beside the views: a thin line, and a progress bar
+    /// for assistive technology. `progress` from 0 to 1, nothing when it is not known. May be said again.
+    void showWork(std::optional<double> progress);
+    void hideWork();
+
     /// Mirrors the tree now, instead of with the next picture. Does nothing when nothing has changed.
     void commit();
     /// Whether something was still on its way at the last commit: moving, growing or fading.
@@ -58,6 +65,7 @@ public:
     QQuickWindow& quickWindow();
     const Statistics& statistics() const;
     const Mirror& mirror() const;
+    WorkLine& workLine() { return *m_workLine; }
 
 private:
     friend class StageWindow;
@@ -77,6 +85,7 @@ private:
     std::unique_ptr<StageWindow> m_quickWindow;
     std::unique_ptr<Mirror> m_mirror;
     std::unique_ptr<Announcer> m_announcer;
+    std::unique_ptr<WorkLine> m_workLine;
     std::function<void()> m_closeHandler;
     std::function<void()> m_firstPictureHandler;
     bool m_schemeIsFixed = false;

@@ -29,6 +29,11 @@ const Mirror& StageWindow::mirror() const
     return m_presenter.mirror();
 }
 
+WorkLine& StageWindow::workLine() const
+{
+    return m_presenter.workLine();
+}
+
 QAccessibleInterface* StageWindow::accessibleRoot() const
 {
     return QAccessible::queryAccessibleInterface(const_cast<StageWindow*>(this));

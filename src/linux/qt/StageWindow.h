@@ -12,6 +12,7 @@ namespace qtui {
 
 class Mirror;
 class Presenter;
+class WorkLine;
 
 /// Where the items hang; tells when a picture is due.
 class RootItem final : public QQuickItem {
@@ -34,6 +35,7 @@ public:
     InputFeed& input() { return m_input; }
     platform::Window& views() const { return m_views; }
     const Mirror& mirror() const;
+    WorkLine& workLine() const;
 
     QAccessibleInterface* accessibleRoot() const override;
 

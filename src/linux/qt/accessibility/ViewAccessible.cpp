@@ -2,6 +2,8 @@
 
 #include "linux/qt/Mirror.h"
 #include "linux/qt/StageWindow.h"
+#include "linux/qt/accessibility/WorkAccessible.h"
+#include "linux/qt/items/WorkLine.h"
 #include "platform/views/MovieScrubber.h"
 
 #include <QAccessible>
@@ -221,11 +223,18 @@ public:
     QAccessibleInterface* child(int index) const override
     {
         const auto below = accessibleChildren(m_window.views());
-        if (index < 0 || index >= static_cast<int>(below.size()))
+        const int count = static_cast<int>(below.size());
+        if (index == count && m_window.workLine().isUnderWay())
+            return QAccessible::queryAccessibleInterface(&m_window.workLine());
+        if (index < 0 || index >= count)
             return nullptr;
         return interfaceFor(m_window, *below[static_cast<std::size_t>(index)]);
     }
-    int childCount() const override { return static_cast<int>(accessibleChildren(m_window.views()).size()); }
+    /// Behind the views comes what is under way, if anything is.
+    int childCount() const override
+    {
+        return static_cast<int>(accessibleChildren(m_window.views()).size()) + m_window.workLine().isUnderWay();
+    }
     int indexOfChild(const QAccessibleInterface* child) const override { return indexOf(*this, child); }
     QAccessibleInterface* childAt(int x, int y) const override { return deepestAt(*this, x, y); }
     QAccessibleInterface* focusChild() const override
@@ -258,6 +267,8 @@ QAccessibleInterface* makeInterface(const QString&, QObject* object)
         return new WindowAccessible(*window);
     if (auto* item = dynamic_cast<ViewItem*>(object))
         return new ViewAccessible(*item);
+    if (auto* line = dynamic_cast<WorkLine*>(object))
+        return makeWorkAccessible(*line);
     return nullptr;
 }
 

@@ -1,0 +1,104 @@
+#include "linux/qt/accessibility/WorkAccessible.h"
+
+#include "linux/qt/StageWindow.h"
+#include "linux/qt/items/WorkLine.h"
+
+#include <QAccessible>
+#include <QAccessibleValueInterface>
+
+#include <cmath>
+
+namespace qtui {
+
+namespace {
+
+int percentOf(const WorkLine& line)
+{
+    return static_cast<int>(std::lround(line.progress().value_or(0) * 100));
+}
+
+class WorkAccessible final : public QAccessibleInterface, public QAccessibleValueInterface {
+public:
+    explicit WorkAccessible(WorkLine& line) : m_line(line) {}
+
+    bool isValid() const override { return m_line.window() != nullptr; }
+    QObject* object() const override { return &m_line; }
+    QWindow* window() const override { return m_line.window(); }
+    QAccessibleInterface* parent() const override { return QAccessible::queryAccessibleInterface(window()); }
+    QAccessibleInterface* child(int /*index*/) const override { return nullptr; }
+    int childCount() const override { return 0; }
+    int indexOfChild(const QAccessibleInterface* /*child*/) const override { return -1; }
+    QAccessibleInterface* childAt(int /*x*/, int /*y*/) const override { return nullptr; }
+    QRect rect() const override
+    {
+        const QRect inWindow = m_line.windowRect().toAlignedRect();
+        return window() ? QRect(window()->mapToGlobal(inWindow.topLeft()), inWindow.size()) : inWindow;
+    }
+    QString text(QAccessible::Text kind) const override
+    {
+        if (kind == QAccessible::Name)
+            return QStringLiteral("Working on the movie");
+        if (kind == QAccessible::Value && m_line.progress())
+            return QStringLiteral("%1 %").arg(percentOf(m_line));
+        return {};
+    }
+    void setText(QAccessible::Text /*kind*/, const QString& /*text*/) override {}
+    QAccessible::Role role() const override { return QAccessible::ProgressBar; }
+    QAccessible::State state() const override
+    {
+        QAccessible::State state;
+        state.busy = m_line.isUnderWay();
+        state.invisible = !m_line.isUnderWay();
+        state.readOnly = true;
+        return state;
+    }
+    void* interface_cast(QAccessible::InterfaceType type) override
+    {
+        return type == QAccessible::ValueInterface ? static_cast<QAccessibleValueInterface*>(this) : nullptr;
+    }
+
+    QVariant currentValue() const override { return percentOf(m_line); }
+    void setCurrentValue(const QVariant& /*value*/) override {}
+    QVariant maximumValue() const override { return 100; }
+    QVariant minimumValue() const override { return 0; }
+    QVariant minimumStepSize() const override { return 1; }
+
+private:
+    WorkLine& m_line;
+};
+
+void tell(WorkLine& line, QAccessible::Event kind)
+{
+    if (!QAccessible::isActive())
+        return;
+    QAccessibleEvent event(&line, kind);
+    QAccessible::updateAccessibility(&event);
+}
+
+} // namespace
+
+QAccessibleInterface* makeWorkAccessible(WorkLine& line)
+{
+    return new WorkAccessible(line);
+}
+
+void announceWorkBegun(WorkLine& line)
+{
+    tell(line, QAccessible::ObjectShow);
+    tell(line, QAccessible::Alert);
+}
+
+void announceWorkProgress(WorkLine& line)
+{
+    if (!QAccessible::isActive())
+        return;
+    QAccessibleValueChangeEvent event(&line, percentOf(line));
+    QAccessible::updateAccessibility(&event);
+}
+
+void announceWorkEnded(WorkLine& line)
+{
+    tell(line, QAccessible::ObjectHide);
+}
+
+} // namespace qtui
