@@ -1,5 +1,7 @@
 #include "platform/views/MovieScrubber.h"
 
+#include "platform/views/Window.h"
+
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
@@ -10,6 +12,12 @@ namespace {
 
 /// More pictures than this in one strip tell nothing more, whatever the movie's shape.
 constexpr double kMostThumbnails = 200;
+/// How far, in points, a handle is put beyond the zoomed strip at most: out of sight is enough.
+constexpr double kOutOfSight = 60;
+/// Free above and below the pictures, so that the play head stands out of them; in points.
+constexpr double kTrackInset = 4;
+/// Over what is to be cut away.
+constexpr Color kShade{0, 0, 0, 0.62};
 
 std::string clockText(double seconds)
 {
@@ -24,7 +32,10 @@ std::string clockText(double seconds)
 
 } // namespace
 
-MovieScrubber::MovieScrubber() : Control({{0, 0}, {0, kHeight}}) {}
+MovieScrubber::MovieScrubber() : Control({{0, 0}, {0, kHeight}})
+{
+    setClipsToBounds(true);
+}
 
 const runtime::Class& MovieScrubber::classObject()
 {
@@ -47,6 +58,15 @@ void MovieScrubber::setEdgeInset(double points)
     setNeedsLayout();
 }
 
+void MovieScrubber::setEditable(bool editable)
+{
+    if (m_editable == editable)
+        return;
+    m_editable = editable;
+    setNeedsDisplay();
+    setNeedsLayout();
+}
+
 void MovieScrubber::setValue(double seconds)
 {
     double value = std::isfinite(seconds) ? std::max(0.0, seconds) : 0;
@@ -55,39 +75,48 @@ void MovieScrubber::setValue(double seconds)
     if (value == m_value)
         return;
     m_value = value;
-    setNeedsDisplay();
+    placePlayHead();
 }
 
-void MovieScrubber::setEditing_animated(bool editing, bool /*animated*/)
+void MovieScrubber::setEditing_animated(bool editing, bool animated)
 {
     if (m_editing == editing)
         return;
     m_editing = editing;
-    setNeedsDisplay();
+    if (!editing) {
+        letGo();
+        m_range = {0, m_duration};
+    }
+    if (animated)
+        placePartsAnimated();
+    else
+        placeParts();
 }
 
 void MovieScrubber::reloadData()
 {
     const auto keepAlive = shared_from_this();
+    // What is under the finger may be elsewhere afterwards.
+    letGo();
     const auto source = dataSource();
     const double duration = source ? source->movieScrubberDuration(*this) : 0;
     const double aspectRatio = source ? source->movieScrubberThumbnailAspectRatio(*this) : 1;
+    const double former = m_duration;
     m_duration = std::isfinite(duration) && duration > 0 ? duration : 0;
     m_aspectRatio = std::isfinite(aspectRatio) && aspectRatio > 0 ? aspectRatio : 1;
+    if (!m_editing || former != m_duration)
+        m_range = {0, m_duration};
+    m_visible = {0, m_duration};
     if (m_duration > 0)
         setValue(m_value);
     else
         endDrag();
     requestThumbnails(true);
+    placeParts();
     setNeedsDisplay();
 }
 
-void MovieScrubber::layoutSubviews()
-{
-    Control::layoutSubviews();
-    if (thumbnailCount() != m_thumbnailCount)
-        requestThumbnails(false);
-}
+// Pictures
 
 std::int32_t MovieScrubber::thumbnailCount() const
 {
@@ -104,11 +133,16 @@ void MovieScrubber::requestThumbnails(bool all)
     m_thumbnailCount = source ? thumbnailCount() : 0;
     m_timestamps.clear();
     if (m_thumbnailCount > 0)
-        m_timestamps =
-            source->movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(*this, m_thumbnailCount, 0, m_duration);
+        m_timestamps = source->movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(*this, m_thumbnailCount,
+                                                                                        m_visible.start, m_visible.end);
     std::erase_if(m_timestamps, [](double timestamp) { return !std::isfinite(timestamp); });
-    std::erase_if(m_thumbnails, [this](const auto& thumbnail) {
-        return std::find(m_timestamps.begin(), m_timestamps.end(), thumbnail.first) == m_timestamps.end();
+    if (!m_zoomed)
+        m_overview = m_timestamps;
+    const auto holds = [](const std::vector<double>& timestamps, double timestamp) {
+        return std::find(timestamps.begin(), timestamps.end(), timestamp) != timestamps.end();
+    };
+    std::erase_if(m_thumbnails, [&](const auto& thumbnail) {
+        return !holds(m_timestamps, thumbnail.first) && !holds(m_overview, thumbnail.first);
     });
     setNeedsDisplay();
     // Copies: a source that has a picture at hand answers before the request returns.
@@ -121,22 +155,40 @@ void MovieScrubber::requestThumbnails(bool all)
 
 void MovieScrubber::setThumbnailImage_forTimestamp(ImageRef image, double timestamp)
 {
-    if (!image || std::find(m_timestamps.begin(), m_timestamps.end(), timestamp) == m_timestamps.end())
+    const auto isOn = [timestamp](const std::vector<double>& timestamps) {
+        return std::find(timestamps.begin(), timestamps.end(), timestamp) != timestamps.end();
+    };
+    if (!image || (!isOn(m_timestamps) && !isOn(m_overview)))
         return;
     m_thumbnails[timestamp] = std::move(image);
     setNeedsDisplay();
 }
 
-base::Rect MovieScrubber::trackRect() const
+// Places
+
+base::Rect MovieScrubber::stripRect() const
 {
     const double width = std::max(0.0, bounds().width() - 2 * m_edgeInset);
     return base::Rect::make(m_edgeInset, 0, width, bounds().height());
 }
 
-double MovieScrubber::playHeadX() const
+base::Rect MovieScrubber::trackRect() const
+{
+    const base::Rect strip = stripRect();
+    const double grip = m_editable ? std::min(TrimFrameView::kGripWidth, strip.width() / 2) : 0;
+    return base::Rect::make(strip.minX() + grip, 0, strip.width() - 2 * grip, strip.height());
+}
+
+double MovieScrubber::xOf(double seconds) const
 {
     const base::Rect track = trackRect();
-    return track.minX() + (m_duration > 0 ? std::min(1.0, m_value / m_duration) * track.width() : 0);
+    const double shown = m_visible.end - m_visible.start;
+    return track.minX() + (shown > 0 ? (seconds - m_visible.start) / shown * track.width() : 0);
+}
+
+double MovieScrubber::playHeadX() const
+{
+    return xOf(std::min(m_value, m_duration));
 }
 
 double MovieScrubber::secondsAt(double x) const
@@ -144,7 +196,85 @@ double MovieScrubber::secondsAt(double x) const
     const base::Rect track = trackRect();
     if (track.isEmpty())
         return m_value;
-    return std::clamp((x - track.minX()) / track.width(), 0.0, 1.0) * m_duration;
+    const double part = std::clamp((x - track.minX()) / track.width(), 0.0, 1.0);
+    // Not start + part × length, which misses the end by a hair.
+    return part < 1 ? m_visible.start + part * (m_visible.end - m_visible.start) : m_visible.end;
+}
+
+void MovieScrubber::layoutSubviews()
+{
+    Control::layoutSubviews();
+    makeParts();
+    placeParts();
+    if (thumbnailCount() != m_thumbnailCount)
+        requestThumbnails(false);
+}
+
+void MovieScrubber::makeParts()
+{
+    if (m_playHead)
+        return;
+    m_shadeBefore = std::make_shared<View>();
+    m_shadeAfter = std::make_shared<View>();
+    for (const auto& shade : {m_shadeBefore, m_shadeAfter}) {
+        shade->setBackgroundColor(kShade);
+        shade->setAlpha(0);
+    }
+    m_frameView = std::make_shared<TrimFrameView>();
+    m_startHandle = std::make_shared<TrimHandleView>(ScrubberHandle::Start);
+    m_endHandle = std::make_shared<TrimHandleView>(ScrubberHandle::End);
+    m_playHead = std::make_shared<PlayHeadView>();
+    for (const std::shared_ptr<View>& part : std::initializer_list<std::shared_ptr<View>>{
+             m_shadeBefore, m_shadeAfter, m_frameView, m_startHandle, m_endHandle, m_playHead})
+        addSubview(part);
+}
+
+void MovieScrubber::placeParts()
+{
+    if (!m_playHead)
+        return;
+    const bool canTrim = m_editable && m_duration > 0 && !trackRect().isEmpty();
+    for (const std::shared_ptr<View>& part :
+         std::initializer_list<std::shared_ptr<View>>{m_frameView, m_startHandle, m_endHandle})
+        part->setHidden(!canTrim);
+
+    const base::Rect track = trackRect();
+    const double height = track.height();
+    const double grip = TrimFrameView::kGripWidth;
+    const double start = std::max(xOf(m_range.start), track.minX() - kOutOfSight);
+    const double end = std::min(xOf(m_range.end), track.maxX() + kOutOfSight);
+    m_frameView->setFrame(base::Rect::make(start - grip, 0, end - start + 2 * grip, height));
+    m_startHandle->setFrame(base::Rect::make(start - grip, 0, grip, height));
+    m_endHandle->setFrame(base::Rect::make(end, 0, grip, height));
+    const double pictures = std::max(0.0, height - 2 * kTrackInset);
+    m_shadeBefore->setFrame(base::Rect::make(track.minX(), kTrackInset, std::max(0.0, start - track.minX()), pictures));
+    m_shadeAfter->setFrame(base::Rect::make(end, kTrackInset, std::max(0.0, track.maxX() - end), pictures));
+    m_shadeBefore->setAlpha(m_editing ? 1 : 0);
+    m_shadeAfter->setAlpha(m_editing ? 1 : 0);
+    m_frameView->setEditing(m_editing);
+    m_frameView->setHeld(m_held);
+    placePlayHead();
+}
+
+void MovieScrubber::placePlayHead()
+{
+    if (!m_playHead)
+        return;
+    const double x = playHeadX();
+    const base::Rect track = trackRect();
+    // While a handle is held the picture is the handle's, and so is the play head's place.
+    const bool isElsewhere = m_held == ScrubberHandle::Start || m_held == ScrubberHandle::End;
+    m_playHead->setHidden(m_duration <= 0 || isElsewhere || x < track.minX() || x > track.maxX());
+    m_playHead->setHeld(m_held == ScrubberHandle::PlayHead);
+    m_playHead->setFrame(base::Rect::make(x - PlayHeadView::kWidth / 2, 0, PlayHeadView::kWidth, bounds().height()));
+}
+
+void MovieScrubber::placePartsAnimated()
+{
+    if (const auto itsWindow = window())
+        animate(itsWindow->mainQueue(), kFrameDuration, [this] { placeParts(); });
+    else
+        placeParts();
 }
 
 Accessibility MovieScrubber::accessibility() const
@@ -159,87 +289,6 @@ Accessibility MovieScrubber::accessibility() const
     description.number = m_value;
     description.step = std::min(1.0, m_duration / 10); // short movies have ten steps too
     return description;
-}
-
-void MovieScrubber::touchBegan(const Touch& touch)
-{
-    if (!isEnabled() || m_duration <= 0 || m_dragging)
-        return;
-    const auto keepAlive = shared_from_this();
-    m_draggingTouch = touch.id;
-    // A thumb that takes the play head moves it from where it is; elsewhere the play head comes to the finger.
-    const double away = playHeadX() - convertFromRoot(touch.position).x;
-    m_grabOffset = std::abs(away) <= kGrabDistance ? away : 0;
-    beginDrag();
-    touchMoved(touch);
-}
-
-void MovieScrubber::touchMoved(const Touch& touch)
-{
-    if (m_draggingTouch == touch.id)
-        dragTo(secondsAt(convertFromRoot(touch.position).x + m_grabOffset));
-}
-
-void MovieScrubber::touchEnded(const Touch& touch)
-{
-    if (m_draggingTouch != touch.id)
-        return;
-    const auto keepAlive = shared_from_this();
-    touchMoved(touch);
-    endDrag();
-}
-
-void MovieScrubber::touchCancelled(const Touch& touch)
-{
-    if (m_draggingTouch == touch.id)
-        endDrag();
-}
-
-void MovieScrubber::scrubTo(double seconds)
-{
-    if (!isEnabled() || m_duration <= 0 || !std::isfinite(seconds))
-        return;
-    const auto keepAlive = shared_from_this();
-    const bool isHeld = m_dragging;
-    if (!isHeld)
-        beginDrag();
-    dragTo(seconds);
-    if (!isHeld)
-        endDrag();
-}
-
-void MovieScrubber::beginDrag()
-{
-    m_dragging = true;
-    setHighlighted(true);
-    if (const auto told = delegate())
-        told->movieScrubberDidBeginScrubbing_withHandle(*this, static_cast<int>(ScrubberHandle::PlayHead));
-}
-
-void MovieScrubber::dragTo(double seconds)
-{
-    const auto keepAlive = shared_from_this();
-    const double previous = m_value;
-    if (!m_dragging || m_duration <= 0)
-        return;
-    setValue(seconds);
-    if (m_value == previous)
-        return;
-    if (const auto told = delegate())
-        told->movieScrubber_valueDidChange(*this, m_value);
-    sendActionsFor(kValueChanged);
-}
-
-void MovieScrubber::endDrag()
-{
-    if (!m_dragging)
-        return;
-    const auto keepAlive = shared_from_this();
-    m_dragging = false;
-    m_draggingTouch.reset();
-    setHighlighted(false);
-    if (const auto told = delegate())
-        told->movieScrubberDidEndScrubbing_withHandle(*this, static_cast<int>(ScrubberHandle::PlayHead));
 }
 
 } // namespace platform

@@ -121,6 +121,10 @@ public:
     virtual bool canBecomeFocused() const { return false; }
     /// What Return or Space does to a focused view, and "press" of assistive technology; false when nothing.
     virtual bool activate() { return false; }
+    /// What an arrow key does to a focused view, to the right if positive; false when nothing.
+    virtual bool adjust(int /*steps*/) { return false; }
+    /// What assistive technology wants a slider to say.
+    virtual void setNumber(double /*number*/) {}
     virtual Accessibility accessibility() const;
     void setAccessibilityLabel(std::string label);
     const std::string& accessibilityLabel() const { return m_accessibilityLabel; }

@@ -30,6 +30,9 @@ public:
     std::shared_ptr<Window> window() const override;
     std::shared_ptr<Responder> nextResponder() const override { return nullptr; }
 
+    /// For views that let time pass.
+    base::MainQueue& mainQueue() const { return m_mainQueue; }
+
     /// Its view fills the window.
     void setRootViewController(const std::shared_ptr<ViewController>& controller);
     std::shared_ptr<ViewController> rootViewController() const { return m_root; }

@@ -35,6 +35,16 @@ void collectFocusable(const std::shared_ptr<View>& view, std::vector<std::shared
         collectFocusable(below, found);
 }
 
+bool isArrow(Key key)
+{
+    return key == Key::Left || key == Key::Right;
+}
+
+bool concernsFocus(Key key)
+{
+    return key == Key::Return || key == Key::Space || isArrow(key);
+}
+
 bool matches(const KeyCommand& command, Key key, char character, bool control)
 {
     const auto lower = [](char each) { return std::tolower(static_cast<unsigned char>(each)); };
@@ -130,9 +140,10 @@ void Window::motion(MotionSubtype subtype)
 bool Window::keyDown(Key key, char character, bool control)
 {
     const auto keepAlive = shared_from_this();
-    if (const auto view = focusedView(); view && (key == Key::Return || key == Key::Space) && !control) {
+    if (const auto view = focusedView(); view && !control && concernsFocus(key)) {
         const auto reachable = focusableViews();
-        if (std::find(reachable.begin(), reachable.end(), view) != reachable.end() && view->activate())
+        if (std::find(reachable.begin(), reachable.end(), view) != reachable.end()
+            && (isArrow(key) ? view->adjust(key == Key::Right ? 1 : -1) : view->activate()))
             return true;
     }
     for (auto responder = firstResponder(); responder; responder = responder->nextResponder())

@@ -1,8 +1,4 @@
-#include "platform/views/MovieScrubber.h"
-
-#include "Fixture.h"
-
-#include <cmath>
+#include "ScrubberFixture.h"
 
 namespace {
 
@@ -10,65 +6,7 @@ using base::Rect;
 using platform::MovieScrubber;
 using testing::ElementsAre;
 using testing::IsEmpty;
-
-struct Movie final : platform::MovieScrubberDataSource, platform::MovieScrubberDelegate {
-    double movieScrubberDuration(MovieScrubber&) override { return duration; }
-    std::vector<double> movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(MovieScrubber&, std::int32_t count,
-                                                                                 double start, double end) override
-    {
-        std::vector<double> timestamps;
-        for (std::int32_t i = 0; i < count; ++i)
-            timestamps.push_back(start + (end - start) * i / count);
-        return timestamps;
-    }
-    double movieScrubberThumbnailAspectRatio(MovieScrubber&) override { return aspectRatio; }
-    void movieScrubber_requestThumbnailImageForTimestamp(MovieScrubber&, double timestamp) override
-    {
-        requested.push_back(timestamp);
-    }
-
-    void movieScrubber_valueDidChange(MovieScrubber&, double seconds) override { say("value", seconds); }
-    void movieScrubberDidBeginScrubbing_withHandle(MovieScrubber&, int handle) override
-    {
-        say("begin", handle);
-        if (onBegin)
-            onBegin();
-    }
-    void movieScrubberDidEndScrubbing_withHandle(MovieScrubber&, int handle) override { say("end", handle); }
-    void movieScrubber_editingStartValueDidChange(MovieScrubber&, double seconds) override { say("start", seconds); }
-    void movieScrubber_editingEndValueDidChange(MovieScrubber&, double seconds) override { say("finish", seconds); }
-    void movieScrubberDidBeginEditing(MovieScrubber&) override { said.emplace_back("editing"); }
-    void movieScrubberDidCancelEditing(MovieScrubber&) override { said.emplace_back("cancelled"); }
-
-    void say(const std::string& what, double number)
-    {
-        said.push_back(what + " " + std::to_string(std::lround(number)));
-    }
-
-    double duration = 30;
-    double aspectRatio = 0.5;
-    std::vector<double> requested;
-    std::vector<std::string> said;
-    std::function<void()> onBegin;
-};
-
-struct Scrubbers : tests::WindowFixture {
-    std::shared_ptr<Movie> movie = std::make_shared<Movie>();
-    std::shared_ptr<MovieScrubber> scrubber = std::make_shared<MovieScrubber>();
-
-    Scrubbers()
-    {
-        scrubber->setFrame(Rect::make(0, 100, 320, 38));
-        scrubber->setEdgeInset(10);
-        scrubber->setDataSource(movie);
-        scrubber->setDelegate(movie);
-        window->addSubview(scrubber);
-    }
-    static platform::ImageRef picture()
-    {
-        return std::make_shared<const platform::Image>(platform::Bitmap::transparent(1, 1), 1.0);
-    }
-};
+using tests::Scrubbers;
 
 TEST_F(Scrubbers, ThePlayHeadStandsInProportionOnTheTrack)
 {
@@ -235,14 +173,6 @@ TEST_F(Scrubbers, IsASliderToAssistiveTechnology)
     movie->duration = 3700;
     scrubber->reloadData();
     EXPECT_EQ(scrubber->accessibility().value, "0:05 of 1:01:40");
-}
-
-TEST_F(Scrubbers, EditingIsAState)
-{
-    EXPECT_FALSE(scrubber->isEditing());
-    scrubber->setEditing_animated(true, true);
-    EXPECT_TRUE(scrubber->isEditing());
-    EXPECT_THAT(movie->said, IsEmpty());
 }
 
 } // namespace
