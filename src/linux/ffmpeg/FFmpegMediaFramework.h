@@ -23,6 +23,8 @@ struct Options {
     std::function<std::string(const std::string&)> resolvePath;
     /// The device that is heard. Empty plays silently, by the system's clock.
     MakeAudioOutput audioOutput;
+    /// By how much the threads that make images stand back: 10 lets a player beside them go first.
+    int imageNiceness = 0;
 };
 
 class FFmpegMediaFramework final : public platform::MediaFramework {
