@@ -3,6 +3,7 @@
 #include "app/host/CommandLine.h"
 #include "app/host/OpenMovie.h"
 #include "app/host/ServeRecorders.h"
+#include "app/host/StartMediaProgram.h"
 #include "app/host/TakeTour.h"
 #include "app/host/TerminationSignals.h"
 
@@ -10,6 +11,7 @@
 
 #include <cstdio>
 #include <string>
+#include <type_traits>
 #include <vector>
 
 namespace {
@@ -52,5 +54,12 @@ int main(int argc, char* argv[])
     }
     host::blockTerminationSignals();
     const QCoreApplication application(argc, argv);
-    return std::visit([](const auto& chosen) { return run(chosen); }, command.value());
+    return std::visit(
+        [argv](const auto& chosen) {
+            if constexpr (std::is_same_v<decltype(chosen), const host::MediaCommand&>)
+                return host::startMediaProgram(argv);
+            else
+                return run(chosen);
+        },
+        command.value());
 }

@@ -1,11 +1,9 @@
 #include "app/host/CommandLine.h"
 
-#include "app/host/RequestText.h"
+#include "app/host/Words.h"
 
 #include <algorithm>
-#include <charconv>
-#include <cstdint>
-#include <limits>
+#include <iterator>
 
 namespace host {
 
@@ -15,6 +13,8 @@ const char* const kHelpText = R"(Clipsa looks at, trims, saves and shares a scre
   clipsa service                serve recorders on the session bus, as org.clipsa.Clipsa
   clipsa tour MOVIE --output DIR [OPTION…]
                                 open MOVIE without a screen, and leave a picture of each step in DIR
+  clipsa thumbnails MOVIE -n N -o DIR [--size WxH] [--force]
+                                leave N pictures of MOVIE, evenly spaced, in DIR
   clipsa --help, --version
 
 Options of open, and of tour:
@@ -29,75 +29,12 @@ Options of open, and of tour:
   --json                    print one JSON object in place of lines
 
 MOVIE is never changed: the editor gets a name of its own for it, or a copy.
-Exit status: 0 the user has finished; 1 it could not be done; 2 a wrong option or file; 3 the editor ended early.
+Exit status: 0 done; 1 it could not be done; 2 a wrong option or file; 3 the editor ended early.
 )";
 
 const char* const kVersionText = "clipsa " CLIPSA_VERSION "\n";
 
 namespace {
-
-base::ErrorRef usageError(const std::string& text)
-{
-    return base::Error::make("org.clipsa.usage", 2, text + " (see clipsa --help)");
-}
-
-/// The words one by one; `--name=value` is the same as `--name value`, and nothing after `--` is an option.
-class Words {
-public:
-    explicit Words(const std::vector<std::string>& words, std::size_t first) : m_words(words), m_next(first) {}
-
-    /// False at the end.
-    bool advance()
-    {
-        m_value.reset();
-        if (m_next >= m_words.size())
-            return false;
-        m_word = m_words[m_next++];
-        if (!m_onlyPlain && m_word == "--") {
-            m_onlyPlain = true;
-            return advance();
-        }
-        m_isOption = !m_onlyPlain && m_word.size() > 1 && m_word.front() == '-';
-        const std::size_t equals = m_word.find('=');
-        if (m_isOption && equals != std::string::npos) {
-            m_value = m_word.substr(equals + 1);
-            m_word.resize(equals);
-        }
-        return true;
-    }
-
-    bool isOption() const { return m_isOption; }
-    const std::string& word() const { return m_word; }
-    bool hasOwnValue() const { return m_value.has_value(); }
-
-    base::Result<std::string> value()
-    {
-        if (!m_value && m_next < m_words.size())
-            m_value = m_words[m_next++];
-        if (!m_value)
-            return usageError(m_word + " needs a value");
-        if (const auto checked = checkText(*m_value, "the value of " + m_word); !checked)
-            return checked.error();
-        return *m_value;
-    }
-
-private:
-    const std::vector<std::string>& m_words;
-    std::size_t m_next;
-    bool m_onlyPlain = false;
-    bool m_isOption = false;
-    std::string m_word;
-    std::optional<std::string> m_value;
-};
-
-std::optional<std::int32_t> wholeNumber(const std::string& text)
-{
-    std::int32_t number = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
-    if (error != std::errc() || end != text.data() + text.size() || number < 0)
-        return std::nullopt;
-    return number;
-}
 
 base::Result<void> takeEditorOption(OpenCommand& command, const std::string& option, const std::string& value)
 {
@@ -153,7 +90,7 @@ base::Result<std::optional<TourCommand>> parseMovieCommand(Words words, bool isT
     std::string& movie = command.open.movie;
     while (words.advance()) {
         if (words.isOption()) {
-            if (words.word() == "--help" || words.word() == "-h")
+            if (words.isHelp())
                 return std::optional<TourCommand>();
             if (isTour && words.word() == "--output") {
                 const auto value = words.value();
@@ -198,6 +135,14 @@ base::Result<Command> parseTour(Words words)
     return Command(std::move(*command.value()));
 }
 
+base::Result<Command> parseMedia(const std::vector<std::string>& words)
+{
+    auto command = parseMediaCommand(words);
+    if (!command)
+        return command.error();
+    return command.value() ? Command(std::move(*command.value())) : Command(HelpCommand{});
+}
+
 base::Result<Command> parseService(Words words)
 {
     ServiceCommand command;
@@ -234,6 +179,8 @@ base::Result<Command> parseCommandLine(const std::vector<std::string>& words)
         return parseTour(Words(words, 1));
     if (first == "service")
         return parseService(Words(words, 1));
+    if (isMediaCommand(first))
+        return parseMedia(words);
     return usageError("there is no command " + first);
 }
 

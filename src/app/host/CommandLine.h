@@ -1,6 +1,7 @@
 /// What the words on the command line of `clipsa` say; nothing is opened or done yet. Any thread.
 #pragma once
 
+#include "app/host/MediaCommandLine.h"
 #include "base/Result.h"
 #include "platform/views/Color.h"
 
@@ -37,7 +38,7 @@ struct ServiceCommand {
 struct HelpCommand {};
 struct VersionCommand {};
 
-using Command = std::variant<OpenCommand, TourCommand, ServiceCommand, HelpCommand, VersionCommand>;
+using Command = std::variant<OpenCommand, TourCommand, ServiceCommand, MediaCommand, HelpCommand, VersionCommand>;
 
 /// `words` without the program's name. The error is one line that says which word is wrong and what to do.
 base::Result<Command> parseCommandLine(const std::vector<std::string>& words);

@@ -1,0 +1,34 @@
+// What `clipsa` becomes for the commands that need the media engine and no window; takes the same words.
+
+#include "app/host/CommandLine.h"
+#include "app/host/MakeThumbnails.h"
+#include "app/host/OpenMovie.h"
+
+#include <cstdio>
+#include <string>
+#include <variant>
+#include <vector>
+
+namespace {
+
+int run(const host::ThumbnailsCommand& command)
+{
+    return host::makeThumbnails(command);
+}
+
+} // namespace
+
+int main(int argc, char* argv[])
+{
+    const auto command = host::parseCommandLine(std::vector<std::string>(argv + 1, argv + argc));
+    if (!command) {
+        std::fprintf(stderr, "clipsa: %s\n", command.error()->description().c_str());
+        return host::kExitUsage;
+    }
+    const auto* chosen = std::get_if<host::MediaCommand>(&command.value());
+    if (!chosen) {
+        std::fputs("clipsa-media: give this to clipsa\n", stderr);
+        return host::kExitUsage;
+    }
+    return std::visit([](const auto& each) { return run(each); }, *chosen);
+}

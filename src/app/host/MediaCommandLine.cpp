@@ -1,0 +1,116 @@
+#include "app/host/MediaCommandLine.h"
+
+#include <utility>
+
+namespace host {
+
+namespace {
+
+constexpr int kMostThumbnails = 10'000;
+constexpr int kLargestSide = 16'384; ///< pixels
+
+base::Result<void> takeMovie(std::string& movie, const std::string& word)
+{
+    if (!movie.empty())
+        return usageError("one movie at a time: both " + movie + " and " + word + " are given");
+    if (word.empty())
+        return usageError("the movie's name is empty");
+    movie = word;
+    return {};
+}
+
+base::Result<void> takeFlag(bool& flag, const Words& words)
+{
+    if (words.hasOwnValue())
+        return usageError(words.word() + " takes no value");
+    flag = true;
+    return {};
+}
+
+/// "320x180".
+std::optional<base::Size> sizeIn(const std::string& text)
+{
+    const std::size_t cross = text.find('x');
+    if (cross == std::string::npos)
+        return std::nullopt;
+    const auto width = wholeNumber(text.substr(0, cross));
+    const auto height = wholeNumber(text.substr(cross + 1));
+    if (!width || !height || *width < 1 || *height < 1 || *width > kLargestSide || *height > kLargestSide)
+        return std::nullopt;
+    return base::Size{double(*width), double(*height)};
+}
+
+base::Result<void> takeThumbnailsOption(ThumbnailsCommand& command, Words& words)
+{
+    const std::string option = words.word();
+    if (option == "--force")
+        return takeFlag(command.force, words);
+    if (option != "-n" && option != "--count" && option != "-o" && option != "--output" && option != "--size")
+        return usageError("thumbnails has no option " + option);
+    const auto value = words.value();
+    if (!value)
+        return value.error();
+    if (option == "-n" || option == "--count") {
+        command.count = wholeNumber(value.value()).value_or(0);
+        if (command.count < 1 || command.count > kMostThumbnails)
+            return usageError(option + " is a number from 1 to " + std::to_string(kMostThumbnails) + ", not \""
+                              + value.value() + "\"");
+    } else if (option == "--size") {
+        const auto size = sizeIn(value.value());
+        if (!size)
+            return usageError("--size is a width and a height like 320x180, not \"" + value.value() + "\"");
+        command.size = *size;
+    } else {
+        command.output = value.value();
+    }
+    return {};
+}
+
+base::Result<std::optional<MediaCommand>> parseThumbnails(Words words)
+{
+    ThumbnailsCommand command;
+    while (words.advance()) {
+        if (words.isHelp())
+            return std::optional<MediaCommand>();
+        const auto taken =
+            words.isOption() ? takeThumbnailsOption(command, words) : takeMovie(command.movie, words.word());
+        if (!taken)
+            return taken.error();
+    }
+    if (command.movie.empty())
+        return usageError("thumbnails needs a movie");
+    if (command.count == 0)
+        return usageError("thumbnails needs -n N, how many");
+    if (command.output.empty())
+        return usageError("thumbnails needs -o DIR, for its pictures");
+    return std::optional<MediaCommand>(std::move(command));
+}
+
+struct Parser {
+    const char* name;
+    base::Result<std::optional<MediaCommand>> (*parse)(Words words);
+};
+
+constexpr Parser kParsers[] = {{"thumbnails", parseThumbnails}};
+
+const Parser* parserOf(const std::string& name)
+{
+    for (const Parser& each : kParsers)
+        if (name == each.name)
+            return &each;
+    return nullptr;
+}
+
+} // namespace
+
+bool isMediaCommand(const std::string& name)
+{
+    return parserOf(name) != nullptr;
+}
+
+base::Result<std::optional<MediaCommand>> parseMediaCommand(const std::vector<std::string>& words)
+{
+    return parserOf(words.front())->parse(Words(words, 1));
+}
+
+} // namespace host

@@ -1,0 +1,30 @@
+/// What the words of the commands say that need no window, only the media engine. Any thread.
+#pragma once
+
+#include "app/host/Words.h"
+#include "base/Geometry.h"
+
+#include <optional>
+#include <string>
+#include <variant>
+#include <vector>
+
+namespace host {
+
+struct ThumbnailsCommand {
+    std::string movie;
+    int count = 0;      ///< at least 1
+    std::string output; ///< the directory for the pictures
+    base::Size size;    ///< pixels that they are fitted into; zero: as large as they are
+    bool force = false; ///< replaces files that are there
+};
+
+using MediaCommand = std::variant<ThumbnailsCommand>;
+
+/// Whether `name` is one of these commands.
+bool isMediaCommand(const std::string& name);
+
+/// `words` with the command's name in front, which is one of these. Nothing when they ask for help.
+base::Result<std::optional<MediaCommand>> parseMediaCommand(const std::vector<std::string>& words);
+
+} // namespace host

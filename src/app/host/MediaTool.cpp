@@ -1,0 +1,144 @@
+#include "app/host/MediaTool.h"
+
+#include "app/host/InputFile.h"
+#include "app/host/OpenMovie.h"
+#include "linux/dbus/EditRequest.h"
+#include "linux/ffmpeg/FFmpegMediaFramework.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <chrono>
+#include <csignal>
+#include <cstdint>
+#include <cstdio>
+#include <filesystem>
+#include <optional>
+#include <poll.h>
+#include <sys/eventfd.h>
+#include <sys/signalfd.h>
+
+namespace host {
+
+namespace {
+
+constexpr base::Instant kMeanwhile = std::chrono::milliseconds(100);
+
+/// The signals as something to poll for; from its beginning on they end nothing by themselves.
+dbus::FileDescriptor openSignals()
+{
+    sigset_t signals;
+    ::sigemptyset(&signals);
+    for (const int number : {SIGINT, SIGTERM, SIGHUP})
+        ::sigaddset(&signals, number);
+    ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
+    return dbus::FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
+}
+
+/// For ppoll(), rounded up: who is woken too early would spin.
+int milliseconds(base::Instant time)
+{
+    const auto rounded = std::chrono::ceil<std::chrono::milliseconds>(time).count();
+    return static_cast<int>(std::clamp<std::int64_t>(rounded, 0, 60'000));
+}
+
+} // namespace
+
+struct MediaTool::Machine {
+    dbus::FileDescriptor signals = openSignals();
+    dbus::FileDescriptor woken{::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)};
+    int interruption = 0;
+
+    base::SystemClock clock;
+    base::MemoryLog log;
+    base::MainQueue mainQueue{clock, [this] { ::eventfd_write(woken.get(), 1); }};
+    base::WorkerQueue background;
+    base::WorkerQueue standard;
+    base::System system{log, clock, mainQueue, background, standard};
+    runtime::NotificationCenter center;
+    ffmpeg::FFmpegMediaFramework media{system, center, {}};
+
+    void wait(std::optional<base::Instant> limit)
+    {
+        pollfd inputs[] = {{woken.get(), POLLIN, 0}, {signals.get(), POLLIN, 0}};
+        if (::poll(inputs, std::size(inputs), limit ? milliseconds(*limit) : -1) <= 0)
+            return;
+        eventfd_t ignored = 0;
+        ::eventfd_read(woken.get(), &ignored);
+        signalfd_siginfo information = {};
+        if (::read(signals.get(), &information, sizeof information) == sizeof information)
+            interruption = static_cast<int>(information.ssi_signo);
+    }
+};
+
+MediaTool::MediaTool() : m_machine(std::make_unique<Machine>()) {}
+
+MediaTool::~MediaTool() = default;
+
+const base::System& MediaTool::system() const
+{
+    return m_machine->system;
+}
+
+platform::MediaFramework& MediaTool::media()
+{
+    return m_machine->media;
+}
+
+const base::MemoryLog& MediaTool::log() const
+{
+    return m_machine->log;
+}
+
+base::Result<std::shared_ptr<platform::Asset>> MediaTool::open(const std::string& path)
+{
+    // Looked at first, because the words for what is no file are better there.
+    if (const auto file = openInput(path, Emptiness::Refused); !file)
+        return file.error();
+    std::error_code error;
+    const std::string whole = std::filesystem::absolute(path, error).native();
+    const auto asset = m_machine->media.assetWithURL(base::Url::fromPath(error ? path : whole));
+    bool loaded = false;
+    asset->whenLoaded([&loaded] { loaded = true; });
+    if (!runUntil([&] { return loaded; }))
+        return base::Error::fromErrno(ECANCELED, "cannot open " + path);
+    if (asset->error())
+        return asset->error();
+    return asset;
+}
+
+bool MediaTool::runUntil(const std::function<bool()>& done, const std::function<void()>& meanwhile)
+{
+    Machine& machine = *m_machine;
+    base::Instant next = machine.clock.now();
+    while (machine.interruption == 0) {
+        machine.mainQueue.runDue();
+        if (done())
+            return true;
+        std::optional<base::Instant> limit = machine.mainQueue.untilNext();
+        if (meanwhile) {
+            if (const base::Instant now = machine.clock.now(); now >= next) {
+                meanwhile();
+                next = now + kMeanwhile;
+            }
+            const base::Instant left = next - machine.clock.now();
+            limit = limit ? std::min(*limit, left) : left;
+        }
+        machine.wait(limit);
+    }
+    return false;
+}
+
+int MediaTool::interruption() const
+{
+    return m_machine->interruption;
+}
+
+int MediaTool::fail(const base::ErrorRef& error) const
+{
+    if (m_machine->interruption != 0)
+        return 128 + m_machine->interruption;
+    std::fprintf(stderr, "clipsa: %s\n", error->description().c_str());
+    return error->domain() == dbus::kBadInputDomain ? kExitUsage : kExitFailed;
+}
+
+} // namespace host
