@@ -1,0 +1,44 @@
+/// One change of the library: takes hold of the movies that are asked for, then puts all of them into the library, or
+/// none. One thread.
+#pragma once
+
+#include "linux/photos/FileDescriptor.h"
+#include "linux/photos/LibraryDirectory.h"
+#include "linux/photos/VideoLibrary.h"
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace photos {
+
+class VideoLibrary::Transaction final : public platform::PhotoLibraryChange {
+public:
+    Transaction(const LibraryOptions& options, base::Work& work) : m_options(options), m_work(work) {}
+
+    /// Opens the movie at once: it may lose its name before it is copied.
+    void createAssetFromVideoAtFileURL(const std::optional<base::Url>& url) override;
+
+    /// Gives the paths of the new files. Once, after the change block.
+    base::Result<std::vector<std::string>> commit();
+
+private:
+    struct Source {
+        std::string path;
+        FileDescriptor file;
+        std::uint64_t size = 0; ///< bytes
+        base::Date date;        ///< of the recording
+        LibraryName name;
+    };
+
+    base::Result<Source> open(const std::optional<base::Url>& url) const;
+    base::Result<NewFile> copy(const Source& source, const LibraryDirectory& directory, double done) const;
+    base::ErrorRef explained(const base::ErrorRef& error, const Source& source) const;
+
+    const LibraryOptions& m_options;
+    base::Work& m_work;
+    std::vector<Source> m_sources;
+    base::ErrorRef m_error; ///< the first
+};
+
+} // namespace photos

@@ -1,0 +1,79 @@
+// What recordings are called in the library.
+
+#include "linux/photos/LibraryFixture.h"
+#include "linux/photos/LibraryName.h"
+
+namespace {
+
+using photos::fileNameSafe;
+using photos::libraryName;
+
+const base::Date kDate = tests::localDate(2026, 11, 21, 15, 4, 5);
+
+std::string nameOf(const std::string& app, const std::string& path = "/a/movie.mp4")
+{
+    return libraryName(app, kDate, path).numbered(1);
+}
+
+TEST(ALibraryName, IsTheAppAndTheDateInLocalTime)
+{
+    EXPECT_EQ(nameOf("Tux Racer"), "Tux Racer 2026-11-21 15-04-05.mp4");
+    EXPECT_EQ(libraryName("Tux Racer", kDate, "a.mp4").numbered(2), "Tux Racer 2026-11-21 15-04-05 (2).mp4");
+    EXPECT_EQ(libraryName("Tux Racer", kDate, "a.mp4").numbered(10), "Tux Racer 2026-11-21 15-04-05 (10).mp4");
+    EXPECT_EQ(libraryName("A", {kDate.secondsSince1970 + 0.999}, "a").numbered(1), "A 2026-11-21 15-04-05.mp4");
+}
+
+TEST(ALibraryName, HasTheExtensionOfTheMovieIfThatIsOne)
+{
+    EXPECT_EQ(libraryName("A", kDate, "/a/b.webm").extension, ".webm");
+    EXPECT_EQ(libraryName("A", kDate, "/a/b.MKV").extension, ".mkv");
+    EXPECT_EQ(libraryName("A", kDate, "/a/b").extension, ".mp4");
+    EXPECT_EQ(libraryName("A", kDate, "/a.webm/b").extension, ".mp4");
+    EXPECT_EQ(libraryName("A", kDate, "/a/.hidden").extension, ".mp4");
+    EXPECT_EQ(libraryName("A", kDate, "/a/b.").extension, ".mp4");
+    EXPECT_EQ(libraryName("A", kDate, "/a/b.a\nb").extension, ".mp4");
+    EXPECT_EQ(libraryName("A", kDate, "/a/version 2.final cut").extension, ".mp4");
+}
+
+TEST(ALibraryName, IsSafeOnEveryFileSystem)
+{
+    EXPECT_EQ(fileNameSafe("AC/DC: Live"), "AC-DC- Live");
+    EXPECT_EQ(fileNameSafe("a\\b*c?d\"e<f>g|h"), "a-b-c-d-e-f-g-h");
+    EXPECT_EQ(fileNameSafe("../../etc/passwd"), "etc-passwd");
+    EXPECT_EQ(fileNameSafe("a\nb\tc  d "), "a b c d");
+    EXPECT_EQ(fileNameSafe(std::string("a\0b\x1b[1m", 7)), "a\uFFFDb[1m");
+    EXPECT_EQ(fileNameSafe(".hidden"), "hidden");
+    EXPECT_EQ(fileNameSafe("--option"), "option");
+    EXPECT_EQ(fileNameSafe("gpj.\xE2\x80\xAEtxt"), "gpj.txt") << "nothing turns the text around";
+}
+
+TEST(ALibraryName, KeepsWhatOtherLanguagesNeed)
+{
+    EXPECT_EQ(fileNameSafe("Überflieger 2"), "Überflieger 2");
+    EXPECT_EQ(fileNameSafe("東方"), "東方");
+    EXPECT_EQ(fileNameSafe("می\u200Cخواهم"), "می\u200Cخواهم");
+}
+
+TEST(ALibraryName, IsThereEvenIfTheAppHasNone)
+{
+    for (const char* nothing : {"", " ", "...", "/", "\n", "\u202E"})
+        EXPECT_EQ(fileNameSafe(nothing), "Recording") << nothing;
+}
+
+TEST(ALibraryName, IsTextEvenIfTheAppsIsNot)
+{
+    EXPECT_EQ(fileNameSafe("a\xFFz"), "a\uFFFDz");
+}
+
+TEST(ALibraryName, IsCutBetweenLettersWhenItIsTooLong)
+{
+    std::string letters;
+    for (int i = 0; i < 200; ++i)
+        letters += "ü";
+    EXPECT_EQ(fileNameSafe("a" + letters), "a" + letters.substr(0, 94));
+    EXPECT_EQ(fileNameSafe(letters), letters.substr(0, 96));
+    EXPECT_EQ(fileNameSafe(std::string(95, 'a') + " bcd"), std::string(95, 'a')) << "no space is left at its end";
+    EXPECT_LE(libraryName(letters, kDate, "a.webm").numbered(9999).size(), 143U) << "for encrypted directories";
+}
+
+} // namespace

@@ -1,0 +1,285 @@
+// How a movie gets into the library: under which name, with which date, in which ways, and beside whom.
+
+#include "linux/photos/LibraryFixture.h"
+#include "support/RefusedSystemCalls.h"
+
+#include <future>
+#include <set>
+#include <sys/file.h>
+#include <thread>
+
+namespace {
+
+using testing::Each;
+using testing::ElementsAre;
+using testing::IsEmpty;
+using tests::namesIn;
+using tests::PrivateDirectory;
+using tests::RefusedSystemCall;
+namespace fs = std::filesystem;
+
+class TheVideoLibrary : public tests::LibraryFixture {};
+
+TEST_F(TheVideoLibrary, NamesAMovieAfterItsAppAndDate)
+{
+    const auto outcome = save();
+    EXPECT_TRUE(outcome.success) << outcome.text();
+    EXPECT_EQ(outcome.completions, 1);
+    EXPECT_THAT(namesIn(videos), ElementsAre(name));
+    EXPECT_THAT(published, ElementsAre(videos / name));
+    EXPECT_THAT(errors(), IsEmpty());
+}
+
+TEST_F(TheVideoLibrary, HoldsTheWholeMovieAndLeavesTheRecordingAsItWas)
+{
+    const double before = tests::modified(source);
+    ASSERT_TRUE(save().success);
+    EXPECT_TRUE(tests::holds(videos / name, bytes));
+    EXPECT_TRUE(tests::holds(source, bytes));
+    EXPECT_EQ(tests::modified(source), before);
+    // A second name of the same file would change whenever the first one is written to.
+    EXPECT_EQ(fs::hard_link_count(videos / name), 1U);
+}
+
+TEST_F(TheVideoLibrary, KeepsTheDateOfTheRecording)
+{
+    recording.date = base::Date{1'500'000'000.25};
+    ASSERT_TRUE(save().success);
+    EXPECT_EQ(tests::modified(published.front()), 1'500'000'000.25);
+}
+
+TEST_F(TheVideoLibrary, TakesTheDateOfTheFileForWantOfABetterOne)
+{
+    recording = {};
+    const auto date = tests::localDate(2025, 1, 2, 3, 4, 5);
+    const timespec times[] = {{0, UTIME_OMIT}, {static_cast<std::time_t>(date.secondsSince1970), 500'000'000}};
+    ASSERT_EQ(::utimensat(AT_FDCWD, source.c_str(), times, 0), 0);
+    ASSERT_TRUE(save().success);
+    EXPECT_THAT(namesIn(videos), ElementsAre("Recording 2025-01-02 03-04-05.mp4"));
+    EXPECT_EQ(tests::modified(published.front()), date.secondsSince1970 + 0.5);
+}
+
+TEST_F(TheVideoLibrary, NeverReplacesAFile)
+{
+    home.write("Videos/" + name, "mine");
+    fs::create_symlink("nowhere", videos / "Tux Racer 2026-11-21 15-04-05 (2).mp4");
+    ASSERT_TRUE(save().success);
+    ASSERT_TRUE(save().success);
+    EXPECT_THAT(namesIn(videos),
+                ElementsAre("Tux Racer 2026-11-21 15-04-05 (2).mp4", "Tux Racer 2026-11-21 15-04-05 (3).mp4",
+                            "Tux Racer 2026-11-21 15-04-05 (4).mp4", name));
+    EXPECT_EQ(PrivateDirectory::read(videos / name), "mine");
+    EXPECT_TRUE(tests::holds(published.front(), bytes));
+    EXPECT_EQ(published.front(), videos / "Tux Racer 2026-11-21 15-04-05 (3).mp4");
+}
+
+TEST_F(TheVideoLibrary, IsMadeWhenItIsNotThere)
+{
+    auto with = options();
+    with.directories.videos = home.path() / "Media/Videos";
+    EXPECT_TRUE(save(base::Url::fromPath(source), with).success);
+    EXPECT_THAT(namesIn(home.path() / "Media/Videos"), ElementsAre(name));
+}
+
+TEST_F(TheVideoLibrary, MayBeALinkToADirectory)
+{
+    fs::create_directory(home.path() / "disk");
+    fs::create_directory_symlink("disk", videos);
+    EXPECT_TRUE(save().success);
+    EXPECT_THAT(namesIn(home.path() / "disk"), ElementsAre(name));
+    EXPECT_THAT(published, ElementsAre(videos / name)) << "as the user finds it";
+}
+
+TEST_F(TheVideoLibrary, FindsMoviesWhereTheDevicesPathsReallyAre)
+{
+    auto with = options();
+    with.resolvedPath = [this](const std::string& path) { return home.path().native() + "/cache" + path.substr(7); };
+    EXPECT_TRUE(save(base::Url::fromPath("/device/movie.mp4"), with).success);
+}
+
+TEST_F(TheVideoLibrary, KeepsTheKindOfAMovieThatIsNotMPEG4)
+{
+    ASSERT_TRUE(save(home.write("a/clip.webm", bytes)).success);
+    EXPECT_THAT(namesIn(videos), ElementsAre("Tux Racer 2026-11-21 15-04-05.webm"));
+}
+
+TEST_F(TheVideoLibrary, HasReadTheMovieEvenIfItGoesRightBehindTheChange)
+{
+    bool saved = false;
+    photos::VideoLibrary(options(), log, works)
+        .performChanges(
+            [&](platform::PhotoLibraryChange& change) {
+                change.createAssetFromVideoAtFileURL(base::Url::fromPath(source));
+                fs::remove(source);
+            },
+            [&](bool success, const base::ErrorRef&) { saved = success; });
+    EXPECT_TRUE(saved);
+    EXPECT_TRUE(tests::holds(videos / name, bytes));
+}
+
+TEST_F(TheVideoLibrary, WorksOnAThreadOfItsOwnUntilTheCompletionHasReturned)
+{
+    const auto here = std::this_thread::get_id();
+    std::promise<void> goOn;
+    std::vector<bool> busy;
+    {
+        photos::VideoLibrary library(options(), log, works);
+        library.performChanges(
+            [&](platform::PhotoLibraryChange&) {
+                goOn.get_future().wait();
+                EXPECT_NE(std::this_thread::get_id(), here);
+            },
+            [&](bool, const base::ErrorRef&) {
+                EXPECT_NE(std::this_thread::get_id(), here);
+                busy.push_back(!works.isEmpty());
+            });
+        busy.push_back(!works.isEmpty());
+        goOn.set_value();
+    }
+    EXPECT_THAT(busy, ElementsAre(true, true));
+    EXPECT_TRUE(works.isEmpty());
+}
+
+TEST_F(TheVideoLibrary, FinishesAllThatWasBegunBeforeItGoes)
+{
+    std::promise<void> goOn;
+    const std::shared_future<void> mayGoOn = goOn.get_future();
+    int saved = 0;
+    {
+        photos::VideoLibrary library(options(), log, works);
+        for (int i = 0; i < 3; ++i)
+            library.performChanges(
+                [&, mayGoOn](platform::PhotoLibraryChange& change) {
+                    mayGoOn.wait();
+                    change.createAssetFromVideoAtFileURL(base::Url::fromPath(source));
+                },
+                [&](bool success, const base::ErrorRef&) { saved += success ? 1 : 0; });
+        goOn.set_value();
+    }
+    EXPECT_EQ(saved, 3);
+    EXPECT_EQ(namesIn(videos).size(), 3U);
+}
+
+TEST_F(TheVideoLibrary, TellsHowFarItIs)
+{
+    std::vector<double> told;
+    works.setChangeHandler([&] {
+        if (const auto progress = works.progress())
+            told.push_back(*progress);
+    });
+    tests::whileRefusing({tests::noReflinks(), {SYS_copy_file_range, EXDEV}, {SYS_sendfile, EINVAL}}, [&] { save(); });
+    works.setChangeHandler({});
+    EXPECT_GE(told.size(), 3U);
+    EXPECT_TRUE(std::is_sorted(told.begin(), told.end()));
+    EXPECT_EQ(told.back(), 1);
+}
+
+/// File systems that can do less than the one that the tests run on.
+class TheVideoLibraryOn : public tests::LibraryFixture,
+                          public testing::WithParamInterface<std::pair<const char*, std::vector<RefusedSystemCall>>> {};
+
+TEST_P(TheVideoLibraryOn, HoldsTheWholeMovieAndNothingElse)
+{
+    recording.date = base::Date{1'500'000'000};
+    tests::whileRefusing(GetParam().second, [&] {
+        const auto outcome = save();
+        EXPECT_TRUE(outcome.success) << outcome.text();
+    });
+    ASSERT_EQ(published.size(), 1U);
+    EXPECT_THAT(namesIn(videos), ElementsAre(fs::path(published.front()).filename()));
+    EXPECT_TRUE(tests::holds(published.front(), bytes));
+    EXPECT_TRUE(tests::holds(source, bytes));
+    EXPECT_EQ(tests::modified(published.front()), 1'500'000'000);
+}
+
+TEST_P(TheVideoLibraryOn, NeverReplacesAFile)
+{
+    home.write("Videos/" + name, "mine");
+    tests::whileRefusing(GetParam().second, [&] { EXPECT_TRUE(save().success); });
+    EXPECT_THAT(namesIn(videos), ElementsAre("Tux Racer 2026-11-21 15-04-05 (2).mp4", name));
+    EXPECT_EQ(PrivateDirectory::read(videos / name), "mine");
+}
+
+const RefusedSystemCall kNoCopies{SYS_copy_file_range, EXDEV};
+const RefusedSystemCall kNoSendfile{SYS_sendfile, EINVAL};
+const RefusedSystemCall kNoFlags{SYS_renameat2, EINVAL};
+const RefusedSystemCall kNoLinks{SYS_linkat, EPERM};
+
+INSTANTIATE_TEST_SUITE_P(
+    FileSystems, TheVideoLibraryOn,
+    testing::Values(std::pair("WithoutReflinks", std::vector{tests::noReflinks()}),
+                    std::pair("WithoutCopiesInTheKernel", std::vector{tests::noReflinks(), kNoCopies}),
+                    std::pair("WithoutAnyWayToCopy", std::vector{tests::noReflinks(), kNoCopies, kNoSendfile}),
+                    std::pair("WithoutUnnamedFiles", std::vector{tests::noUnnamedFiles()}),
+                    std::pair("WithoutUnnamedFilesOnAnOldKernel", std::vector{tests::noUnnamedFiles(EISDIR)}),
+                    std::pair("WithoutFlags", std::vector{tests::noUnnamedFiles(), kNoFlags}),
+                    std::pair("WithoutFlagsAndLinks", std::vector{tests::noUnnamedFiles(), kNoFlags, kNoLinks}),
+                    std::pair("WithoutLinks", std::vector{kNoLinks}),
+                    std::pair("WithoutFlushing", std::vector{RefusedSystemCall{SYS_fsync, EINVAL}}),
+                    std::pair("WithoutLocks",
+                              std::vector{tests::noUnnamedFiles(), RefusedSystemCall{SYS_flock, EOPNOTSUPP}})),
+    [](const auto& kind) { return std::string(kind.param.first); });
+
+TEST_F(TheVideoLibrary, SweepsWhatWasLeftByOnesThatWereKilled)
+{
+    home.write("Videos/.clipsa-12-3.part", "half");
+    home.write("Videos/.clipsa-notes", "not ours");
+    home.write("Videos/film.part", "not ours either");
+    const fs::path live = home.write("Videos/.clipsa-45-6.part", "being written");
+    const int writer = ::open(live.c_str(), O_RDWR | O_CLOEXEC);
+    ASSERT_EQ(::flock(writer, LOCK_EX), 0);
+    ASSERT_TRUE(save().success);
+    ::close(writer);
+    EXPECT_THAT(namesIn(videos), ElementsAre(".clipsa-45-6.part", ".clipsa-notes", name, "film.part"));
+}
+
+/// Several libraries at once, each with a movie of its own, all under one name.
+void publishTogether(const fs::path& home, photos::LibraryOptions options,
+                     const std::vector<RefusedSystemCall>& refused)
+{
+    constexpr unsigned kLibraries = 8;
+    options.published = {};
+    base::MemoryLog log;
+    base::WorkList works;
+    std::set<std::string> contents;
+    std::vector<std::thread> threads;
+    for (unsigned i = 0; i < kLibraries; ++i) {
+        const fs::path movie = home / ("movie" + std::to_string(i) + ".mp4");
+        const std::string bytes = tests::movieBytes(500'000, i + 1);
+        std::ofstream(movie, std::ios::binary) << bytes;
+        contents.insert(bytes);
+        threads.emplace_back([=, &log, &works] {
+            tests::refuseSystemCalls(refused);
+            photos::VideoLibrary library(options, log, works);
+            for (int times = 0; times < 3; ++times)
+                library.performChanges(
+                    [&](platform::PhotoLibraryChange& change) {
+                        change.createAssetFromVideoAtFileURL(base::Url::fromPath(movie));
+                    },
+                    [](bool success, const base::ErrorRef& error) { EXPECT_TRUE(success) << error->description(); });
+        });
+    }
+    for (std::thread& thread : threads)
+        thread.join();
+
+    const auto names = namesIn(options.directories.videos);
+    EXPECT_EQ(names.size(), 3 * kLibraries);
+    EXPECT_THAT(names, Each(testing::EndsWith(".mp4")));
+    std::map<std::string, int> found;
+    for (const auto& file : names)
+        ++found[PrivateDirectory::read(fs::path(options.directories.videos) / file)];
+    for (const auto& bytes : contents)
+        EXPECT_EQ(found[bytes], 3);
+}
+
+TEST_F(TheVideoLibrary, TakesMoviesFromSeveralWithTheSameNameAtOnce)
+{
+    publishTogether(home.path(), options(), {});
+}
+
+TEST_F(TheVideoLibrary, TakesMoviesFromSeveralAtOnceWithoutUnnamedFiles)
+{
+    publishTogether(home.path(), options(), {tests::noUnnamedFiles()});
+}
+
+} // namespace

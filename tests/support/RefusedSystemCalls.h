@@ -1,0 +1,77 @@
+/// Makes the kernel refuse system calls to one thread, and to those that it starts, as a full disk or a poor file system
+/// would. For ever, and also to programs that it starts: use it on a thread that ends.
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <fcntl.h>
+#include <linux/filter.h>
+#include <linux/fs.h>
+#include <linux/seccomp.h>
+#include <stdexcept>
+#include <sys/prctl.h>
+#include <sys/syscall.h>
+#include <thread>
+#include <vector>
+
+namespace tests {
+
+struct RefusedSystemCall {
+    long call;
+    int error; ///< errno
+    /// Only calls with any of these bits in this argument; all of them when there are no bits.
+    unsigned argument = 0;
+    std::uint32_t bits = 0;
+    /// Only calls where the argument equals the bits.
+    bool exactly = false;
+};
+
+/// What a file system without unnamed files says.
+inline RefusedSystemCall noUnnamedFiles(int error = EOPNOTSUPP)
+{
+    return {SYS_openat, error, 2, O_TMPFILE & ~O_DIRECTORY};
+}
+
+/// No two files share blocks.
+inline RefusedSystemCall noReflinks()
+{
+    return {SYS_ioctl, EOPNOTSUPP, 1, FICLONE, true};
+}
+
+inline void refuseSystemCalls(const std::vector<RefusedSystemCall>& calls)
+{
+    const auto load = [](std::size_t offset) {
+        return sock_filter(BPF_STMT(BPF_LD | BPF_W | BPF_ABS, static_cast<std::uint32_t>(offset)));
+    };
+    std::vector<sock_filter> filter;
+    for (const RefusedSystemCall& refused : calls) {
+        filter.push_back(load(offsetof(seccomp_data, nr)));
+        // The lower half of the argument: flags and requests have no other.
+        filter.push_back(BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, static_cast<std::uint32_t>(refused.call), 0,
+                                  static_cast<std::uint8_t>(refused.bits ? 3 : 1)));
+        if (refused.bits) {
+            filter.push_back(load(offsetof(seccomp_data, args) + refused.argument * sizeof(std::uint64_t)));
+            const int test = refused.exactly ? BPF_JEQ : BPF_JSET;
+            filter.push_back(BPF_JUMP(static_cast<std::uint16_t>(BPF_JMP | test | BPF_K), refused.bits, 0, 1));
+        }
+        filter.push_back(BPF_STMT(BPF_RET | BPF_K,
+                                  SECCOMP_RET_ERRNO | (static_cast<std::uint32_t>(refused.error) & SECCOMP_RET_DATA)));
+    }
+    filter.push_back(BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ALLOW));
+    const sock_fprog program = {static_cast<unsigned short>(filter.size()), filter.data()};
+    if (::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) != 0
+        || ::prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &program, 0, 0) != 0)
+        throw std::runtime_error("the kernel takes no filter");
+}
+
+/// Runs `body` on a thread of its own to which `calls` are refused.
+template <typename Body> void whileRefusing(const std::vector<RefusedSystemCall>& calls, Body body)
+{
+    std::thread([&] {
+        refuseSystemCalls(calls);
+        body();
+    }).join();
+}
+
+} // namespace tests
