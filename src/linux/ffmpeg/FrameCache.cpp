@@ -5,31 +5,57 @@
 
 namespace ffmpeg {
 
-void FrameCache::insert(const ShownFrame& shown, std::int64_t focus, Overflow overflow)
+namespace {
+
+constexpr std::size_t kFull = 2; ///< steps that a picture in full can be reduced by
+
+/// Decoding such pictures takes so much memory that little is left for keeping them.
+bool isHuge(const DecodedFrame& frame)
+{
+    return std::max(frame.picture().width, frame.picture().height) > 1920;
+}
+
+} // namespace
+
+void FrameCache::insert(const ShownFrame& shown, std::int64_t focus, Overflow overflow, std::int64_t reach)
 {
     const std::int64_t pts = shown.frame->pts();
     if (const auto found = m_entries.find(pts); found != m_entries.end()) {
-        if (shown.frame->isReduced() && !found->second.frame->isReduced())
+        if (shown.frame->picture().width < found->second.frame->picture().width)
             return;
         erase(found);
     }
     m_entries.emplace(pts, shown);
     m_bytes += shown.frame->byteCount();
-    m_fullCount += isReducible(*shown.frame);
-    while (m_fullCount > fullLimit(*shown.frame)) {
-        const auto entry = farthestFull(focus);
+    ++m_counts[stepOf(*shown.frame)];
+    while (m_counts[kFull] > fullLimit(*shown.frame)) {
+        const auto entry = farthestOf(kFull, focus);
         if (overflow == Overflow::Reduce)
-            reduce(entry);
+            reduce(entry, isHuge(*entry->second.frame) ? 0 : kFull - 1);
         else
             erase(entry);
     }
     while (m_bytes > m_mostBytes && m_entries.size() > 1)
-        erase(farther(m_entries.begin(), std::prev(m_entries.end()), focus));
+        makeRoom(focus, overflow, reach);
+}
+
+void FrameCache::makeRoom(std::int64_t focus, Overflow overflow, std::int64_t reach)
+{
+    const auto last = farthest(focus);
+    const bool isWanted = last->first / 2 >= focus / 2 - reach / 2 && last->first / 2 <= focus / 2 + reach / 2;
+    if (overflow == Overflow::Drop || !isWanted)
+        erase(last);
+    else if (m_counts[1] > 0)
+        reduce(farthestOf(1, focus), 0);
+    else if (m_counts[kFull] > kKeptAmongReduced)
+        reduce(farthestOf(kFull, focus), 0);
+    else
+        erase(last);
 }
 
 std::size_t FrameCache::fullLimit(const DecodedFrame& picture) const
 {
-    return std::max(kKeptFull, m_mostBytes / 3 / std::max<std::size_t>(1, picture.byteCount()));
+    return std::max(kKeptFull, m_mostBytes / 4 / std::max<std::size_t>(1, picture.byteCount()));
 }
 
 std::optional<ShownFrame> FrameCache::at(std::int64_t tick) const
@@ -54,45 +80,54 @@ FrameRef FrameCache::nearest(std::int64_t tick) const
 std::int64_t FrameCache::capacity(const DecodedFrame& full, Overflow overflow) const
 {
     const std::size_t bytes = std::max<std::size_t>(1, full.byteCount());
-    if (!isReducible(full))
-        return static_cast<std::int64_t>(m_mostBytes / bytes);
-    const std::size_t kept = fullLimit(full);
-    if (overflow == Overflow::Drop || m_mostBytes < kept * bytes)
-        return static_cast<std::int64_t>(kept);
-    const double side = static_cast<double>(kReducedLimit) / std::max(full.picture().width, full.picture().height);
+    const std::size_t step = stepOf(full);
+    if (overflow == Overflow::Drop || step == 0)
+        return static_cast<std::int64_t>(step == kFull ? fullLimit(full) : m_mostBytes / bytes);
+    const std::size_t kept = std::min({kKeptAmongReduced, fullLimit(full), m_mostBytes / bytes});
+    const double side =
+        static_cast<double>(kReducedSides.back()) / std::max(full.picture().width, full.picture().height);
     const double reduced = static_cast<double>(bytes) * side * side;
     return static_cast<std::int64_t>(static_cast<double>(m_mostBytes - kept * bytes) / reduced)
            + static_cast<std::int64_t>(kept);
 }
 
-bool FrameCache::isReducible(const DecodedFrame& frame)
+std::size_t FrameCache::stepOf(const DecodedFrame& frame)
 {
-    return !frame.isReduced() && std::max(frame.picture().width, frame.picture().height) > kReducedLimit;
+    const int side = std::max(frame.picture().width, frame.picture().height);
+    return static_cast<std::size_t>(
+        std::count_if(kReducedSides.begin(), kReducedSides.end(), [&](int limit) { return side > limit; }));
 }
 
 void FrameCache::erase(Entries::iterator entry)
 {
     m_bytes -= entry->second.frame->byteCount();
-    m_fullCount -= isReducible(*entry->second.frame);
+    --m_counts[stepOf(*entry->second.frame)];
     m_entries.erase(entry);
 }
 
-FrameCache::Entries::iterator FrameCache::farthestFull(std::int64_t focus)
+FrameCache::Entries::iterator FrameCache::farthest(std::int64_t focus)
 {
-    const auto isFull = [](const auto& entry) { return isReducible(*entry.second.frame); };
-    const auto first = std::find_if(m_entries.begin(), m_entries.end(), isFull);
-    const auto last = std::find_if(m_entries.rbegin(), m_entries.rend(), isFull);
+    return farther(m_entries.begin(), std::prev(m_entries.end()), focus);
+}
+
+FrameCache::Entries::iterator FrameCache::farthestOf(std::size_t step, std::int64_t focus)
+{
+    const auto isOfStep = [&](const auto& entry) { return stepOf(*entry.second.frame) == step; };
+    const auto first = std::find_if(m_entries.begin(), m_entries.end(), isOfStep);
+    const auto last = std::find_if(m_entries.rbegin(), m_entries.rend(), isOfStep);
     return farther(first, std::prev(last.base()), focus);
 }
 
-void FrameCache::reduce(Entries::iterator entry)
+/// So that `step` more steps would be possible.
+void FrameCache::reduce(Entries::iterator entry, std::size_t step)
 {
-    const ShownFrame full = entry->second;
-    FrameRef small = DecodedFrame::reduced(full.frame, kReducedLimit);
+    const ShownFrame large = entry->second;
+    FrameRef small = DecodedFrame::reduced(large.frame, kReducedSides[kReducedSides.size() - 1 - step]);
     erase(entry);
     if (small) {
         m_bytes += small->byteCount();
-        m_entries.emplace(full.frame->pts(), ShownFrame{std::move(small), full.until});
+        ++m_counts[stepOf(*small)];
+        m_entries.emplace(large.frame->pts(), ShownFrame{std::move(small), large.until});
     }
 }
 

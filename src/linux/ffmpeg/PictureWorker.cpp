@@ -90,6 +90,12 @@ bool PictureWorker::isAhead() const
     return !m_queue.empty() || m_exhausted;
 }
 
+/// With the lock held. One picture, however large, is always decoded ahead.
+bool PictureWorker::hasRoom() const
+{
+    return m_queue.empty() || (m_queue.size() < kAhead && m_queue.size() * m_queue.back()->byteCount() < kAheadBytes);
+}
+
 void PictureWorker::loop()
 {
     const auto source = VideoSource::open(m_movie, m_cancelled, threadCount());
@@ -99,7 +105,7 @@ void PictureWorker::loop()
             std::unique_lock lock(m_mutex);
             const auto hasWork = [&] {
                 return *m_cancelled || m_answered != m_generation
-                       || (m_request.plays && m_playedTo != kForever && m_queue.size() < kAhead);
+                       || (m_request.plays && m_playedTo != kForever && hasRoom());
             };
             if (m_unrefined)
                 m_changed.wait_for(lock, kRest, hasWork);
@@ -123,7 +129,7 @@ void PictureWorker::loop()
 
 void PictureWorker::answer(VideoSource& source, const Request& request)
 {
-    const auto want = request.plays ? VideoSource::Want::Full : VideoSource::Want::Any;
+    const auto want = request.plays ? VideoSource::Want::Played : VideoSource::Want::Any;
     VideoSource::Glimpse glimpse;
     if (!request.plays)
         glimpse = [&](FrameRef frame) { m_arrived(request.generation, std::move(frame), What::Glimpse); };
@@ -163,7 +169,7 @@ void PictureWorker::playOn(VideoSource& source, const Request& request)
         const std::lock_guard lock(m_mutex);
         tick = std::max(tick, m_dueTick);
     }
-    const auto shown = source.at(tick, VideoSource::Want::Full, [&] { return isOvertaken(request); });
+    const auto shown = source.at(tick, VideoSource::Want::Played, [&] { return isOvertaken(request); });
     if (isOvertaken(request) || *m_cancelled)
         return;
     bool tells = false;

@@ -45,7 +45,9 @@ public:
     bool isAhead() const;
 
 private:
-    static constexpr std::size_t kAhead = 8; ///< pictures
+    /// Pictures, and bytes, that are decoded ahead of the time that is played: two at 3840 × 2160.
+    static constexpr std::size_t kAhead = 8;
+    static constexpr std::size_t kAheadBytes = 24u << 20;
 
     struct Request {
         std::uint64_t generation = 0;
@@ -59,6 +61,7 @@ private:
     void refine(VideoSource& source, const Request& request);
     void playOn(VideoSource& source, const Request& request);
     void request(std::uint64_t generation, std::int64_t tick, bool plays);
+    bool hasRoom() const;
     bool isOvertaken(const Request& request) const { return m_generation.load() != request.generation; }
 
     const std::shared_ptr<const Movie> m_movie;

@@ -6,6 +6,14 @@
 
 namespace ffmpeg {
 
+namespace {
+
+/// Seconds. A finger that goes farther between two pictures looks for another place: all that lies between would come
+/// too late.
+constexpr std::int64_t kStride = 2;
+
+} // namespace
+
 VideoSource::VideoSource(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer,
                          std::unique_ptr<VideoDecoder> decoder, Cancelled cancelled)
     : m_movie(std::move(movie)), m_track(*m_movie->video()), m_demuxer(std::move(demuxer)),
@@ -23,6 +31,7 @@ VideoSource::VideoSource(std::shared_ptr<const Movie> movie, std::unique_ptr<Dem
     const std::int64_t full = m_cache.capacity(picture, FrameCache::Overflow::Drop);
     m_shortReach = ticksOf(std::max(full / 4, std::min<std::int64_t>(full, 10)));
     m_longReach = ticksOf(m_cache.capacity(picture, FrameCache::Overflow::Reduce));
+    m_stride = std::min(m_longReach, av_rescale_q(kStride, {1, 1}, m_track.timeBase));
 }
 
 base::Result<std::unique_ptr<VideoSource>> VideoSource::open(std::shared_ptr<const Movie> movie, Cancelled cancelled,
@@ -47,7 +56,7 @@ std::optional<ShownFrame> VideoSource::at(std::int64_t tick, Want want, const St
     const auto cached = m_cache.at(tick);
     if (cached && (want == Want::Any || !cached->frame->isReduced()))
         return cached;
-    plan(tick, before, want);
+    plan(tick, before, want, cached.has_value());
     const auto showsFarAhead = [&](const FrameRef& frame) {
         if (glimpse && frame && frame->pts() < tick - m_shortReach)
             glimpse(frame);
@@ -75,7 +84,7 @@ std::optional<ShownFrame> VideoSource::at(std::int64_t tick, Want want, const St
             seek(tick);
         } else if (m_current) {
             const ShownFrame shown{m_current, m_next ? m_next->pts() : kForever};
-            m_cache.insert(shown, tick, m_overflow);
+            m_cache.insert(shown, tick, m_overflow, m_longReach);
             return shown;
         } else if (!m_fromStart) {
             seekFarther();
@@ -88,13 +97,14 @@ std::optional<ShownFrame> VideoSource::at(std::int64_t tick, Want want, const St
     return std::nullopt;
 }
 
-/// Who moves about a place will want what lies beside: all that is passed is kept then. Who comes to a new place gets
-/// there sooner with less.
-void VideoSource::plan(std::int64_t tick, std::int64_t before, Want want)
+/// Who moves about a place will want what lies beside: all that is passed is kept then, and what has been kept is not
+/// dropped when the finger rests. Who comes to a new place gets there sooner with less.
+void VideoSource::plan(std::int64_t tick, std::int64_t before, Want want, bool isCached)
 {
-    const bool movesAbout = want == Want::Any && before != kNever && std::abs(tick - before) <= m_longReach;
+    const bool movesAbout = want == Want::Any && before != kNever && std::abs(tick - before) <= m_stride;
     const bool goesBack = movesAbout && tick < before;
-    m_overflow = movesAbout ? FrameCache::Overflow::Reduce : FrameCache::Overflow::Drop;
+    const bool rests = want == Want::Full && isCached;
+    m_overflow = movesAbout || rests ? FrameCache::Overflow::Reduce : FrameCache::Overflow::Drop;
     m_skipBefore = tick - (movesAbout ? m_longReach : m_shortReach);
     m_focus = goesBack ? tick - m_longReach / 2 : tick;
 }
@@ -195,7 +205,7 @@ void VideoSource::decodeSome()
 void VideoSource::advance()
 {
     if (m_current && m_current->pts() >= m_skippedTo && !m_cache.at(m_current->pts()))
-        m_cache.insert({m_current, m_next->pts()}, m_focus, m_overflow);
+        m_cache.insert({m_current, m_next->pts()}, m_focus, m_overflow, m_longReach);
     m_current = std::move(m_next);
     m_next = nullptr;
 }

@@ -24,7 +24,11 @@ public:
     static base::Result<std::unique_ptr<VideoSource>> open(std::shared_ptr<const Movie> movie, Cancelled cancelled,
                                                            int threads);
 
-    enum class Want { Any, Full }; ///< a picture that was reduced will do; or not
+    enum class Want {
+        Any,   ///< a picture that was reduced will do: a finger moves
+        Full,  ///< only a full one: the finger rests, and may go on
+        Played ///< a full one, and next the one behind it
+    };
 
     using Stopped = std::function<bool()>;
     using Glimpse = std::function<void(FrameRef)>;
@@ -44,7 +48,7 @@ private:
     VideoSource(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer,
                 std::unique_ptr<VideoDecoder> decoder, Cancelled cancelled);
 
-    void plan(std::int64_t tick, std::int64_t before, Want want);
+    void plan(std::int64_t tick, std::int64_t before, Want want, bool isCached);
     bool goesOnTo(std::int64_t tick) const;
     std::optional<std::int64_t> keyframeBefore(std::int64_t tick) const;
     void seek(std::int64_t tick);
@@ -72,9 +76,11 @@ private:
     std::int64_t m_stepBack = 0;
     std::int64_t m_decodedCount = 0;
 
-    // How far before a tick pictures are wanted too, in ticks: at a new place, and where a finger moves.
+    // How far before a tick pictures are wanted too, in ticks: at a new place, and where a finger moves; and how far it
+    // can go at once and still be moving about a place.
     std::int64_t m_shortReach = 0;
     std::int64_t m_longReach = 0;
+    std::int64_t m_stride = 0;
     // The same for the tick that is looked for, and what is to be kept.
     std::optional<std::int64_t> m_lastTick;
     std::int64_t m_focus = 0;

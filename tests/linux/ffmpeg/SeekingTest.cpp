@@ -1,6 +1,7 @@
 #include "linux/ffmpeg/VideoSource.h"
 #include "support/EngineTest.h"
 
+#include <algorithm>
 #include <random>
 #include <semaphore>
 
@@ -264,6 +265,78 @@ TEST_F(Scrubbing, TheCacheKeepsItsBound)
     EXPECT_FALSE(cache.at(0)) << "the farthest goes first";
     EXPECT_TRUE(cache.at(99LL * 256));
     EXPECT_FALSE(cache.at(100LL * 256)) << "nobody knows what comes there";
+}
+
+/// A grey picture that was never coded.
+ffmpeg::ShownFrame madeFrame(std::int64_t pts, int width, int height)
+{
+    ffmpeg::Owned<AVFrame> picture = ffmpeg::newFrame();
+    picture->width = width;
+    picture->height = height;
+    picture->format = AV_PIX_FMT_YUV420P;
+    EXPECT_EQ(av_frame_get_buffer(picture.get(), 0), 0);
+    for (int plane = 0; plane < 3; ++plane)
+        std::fill_n(picture->data[plane], std::ptrdiff_t(picture->linesize[plane]) * (plane == 0 ? height : height / 2),
+                    std::uint8_t(128));
+    return {std::make_shared<ffmpeg::DecodedFrame>(std::move(picture), pts, base::MediaTime::make(pts, 60),
+                                                   ffmpeg::Orientation{}, AVRational{1, 1}),
+            pts + 1};
+}
+
+TEST_F(Scrubbing, TenSecondsOfALargeMovieStayUnderTheBoundAndTheNearestInFull)
+{
+    ffmpeg::FrameCache cache;
+    EXPECT_GE(cache.capacity(*madeFrame(0, 1920, 1080).frame, ffmpeg::FrameCache::Overflow::Reduce), 600);
+    for (int i = 0; i < 600; ++i) {
+        cache.insert(madeFrame(i, 1920, 1080), i, ffmpeg::FrameCache::Overflow::Reduce, 700);
+        ASSERT_LE(cache.byteCount(), ffmpeg::FrameCache::kMostBytes);
+    }
+    for (int i = 0; i < 600; ++i)
+        ASSERT_TRUE(cache.at(i)) << i;
+    for (int i = 596; i < 600; ++i)
+        EXPECT_FALSE(cache.at(i)->frame->isReduced()) << i;
+    EXPECT_TRUE(cache.at(0)->frame->isReduced());
+    EXPECT_EQ(cache.at(0)->frame->displaySize(), (base::Size{1920, 1080}));
+    cache.insert(madeFrame(0, 960, 540), 599, ffmpeg::FrameCache::Overflow::Reduce, 700);
+    EXPECT_TRUE(cache.at(599)) << "what is near stays";
+}
+
+TEST_F(Scrubbing, PicturesNearTheFingerAreReducedLessThanThoseFarAway)
+{
+    ffmpeg::FrameCache cache(40'000'000);
+    for (int i = 0; i < 100; ++i)
+        cache.insert(madeFrame(i, 1920, 1080), i, ffmpeg::FrameCache::Overflow::Reduce, 700);
+    const auto width = [&](int i) { return cache.at(i)->frame->picture().width; };
+    EXPECT_EQ(width(0), 480);
+    EXPECT_EQ(width(95), 960);
+    EXPECT_EQ(width(99), 1920);
+    for (int i = 1; i < 100; ++i)
+        EXPECT_GE(width(i), width(i - 1)) << i;
+}
+
+TEST_F(Scrubbing, WhatLiesOutOfReachGoesBeforeAnythingIsMadeSmaller)
+{
+    ffmpeg::FrameCache cache(20'000'000);
+    for (int i = 0; i < 20; ++i)
+        cache.insert(madeFrame(i, 960, 540), i, ffmpeg::FrameCache::Overflow::Reduce, 100);
+    for (int i = 1000; i < 1010; ++i)
+        cache.insert(madeFrame(i, 960, 540), i, ffmpeg::FrameCache::Overflow::Reduce, 100);
+    EXPECT_FALSE(cache.at(0));
+    for (int i = 1000; i < 1010; ++i)
+        EXPECT_EQ(cache.at(i)->frame->picture().width, 960);
+}
+
+TEST_F(Scrubbing, OfVeryLargePicturesFewAreKeptInFull)
+{
+    ffmpeg::FrameCache cache;
+    for (int i = 0; i < 12; ++i)
+        cache.insert(madeFrame(i, 3840, 2160), i, ffmpeg::FrameCache::Overflow::Reduce, 100);
+    int full = 0;
+    for (int i = 0; i < 12; ++i)
+        full += !cache.at(i)->frame->isReduced();
+    EXPECT_EQ(full, 2);
+    EXPECT_EQ(cache.at(0)->frame->picture().width, 480);
+    EXPECT_LT(cache.byteCount(), std::size_t{30} << 20);
 }
 
 TEST_F(Scrubbing, AStoppedSearchGivesNothingAndTheNextOneStillWorks)
