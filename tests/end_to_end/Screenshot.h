@@ -22,10 +22,10 @@ struct Coded {
 
 class Screenshot {
 public:
+    explicit Screenshot(const QImage& image) : m_image(image.convertToFormat(QImage::Format_RGB32)) {}
     /// Null when there is no such picture.
-    explicit Screenshot(const std::filesystem::path& file) : m_image(QString::fromStdString(file.native()))
+    explicit Screenshot(const std::filesystem::path& file) : Screenshot(QImage(QString::fromStdString(file.native())))
     {
-        m_image = m_image.convertToFormat(QImage::Format_RGB32);
     }
 
     bool isNull() const { return m_image.isNull(); }
