@@ -208,3 +208,22 @@ void VKVideoEditorViewController::goToEnd()
 {
     avTrimmer()->scrubTo(avTrimmer()->duration());
 }
+
+void VKVideoEditorViewController::trimStartHere()
+{
+    avTrimmer()->moveHandle(platform::ScrubberHandle::Start, avTrimmer()->value());
+}
+
+void VKVideoEditorViewController::trimEndHere()
+{
+    avTrimmer()->moveHandle(platform::ScrubberHandle::End, avTrimmer()->value());
+}
+
+void VKVideoEditorViewController::confirmTrim()
+{
+    const bool isUnderWay =
+        isExporting() && exportSession() && exportSession()->status() == platform::ExportSession::Status::Exporting;
+    // A key is soon pressed twice.
+    if (isTrimming() && !isUnderWay)
+        saveAction();
+}

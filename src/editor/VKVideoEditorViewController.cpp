@@ -111,6 +111,9 @@ const runtime::Class& VKVideoEditorViewController::classObject()
             .method("stepForward", &Self::stepForward)
             .method("goToStart", &Self::goToStart)
             .method("goToEnd", &Self::goToEnd)
+            .method("trimStartHere", &Self::trimStartHere)
+            .method("trimEndHere", &Self::trimEndHere)
+            .method("confirmTrim", &Self::confirmTrim)
             .build();
     return instance;
 }
@@ -284,6 +287,9 @@ std::vector<platform::KeyCommand> VKVideoEditorViewController::keyCommands() con
         {Key::Period, 0, false, Selector("stepForward"), "One picture forward"},
         {Key::Home, 0, false, Selector("goToStart"), "To the start"},
         {Key::End, 0, false, Selector("goToEnd"), "To the end"},
+        {Key::Character, 'i', false, Selector("trimStartHere"), "Start the trim here"},
+        {Key::Character, 'o', false, Selector("trimEndHere"), "End the trim here"},
+        {Key::Return, 0, false, Selector("confirmTrim"), "Trim"},
         {Key::Escape, 0, false, Selector("leave"), "Leave trim mode, or close"},
     };
 }

@@ -132,6 +132,10 @@ public:
     void stepForward();
     void goToStart();
     void goToEnd();
+    /// Put a handle where the play head is; the way into trim mode too.
+    void trimStartHere();
+    void trimEndHere();
+    void confirmTrim();
 
 private:
     explicit VKVideoEditorViewController(const platform::Platform& platform) : m_platform(platform) {}
