@@ -28,6 +28,18 @@ base::Result<std::shared_ptr<OpenFile>> OpenFile::open(const std::string& path)
     return file;
 }
 
+base::Result<std::shared_ptr<OpenFile>> OpenFile::of(int descriptor, const std::string& name)
+{
+    const int own = fcntl(descriptor, F_DUPFD_CLOEXEC, 0);
+    if (own < 0)
+        return Error::fromErrno(errno, "“" + name + "” cannot be opened");
+    std::shared_ptr<OpenFile> file(new OpenFile(own, name));
+    struct stat about {};
+    if (fstat(own, &about) == 0)
+        file->m_identity = identityOf(about);
+    return file;
+}
+
 OpenFile::~OpenFile()
 {
     ::close(m_descriptor);

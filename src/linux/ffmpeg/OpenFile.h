@@ -14,6 +14,8 @@ class OpenFile {
 public:
     /// Regular files only: anything else could block, or never end.
     static base::Result<std::shared_ptr<OpenFile>> open(const std::string& path);
+    /// A file that is open already; `descriptor` stays the caller's.
+    static base::Result<std::shared_ptr<OpenFile>> of(int descriptor, const std::string& name);
     ~OpenFile();
     OpenFile(const OpenFile&) = delete;
     OpenFile& operator=(const OpenFile&) = delete;

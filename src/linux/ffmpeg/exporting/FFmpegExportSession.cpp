@@ -1,5 +1,9 @@
 #include "linux/ffmpeg/exporting/FFmpegExportSession.h"
 
+#include "linux/ffmpeg/exporting/ExportJob.h"
+
+#include <cassert>
+#include <thread>
 #include <utility>
 
 namespace ffmpeg {
@@ -10,6 +14,11 @@ std::shared_ptr<FFmpegExportSession> FFmpegExportSession::make(const std::shared
     return std::shared_ptr<FFmpegExportSession>(new FFmpegExportSession(engine, std::move(asset)));
 }
 
+FFmpegExportSession::FFmpegExportSession(std::shared_ptr<Engine> engine, std::shared_ptr<FFmpegAsset> asset)
+    : m_engine(std::move(engine)), m_asset(std::move(asset))
+{
+}
+
 void FFmpegExportSession::setOutputURL(std::optional<base::Url> url)
 {
     const std::lock_guard lock(m_mutex);
@@ -18,14 +27,76 @@ void FFmpegExportSession::setOutputURL(std::optional<base::Url> url)
 
 void FFmpegExportSession::exportAsynchronously(std::function<void()> done)
 {
-    m_engine->reaper.post([self = std::static_pointer_cast<FFmpegExportSession>(shared_from_this()), done] {
+    {
+        const std::lock_guard lock(m_mutex);
+        assert(m_status == Status::Unknown);
+        m_status = Status::Waiting;
+    }
+    auto self = std::static_pointer_cast<FFmpegExportSession>(shared_from_this());
+    m_asset->whenLoaded([self, done = std::move(done)]() mutable { self->start(std::move(done)); });
+}
+
+void FFmpegExportSession::start(std::function<void()> done)
+{
+    {
+        const std::lock_guard lock(m_mutex);
+        m_status = Status::Exporting;
+    }
+    auto self = std::static_pointer_cast<FFmpegExportSession>(shared_from_this());
+    // The movie is asked for here, because the asset is the main queue's.
+    auto work = [self, movie = m_asset->movie(), why = m_asset->error(), done = std::move(done)]() mutable {
+        self->finish(movie ? self->work(movie) : base::Result<void>(why));
+        movie = nullptr;
+        std::exchange(done, nullptr)();
+    };
+    // Whoever is told may wait for the main queue, so nobody waits there for the thread before it has told. The session
+    // and the thread then end there: the former's asset lives on that queue.
+    auto thread = std::make_shared<std::jthread>();
+    base::MainQueue& main = m_engine->system.mainQueue;
+    auto started = std::make_shared<std::atomic<bool>>(false);
+    *thread = std::jthread([self = std::move(self), work = std::move(work), thread, started, &main]() mutable {
+        started->wait(false); // until `thread` is what it refers to
         {
-            const std::lock_guard lock(self->m_mutex);
-            self->m_status = Status::Failed;
-            self->m_error = base::Error::make("ffmpeg", AVERROR(ENOSYS), "Movies cannot be exported yet.");
+            auto now = std::move(work);
+            now();
         }
-        done();
+        main.post([self = std::move(self), thread = std::move(thread)] {});
     });
+    *started = true;
+    started->notify_one();
+}
+
+base::Result<void> FFmpegExportSession::work(const std::shared_ptr<const Movie>& movie) const
+{
+    const auto url = outputURL();
+    if (!url || !url->isFile())
+        return base::Error::make("ffmpeg", AVERROR(EINVAL),
+                                 "“" + movie->file()->name() + "” cannot be exported: there is no file to write to.");
+    const auto& resolve = m_engine->options.resolvePath;
+    ExportJob job;
+    job.movie = movie;
+    job.output = resolve ? resolve(url->path()) : url->path();
+    job.range = m_range;
+    job.mix = m_mix;
+    job.cancelled = m_cancelled;
+    // A second attempt, after copying failed, begins anew; what was told does not go back.
+    job.progress = [told = m_progress](double part) {
+        if (part > *told)
+            *told = part;
+    };
+    job.log = &m_engine->system.log;
+    return job.run();
+}
+
+void FFmpegExportSession::finish(const base::Result<void>& result)
+{
+    if (result)
+        *m_progress = 1;
+    else if (!*m_cancelled)
+        m_engine->system.log.error(result.error()->description());
+    const std::lock_guard lock(m_mutex);
+    m_status = result ? Status::Completed : *m_cancelled ? Status::Cancelled : Status::Failed;
+    m_error = m_status == Status::Failed ? result.error() : nullptr;
 }
 
 platform::ExportSession::Status FFmpegExportSession::status() const

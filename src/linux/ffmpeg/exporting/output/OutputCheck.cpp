@@ -1,0 +1,120 @@
+#include "linux/ffmpeg/exporting/output/OutputCheck.h"
+
+#include "linux/ffmpeg/Movie.h"
+#include "linux/ffmpeg/VideoDecoder.h"
+
+#include <cmath>
+#include <optional>
+#include <set>
+#include <string>
+
+namespace ffmpeg {
+
+using base::Result;
+
+namespace {
+
+constexpr double kTolerance = 0.001; ///< seconds; clocks of movie and tracks round
+
+base::ErrorRef wrong(const std::string& what)
+{
+    return base::Error::make("ffmpeg", AVERROR_EXTERNAL, "the exported movie is not as it should be: " + what);
+}
+
+bool areFar(std::int64_t a, AVRational aTicks, double seconds)
+{
+    return std::abs(static_cast<double>(a) * av_q2d(aTicks) - seconds) > kTolerance;
+}
+
+double secondsOf(std::int64_t ticks, const TrackSummary& track)
+{
+    return static_cast<double>(ticks) * av_q2d(track.timeBase);
+}
+
+Result<void> checkBeginnings(Demuxer& demuxer, const std::vector<TrackSummary>& written)
+{
+    std::set<int> awaited;
+    for (std::size_t i = 0; i < written.size(); ++i)
+        if (written[i].packets > 0)
+            awaited.insert(static_cast<int>(i));
+    const auto packet = newPacket();
+    while (!awaited.empty()) {
+        if (demuxer.read(*packet) != 0)
+            return wrong("a track is empty");
+        if (awaited.erase(packet->stream_index) == 0)
+            continue;
+        const TrackSummary& track = written[static_cast<std::size_t>(packet->stream_index)];
+        if (areFar(packet->pts, demuxer.stream(packet->stream_index).time_base, secondsOf(track.firstPts, track)))
+            return wrong("track " + std::to_string(packet->stream_index + 1) + " begins at the wrong time");
+    }
+    return {};
+}
+
+/// Groups of pictures that were encoded stand beside copied ones: each kind must be decoded by the one header.
+Result<void> checkGroups(Demuxer& demuxer, int stream)
+{
+    AVStream& about = demuxer.stream(stream);
+    std::vector<std::int64_t> keyframes;
+    for (int i = 0; i < avformat_index_get_entries_count(&about); ++i) {
+        const AVIndexEntry* entry = avformat_index_get_entry(&about, i);
+        if (entry->flags & AVINDEX_KEYFRAME)
+            keyframes.push_back(entry->timestamp);
+    }
+    if (keyframes.empty())
+        return wrong("it has no keyframe");
+    VideoTrack track;
+    track.stream = stream;
+    track.timeBase = about.time_base;
+    demuxer.select({stream});
+    const auto packet = newPacket();
+    for (const std::size_t which :
+         std::set<std::size_t>{0, std::min<std::size_t>(1, keyframes.size() - 1), keyframes.size() - 1}) {
+        const auto decoder = VideoDecoder::open(about, track, 1);
+        if (!decoder)
+            return decoder.error();
+        if (!demuxer.seek(stream, keyframes[which]) || demuxer.read(*packet) != 0)
+            return wrong("it cannot be read from each keyframe");
+        decoder.value()->send(*packet);
+        decoder.value()->finish();
+        if (!decoder.value()->receive())
+            return wrong("a group of pictures cannot be decoded");
+    }
+    return {};
+}
+
+} // namespace
+
+Result<void> checkOutput(const OutputFile& file, const std::vector<TrackSummary>& written, const Cancelled& cancelled)
+{
+    const auto again = OpenFile::of(file.descriptor(), file.name());
+    if (!again)
+        return again.error();
+    auto opened = Demuxer::open(again.value(), cancelled);
+    if (!opened)
+        return opened.error();
+    Demuxer& demuxer = *opened.value();
+    if (demuxer.streamCount() != static_cast<int>(written.size()))
+        return wrong("it has " + std::to_string(demuxer.streamCount()) + " tracks");
+    if (auto checked = checkBeginnings(demuxer, written); !checked)
+        return checked;
+    for (int i = 0; i < demuxer.streamCount(); ++i) {
+        const TrackSummary& track = written[static_cast<std::size_t>(i)];
+        AVStream& stream = demuxer.stream(i);
+        if (track.packets == 0)
+            continue;
+        if (avformat_index_get_entries_count(&stream) != track.packets)
+            return wrong("track " + std::to_string(i + 1) + " has not all of its packets");
+        if (track.type != AVMEDIA_TYPE_VIDEO)
+            continue;
+        const AVIndexEntry* last = avformat_index_get_entry(&stream, static_cast<int>(track.packets) - 1);
+        if (!last
+            || static_cast<double>(last->timestamp) * av_q2d(stream.time_base)
+                   > secondsOf(track.lastPts, track) + kTolerance)
+            return wrong("its pictures end too late");
+        if (auto checked = checkGroups(demuxer, i); !checked)
+            return checked;
+    }
+    return {};
+}
+
+} // namespace ffmpeg

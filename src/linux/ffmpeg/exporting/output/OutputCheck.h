@@ -1,0 +1,14 @@
+/// Opens what was written and compares it with what should have been. One thread.
+#pragma once
+
+#include "linux/ffmpeg/exporting/output/MovieWriter.h"
+
+#include <vector>
+
+namespace ffmpeg {
+
+/// The error says what is wrong: a track, its first picture or sound, its length, or a group that cannot be decoded.
+base::Result<void> checkOutput(const OutputFile& file, const std::vector<TrackSummary>& written,
+                               const Cancelled& cancelled);
+
+} // namespace ffmpeg

@@ -1,0 +1,113 @@
+#include "linux/ffmpeg/exporting/output/OutputFile.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <fcntl.h>
+#include <random>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace ffmpeg {
+
+using base::Error;
+
+base::Result<std::unique_ptr<OutputFile>> OutputFile::create(const std::string& path)
+{
+    const std::size_t slash = path.find_last_of('/');
+    const std::string folder = slash == std::string::npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
+    const int directory = ::open(folder.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC);
+    const int error = errno;
+    std::unique_ptr<OutputFile> file(new OutputFile(directory, path.substr(slash + 1)));
+    if (directory < 0)
+        return file->failure(error);
+    struct stat about {};
+    if (file->m_name.empty())
+        return file->failure(EISDIR);
+    if (fstatat(directory, file->m_name.c_str(), &about, AT_SYMLINK_NOFOLLOW) == 0)
+        return file->failure(EEXIST);
+    constexpr mode_t kMode = 0666; // what the user's mask leaves of it
+    file->m_descriptor = openat(directory, ".", O_TMPFILE | O_RDWR | O_CLOEXEC, kMode);
+    if (file->m_descriptor < 0 && (errno == EOPNOTSUPP || errno == EISDIR || errno == ENOENT || errno == EINVAL)) {
+        std::random_device random;
+        char tag[16];
+        std::snprintf(tag, sizeof tag, "%08x", random());
+        file->m_hiddenName = "." + file->m_name.substr(0, 200) + "." + tag + ".part";
+        file->m_descriptor =
+            openat(directory, file->m_hiddenName.c_str(), O_CREAT | O_EXCL | O_RDWR | O_CLOEXEC, kMode);
+    }
+    if (file->m_descriptor < 0)
+        return file->failure(errno);
+    return file;
+}
+
+OutputFile::~OutputFile()
+{
+    if (m_descriptor >= 0) {
+        if (!m_published && !m_hiddenName.empty())
+            unlinkat(m_directory, m_hiddenName.c_str(), 0);
+        ::close(m_descriptor);
+    }
+    if (m_directory >= 0)
+        ::close(m_directory);
+}
+
+base::ErrorRef OutputFile::failure(int error) const
+{
+    return Error::fromErrno(error, "“" + m_name + "” cannot be written");
+}
+
+int OutputFile::write(std::int64_t position, const std::uint8_t* bytes, std::size_t count)
+{
+    while (count > 0) {
+        const ssize_t done = pwrite(m_descriptor, bytes, count, position);
+        if (done < 0 && errno == EINTR)
+            continue;
+        if (done < 0)
+            return -errno;
+        position += done;
+        bytes += done;
+        count -= static_cast<std::size_t>(done);
+    }
+    return 0;
+}
+
+base::Result<void> OutputFile::clear()
+{
+    if (ftruncate(m_descriptor, 0) != 0)
+        return failure(errno);
+    return {};
+}
+
+int OutputFile::link() const
+{
+    if (m_hiddenName.empty()) {
+        const std::string self = "/proc/self/fd/" + std::to_string(m_descriptor);
+        return linkat(AT_FDCWD, self.c_str(), m_directory, m_name.c_str(), AT_SYMLINK_FOLLOW) == 0 ? 0 : errno;
+    }
+    if (renameat2(m_directory, m_hiddenName.c_str(), m_directory, m_name.c_str(), RENAME_NOREPLACE) == 0)
+        return 0;
+    if (errno != EINVAL && errno != ENOSYS)
+        return errno;
+    // A file system that cannot rename so; a link does not replace anything either.
+    if (linkat(m_directory, m_hiddenName.c_str(), m_directory, m_name.c_str(), 0) != 0)
+        return errno;
+    unlinkat(m_directory, m_hiddenName.c_str(), 0);
+    return 0;
+}
+
+base::Result<void> OutputFile::publish()
+{
+    if (fsync(m_descriptor) != 0)
+        return failure(errno);
+    if (const int error = link())
+        return failure(error);
+    m_published = true;
+    // The name is there for all to see; that it outlives a power cut too is not worth failing for.
+    if (const int directory = openat(m_directory, ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC); directory >= 0) {
+        fsync(directory);
+        ::close(directory);
+    }
+    return {};
+}
+
+} // namespace ffmpeg

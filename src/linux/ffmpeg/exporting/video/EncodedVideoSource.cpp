@@ -1,0 +1,146 @@
+#include "linux/ffmpeg/exporting/video/EncodedVideoSource.h"
+
+#include "linux/ffmpeg/exporting/video/StreamTraits.h"
+
+#include <algorithm>
+#include <cmath>
+#include <utility>
+
+namespace ffmpeg {
+
+using base::Result;
+
+namespace {
+
+/// Above 45 dB on recordings of screens, where an eye finds no difference.
+constexpr const char* kQuality = "12";
+constexpr double kSecondsBetweenKeyframes = 2; ///< so that seeking is quick
+
+EncoderRequest requestFor(const AVStream& stream, const AVFrame& picture, AVRational timeBase)
+{
+    EncoderRequest request = EncoderRequest::like(stream, picture, timeBase);
+    request.encoder = "libx264";
+    request.format = formatForH264(request.format);
+    const AVPixFmtDescriptor& about = *av_pix_fmt_desc_get(request.format);
+    // Odd sizes have half a sample of colour at the edge, which x264 refuses.
+    request.width = std::max(request.width >> about.log2_chroma_w << about.log2_chroma_w, 1 << about.log2_chroma_w);
+    request.height = std::max(request.height >> about.log2_chroma_h << about.log2_chroma_h, 1 << about.log2_chroma_h);
+    if (request.matrix == AVCOL_SPC_RGB)
+        request.matrix = AVCOL_SPC_BT709;
+    request.isInterlaced = false;
+    request.keyframeInterval =
+        std::max(1, static_cast<int>(std::lround(av_q2d(request.frameRate) * kSecondsBetweenKeyframes)));
+    request.options = {{"preset", "veryfast"}, {"crf", kQuality}};
+    return request;
+}
+
+} // namespace
+
+EncodedVideoSource::EncodedVideoSource(std::unique_ptr<PicturePackets> packets, std::int64_t start, std::int64_t end)
+    : m_packets(std::move(packets)), m_start(start), m_end(end),
+      m_request(requestFor(m_packets->stream(), m_packets->movie().firstFrame()->picture(), m_packets->outTimeBase())),
+      m_scaler(m_request.format, m_request.width, m_request.height),
+      m_line(0, usualStep(m_packets->stream(), m_packets->outTimeBase()), std::nullopt, end - start)
+{
+}
+
+Result<std::unique_ptr<TrackSource>> EncodedVideoSource::open(std::unique_ptr<PicturePackets> packets,
+                                                              std::int64_t start, std::int64_t end)
+{
+    std::unique_ptr<EncodedVideoSource> source(new EncodedVideoSource(std::move(packets), start, end));
+    auto encoder = PictureEncoder::open(source->m_request);
+    if (!encoder)
+        return encoder.error();
+    source->m_encoder = std::move(encoder).value();
+    return std::unique_ptr<TrackSource>(std::move(source));
+}
+
+Result<void> EncodedVideoSource::describe(AVStream& output)
+{
+    if (auto done = describeLike(m_packets->stream(), m_packets->outTimeBase(), output); !done)
+        return done;
+    const AVCodecContext& encoder = m_encoder->context();
+    if (const int error = avcodec_parameters_from_context(output.codecpar, &encoder); error < 0)
+        return base::Error::make("ffmpeg", error, textOf(error));
+    output.codecpar->codec_tag = MKTAG('a', 'v', 'c', '1');
+    const auto isEnd = [this, behind = 0](const AVPacket& packet) mutable {
+        behind += packet.pts != AV_NOPTS_VALUE && m_packets->outTick(packet.pts) >= m_end;
+        return behind > PicturePackets::kFarthestReorder;
+    };
+    auto feed = PictureFeed::start(*m_packets, m_start, isEnd);
+    if (!feed)
+        return feed.error();
+    m_feed = std::move(feed).value();
+    return {};
+}
+
+Result<bool> EncodedVideoSource::next(AVPacket& packet)
+{
+    while (!m_line.pop(packet)) {
+        if (m_ended)
+            return false;
+        if (auto done = goOn(); !done)
+            return done.error();
+    }
+    return true;
+}
+
+Result<void> EncodedVideoSource::goOn()
+{
+    const auto next = m_feed->next();
+    if (!next)
+        return next.error();
+    const FrameRef& picture = next.value();
+    const std::int64_t pts = picture ? m_packets->outTick(picture->pts()) : m_end;
+    if (picture && pts < m_end) {
+        const std::int64_t waiting = m_waiting ? m_packets->outTick(m_waiting->pts()) : pts - 1;
+        if (pts <= waiting)
+            return {}; // broken files give pictures out of order
+        // What another replaces before the range begins is not seen in it.
+        const FrameRef shown = std::exchange(m_waiting, picture);
+        return shown && pts > m_start ? encode(*shown, pts) : Result<void>();
+    }
+    std::int64_t end = pts;
+    if (m_waiting && !picture) {
+        // The movie ends before the range does, and its last picture when it would have ended anyway.
+        const std::int64_t begin = m_packets->outTick(m_waiting->pts());
+        const std::int64_t own = m_packets->outTicks(m_waiting->picture().pkt_duration);
+        const std::int64_t usual = usualStep(m_packets->stream(), m_packets->outTimeBase());
+        end = std::min(m_end, std::max(begin, m_start) + (own > 0 ? own : usual));
+    }
+    end = std::min(end, m_end);
+    if (m_waiting) {
+        if (auto done = encode(*std::exchange(m_waiting, nullptr), end); !done)
+            return done;
+    }
+    if (auto done = m_encoder->finish(); !done)
+        return done;
+    if (auto done = moveOut(); !done)
+        return done;
+    m_line.finish(end - m_start);
+    m_ended = true;
+    return {};
+}
+
+Result<void> EncodedVideoSource::encode(const DecodedFrame& picture, std::int64_t until)
+{
+    auto fitting = m_scaler.fit(picture.picture());
+    if (!fitting)
+        return fitting.error();
+    const std::int64_t pts = std::max(m_packets->outTick(picture.pts()), m_start);
+    if (auto done = m_encoder->encode(*fitting.value(), pts, until - pts); !done)
+        return done;
+    return moveOut();
+}
+
+Result<void> EncodedVideoSource::moveOut()
+{
+    while (auto packet = m_encoder->take()) {
+        packet->pts -= m_start;
+        if (auto done = m_line.push(std::move(packet)); !done)
+            return done;
+    }
+    return {};
+}
+
+} // namespace ffmpeg

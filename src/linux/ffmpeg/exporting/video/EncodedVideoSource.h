@@ -1,0 +1,43 @@
+/// Pictures of a range, all encoded to H.264 without visible loss: for what cannot be copied. One thread.
+#pragma once
+
+#include "linux/ffmpeg/exporting/TrackSource.h"
+#include "linux/ffmpeg/exporting/video/PictureEncoder.h"
+#include "linux/ffmpeg/exporting/video/PictureFeed.h"
+#include "linux/ffmpeg/exporting/video/PictureLine.h"
+#include "linux/ffmpeg/exporting/video/PicturePackets.h"
+#include "linux/ffmpeg/exporting/video/PictureScaler.h"
+
+#include <optional>
+
+namespace ffmpeg {
+
+class EncodedVideoSource final : public TrackSource {
+public:
+    /// As SplicedVideoSource::open.
+    static base::Result<std::unique_ptr<TrackSource>> open(std::unique_ptr<PicturePackets> packets, std::int64_t start,
+                                                           std::int64_t end);
+
+    base::Result<void> describe(AVStream& output) override;
+    base::Result<bool> next(AVPacket& packet) override;
+
+private:
+    EncodedVideoSource(std::unique_ptr<PicturePackets> packets, std::int64_t start, std::int64_t end);
+
+    base::Result<void> goOn();
+    base::Result<void> encode(const DecodedFrame& picture, std::int64_t until);
+    base::Result<void> moveOut();
+
+    std::unique_ptr<PicturePackets> m_packets;
+    std::int64_t m_start;
+    std::int64_t m_end;
+    EncoderRequest m_request;
+    PictureScaler m_scaler;
+    std::unique_ptr<PictureEncoder> m_encoder;
+    std::unique_ptr<PictureFeed> m_feed;
+    PictureLine m_line;
+    FrameRef m_waiting; ///< decoded; encoded when its end is known
+    bool m_ended = false;
+};
+
+} // namespace ffmpeg

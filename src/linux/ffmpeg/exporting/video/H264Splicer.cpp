@@ -1,0 +1,204 @@
+#include "linux/ffmpeg/exporting/video/H264Splicer.h"
+
+#include "linux/ffmpeg/exporting/CannotCopy.h"
+#include "linux/ffmpeg/exporting/video/NalUnits.h"
+
+#include <algorithm>
+
+namespace ffmpeg {
+
+using h264::Unit;
+
+namespace {
+
+constexpr std::uint32_t kHighestSpsId = 31;
+
+/// Nearly without loss: the first picture of a group that is decoded beside untouched ones must not stand out.
+constexpr const char* kQuality = "10";
+
+} // namespace
+
+base::Result<std::unique_ptr<Splicer>> H264Splicer::make(const AVStream& stream)
+{
+    const ByteView extradata = extradataOf(*stream.codecpar);
+    auto header = h264::Configuration::parse(extradata);
+    if (!header)
+        return cannotCopy("its parameter sets are not in the file's header");
+    if (header->hasExtensions)
+        return cannotCopy("its parameter sets have extensions");
+    std::unique_ptr<H264Splicer> splicer(new H264Splicer);
+    splicer->m_hasStartCodes = h264::Configuration::hasStartCodes(extradata);
+    splicer->m_header = std::move(*header);
+    for (const Bytes& nal : splicer->m_header.sps) {
+        const auto sps = h264::parseSps(nal);
+        if (!sps)
+            return cannotCopy("a parameter set is damaged");
+        splicer->m_sps.push_back(*sps);
+    }
+    return std::unique_ptr<Splicer>(std::move(splicer));
+}
+
+std::vector<ByteView> H264Splicer::unitsIn(const AVPacket& packet) const
+{
+    if (m_hasStartCodes)
+        return unitsBetweenStartCodes(payloadOf(packet));
+    return unitsBehindLengths(payloadOf(packet), m_header.lengthSize).value_or(std::vector<ByteView>{});
+}
+
+/// Containers mark as keyframes also pictures that later ones look past; only these are never looked past.
+bool H264Splicer::isJoint(const AVPacket& keyframe) const
+{
+    const auto units = unitsIn(keyframe);
+    return std::any_of(units.begin(), units.end(), [](ByteView nal) { return h264::unitOf(nal) == Unit::Idr; });
+}
+
+int H264Splicer::reorderDepth() const
+{
+    std::uint32_t depth = 0;
+    for (const h264::Sps& each : m_sps)
+        if (each.restriction)
+            depth = std::max(depth, each.restriction->reorderFrames);
+    return static_cast<int>(std::min<std::uint32_t>(depth, 16));
+}
+
+void H264Splicer::see(const AVPacket& copied)
+{
+    for (const ByteView nal : unitsIn(copied)) {
+        const Unit unit = h264::unitOf(nal);
+        if (unit == Unit::Slice || unit == Unit::SliceA || unit == Unit::Idr)
+            m_usedPps.insert(h264::ppsOfSlice(nal));
+    }
+}
+
+/// Otherwise each export of an export would leave one more set behind.
+void H264Splicer::dropUnused(h264::Configuration& header) const
+{
+    if (m_usedPps.empty())
+        return;
+    std::set<std::uint32_t> usedSps;
+    std::erase_if(header.pps, [&](const Bytes& nal) { return !m_usedPps.contains(h264::idsOfPps(nal).pps); });
+    for (const Bytes& nal : header.pps)
+        usedSps.insert(h264::idsOfPps(nal).sps);
+    std::erase_if(header.sps, [&](const Bytes& nal) { return !usedSps.contains(h264::parseSps(nal)->id); });
+}
+
+base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDepth)
+{
+    std::set<std::uint32_t> taken;
+    for (const h264::Sps& each : m_sps)
+        taken.insert(each.id);
+    for (const Bytes& nal : m_header.pps)
+        taken.insert(h264::idsOfPps(nal).pps);
+    std::uint32_t id = 1;
+    while (taken.contains(id))
+        ++id;
+    if (id > kHighestSpsId)
+        return cannotCopy("all ids of parameter sets are taken");
+
+    // Decoders hold pictures back by what the sets say; where two streams differ, some would be lost at the joint.
+    m_restriction = {static_cast<std::uint32_t>(std::max(reorderDepth, 0)), 1};
+    for (const h264::Sps& each : m_sps) {
+        const std::uint32_t buffered =
+            each.restriction ? each.restriction->bufferedFrames : std::max(each.referenceFrames, 1U);
+        m_restriction.bufferedFrames =
+            std::max({m_restriction.bufferedFrames, buffered, m_restriction.reorderFrames, 1U});
+    }
+    const h264::Sps& sps = m_sps.front();
+    request.encoder = "libx264";
+    if (sps.profile == FF_PROFILE_H264_BASELINE)
+        request.options["profile"] = "baseline";
+    else if (sps.profile == FF_PROFILE_H264_MAIN)
+        request.options["profile"] = "main";
+    request.options["preset"] = "veryfast";
+    request.options["crf"] = kQuality;
+    request.options["a53cc"] = "0";
+    std::string params = "sps-id=" + std::to_string(id) + ":stitchable=1:scenecut=0:keyint=infinite:bframes=0:ref=1";
+    constexpr std::uint8_t kLowestSensibleLevel = 10;
+    const bool isLevel1b = sps.level == 11 && (sps.constraints & 0x10);
+    if (sps.level >= kLowestSensibleLevel && !isLevel1b)
+        params += ":level=" + std::to_string(sps.level);
+    request.options["x264-params"] = params;
+    return {};
+}
+
+base::Result<void> H264Splicer::join(const AVCodecContext& encoder)
+{
+    const auto header =
+        h264::Configuration::parse({encoder.extradata, static_cast<std::size_t>(encoder.extradata_size)});
+    if (!header)
+        return cannotCopy("the encoder did not tell its parameter sets");
+    for (const Bytes& nal : header->sps) {
+        const auto same = h264::withRestriction(nal, m_restriction);
+        if (!same)
+            return cannotCopy("the encoder's parameter sets make no sense");
+        m_encoderSps.push_back(*same);
+    }
+    m_encoderPps = header->pps;
+    return {};
+}
+
+base::Result<void> H264Splicer::describe(AVCodecParameters& parameters)
+{
+    h264::Configuration all = m_header;
+    dropUnused(all);
+    if (m_hasStartCodes)
+        all.lengthSize = 4;
+    all.sps.insert(all.sps.end(), m_encoderSps.begin(), m_encoderSps.end());
+    all.pps.insert(all.pps.end(), m_encoderPps.begin(), m_encoderPps.end());
+    const Bytes bytes = all.bytes();
+    av_freep(&parameters.extradata);
+    parameters.extradata_size = 0;
+    parameters.extradata = static_cast<std::uint8_t*>(av_mallocz(bytes.size() + AV_INPUT_BUFFER_PADDING_SIZE));
+    if (!parameters.extradata)
+        return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
+    std::copy(bytes.begin(), bytes.end(), parameters.extradata);
+    parameters.extradata_size = static_cast<int>(bytes.size());
+    parameters.codec_tag = MKTAG('a', 'v', 'c', '1');
+    return {};
+}
+
+bool H264Splicer::isKnown(ByteView set) const
+{
+    const auto& known = h264::unitOf(set) == Unit::Sps ? m_header.sps : m_header.pps;
+    return std::any_of(known.begin(), known.end(),
+                       [&](const Bytes& each) { return std::equal(each.begin(), each.end(), set.begin(), set.end()); });
+}
+
+base::Result<void> H264Splicer::adoptCopied(AVPacket& packet)
+{
+    std::vector<ByteView> units = unitsIn(packet);
+    bool isChanged = m_hasStartCodes;
+    for (const ByteView nal : units) {
+        const Unit unit = h264::unitOf(nal);
+        if (unit == Unit::SpsExtension || unit == Unit::SubsetSps)
+            return cannotCopy("its parameter sets have extensions");
+        if (unit == Unit::Sps || unit == Unit::Pps) {
+            if (!isKnown(nal))
+                return cannotCopy("its parameter sets change on the way");
+            isChanged = true;
+        }
+    }
+    if (!isChanged)
+        return {};
+    std::erase_if(units, [](ByteView nal) {
+        const Unit unit = h264::unitOf(nal);
+        return unit == Unit::Sps || unit == Unit::Pps || unit == Unit::Delimiter || unit == Unit::Filler;
+    });
+    if (!replacePayload(packet, units, m_hasStartCodes ? 4 : m_header.lengthSize))
+        return cannotCopy("a packet is too large");
+    return {};
+}
+
+base::Result<void> H264Splicer::adoptEncoded(AVPacket& packet)
+{
+    std::vector<ByteView> units = unitsBetweenStartCodes(payloadOf(packet));
+    std::erase_if(units, [](ByteView nal) {
+        const Unit unit = h264::unitOf(nal);
+        return unit != Unit::Slice && unit != Unit::Idr;
+    });
+    if (!replacePayload(packet, units, m_hasStartCodes ? 4 : m_header.lengthSize))
+        return cannotCopy("an encoded packet is too large for its header");
+    return {};
+}
+
+} // namespace ffmpeg

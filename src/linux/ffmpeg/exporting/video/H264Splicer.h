@@ -1,0 +1,42 @@
+/// Joins H.264 with what x264 encodes: its parameter sets get an id of their own, and stand beside the stream's.
+#pragma once
+
+#include "linux/ffmpeg/exporting/video/H264Headers.h"
+#include "linux/ffmpeg/exporting/video/Splicer.h"
+
+#include <optional>
+#include <set>
+
+namespace ffmpeg {
+
+class H264Splicer final : public Splicer {
+public:
+    static base::Result<std::unique_ptr<Splicer>> make(const AVStream& stream);
+
+    bool isJoint(const AVPacket& keyframe) const override;
+    int reorderDepth() const override;
+    bool wantsToSee() const override { return m_header.pps.size() > 1 || m_header.sps.size() > 1; }
+    void see(const AVPacket& copied) override;
+    base::Result<void> prepare(EncoderRequest& request, int reorderDepth) override;
+    base::Result<void> join(const AVCodecContext& encoder) override;
+    base::Result<void> describe(AVCodecParameters& parameters) override;
+    base::Result<void> adoptCopied(AVPacket& packet) override;
+    base::Result<void> adoptEncoded(AVPacket& packet) override;
+
+private:
+    H264Splicer() = default;
+
+    std::vector<ByteView> unitsIn(const AVPacket& packet) const;
+    bool isKnown(ByteView set) const;
+    void dropUnused(h264::Configuration& header) const;
+
+    h264::Configuration m_header;
+    bool m_hasStartCodes = false;
+    std::vector<h264::Sps> m_sps;
+    std::set<std::uint32_t> m_usedPps; ///< empty when nobody looked
+    h264::Sps::Restriction m_restriction{0, 1};
+    std::vector<Bytes> m_encoderSps;
+    std::vector<Bytes> m_encoderPps;
+};
+
+} // namespace ffmpeg

@@ -1,0 +1,75 @@
+#include "linux/ffmpeg/exporting/video/NalUnits.h"
+
+#include <algorithm>
+
+namespace ffmpeg {
+
+std::vector<ByteView> unitsBetweenStartCodes(ByteView data)
+{
+    std::vector<ByteView> units;
+    std::optional<std::size_t> begin;
+    const auto end = [&](std::size_t at) {
+        if (!begin)
+            return;
+        while (at > *begin && data[at - 1] == 0)
+            --at; // zeros before a start code belong to nobody
+        if (at > *begin)
+            units.push_back(data.subspan(*begin, at - *begin));
+    };
+    for (std::size_t at = 0; at + 3 <= data.size(); ++at) {
+        if (data[at] == 0 && data[at + 1] == 0 && data[at + 2] == 1) {
+            end(at);
+            begin = at + 3;
+            at += 2;
+        }
+    }
+    end(data.size());
+    return units;
+}
+
+std::optional<std::vector<ByteView>> unitsBehindLengths(ByteView data, int lengthSize)
+{
+    std::vector<ByteView> units;
+    const auto header = static_cast<std::size_t>(lengthSize);
+    std::size_t at = 0;
+    while (at + header <= data.size()) {
+        std::size_t length = 0;
+        for (std::size_t i = 0; i < header; ++i)
+            length = length << 8 | data[at + i];
+        at += header;
+        if (length > data.size() - at)
+            return std::nullopt;
+        if (length > 0)
+            units.push_back(data.subspan(at, length));
+        at += length;
+    }
+    return units;
+}
+
+bool replacePayload(AVPacket& packet, const std::vector<ByteView>& units, int lengthSize)
+{
+    const auto header = static_cast<std::size_t>(lengthSize);
+    std::size_t size = 0;
+    for (const ByteView unit : units) {
+        if (lengthSize < 4 && unit.size() >> (8 * lengthSize) != 0)
+            return false;
+        size += header + unit.size();
+    }
+    AVBufferRef* buffer = av_buffer_alloc(size + AV_INPUT_BUFFER_PADDING_SIZE);
+    if (!buffer)
+        return false;
+    std::uint8_t* to = buffer->data;
+    for (const ByteView unit : units) {
+        for (int i = lengthSize - 1; i >= 0; --i)
+            *to++ = static_cast<std::uint8_t>(unit.size() >> (8 * i));
+        to = std::copy(unit.begin(), unit.end(), to);
+    }
+    std::fill_n(to, AV_INPUT_BUFFER_PADDING_SIZE, std::uint8_t{0});
+    av_buffer_unref(&packet.buf); // only now: the units may lie in it
+    packet.buf = buffer;
+    packet.data = buffer->data;
+    packet.size = static_cast<int>(size);
+    return true;
+}
+
+} // namespace ffmpeg

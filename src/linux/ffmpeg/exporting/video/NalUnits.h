@@ -1,0 +1,32 @@
+/// The NAL units of H.264 and HEVC packets: between start codes, as broadcasts have them, or behind their lengths, as
+/// files do. Views into what they were made from.
+#pragma once
+
+#include "linux/ffmpeg/Libraries.h"
+#include "linux/ffmpeg/exporting/video/Bits.h"
+
+#include <optional>
+#include <vector>
+
+namespace ffmpeg {
+
+/// Units between start codes.
+std::vector<ByteView> unitsBetweenStartCodes(ByteView data);
+/// Units behind big-endian lengths of so many bytes. Nothing where a length leads beyond the end.
+std::optional<std::vector<ByteView>> unitsBehindLengths(ByteView data, int lengthSize);
+
+/// A packet's payload made of units behind lengths. False when one is too long for that, or memory ran out.
+/// Times, flags and the rest of `packet` stay.
+bool replacePayload(AVPacket& packet, const std::vector<ByteView>& units, int lengthSize);
+
+inline ByteView payloadOf(const AVPacket& packet)
+{
+    return {packet.data, static_cast<std::size_t>(packet.size)};
+}
+
+inline ByteView extradataOf(const AVCodecParameters& parameters)
+{
+    return {parameters.extradata, static_cast<std::size_t>(parameters.extradata_size)};
+}
+
+} // namespace ffmpeg

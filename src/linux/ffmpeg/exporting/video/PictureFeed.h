@@ -1,0 +1,38 @@
+/// Decodes a stretch of a movie's pictures, for encoding them again. One thread, but the decoder uses more.
+#pragma once
+
+#include "linux/ffmpeg/VideoDecoder.h"
+#include "linux/ffmpeg/exporting/video/PicturePackets.h"
+
+#include <deque>
+#include <functional>
+#include <memory>
+#include <optional>
+
+namespace ffmpeg {
+
+class PictureFeed {
+public:
+    /// A packet that ends the stretch; it is not decoded.
+    using IsEnd = std::function<bool(const AVPacket&)>;
+
+    /// Goes to the keyframe before `from`. `packets` lives longer; nobody else reads it before this has ended.
+    static base::Result<std::unique_ptr<PictureFeed>> start(PicturePackets& packets, std::int64_t from, IsEnd isEnd);
+
+    /// The next picture in the order of presentation; null at the end. Packets that were damaged give none.
+    base::Result<FrameRef> next();
+    /// The packet that ended the stretch; null when the movie did, or before the end.
+    Owned<AVPacket> takeEnd() { return std::move(m_end); }
+
+private:
+    PictureFeed(PicturePackets& packets, std::unique_ptr<VideoDecoder> decoder, IsEnd isEnd);
+
+    PicturePackets& m_packets;
+    std::unique_ptr<VideoDecoder> m_decoder;
+    IsEnd m_isEnd;
+    Owned<AVPacket> m_packet;
+    Owned<AVPacket> m_end;
+    bool m_finished = false;
+};
+
+} // namespace ffmpeg

@@ -1,0 +1,48 @@
+/// The packets of an exported picture track in the order of decoding: gives them their times of decoding and durations.
+/// One thread.
+///
+/// The i-th packet is decoded when the (i - depth)-th picture is shown: so times of decoding grow, are never behind those
+/// of presentation, and need not be known of the source (Matroska does not keep them).
+#pragma once
+
+#include "base/Result.h"
+#include "linux/ffmpeg/Libraries.h"
+
+#include <cstdint>
+#include <deque>
+#include <functional>
+#include <optional>
+#include <queue>
+#include <vector>
+
+namespace ffmpeg {
+
+class PictureLine {
+public:
+    /// `step` is a usual picture's duration. No picture lasts longer than up to `end`; the one that is shown at `last`
+    /// lasts so long.
+    PictureLine(int depth, std::int64_t step, std::optional<std::int64_t> last, std::int64_t end);
+
+    /// The packet's pts is set, and its duration where it is known. Fails when pictures are reordered more than `depth`.
+    base::Result<void> push(Owned<AVPacket> packet);
+    /// Nothing more comes. `end` replaces the one that was known before, where the last was not.
+    void finish(std::optional<std::int64_t> end = std::nullopt);
+    /// False when more must be pushed first, or all have come out.
+    bool pop(AVPacket& packet);
+
+    std::int64_t count() const { return m_count; }
+
+private:
+    int m_depth;
+    std::int64_t m_step;
+    std::optional<std::int64_t> m_last;
+    std::int64_t m_end;
+    std::deque<Owned<AVPacket>> m_packets;
+    std::priority_queue<std::int64_t, std::vector<std::int64_t>, std::greater<>> m_pending;
+    std::int64_t m_count = 0;
+    std::int64_t m_first = 0;
+    std::int64_t m_lastDts = 0;
+    bool m_finished = false;
+};
+
+} // namespace ffmpeg

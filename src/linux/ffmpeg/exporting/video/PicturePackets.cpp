@@ -1,0 +1,132 @@
+#include "linux/ffmpeg/exporting/video/PicturePackets.h"
+
+#include "linux/ffmpeg/exporting/CannotCopy.h"
+
+#include <algorithm>
+
+namespace ffmpeg {
+
+PicturePackets::PicturePackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer)
+    : m_movie(std::move(movie)), m_demuxer(std::move(demuxer)),
+      m_scale(std::int64_t(track().timescale) / track().timeBase.den * track().timeBase.num), m_packet(newPacket()),
+      m_peeked(newPacket())
+{
+    m_demuxer->select({track().stream});
+}
+
+base::Result<std::unique_ptr<PicturePackets>> PicturePackets::open(std::shared_ptr<const Movie> movie,
+                                                                   Cancelled cancelled)
+{
+    auto demuxer = movie->demuxer(std::move(cancelled));
+    if (!demuxer)
+        return demuxer.error();
+    return std::unique_ptr<PicturePackets>(new PicturePackets(std::move(movie), std::move(demuxer).value()));
+}
+
+void PicturePackets::seek(std::int64_t outTick)
+{
+    const std::int64_t second = std::max<std::int64_t>(1, av_rescale_q(1, {1, 1}, track().timeBase));
+    const std::int64_t wanted = outTick / m_scale + track().origin;
+    std::int64_t back = 0;
+    for (;;) {
+        const std::int64_t target = wanted - back;
+        // Formats without a table find their way only from the start; nor is there anything before it to skip.
+        m_startsMovie = !m_demuxer->seeksByTable() || outTick <= 0 || target < track().origin - second
+                        || !m_demuxer->seek(track().stream, target);
+        if (m_startsMovie)
+            m_demuxer->seekToStart(track().stream);
+        do {
+            m_hasPeeked = m_demuxer->read(*m_peeked) == 0;
+        } while (m_hasPeeked && !m_startsMovie && !(m_peeked->flags & AV_PKT_FLAG_KEY));
+        const bool isEarly = m_hasPeeked && m_peeked->pts != AV_NOPTS_VALUE && this->outTick(m_peeked->pts) <= outTick;
+        if (m_startsMovie || isEarly || m_demuxer->isCancelled())
+            return;
+        // The table's times are those of decoding, and a file that is cut has a table that is not.
+        back = back ? back * 2 : second;
+    }
+}
+
+int PicturePackets::read(AVPacket& packet)
+{
+    if (!m_hasPeeked)
+        return m_demuxer->read(packet);
+    m_hasPeeked = false;
+    av_packet_unref(&packet);
+    av_packet_move_ref(&packet, m_peeked.get());
+    return 0;
+}
+
+base::Result<PicturePacket> PicturePackets::look(const AVPacket& packet, const IsJoint& isJoint) const
+{
+    if (packet.pts == AV_NOPTS_VALUE)
+        return cannotCopy("its packets do not say when they are shown");
+    const bool isKey = packet.flags & AV_PKT_FLAG_KEY;
+    return PicturePacket{outTick(packet.pts), isKey, isKey && isJoint(packet),
+                         (packet.flags & AV_PKT_FLAG_DISCARD) != 0};
+}
+
+base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::int64_t end, const IsJoint& isJoint)
+{
+    seek(start);
+    PacketWindow window;
+    window.startsMovie = m_startsMovie;
+    int behindStart = 0;
+    int behindEnd = 0;
+    std::int64_t visible = 0;
+    while (read(*m_packet) == 0) {
+        const auto looked = look(*m_packet, isJoint);
+        if (!looked)
+            return looked.error();
+        const PicturePacket& each = looked.value();
+        if (each.isKey && each.pts <= start && !window.packets.empty()) {
+            window.packets.clear();
+            window.startsMovie = false;
+        }
+        window.packets.push_back(each);
+        if (each.pts <= start && !each.isHidden)
+            visible = std::max(visible, each.pts);
+        behindStart += each.pts > start;
+        behindEnd += each.pts >= end;
+        if (each.isJoint && !each.isHidden && each.pts > start && window.packets.size() > 1)
+            return window;
+        // What is visible at the start is a joint itself: all that follows can be copied.
+        const PicturePacket& first = window.packets.front();
+        const bool startsWithIt = first.isJoint && !first.isHidden && first.pts >= visible;
+        if (behindEnd > kFarthestReorder || (startsWithIt && behindStart > kFarthestReorder))
+            return window;
+    }
+    window.endsMovie = true;
+    return window;
+}
+
+base::Result<PacketWindow> PicturePackets::tailWindow(std::int64_t from, std::int64_t end, const IsJoint& isJoint)
+{
+    const std::int64_t second = track().timescale;
+    from = std::min(from, m_movie->duration().convertedTo(track().timescale).value);
+    for (std::int64_t back = 0;; back = back ? back * 2 : second) {
+        seek(from - back);
+        PacketWindow window;
+        window.startsMovie = m_startsMovie;
+        int behindEnd = 0;
+        while (read(*m_packet) == 0) {
+            const auto looked = look(*m_packet, isJoint);
+            if (!looked)
+                return looked.error();
+            const PicturePacket& each = looked.value();
+            if (each.isJoint && !each.isHidden && each.pts < end && !window.packets.empty()) {
+                window.packets.clear();
+                window.startsMovie = false;
+            }
+            window.packets.push_back(each);
+            behindEnd += each.pts >= end;
+            if (behindEnd > kFarthestReorder || (each.isJoint && each.pts >= end))
+                return window;
+        }
+        window.endsMovie = true;
+        // A file that is cut has nothing where its table leads to.
+        if (!window.packets.empty() || m_startsMovie || isCancelled())
+            return window;
+    }
+}
+
+} // namespace ffmpeg

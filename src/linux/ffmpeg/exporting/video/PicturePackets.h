@@ -1,0 +1,63 @@
+/// Reads the packets of a movie's pictures in the order of decoding, from any place. One thread.
+///
+/// Packets keep the stream's own ticks, as its decoder wants them; outTick() makes them those of the output: on the
+/// movie's time line, and as fine as all times that the movie tells.
+#pragma once
+
+#include "linux/ffmpeg/Movie.h"
+#include "linux/ffmpeg/exporting/video/VideoPlan.h"
+
+#include <functional>
+#include <memory>
+
+namespace ffmpeg {
+
+class PicturePackets {
+public:
+    /// No codec shows a picture later than so many that follow it: 16 is what H.264 and HEVC allow, of two fields each.
+    static constexpr int kFarthestReorder = 33;
+
+    /// `movie` has pictures.
+    static base::Result<std::unique_ptr<PicturePackets>> open(std::shared_ptr<const Movie> movie, Cancelled cancelled);
+
+    const Movie& movie() const { return *m_movie; }
+    const VideoTrack& track() const { return *m_movie->video(); }
+    AVStream& stream() { return m_demuxer->stream(track().stream); }
+    AVFormatContext& context() { return m_demuxer->context(); }
+    /// Whether the file's times of decoding are its own, and all times are exact.
+    bool isMov() const { return m_demuxer->isMov(); }
+    bool isCancelled() const { return m_demuxer->isCancelled(); }
+
+    std::int64_t outTick(std::int64_t pts) const { return (pts - track().origin) * m_scale; }
+    /// A time span, in ticks of the output.
+    std::int64_t outTicks(std::int64_t duration) const { return duration * m_scale; }
+    AVRational outTimeBase() const { return {1, track().timescale}; }
+
+    /// What is read next is a keyframe shown at or before this tick of the output, or the first packet of all.
+    void seek(std::int64_t outTick);
+    /// Whether nothing precedes what is read next (or was read first since).
+    bool startsMovie() const { return m_startsMovie; }
+    /// As Demuxer::read.
+    int read(AVPacket& packet);
+
+    using IsJoint = std::function<bool(const AVPacket&)>;
+    /// The windows that planVideo() takes. The error says why times are not good enough to copy.
+    base::Result<PacketWindow> headWindow(std::int64_t start, std::int64_t end, const IsJoint& isJoint);
+    /// `from` is `end`, or earlier when that was not early enough.
+    base::Result<PacketWindow> tailWindow(std::int64_t from, std::int64_t end, const IsJoint& isJoint);
+
+private:
+    PicturePackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer);
+
+    base::Result<PicturePacket> look(const AVPacket& packet, const IsJoint& isJoint) const;
+
+    std::shared_ptr<const Movie> m_movie;
+    std::unique_ptr<Demuxer> m_demuxer;
+    std::int64_t m_scale;
+    Owned<AVPacket> m_packet;
+    Owned<AVPacket> m_peeked;
+    bool m_hasPeeked = false;
+    bool m_startsMovie = false;
+};
+
+} // namespace ffmpeg

@@ -1,0 +1,29 @@
+/// Brings pictures of any size and format to those that an encoder takes. One thread.
+#pragma once
+
+#include "base/Result.h"
+#include "linux/ffmpeg/Libraries.h"
+
+namespace ffmpeg {
+
+/// The format nearest to `source` that x264 takes; alpha is left out.
+AVPixelFormat formatForH264(AVPixelFormat source);
+
+class PictureScaler {
+public:
+    PictureScaler(AVPixelFormat format, int width, int height) : m_format(format), m_width(width), m_height(height) {}
+
+    /// The picture itself where it fits already; else scaled to the whole width or height, black beside it.
+    base::Result<Owned<AVFrame>> fit(const AVFrame& picture);
+
+private:
+    AVPixelFormat m_format;
+    int m_width;
+    int m_height;
+    Owned<SwsContext> m_scaler;
+    int m_fromWidth = 0;
+    int m_fromHeight = 0;
+    int m_fromFormat = -1;
+};
+
+} // namespace ffmpeg

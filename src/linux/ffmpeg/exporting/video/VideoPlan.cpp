@@ -1,0 +1,140 @@
+#include "linux/ffmpeg/exporting/video/VideoPlan.h"
+
+#include <algorithm>
+#include <limits>
+#include <set>
+
+namespace ffmpeg {
+
+namespace {
+
+constexpr std::int64_t kBefore = std::numeric_limits<std::int64_t>::min();
+constexpr std::int64_t kBehind = std::numeric_limits<std::int64_t>::max();
+
+VideoPlan encodeAll(VideoPlan plan, std::string reason)
+{
+    plan.reason = std::move(reason);
+    return plan;
+}
+
+/// Of the last picture that is shown at or before `start`, else of the first; nothing when there is none.
+std::optional<std::int64_t> visibleAt(const std::vector<PicturePacket>& packets, std::int64_t start)
+{
+    std::optional<std::int64_t> visible;
+    std::optional<std::int64_t> first;
+    for (const PicturePacket& each : packets) {
+        if (each.isHidden)
+            continue;
+        if (each.pts <= start)
+            visible = std::max(visible.value_or(each.pts), each.pts);
+        first = std::min(first.value_or(each.pts), each.pts);
+    }
+    return visible ? visible : first;
+}
+
+bool haveTimesOfTheirOwn(const std::vector<PicturePacket>& packets)
+{
+    std::set<std::int64_t> seen;
+    return std::all_of(packets.begin(), packets.end(),
+                       [&](const PicturePacket& each) { return each.isHidden || seen.insert(each.pts).second; });
+}
+
+/// The first joint that shows no picture before `firstPts`, and behind which nothing earlier than itself is shown.
+std::optional<std::size_t> findJoint(const PacketWindow& head, std::int64_t firstPts)
+{
+    std::int64_t shown = kBefore;
+    for (std::size_t i = 0; i < head.packets.size(); ++i) {
+        const PicturePacket& each = head.packets[i];
+        if (!each.isHidden && each.pts >= firstPts && each.pts > shown) {
+            const bool nothingEarlier =
+                std::all_of(head.packets.begin() + static_cast<std::ptrdiff_t>(i) + 1, head.packets.end(),
+                            [&](const PicturePacket& later) { return later.pts > each.pts; });
+            // The movie's first picture needs none before it, whatever its kind.
+            if ((each.isJoint || (head.startsMovie && i == 0 && each.isKey)) && nothingEarlier)
+                return i;
+        }
+        shown = std::max(shown, each.pts);
+    }
+    return std::nullopt;
+}
+
+/// How many of the packets from `begin` on can be copied.
+std::size_t copyablePrefix(const std::vector<PicturePacket>& packets, std::size_t begin, std::int64_t end,
+                           bool endsMovie)
+{
+    std::vector<std::int64_t> earliest(packets.size() + 1, kBehind);
+    for (std::size_t i = packets.size(); i-- > begin;)
+        earliest[i] = std::min(earliest[i + 1], packets[i].pts);
+    std::size_t best = 0;
+    std::int64_t latest = kBefore;
+    for (std::size_t i = begin; i < packets.size(); ++i) {
+        if (packets[i].isHidden || packets[i].pts >= end)
+            break;
+        latest = std::max(latest, packets[i].pts);
+        if (latest < earliest[i + 1] && (i + 1 < packets.size() || endsMovie))
+            best = i + 1 - begin;
+    }
+    return best;
+}
+
+} // namespace
+
+int reorderDepthOf(const std::vector<PicturePacket>& packets)
+{
+    int depth = 0;
+    std::vector<std::int64_t> before; // sorted
+    for (const PicturePacket& each : packets) {
+        const auto at = std::upper_bound(before.begin(), before.end(), each.pts);
+        depth = std::max(depth, static_cast<int>(before.end() - at));
+        before.insert(at, each.pts);
+        constexpr std::size_t kEnough = 64; // more than any codec reorders
+        if (before.size() > kEnough)
+            before.erase(before.begin());
+    }
+    return depth;
+}
+
+VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int64_t start, std::int64_t end)
+{
+    VideoPlan plan;
+    const auto first = visibleAt(head.packets, start);
+    if (!first || *first >= end)
+        return encodeAll(plan, "no picture is shown in the range");
+    plan.firstPts = *first;
+    plan.reorderDepth = std::max(reorderDepthOf(head.packets), reorderDepthOf(tail.packets));
+    if (!haveTimesOfTheirOwn(head.packets) || !haveTimesOfTheirOwn(tail.packets))
+        return encodeAll(plan, "several pictures have the same time");
+
+    const auto joint = findJoint(head, plan.firstPts);
+    if (!joint || head.packets[*joint].pts >= end)
+        return encodeAll(plan, "no group of pictures begins in the range");
+    plan.copyFrom = head.packets[*joint].pts;
+
+    // Where both windows overlap, the stretch begins inside the tail's.
+    const auto& packets = tail.packets;
+    const auto found = std::find_if(packets.begin(), packets.end(),
+                                    [&](const PicturePacket& each) { return each.pts == plan.copyFrom; });
+    const auto begin = found == packets.end() ? std::size_t{0} : static_cast<std::size_t>(found - packets.begin());
+    const std::size_t count = copyablePrefix(packets, begin, end, tail.endsMovie);
+    if (count == 0) {
+        if (found != packets.end() || tail.startsMovie)
+            return encodeAll(plan, "no picture can be copied before the end of the range");
+        plan.wantsEarlierTail = true;
+        return plan;
+    }
+    plan.lastCopied = kBefore;
+    for (std::size_t i = begin; i < begin + count; ++i)
+        plan.lastCopied = std::max(plan.lastCopied, packets[i].pts);
+    if (begin + count < packets.size())
+        plan.copyTo = packets[begin + count].pts;
+    for (std::size_t i = begin + count; i < packets.size(); ++i) {
+        if (!packets[i].isHidden && packets[i].pts < end)
+            plan.tail.push_back(packets[i].pts);
+        plan.isCutAtEnd = plan.isCutAtEnd || packets[i].pts >= end;
+    }
+    std::sort(plan.tail.begin(), plan.tail.end());
+    plan.lastPts = plan.tail.empty() ? plan.lastCopied : plan.tail.back();
+    return plan;
+}
+
+} // namespace ffmpeg

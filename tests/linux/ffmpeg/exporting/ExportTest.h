@@ -1,0 +1,78 @@
+/// A fixture that exports movies into a directory of its own.
+#pragma once
+
+#include "linux/ffmpeg/exporting/DecodedMovie.h"
+#include "platform/media/ExportSession.h"
+#include "support/EngineTest.h"
+
+#include <filesystem>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace tests {
+
+class ExportTest : public EngineTest {
+protected:
+    using ExportStatus = platform::ExportSession::Status;
+    using Range = base::MediaTimeRange;
+
+    ExportTest()
+    {
+        std::string pattern = (std::filesystem::temp_directory_path() / "clipsa-export-XXXXXX").string();
+        directory = mkdtemp(pattern.data());
+    }
+    ~ExportTest() override { std::filesystem::remove_all(directory); }
+
+    static std::string exportMovie(const std::string& name) { return movie("export/" + name); }
+    std::string output(const std::string& name = "out.mp4") const { return directory + "/" + name; }
+    static Range fromTo(double start, double end) { return {at(start), at(end - start)}; }
+
+    std::shared_ptr<platform::ExportSession> sessionFor(const std::string& from, const std::string& to,
+                                                        std::optional<Range> range)
+    {
+        asset = media.assetWithURL(base::Url::fromPath(from));
+        auto session = media.exportSessionWithAsset(asset, platform::ExportPreset::HighestQuality);
+        session->setOutputURL(base::Url::fromPath(to));
+        session->setOutputFileType(platform::FileType::Mpeg4);
+        session->setTimeRange(range);
+        return session;
+    }
+    /// Runs it to its end; gives the final status.
+    ExportStatus run(const std::shared_ptr<platform::ExportSession>& session)
+    {
+        std::atomic<int> ended = 0;
+        session->exportAsynchronously([&] { ++ended; });
+        EXPECT_TRUE(waitFor([&] { return ended > 0; }));
+        EXPECT_EQ(ended, 1);
+        lastError = session->error();
+        return session->status();
+    }
+    ExportStatus cut(const std::string& from, const std::string& to, std::optional<Range> range)
+    {
+        return run(sessionFor(from, to, range));
+    }
+    std::string errorText() const { return lastError ? lastError->description() : ""; }
+    /// Names of what lies in the directory.
+    std::vector<std::string> files() const
+    {
+        std::vector<std::string> names;
+        for (const auto& each : std::filesystem::directory_iterator(directory))
+            names.push_back(each.path().filename());
+        std::sort(names.begin(), names.end());
+        return names;
+    }
+    bool saysEncodedAsAWhole() const
+    {
+        for (const std::string& line : log.texts(base::MemoryLog::Line::Kind::Message))
+            if (line.find("is encoded as a whole") != std::string::npos)
+                return true;
+        return false;
+    }
+
+    std::string directory;
+    base::ErrorRef lastError;
+};
+
+} // namespace tests
