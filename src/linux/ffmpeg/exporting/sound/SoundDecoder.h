@@ -1,0 +1,32 @@
+/// Decodes the packets of one sound track, giving every sample there is: edit lists and priming are the caller's. One
+/// thread.
+#pragma once
+
+#include "linux/ffmpeg/Libraries.h"
+
+#include <memory>
+
+namespace ffmpeg {
+
+class SoundDecoder {
+public:
+    /// Null when there is none for it.
+    static std::unique_ptr<SoundDecoder> open(const AVCodecParameters& parameters, AVRational timeBase);
+
+    /// Null at the end of the track. False when the packet is damaged.
+    bool send(const AVPacket* packet);
+    /// The next frame, or null: send more.
+    const AVFrame* receive();
+    void flush();
+
+    /// How many samples the file says do not belong to the sound at this frame's end.
+    static int surplusOf(const AVFrame& frame);
+
+private:
+    explicit SoundDecoder(Owned<AVCodecContext> context) : m_context(std::move(context)), m_frame(newFrame()) {}
+
+    Owned<AVCodecContext> m_context;
+    Owned<AVFrame> m_frame;
+};
+
+} // namespace ffmpeg

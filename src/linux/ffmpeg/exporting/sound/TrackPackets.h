@@ -1,0 +1,61 @@
+/// Reads the packets of one sound track, as MP4 wants them, with a demuxer of its own. One thread.
+#pragma once
+
+#include "linux/ffmpeg/Demuxer.h"
+#include "linux/ffmpeg/Movie.h"
+
+extern "C" {
+#include <libavcodec/bsf.h>
+}
+
+#include <memory>
+#include <optional>
+#include <string>
+
+namespace ffmpeg {
+
+struct FreeingFilter {
+    void operator()(AVBSFContext* filter) const { av_bsf_free(&filter); }
+};
+struct FreeingParameters {
+    void operator()(AVCodecParameters* parameters) const { avcodec_parameters_free(&parameters); }
+};
+
+class TrackPackets {
+public:
+    static base::Result<std::unique_ptr<TrackPackets>> open(std::shared_ptr<const Movie> movie, int stream,
+                                                            const Cancelled& cancelled);
+
+    const Movie& movie() const { return *m_movie; }
+    AVStream& stream() const { return m_demuxer->stream(m_stream); }
+    /// With the header that decoders and MP4 need.
+    const AVCodecParameters& parameters() const { return *m_parameters; }
+    int rate() const { return m_parameters->sample_rate; }
+
+    /// The next packet is one that begins at or before this moment of the movie, or the track's first.
+    void seek(double seconds);
+    /// Whether what is read next, or was read since, begins with the track's first packet.
+    bool isFromStart() const { return m_isFromStart; }
+    /// 0, AVERROR_EOF where the track ends or the file is cut, AVERROR_EXIT, or another error after which nothing can
+    /// be read. Every packet has a presentation time.
+    int read(AVPacket& packet);
+
+private:
+    TrackPackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer, int stream);
+
+    int prepare();
+    bool trySeek(double seconds);
+    void toStart();
+    int readFiltered(AVPacket& packet);
+
+    std::shared_ptr<const Movie> m_movie;
+    std::unique_ptr<Demuxer> m_demuxer;
+    int m_stream;
+    std::unique_ptr<AVCodecParameters, FreeingParameters> m_parameters;
+    std::unique_ptr<AVBSFContext, FreeingFilter> m_filter;
+    Owned<AVPacket> m_first; ///< read already
+    std::int64_t m_expected = AV_NOPTS_VALUE;
+    bool m_isFromStart = false;
+};
+
+} // namespace ffmpeg
