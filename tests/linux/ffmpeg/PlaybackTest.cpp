@@ -260,13 +260,16 @@ TEST_F(Playback, APlayerOfNothingDoesNothing)
 
 TEST_F(Playback, PlayersThatGoWhileTheyWorkAreNotWaitedFor)
 {
+    // The quickest of them: a loaded machine can stop any single one for as long as it likes.
+    auto quickest = std::chrono::steady_clock::duration::max();
     for (int i = 0; i < 10; ++i) {
         playFile("long-gop.mp4");
         player->seekToTime(at(19));
         const auto before = std::chrono::steady_clock::now();
         player = nullptr;
-        EXPECT_LT(std::chrono::steady_clock::now() - before, 50ms);
+        quickest = std::min(quickest, std::chrono::steady_clock::now() - before);
     }
+    EXPECT_LT(quickest, 50ms);
 }
 
 } // namespace
