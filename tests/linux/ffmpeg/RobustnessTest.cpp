@@ -5,6 +5,8 @@
 #include <iterator>
 #include <random>
 #include <unistd.h>
+#include <utility>
+#include <vector>
 
 namespace {
 
@@ -14,6 +16,25 @@ std::string bytesOf(const std::string& path)
 {
     std::ifstream file(path, std::ios::binary);
     return {std::istreambuf_iterator<char>(file), {}};
+}
+
+std::uint32_t wordAt(const std::string& bytes, std::size_t at)
+{
+    std::uint32_t number = 0;
+    for (std::size_t i = 0; i < 4; ++i)
+        number = number << 8 | static_cast<unsigned char>(bytes.at(at + i));
+    return number;
+}
+
+/// Overwrites the words of the movie's first table of that name, from its `first` word on, each `step` words.
+void lieIn(std::string& bytes, const char* table, std::size_t first, std::size_t step, std::uint32_t lie)
+{
+    const std::size_t name = bytes.find(table);
+    ASSERT_NE(name, std::string::npos) << table;
+    const std::size_t end = name - 4 + wordAt(bytes, name - 4);
+    for (std::size_t at = name + 4 + 4 * first; at + 4 <= end; at += 4 * step)
+        for (std::size_t i = 0; i < 4; ++i)
+            bytes.at(at + i) = static_cast<char>(lie >> (24 - 8 * i));
 }
 
 /// Opened, sought and played: whatever comes of it, it comes soon, and the player is still in order.
@@ -106,6 +127,34 @@ TEST_F(Robustness, AnUnknownCodecFailsInWords)
     EXPECT_EQ(open(path), Status::Failed);
     EXPECT_NE(item->error()->description().find("cannot be decoded"), std::string::npos)
         << item->error()->description();
+}
+
+TEST_F(Robustness, AnIndexThatLiesDoesNoHarm)
+{
+    // Words are counted from the table's flags: entries follow the flags and their count, sizes one word later.
+    for (const auto& [table, first] : std::vector<std::pair<const char*, std::size_t>>{
+             {"stsz", 1}, {"stsz", 2}, {"stsz", 3}, {"stco", 1}, {"stco", 2}, {"stsc", 2}, {"stts", 1}, {"stts", 2}})
+        for (const std::uint32_t lie : {0u, 1u, 0x00ffffffu, 0x7fffffffu, 0xfffffff0u}) {
+            std::string bytes = bytesOf(movie("no-sound.mp4"));
+            ASSERT_NO_FATAL_FAILURE(lieIn(bytes, table, first, 1, lie));
+            write(bytes);
+            use(path);
+            ASSERT_FALSE(HasFatalFailure()) << table << " from " << first << " is " << lie;
+        }
+}
+
+TEST_F(Robustness, AMovieWhosePicturesTakeNoTimeIsOverAtOnce)
+{
+    std::string bytes = bytesOf(movie("no-sound.mp4"));
+    ASSERT_NO_FATAL_FAILURE(lieIn(bytes, "stts", 3, 2, 0));
+    write(bytes);
+    use(path);
+    if (item->status() != Status::ReadyToPlay)
+        return;
+    player->seekToTime(at(5));
+    EXPECT_LE(player->currentTime(), item->duration());
+    player->seekToTime(at(-5));
+    EXPECT_EQ(player->currentTime().seconds(), 0);
 }
 
 TEST_F(Robustness, FilesCutAnywhereDoNoHarm)

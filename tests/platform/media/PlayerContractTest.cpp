@@ -217,6 +217,20 @@ TEST_P(PlayerContract, ABoundaryThatPausesEndsTheRunThere)
     EXPECT_NEAR(player->currentTime().seconds(), 0.2, 0.006);
 }
 
+TEST_P(PlayerContract, FormerBoundariesStayAttachedAndPauseEachRunFromBeforeThem)
+{
+    becomeReady();
+    const auto former = player->addBoundaryTimeObserver({at(0.6)}, [&] { player->pause(); });
+    for (int run = 0; run < 2; ++run) {
+        player->seekToTime(at(0.3));
+        const auto later = player->addBoundaryTimeObserver({at(0.9)}, [&] { player->pause(); });
+        player->play();
+        letPlay(1);
+        EXPECT_FALSE(player->isPlaying());
+        EXPECT_NEAR(player->currentTime().seconds(), 0.6, 0.006);
+    }
+}
+
 TEST_P(PlayerContract, StepsGoPictureByPictureAndAddUp)
 {
     becomeReady();
