@@ -47,6 +47,22 @@ TEST_F(Playback, ADurationThatIsNotNumericYetWaitsForOneThatIs)
     EXPECT_TRUE(editor->currentItemLoaded());
 }
 
+TEST_F(Playback, ADurationThatComesBeforeTheStatusWaitsForItAndIsTakenOnce)
+{
+    fake->media.movies.clear();
+    open();
+    fake->media.item()->learnDuration(10);
+    EXPECT_FALSE(editor->currentItemLoaded());
+    EXPECT_EQ(editor->avTrimmer()->delegate(), nullptr);
+    EXPECT_TRUE(std::isnan(editor->getPlayerDuration()));
+    fake->media.item()->becomeReady(10);
+    EXPECT_TRUE(editor->currentItemLoaded());
+    EXPECT_EQ(editor->editEndTime(), 10);
+    editor->setEditEndTime(7);
+    fake->media.item()->learnDuration(12);
+    EXPECT_EQ(editor->editEndTime(), 7);
+}
+
 TEST_F(Playback, ChangesOfOtherObjectsAndKeysAreNotTheEditors)
 {
     fake->media.movies.clear();

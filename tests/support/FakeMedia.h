@@ -134,6 +134,12 @@ public:
         change(Status::ReadyToPlay);
     }
     void becomeReady(double seconds) { becomeReady(FakeMovie::lasting(seconds)); }
+    /// Tells the observers of "duration" only: the status is not known yet.
+    void learnDuration(double seconds)
+    {
+        m_duration = FakeMovie::lasting(seconds).duration;
+        didChangeValueForKey(kDurationKey);
+    }
     void fail(base::ErrorRef why = FakeMovie::failing().error)
     {
         m_error = std::move(why);
