@@ -31,6 +31,9 @@ Theme Theme::forScheme(Scheme scheme)
     theme.chrome = dark ? QColor(0x1B, 0x1B, 0x20, 168) : QColor(0xF4, 0xF4, 0xF8, 180);
     theme.disc = QColor(0xFF, 0xFF, 0xFF, 150);
     theme.hairline = dark ? QColor(255, 255, 255, 40) : QColor(0, 0, 0, 46);
+    theme.trim = dark ? QColor(0xFF, 0xCF, 0x40) : QColor(0xFB, 0xBF, 0x24);
+    theme.trimMark = QColor(0x2E, 0x22, 0x00);
+    theme.trimOutline = dark ? QColor(0, 0, 0, 90) : QColor(0x4A, 0x36, 0x00, 150);
     theme.focusRing = dark ? QColor(0x9D, 0xBB, 0xFF) : QColor(0x1F, 0x4F, 0xD1);
     theme.focusContrast = dark ? QColor(0x0B, 0x0B, 0x0E, 200) : QColor(255, 255, 255, 230);
     return theme;

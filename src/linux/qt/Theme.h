@@ -18,12 +18,15 @@ QColor toQColor(const platform::Color& color);
 
 struct Theme {
     Scheme scheme = Scheme::Light;
-    QColor text;     ///< titles and labels
-    QColor accent;   ///< what can be pressed, unless it has a tint colour
-    QColor bar;      ///< over the blur behind a bar: opaque enough for text on any picture
-    QColor chrome;   ///< over the blur behind the scrubber's strip
-    QColor disc;     ///< over the blur of a masked backdrop; light in both schemes, as its glyph is dark
-    QColor hairline; ///< the bar's edge toward the content
+    QColor text;        ///< titles and labels
+    QColor accent;      ///< what can be pressed, unless it has a tint colour
+    QColor bar;         ///< over the blur behind a bar: opaque enough for text on any picture
+    QColor chrome;      ///< over the blur behind the scrubber's strip
+    QColor disc;        ///< over the blur of a masked backdrop; light in both schemes, as its glyph is dark
+    QColor hairline;    ///< the bar's edge toward the content
+    QColor trim;        ///< the frame around the range that is kept
+    QColor trimMark;    ///< on its grips
+    QColor trimOutline; ///< around it, where it stands on a bright ground
     QColor focusRing;
     QColor focusContrast; ///< around the ring, so that it shows on any picture
 

@@ -114,6 +114,9 @@ public:
     /// Those on the strip and, while it is zoomed, those of the whole movie.
     const std::map<double, ImageRef>& thumbnails() const { return m_thumbnails; }
     bool isZoomed() const { return m_zoomed; }
+    // Seconds at the left and at the right end of the track.
+    double visibleStart() const { return m_visible.start; }
+    double visibleEnd() const { return m_visible.end; }
     ScrubberHandle held() const { return m_held; }
     // Null until first laid out.
     const std::shared_ptr<PlayHeadView>& playHead() const { return m_playHead; }

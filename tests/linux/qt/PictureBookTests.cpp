@@ -101,6 +101,8 @@ protected:
         scrubber = std::make_shared<platform::MovieScrubber>();
         scrubber->setFrame(base::Rect::make(0, 0, size.width, 38));
         scrubber->setEdgeInset(10);
+        scrubber->setEditable(true);
+        scrubber->setZoomDelay(0.5);
         scrubber->setDataSource(movie);
         backdrop->addSubview(scrubber);
         scrubber->reloadData();
@@ -179,6 +181,14 @@ TEST_F(PictureBookAtTwo, APhone)
     scrubber->setHighlighted(true);
     top->setAlpha(0.5);
     keep("phone-dark-held-half");
+    top->setAlpha(1);
+    scrubber->setHighlighted(false);
+    scrubber->moveHandle(platform::ScrubberHandle::Start, 3);
+    scrubber->moveHandle(platform::ScrubberHandle::End, 8);
+    scrubber->setValue(5);
+    keep("phone-dark-trim");
+    presenter->setScheme(qtui::Scheme::Light);
+    keep("phone-light-trim");
     expectWhole();
 }
 
@@ -190,6 +200,16 @@ TEST_F(PictureBook, ATablet)
     presenter->setScheme(qtui::Scheme::Dark);
     presenter->setLiveBlur(false);
     keep("tablet-dark-plain");
+    scrubber->moveHandle(platform::ScrubberHandle::Start, 3);
+    keep("tablet-dark-trim");
+    presenter->setScheme(qtui::Scheme::Light);
+    look();
+    const double y = scrubber->convertToRoot({0, 19}).y;
+    window->touchDown({1, {scrubber->startHandle()->frame().center().x, y}, {}});
+    clock.advance(std::chrono::milliseconds(500));
+    mainQueue.drain();
+    keep("tablet-light-zoomed");
+    window->touchCancel({1, {}, {}});
     expectWhole();
 }
 

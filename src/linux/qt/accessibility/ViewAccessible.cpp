@@ -4,7 +4,6 @@
 #include "linux/qt/StageWindow.h"
 #include "linux/qt/accessibility/WorkAccessible.h"
 #include "linux/qt/items/WorkLine.h"
-#include "platform/views/MovieScrubber.h"
 
 #include <QAccessible>
 #include <QAccessibleActionInterface>
@@ -189,8 +188,8 @@ private:
     void setNumber(double number)
     {
         const auto shown = description();
-        if (const auto scrubber = std::dynamic_pointer_cast<platform::MovieScrubber>(view()); scrubber && shown.enabled)
-            scrubber->scrubTo(std::clamp(number, shown.minimum, shown.maximum));
+        if (shown.role == AccessibilityRole::Slider && shown.enabled)
+            view()->setNumber(std::clamp(number, shown.minimum, std::max(shown.minimum, shown.maximum)));
     }
 
     /// The focus goes round until it comes here, or back to where it began.

@@ -4,6 +4,7 @@
 #include "linux/qt/items/ImageItem.h"
 #include "linux/qt/items/LabelItem.h"
 #include "linux/qt/items/ScrubberItem.h"
+#include "linux/qt/items/ScrubberPartItems.h"
 #include "linux/qt/items/ToolbarItem.h"
 #include "platform/views/BackdropView.h"
 #include "platform/views/Button.h"
@@ -22,6 +23,10 @@ std::unique_ptr<ViewItem> makePeer(const std::shared_ptr<platform::View>& view, 
         return std::make_unique<ButtonItem>(view, stage);
     if (dynamic_cast<platform::MovieScrubber*>(view.get()))
         return std::make_unique<ScrubberItem>(view, stage);
+    if (dynamic_cast<platform::PlayHeadView*>(view.get()))
+        return std::make_unique<PlayHeadItem>(view, stage);
+    if (dynamic_cast<platform::TrimFrameView*>(view.get()))
+        return std::make_unique<TrimFrameItem>(view, stage);
     if (dynamic_cast<platform::Toolbar*>(view.get()))
         return std::make_unique<ToolbarItem>(view, stage);
     if (dynamic_cast<platform::ImageView*>(view.get()))

@@ -7,6 +7,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <iterator>
 
 namespace qtui {
 
@@ -14,14 +15,15 @@ namespace {
 
 constexpr double kTrackInset = 4; ///< above and below the strip, so that the play head stands out of it
 constexpr double kTrackCorner = 6;
-constexpr double kHeadWidth = 4;
-constexpr double kHeadOutline = 1;
-constexpr double kKnobRadius = 8;
-constexpr double kKnobRadiusHeld = 10;
+/// Ticks of a zoomed strip: they grow with what they stand for.
+constexpr double kTickWidth = 1;
+constexpr double kSecondTick = 8;
+constexpr double kTenthTick = 4;
 
 const QColor kTrackGround(0x16, 0x16, 0x1A);
 const QColor kFilmFrame(255, 255, 255, 24);
-const QColor kOutline(0, 0, 0, 190);
+const QColor kTick(255, 255, 255, 210);
+const QColor kTickShadow(0, 0, 0, 120);
 
 /// The part of the picture that fills `target` without being squeezed.
 QRectF coveringPart(const QSizeF& picture, const QSizeF& target)
@@ -43,48 +45,56 @@ void drawFilm(QPainter& painter, const QRectF& track)
     }
 }
 
+/// The picture of that moment or, as long as it is on its way, the one nearest to it.
+platform::ImageRef pictureAt(double timestamp, const std::map<double, platform::ImageRef>& pictures, bool orNearest)
+{
+    const auto found = pictures.find(timestamp);
+    if (found != pictures.end())
+        return found->second;
+    if (!orNearest || pictures.empty())
+        return nullptr;
+    const auto after = pictures.lower_bound(timestamp);
+    if (after == pictures.begin())
+        return after->second;
+    const auto before = std::prev(after);
+    const bool isAfterNearer = after != pictures.end() && after->first - timestamp < timestamp - before->first;
+    return isAfterNearer ? after->second : before->second;
+}
+
 } // namespace
 
 std::vector<Sprite> ScrubberItem::draw(platform::View& view)
 {
     const auto& scrubber = dynamic_cast<const platform::MovieScrubber&>(view);
-    const QRectF track = toQRectF(scrubber.trackRect()).adjusted(0, kTrackInset, 0, -kTrackInset);
-    TrackState state{track, scrubber.timestamps(), scrubber.thumbnails(), scrubber.duration() > 0, stage().generation};
+    const auto inset = [](const base::Rect& rect) { return toQRectF(rect).adjusted(0, kTrackInset, 0, -kTrackInset); };
+    TrackState state{inset(scrubber.stripRect()), inset(scrubber.trackRect()), scrubber.timestamps(),
+                     scrubber.thumbnails(),       scrubber.isZoomed(),         scrubber.visibleStart(),
+                     scrubber.visibleEnd(),       stage().generation};
     if (state != m_trackState) {
         m_track = drawTrack(state);
         m_trackState = std::move(state);
     }
     std::vector<Sprite> sprites = ViewItem::draw(view);
     sprites.push_back(m_track);
-    if (m_trackState.loaded)
-        sprites.push_back(drawPlayHead(scrubber.playHeadX(), scrubber.isHighlighted()));
     return sprites;
 }
 
 Sprite ScrubberItem::drawTrack(const TrackState& state) const
 {
-    if (state.rect.isEmpty())
+    if (state.strip.isEmpty())
         return {};
-    return paintedSprite(state.rect.adjusted(-1, -1, 1, 1), stage().scale, [&](QPainter& painter) {
+    return paintedSprite(state.strip.adjusted(-1, -1, 1, 1), stage().scale, [&](QPainter& painter) {
         QPainterPath outline;
-        outline.addRoundedRect(state.rect, kTrackCorner, kTrackCorner);
+        outline.addRoundedRect(state.strip, kTrackCorner, kTrackCorner);
         painter.fillPath(outline, kTrackGround);
         painter.save();
         painter.setClipPath(outline);
+        painter.setClipRect(state.track, Qt::IntersectClip);
         if (state.thumbnails.empty())
-            drawFilm(painter, state.rect);
-        const auto count = static_cast<double>(state.timestamps.size());
-        for (std::size_t i = 0; i < state.timestamps.size(); ++i) {
-            const auto found = state.thumbnails.find(state.timestamps[i]);
-            if (found == state.thumbnails.end())
-                continue;
-            const QImage picture = toQImage(found->second);
-            const double left = stage().snapped(state.rect.width() * static_cast<double>(i) / count);
-            const double right = stage().snapped(state.rect.width() * static_cast<double>(i + 1) / count);
-            const QRectF slot(state.rect.left() + left, state.rect.top(), right - left, state.rect.height());
-            if (!picture.isNull())
-                painter.drawImage(slot, picture, coveringPart(picture.size(), slot.size()));
-        }
+            drawFilm(painter, state.track);
+        drawThumbnails(painter, state);
+        if (state.zoomed)
+            drawRuler(painter, state);
         painter.restore();
         // Keeps a dark movie's strip apart from a dark ground.
         painter.setPen(QPen(stage().theme.hairline, 1));
@@ -92,24 +102,36 @@ Sprite ScrubberItem::drawTrack(const TrackState& state) const
     });
 }
 
-Sprite ScrubberItem::drawPlayHead(double x, bool held) const
+void ScrubberItem::drawThumbnails(QPainter& painter, const TrackState& state) const
 {
-    const double radius = held ? kKnobRadiusHeld : kKnobRadius;
-    const QPointF center(stage().snapped(x), ownRect().center().y());
-    const QRectF area = QRectF(center.x() - radius - 2, 0, 2 * radius + 4, ownRect().height());
-    return paintedSprite(area, stage().scale, [&](QPainter& painter) {
-        const QRectF bar(center.x() - kHeadWidth / 2, kHeadOutline, kHeadWidth, ownRect().height() - 2 * kHeadOutline);
-        QPainterPath shape;
-        shape.setFillRule(Qt::WindingFill);
-        shape.addRoundedRect(bar, kHeadWidth / 2, kHeadWidth / 2);
-        shape.addEllipse(center, radius, radius);
-        const QPainterPath whole = shape.simplified();
-        painter.strokePath(whole, QPen(kOutline, 2 * kHeadOutline));
-        painter.fillPath(whole, Qt::white);
-        painter.setPen(Qt::NoPen);
-        painter.setBrush(Theme::forScheme(Scheme::Light).accent); // stands on white in both schemes
-        painter.drawEllipse(center, radius - 4.5, radius - 4.5);
-    });
+    const auto count = static_cast<double>(state.timestamps.size());
+    for (std::size_t i = 0; i < state.timestamps.size(); ++i) {
+        const auto found = pictureAt(state.timestamps[i], state.thumbnails, state.zoomed);
+        const QImage picture = found ? toQImage(found) : QImage();
+        if (picture.isNull())
+            continue;
+        const double left = stage().snapped(state.track.width() * static_cast<double>(i) / count);
+        const double right = stage().snapped(state.track.width() * static_cast<double>(i + 1) / count);
+        const QRectF slot(state.track.left() + left, state.track.top(), right - left, state.track.height());
+        painter.drawImage(slot, picture, coveringPart(picture.size(), slot.size()));
+    }
+}
+
+void ScrubberItem::drawRuler(QPainter& painter, const TrackState& state) const
+{
+    const double seconds = state.visibleEnd - state.visibleStart;
+    if (seconds <= 0)
+        return;
+    const auto first = static_cast<long long>(std::ceil(state.visibleStart * 10));
+    const auto last = static_cast<long long>(std::floor(state.visibleEnd * 10));
+    for (long long tenth = first; tenth <= last; ++tenth) {
+        const double part = (static_cast<double>(tenth) / 10 - state.visibleStart) / seconds;
+        const double x = stage().snapped(state.track.left() + part * state.track.width());
+        const double height = tenth % 10 == 0 ? kSecondTick : kTenthTick;
+        const QRectF tick(x, state.track.bottom() - height, kTickWidth, height);
+        painter.fillRect(tick.adjusted(-kTickWidth, -kTickWidth, kTickWidth, 0), kTickShadow);
+        painter.fillRect(tick, kTick);
+    }
 }
 
 } // namespace qtui
