@@ -9,10 +9,12 @@
 #include <QImage>
 #include <QQuickWindow>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
 #include <sstream>
+#include <utility>
 
 namespace app {
 
@@ -131,8 +133,10 @@ bool Script::carryOut(const Words& words)
         return argument(1) == "frame" ? waitForFrame(words) : waitFor(argument(1));
     if (command == "tap")
         return tap(words);
-    if (command == "drag")
+    if (command == "drag" || command == "hold")
         return drag(words);
+    if (command == "lift")
+        return lift();
     if (command == "key")
         return key(argument(1));
     if (command == "scheme") {
@@ -162,6 +166,16 @@ bool Script::waitFor(const std::string& what)
         return m_program.hasShownPicture();
     if (what == "ready")
         return editor->currentItemLoaded() || editor->avPlayerItem()->status() == platform::PlayerItem::Status::Failed;
+    if (what == "thumbnails") {
+        const auto& wanted = editor->avTrimmer()->timestamps();
+        const auto& here = editor->avTrimmer()->thumbnails();
+        return !wanted.empty()
+               && std::all_of(wanted.begin(), wanted.end(), [&](double timestamp) { return here.contains(timestamp); });
+    }
+    if (what == "trimming")
+        return editor->isTrimming();
+    if (what == "trimmed")
+        return !editor->isTrimming() && editor->currentItemLoaded();
     if (what == "hidden" || what == "shown") // and what the fade takes
         return editor->isUIHidden() == (what == "hidden")
                && m_program.system().clock.now() - *m_since > VKVideoEditorViewController::kFadeDuration;
@@ -212,7 +226,15 @@ bool Script::drag(const Words& words)
         const double part = double(i) / kSteps;
         input.move({from.x + (to.x - from.x) * part, from.y + (to.y - from.y) * part});
     }
-    input.release(to);
+    m_finger = to;
+    return words.front() == "hold" || lift();
+}
+
+bool Script::lift()
+{
+    if (!m_finger)
+        return false;
+    SyntheticInput(m_program.presenter().quickWindow()).release(*std::exchange(m_finger, std::nullopt));
     return true;
 }
 
@@ -273,6 +295,7 @@ std::string Script::filledIn(std::string line) const
             std::to_string(static_cast<int>(size.width)) + "x" + std::to_string(static_cast<int>(size.height)));
     replace(line, "{chrome}", editor->isUIHidden() ? "hidden" : "shown");
     replace(line, "{layout}", editor->isPadMode() ? "pad" : "phone");
+    replace(line, "{range}", seconds(editor->editStartTime()) + "-" + seconds(editor->editEndTime()));
     const auto lines = editor->titleLabel()->subviews();
     const auto date = lines.empty() ? nullptr : std::dynamic_pointer_cast<platform::Label>(lines.front());
     replace(line, "{date}", date ? date->text() : "");

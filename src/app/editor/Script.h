@@ -4,17 +4,20 @@
 ///   size W H               resize the window, in points
 ///   wait picture|ready     until the movie's first picture is shown; until its item is ready (or failed)
 ///   wait hidden|shown      until the chrome has faded out or in
+///   wait thumbnails        until the strip has all its pictures
+///   wait trimming|trimmed  until trim mode is on; until it is off and the movie then shown is ready
 ///   wait frame [SECONDS]   until the picture of the present time is on the screen, or that of SECONDS or a later one
 ///   tap NAME  |  tap X Y   touch a control by its accessible name, or a place in points
 ///   drag X1 Y1 X2 Y2       touch, move in small steps, lift
-///   key NAME               space, escape, return, left, right, home, end, tab, comma, period, undo
+///   hold X1 Y1 X2 Y2       the same without lifting; `lift` does that
+///   key NAME               space, escape, return, left, right, home, end, tab, comma, period, undo, i, o
 ///   scheme light|dark
 ///   pause MILLISECONDS     let time pass
 ///   picture FILE [WORDS]   once nothing moves or fades, write what is on the screen as a PNG, into $CLIPSA_PICTURES or
 ///                          here; with WORDS, say so
 ///   print WORDS            a line at the end of the file $CLIPSA_REPORT, or on standard output; filled in are {time},
 ///                          {frame} (the shown picture's time), {duration}, {size}, {title}, {date}, {chrome},
-///                          {layout} (phone or pad), {memory} (resident, in kB)
+///                          {layout} (phone or pad), {range} (START-END of trim mode), {memory} (resident, in kB)
 ///   transitions N          change the size N times, without waiting for it to settle; report what the first and the
 ///                          last hundred took, and the memory
 /// A command that cannot be carried out within ten seconds ends the process with status 5. GUI thread.
@@ -22,6 +25,7 @@
 
 #include "app/editor/TransitionTrial.h"
 #include "base/Clock.h"
+#include "base/Geometry.h"
 
 #include <functional>
 #include <memory>
@@ -51,6 +55,7 @@ private:
     bool waitForFrame(const Words& words) const;
     bool tap(const Words& words);
     bool drag(const Words& words);
+    bool lift();
     bool key(const std::string& name);
     bool picture(const Words& words);
     bool transitions(const Words& words);
@@ -65,6 +70,7 @@ private:
     std::size_t m_next = 0;
     std::optional<base::Instant> m_since;
     std::optional<TransitionTrial> m_trial;
+    std::optional<base::Point> m_finger; ///< where it is held
     std::shared_ptr<bool> m_alive = std::make_shared<bool>(true);
 };
 

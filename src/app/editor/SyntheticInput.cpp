@@ -48,7 +48,8 @@ bool SyntheticInput::key(const std::string& name)
     static const std::map<std::string, int> kKeys{
         {"space", Qt::Key_Space}, {"escape", Qt::Key_Escape}, {"return", Qt::Key_Return}, {"left", Qt::Key_Left},
         {"right", Qt::Key_Right}, {"home", Qt::Key_Home},     {"end", Qt::Key_End},       {"tab", Qt::Key_Tab},
-        {"comma", Qt::Key_Comma}, {"period", Qt::Key_Period}, {"undo", Qt::Key_Z},
+        {"comma", Qt::Key_Comma}, {"period", Qt::Key_Period}, {"undo", Qt::Key_Z},        {"i", Qt::Key_I},
+        {"o", Qt::Key_O},
     };
     const auto found = kKeys.find(name);
     if (found == kKeys.end())
