@@ -57,7 +57,7 @@ bool isRefusal(int number)
 
 } // namespace
 
-base::Result<void> copyContents(int from, int to, std::uint64_t size, const std::function<void(double)>& progress)
+base::Result<void> copyContents(int from, int to, std::uint64_t size, const std::function<bool(double)>& goOn)
 {
     static constexpr CopyStep kWays[] = {copyInKernel, copyWithSendfile, copyByHand};
 
@@ -80,8 +80,8 @@ base::Result<void> copyContents(int from, int to, std::uint64_t size, const std:
             continue;
         }
         done += static_cast<std::uint64_t>(copied);
-        if (progress)
-            progress(static_cast<double>(done) / static_cast<double>(size));
+        if (goOn && !goOn(static_cast<double>(done) / static_cast<double>(size)))
+            return base::Error::make(base::kPosixErrorDomain, ECANCELED, "it was given up");
     }
     return {};
 }

@@ -9,8 +9,9 @@
 
 namespace photos {
 
-/// `progress` is told the part that is done, from 0 to 1; it may be empty. `size` is what the source holds: a source that
-/// ends earlier is an error. Both files stay open, and their offsets are not defined afterwards.
-base::Result<void> copyContents(int from, int to, std::uint64_t size, const std::function<void(double)>& progress);
+/// `goOn` is told the part that is done, from 0 to 1, and stops the copying with ECANCELED when it gives false; it may be
+/// empty. `size` is what the source holds: a source that ends earlier is an error. Both files stay open, and their offsets
+/// are not defined afterwards.
+base::Result<void> copyContents(int from, int to, std::uint64_t size, const std::function<bool(double)>& goOn);
 
 } // namespace photos

@@ -3,6 +3,7 @@
 #include "linux/photos/FileDescriptor.h"
 #include "linux/photos/GLibText.h"
 #include "linux/photos/MediaType.h"
+#include "linux/photos/VideoLibrary.h"
 
 #include <cerrno>
 #include <cstdio>

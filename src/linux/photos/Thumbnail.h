@@ -8,9 +8,6 @@
 
 namespace photos {
 
-/// Pixels: neither side of a large thumbnail is longer.
-inline constexpr int kThumbnailSide = 256;
-
 /// Writes the large thumbnail of `file` below `thumbnails`, in place of one that is there; whole or not at all.
 base::Result<void> writeThumbnail(const std::string& thumbnails, const std::string& file,
                                   const platform::Bitmap& bitmap);

@@ -137,10 +137,11 @@ base::Result<NewFile> VideoLibrary::Transaction::copy(const Source& source, cons
     auto file = NewFile::make(directory);
     if (!file)
         return file;
-    const auto progress = [&](double part) {
+    const auto goOn = [&](double part) {
         m_work.setProgress((done + part) / static_cast<double>(m_sources.size()));
+        return !m_options.goOn || m_options.goOn();
     };
-    if (const auto copied = copyContents(source.file.get(), file.value().descriptor(), source.size, progress); !copied)
+    if (const auto copied = copyContents(source.file.get(), file.value().descriptor(), source.size, goOn); !copied)
         return copied.error();
     if (const auto sealed = file.value().seal(timespecOf(source.date)); !sealed)
         return sealed.error();
@@ -150,8 +151,8 @@ base::Result<NewFile> VideoLibrary::Transaction::copy(const Source& source, cons
 base::ErrorRef VideoLibrary::Transaction::explained(const base::ErrorRef& error, const Source& source) const
 {
     const auto code = error->code();
-    // The one failure that is not the library's.
-    const std::string help = code == ENODATA ? "" : std::string("; ") + remedy(code);
+    // The failures that are not the library's.
+    const std::string help = code == ENODATA || code == ECANCELED ? "" : std::string("; ") + remedy(code);
     return base::Error::make(error->domain(), code,
                              "cannot save " + source.path + " in the library " + m_options.directories.videos + ": "
                                  + error->description() + help);

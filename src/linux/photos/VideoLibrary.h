@@ -23,6 +23,9 @@
 
 namespace photos {
 
+/// Pixels: neither side of a thumbnail is longer.
+inline constexpr int kThumbnailSide = 256;
+
 /// What is known of a recording.
 struct Recording {
     std::string appName;            ///< empty: unknown
@@ -41,6 +44,8 @@ struct LibraryOptions {
     std::function<std::optional<platform::Bitmap>(const std::string& path, int side)> thumbnail;
     /// Told before the completion where a new movie is.
     std::function<void(const std::string& path)> published;
+    /// Asked while a movie is copied: false ends the transaction with ECANCELED.
+    std::function<bool()> goOn = {};
 };
 
 class VideoLibrary final : public platform::PhotoLibrary {

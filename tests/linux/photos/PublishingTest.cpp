@@ -174,6 +174,14 @@ TEST_F(TheVideoLibrary, TellsHowFarItIs)
     EXPECT_EQ(told.back(), 1);
 }
 
+TEST_F(TheVideoLibrary, CanBeToldToGiveUpWhileItCopies)
+{
+    auto with = options();
+    with.goOn = [] { return false; };
+    tests::whileRefusing({tests::noReflinks()},
+                         [&] { expectFailure(save(base::Url::fromPath(source), with), ECANCELED); });
+}
+
 /// File systems that can do less than the one that the tests run on.
 class TheVideoLibraryOn : public tests::LibraryFixture,
                           public testing::WithParamInterface<std::pair<const char*, std::vector<RefusedSystemCall>>> {};
