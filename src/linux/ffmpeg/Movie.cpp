@@ -72,7 +72,7 @@ void Movie::describe()
         if (isSound(stream) && avcodec_find_decoder(stream.codecpar->codec_id))
             m_audioStreams.push_back(i);
         platform::AssetTrack track;
-        track.trackID = stream.id > 0 ? stream.id : i + 1;
+        track.trackID = trackIDOf(stream);
         track.type = isPicture(stream) ? platform::MediaType::Video : platform::MediaType::Audio;
         m_tracks.push_back(track);
     }

@@ -30,6 +30,8 @@ public:
     std::int32_t timescale() const { return m_video ? m_video->timescale : kSoundTimescale; }
     /// Nothing when there is only sound.
     const std::optional<VideoTrack>& video() const { return m_video; }
+    /// How an asset names the track that is in a stream.
+    static int trackIDOf(const AVStream& stream) { return stream.id > 0 ? stream.id : stream.index + 1; }
     /// Streams whose sound can be decoded.
     const std::vector<int>& audioStreams() const { return m_audioStreams; }
     /// Where the movie begins, in microseconds of the file's own time.
