@@ -143,7 +143,7 @@ Result<void> ExportJob::run() const
     const auto found = rangeIn(*movie, range);
     if (!found)
         return found.error();
-    const auto file = OutputFile::create(output);
+    const auto file = OutputFile::create(output, movie->file());
     if (!file)
         return file.error();
     Attempt attempt(*this, found.value(), *file.value());

@@ -106,6 +106,7 @@ private:
         Owned<AVPacket> next; ///< null when none is left
         AVRational sourceTimeBase;
         TrackSummary summary;
+        double done = 0;
     };
 
     base::ErrorRef failure(int error) const
@@ -137,7 +138,7 @@ private:
                 return failure(AVERROR(ENOMEM));
             if (auto described = source->describe(*stream); !described)
                 return described;
-            m_tracks.push_back({source.get(), newPacket(), stream->time_base, {}});
+            m_tracks.push_back({source.get(), newPacket(), stream->time_base, {}, 0});
         }
         AVDictionary* options = nullptr;
         if (m_job.videoTimescale > 0)
@@ -197,8 +198,6 @@ private:
     {
         while (Track* track = furthestBehind()) {
             const double turn = secondsOf(*track) + kTurn;
-            if (m_job.progress && m_job.seconds > 0)
-                m_job.progress(std::clamp(secondsOf(*track) / m_job.seconds, 0.0, 1.0));
             while (track->next && secondsOf(*track) < turn) {
                 if (m_job.cancelled && *m_job.cancelled)
                     return failure(AVERROR_EXIT);
@@ -206,9 +205,21 @@ private:
                     return done;
                 if (auto done = fetch(*track); !done)
                     return done;
+                tellProgress(*track);
             }
         }
         return {};
+    }
+
+    void tellProgress(Track& track)
+    {
+        if (!m_job.progress || m_job.seconds <= 0)
+            return;
+        track.done = track.next ? std::clamp(secondsOf(track) / m_job.seconds, track.done, 1.0) : 1.0;
+        double sum = 0;
+        for (const Track& each : m_tracks)
+            sum += each.done;
+        m_job.progress(sum / static_cast<double>(m_tracks.size()));
     }
 
     Result<void> write(Track& track)

@@ -1,29 +1,46 @@
 #include "linux/ffmpeg/exporting/output/OutputFile.h"
 
 #include <cerrno>
+#include <chrono>
 #include <cstdio>
 #include <fcntl.h>
 #include <random>
 #include <sys/stat.h>
+#include <thread>
 #include <unistd.h>
+#include <utility>
 
 namespace ffmpeg {
 
 using base::Error;
 
-base::Result<std::unique_ptr<OutputFile>> OutputFile::create(const std::string& path)
+namespace {
+
+using namespace std::chrono_literals;
+
+/// Removals wait their turn on a worker that has little to do.
+constexpr auto kPatience = 2s;
+constexpr auto kPause = 5ms;
+
+} // namespace
+
+OutputFile::OutputFile(std::string path, std::shared_ptr<const OpenFile> source)
+    : m_path(std::move(path)), m_source(std::move(source)), m_name(m_path.substr(m_path.find_last_of('/') + 1))
+{
+}
+
+base::Result<std::unique_ptr<OutputFile>> OutputFile::create(const std::string& path,
+                                                             std::shared_ptr<const OpenFile> source)
 {
     const std::size_t slash = path.find_last_of('/');
     const std::string folder = slash == std::string::npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
-    const int directory = ::open(folder.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC);
-    const int error = errno;
-    std::unique_ptr<OutputFile> file(new OutputFile(directory, path.substr(slash + 1)));
+    std::unique_ptr<OutputFile> file(new OutputFile(path, std::move(source)));
+    const int directory = file->m_directory = ::open(folder.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC);
     if (directory < 0)
-        return file->failure(error);
-    struct stat about {};
+        return file->failure(errno);
     if (file->m_name.empty())
         return file->failure(EISDIR);
-    if (fstatat(directory, file->m_name.c_str(), &about, AT_SYMLINK_NOFOLLOW) == 0)
+    if (file->isTaken())
         return file->failure(EEXIST);
     constexpr mode_t kMode = 0666; // what the user's mask leaves of it
     file->m_descriptor = openat(directory, ".", O_TMPFILE | O_RDWR | O_CLOEXEC, kMode);
@@ -49,6 +66,14 @@ OutputFile::~OutputFile()
     }
     if (m_directory >= 0)
         ::close(m_directory);
+}
+
+bool OutputFile::isTaken() const
+{
+    struct stat about {};
+    if (fstatat(m_directory, m_name.c_str(), &about, AT_SYMLINK_NOFOLLOW) != 0)
+        return false;
+    return S_ISLNK(about.st_mode) || !m_source || !m_source->isStillAt(m_path);
 }
 
 base::ErrorRef OutputFile::failure(int error) const
@@ -99,7 +124,12 @@ base::Result<void> OutputFile::publish()
 {
     if (fsync(m_descriptor) != 0)
         return failure(errno);
-    if (const int error = link())
+    int error = link();
+    for (auto waited = 0ms; error == EEXIST && waited < kPatience && !isTaken(); waited += kPause) {
+        std::this_thread::sleep_for(kPause);
+        error = link();
+    }
+    if (error != 0)
         return failure(error);
     m_published = true;
     // The name is there for all to see; that it outlives a power cut too is not worth failing for.

@@ -4,6 +4,7 @@
 #pragma once
 
 #include "base/Result.h"
+#include "linux/ffmpeg/OpenFile.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -14,8 +15,10 @@ namespace ffmpeg {
 
 class OutputFile {
 public:
-    /// Fails when there is something of that name already.
-    static base::Result<std::unique_ptr<OutputFile>> create(const std::string& path);
+    /// Fails when there is something of that name already. But `source`, where it is not null, may be about to be removed
+    /// from there: publish() gives that some time.
+    static base::Result<std::unique_ptr<OutputFile>> create(const std::string& path,
+                                                            std::shared_ptr<const OpenFile> source = nullptr);
     /// Removes what was not published.
     ~OutputFile();
     OutputFile(const OutputFile&) = delete;
@@ -33,11 +36,14 @@ public:
     base::Result<void> publish();
 
 private:
-    OutputFile(int directory, std::string name) : m_directory(directory), m_name(std::move(name)) {}
+    OutputFile(std::string path, std::shared_ptr<const OpenFile> source);
+    bool isTaken() const;
     base::ErrorRef failure(int error) const;
     int link() const;
 
-    int m_directory;
+    std::string m_path;
+    std::shared_ptr<const OpenFile> m_source;
+    int m_directory = -1;
     std::string m_name;
     std::string m_hiddenName; ///< empty when it has none
     int m_descriptor = -1;

@@ -239,6 +239,7 @@ Result<void> SplicedVideoSource::copyOne()
     if (header
         && !std::equal(header, header + size, parameters.extradata, parameters.extradata + parameters.extradata_size))
         return cannotCopy("its header changes on the way");
+    m_lastDts = std::max(m_lastDts, packet->dts);
     if (auto done = m_splicer->adoptCopied(*packet); !done)
         return done;
     av_packet_free_side_data(packet.get());
@@ -249,8 +250,12 @@ Result<void> SplicedVideoSource::copyOne()
 
 Result<void> SplicedVideoSource::endCopying(bool isExpected)
 {
-    if (!isExpected && m_log)
-        m_log("“" + m_packets->movie().file()->name() + "” ends before the range does: the rest of it is missing.");
+    AVStream& stream = m_packets->stream();
+    const AVIndexEntry* last =
+        m_packets->isMov() ? avformat_index_get_entry(&stream, avformat_index_get_entries_count(&stream) - 1) : nullptr;
+    const bool isCut = !isExpected || (!m_plan.copyTo && last && last->timestamp > m_lastDts);
+    if (isCut && m_log)
+        m_log("“" + m_packets->movie().file()->name() + "” ends before its index does: pictures are missing.");
     return beginStretch(isExpected && !m_plan.tail.empty() ? State::Tail : State::Ended);
 }
 

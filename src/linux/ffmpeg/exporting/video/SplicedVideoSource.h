@@ -56,7 +56,8 @@ private:
     std::unique_ptr<PictureLine> m_line;
     State m_state = State::Head;
     bool m_isPastJoint = false;
-    Owned<AVPacket> m_copied; ///< where copying begins, when it was read already
+    std::int64_t m_lastDts = AV_NOPTS_VALUE; ///< of what was copied, in the stream's ticks
+    Owned<AVPacket> m_copied;                ///< where copying begins, when it was read already
 };
 
 } // namespace ffmpeg

@@ -1,0 +1,414 @@
+// What whoever exports sees: status, errors, the file, the threads.
+#include "linux/ffmpeg/exporting/ExportJob.h"
+#include "linux/ffmpeg/exporting/ExportTest.h"
+#include "linux/ffmpeg/exporting/output/MovieWriter.h"
+#include "linux/ffmpeg/exporting/output/OutputCheck.h"
+#include "linux/ffmpeg/exporting/video/VideoSources.h"
+#include "support/RefusedSystemCalls.h"
+#include "support/WithoutPrivileges.h"
+
+#include <gmock/gmock.h>
+
+#include <csignal>
+#include <fstream>
+#include <limits>
+#include <sys/resource.h>
+#include <thread>
+
+namespace tests {
+namespace {
+
+using testing::HasSubstr;
+
+std::string bytesOf(const std::string& path)
+{
+    std::ifstream file(path, std::ios::binary);
+    return {std::istreambuf_iterator<char>(file), {}};
+}
+
+class AnExport : public ExportTest {
+protected:
+    /// The work without the session, on this thread.
+    base::Result<void> runJob(const std::string& from, std::optional<Range> range)
+    {
+        EXPECT_EQ(open(from), Status::ReadyToPlay);
+        ffmpeg::ExportJob job;
+        job.movie = std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie();
+        job.output = output();
+        job.range = range;
+        job.cancelled = std::make_shared<std::atomic<bool>>(false);
+        job.log = &log;
+        return job.run();
+    }
+    base::Result<void> runJobRefusing(const std::vector<RefusedSystemCall>& calls, const std::string& from,
+                                      std::optional<Range> range)
+    {
+        EXPECT_EQ(open(from), Status::ReadyToPlay);
+        base::Result<void> result;
+        whileRefusing(calls, [&] { result = runJob(from, range); });
+        return result;
+    }
+};
+
+TEST_F(AnExport, TellsItsEndOnceOnAThreadOfItsOwn)
+{
+    const auto session = sessionFor(exportMovie("h264.mp4"), output(), fromTo(1, 2));
+    EXPECT_EQ(session->status(), ExportStatus::Unknown);
+    EXPECT_EQ(session->progress(), 0);
+    std::atomic<int> ended = 0;
+    std::thread::id thread;
+    session->exportAsynchronously([&] {
+        thread = std::this_thread::get_id();
+        EXPECT_EQ(session->status(), ExportStatus::Completed);
+        ++ended;
+    });
+    EXPECT_EQ(ended, 0);
+    EXPECT_EQ(session->status(), ExportStatus::Waiting);
+    ASSERT_TRUE(waitFor([&] { return ended > 0; }));
+    EXPECT_NE(thread, std::this_thread::get_id());
+    EXPECT_EQ(session->error(), nullptr);
+    EXPECT_EQ(session->progress(), 1);
+    EXPECT_EQ(session->outputURL()->path(), output());
+}
+
+TEST_F(AnExport, MayWaitForTheMainQueueWhereItTellsItsEnd)
+{
+    bool ran = false;
+    std::atomic<bool> told = false;
+    {
+        const auto session = sessionFor(exportMovie("h264.mp4"), output(), fromTo(1, 2));
+        session->exportAsynchronously([&] {
+            mainQueue.run([&] { ran = true; });
+            told = true;
+        });
+    }
+    // Nobody but itself holds the session now.
+    asset = nullptr;
+    EXPECT_TRUE(waitFor([&] { return told.load(); }));
+    EXPECT_TRUE(ran);
+    EXPECT_EQ(files(), std::vector<std::string>{"out.mp4"});
+}
+
+TEST_F(AnExport, LeavesTheSourceAsItIs)
+{
+    const std::string before = bytesOf(exportMovie("h264-b.mp4"));
+    ASSERT_EQ(cut(exportMovie("h264-b.mp4"), output(), fromTo(0.5, 3)), ExportStatus::Completed);
+    EXPECT_EQ(bytesOf(exportMovie("h264-b.mp4")), before);
+}
+
+TEST_F(AnExport, DoesNotReplaceAFile)
+{
+    std::ofstream(output()) << "mine";
+    EXPECT_EQ(cut(exportMovie("h264.mp4"), output(), fromTo(1, 2)), ExportStatus::Failed);
+    EXPECT_THAT(errorText(), HasSubstr("out.mp4"));
+    EXPECT_THAT(errorText(), HasSubstr("File exists"));
+    EXPECT_EQ(bytesOf(output()), "mine");
+}
+
+TEST_F(AnExport, DoesNotReplaceALinkThatLeadsNowhere)
+{
+    const auto session = sessionFor(exportMovie("h264.mp4"), output(), std::nullopt);
+    std::filesystem::create_symlink("/nowhere", output());
+    EXPECT_EQ(run(session), ExportStatus::Failed);
+    EXPECT_TRUE(std::filesystem::is_symlink(output()));
+}
+
+TEST_F(AnExport, NeedsSomewhereToWriteTo)
+{
+    EXPECT_EQ(cut(exportMovie("h264.mp4"), directory + "/none/out.mp4", fromTo(1, 2)), ExportStatus::Failed);
+    EXPECT_THAT(errorText(), HasSubstr("No such file or directory"));
+    const auto session = sessionFor(exportMovie("h264.mp4"), output(), fromTo(1, 2));
+    session->setOutputURL(std::nullopt);
+    EXPECT_EQ(run(session), ExportStatus::Failed);
+    EXPECT_THAT(errorText(), HasSubstr("there is no file to write to"));
+}
+
+TEST_F(AnExport, SaysWhatCannotBeWrittenIntoADirectoryOfOthers)
+{
+    std::filesystem::permissions(directory, std::filesystem::perms::owner_read | std::filesystem::perms::owner_exec);
+    base::Result<void> result;
+    std::thread([&] {
+        const WithoutPrivileges without;
+        result = runJob(exportMovie("h264.mp4"), fromTo(1, 2));
+    }).join();
+    std::filesystem::permissions(directory, std::filesystem::perms::owner_all);
+    ASSERT_FALSE(result);
+    EXPECT_THAT(result.error()->description(), HasSubstr("“out.mp4” cannot be written: Permission denied"));
+    EXPECT_TRUE(files().empty());
+}
+
+TEST_F(AnExport, LeavesNothingOnAFullDisk)
+{
+    for (const auto& calls : {std::vector<RefusedSystemCall>{{SYS_pwrite64, ENOSPC}},
+                              std::vector<RefusedSystemCall>{{SYS_pwrite64, ENOSPC}, noUnnamedFiles()}}) {
+        const auto result = runJobRefusing(calls, exportMovie("h264.mp4"), fromTo(1, 2));
+        ASSERT_FALSE(result);
+        EXPECT_THAT(result.error()->description(), HasSubstr("“out.mp4” cannot be written: the disk is full"));
+        EXPECT_TRUE(files().empty());
+    }
+}
+
+TEST_F(AnExport, LeavesNothingOfAFileThatMayNotGrowFurther)
+{
+    rlimit before{};
+    getrlimit(RLIMIT_FSIZE, &before);
+    std::signal(SIGXFSZ, SIG_IGN);
+    const rlimit small{90'000, before.rlim_max};
+    setrlimit(RLIMIT_FSIZE, &small);
+    const auto result = runJob(exportMovie("h264-sparse.mp4"), std::nullopt);
+    setrlimit(RLIMIT_FSIZE, &before);
+    ASSERT_FALSE(result);
+    EXPECT_THAT(result.error()->description(), HasSubstr("“out.mp4” cannot be written: File too large"));
+    EXPECT_TRUE(files().empty());
+}
+
+TEST_F(AnExport, IsWholeAlsoWhereEveryFileHasAName)
+{
+    const auto result = runJobRefusing({noUnnamedFiles()}, exportMovie("h264.mp4"), fromTo(1, 2));
+    ASSERT_TRUE(result) << result.error()->description();
+    EXPECT_EQ(files(), std::vector<std::string>{"out.mp4"});
+    EXPECT_EQ(DecodedMovie(output()).all().size(), 30U);
+}
+
+TEST_F(AnExport, HasTheRangeThatLiesInTheMovie)
+{
+    ASSERT_EQ(cut(exportMovie("h264.mp4"), output("late.mp4"), Range{at(4), at(1000)}), ExportStatus::Completed);
+    EXPECT_EQ(DecodedMovie(output("late.mp4")).all().size(), 30U);
+    ASSERT_EQ(cut(exportMovie("h264.mp4"), output("early.mp4"), Range{at(-1), at(2)}), ExportStatus::Completed);
+    EXPECT_EQ(DecodedMovie(output("early.mp4")).all().size(), 30U);
+    ASSERT_EQ(cut(exportMovie("h264.mp4"), output("endless.mp4"), Range{at(4), MediaTime::positiveInfinity()}),
+              ExportStatus::Completed)
+        << errorText();
+    EXPECT_EQ(DecodedMovie(output("endless.mp4")).all().size(), 30U);
+}
+
+TEST_F(AnExport, RefusesRangesThatHoldNothing)
+{
+    for (const Range& range :
+         {Range{at(1), at(0)}, Range{at(2), at(-1)}, Range{at(5), at(1)}, Range{at(100), at(1)}, Range{at(-2), at(1)},
+          Range{MediaTime::invalid(), at(1)}, Range{at(1), MediaTime::invalid()}, Range{MediaTime::indefinite(), at(1)},
+          Range{at(1), MediaTime::make(1, 1'000'000'000)},
+          Range{MediaTime::make(std::numeric_limits<std::int64_t>::max(), 1), at(1)}}) {
+        EXPECT_EQ(cut(exportMovie("h264.mp4"), output(), range), ExportStatus::Failed);
+        EXPECT_THAT(errorText(), HasSubstr("“h264.mp4” cannot be exported: the range"));
+    }
+    EXPECT_TRUE(files().empty());
+}
+
+TEST_F(AnExport, KeepsEveryPacketWhenNothingIsCut)
+{
+    for (const char* name : {"h264-b.mp4", "h264-open.mp4", "h264-one-group.mp4", "h264-b.mkv", "h264-b.ts"}) {
+        ASSERT_EQ(cut(exportMovie(name), output(), std::nullopt), ExportStatus::Completed) << errorText();
+        const auto source = DecodedMovie(exportMovie(name)).all();
+        const auto copy = DecodedMovie(output()).all();
+        ASSERT_EQ(copy.size(), source.size());
+        for (std::size_t i = 0; i < copy.size(); ++i)
+            EXPECT_EQ(copy[i].hash, source[i].hash) << name << i;
+        EXPECT_NEAR(copy.back().seconds + copy.back().duration - copy.front().seconds,
+                    source.back().seconds + source.back().duration - source.front().seconds, 0.002);
+        std::filesystem::remove(output());
+    }
+    EXPECT_FALSE(saysEncodedAsAWhole());
+}
+
+TEST_F(AnExport, KeepsWhatIsSaidOfTheMovie)
+{
+    ASSERT_EQ(cut(exportMovie("two-tracks.mp4"), output(), fromTo(1, 3)), ExportStatus::Completed);
+    DecodedMovie decoded(output());
+    const auto value = [](AVDictionary* metadata, const char* key) {
+        const AVDictionaryEntry* entry = av_dict_get(metadata, key, nullptr, 0);
+        return std::string(entry ? entry->value : "");
+    };
+    AVFormatContext& context = decoded.context();
+    EXPECT_THAT(value(context.metadata, "creation_time"), HasSubstr("2024-05-17T09:30:00"));
+    EXPECT_EQ(value(context.metadata, "title"), "Recording");
+    ASSERT_EQ(context.nb_streams, 3U);
+    EXPECT_EQ(value(context.streams[1]->metadata, "handler_name"), "App sound");
+    EXPECT_EQ(value(context.streams[2]->metadata, "handler_name"), "Microphone");
+    const AVCodecParameters& parameters = *decoded.stream().codecpar;
+    EXPECT_EQ(parameters.color_space, AVCOL_SPC_BT709);
+    EXPECT_EQ(parameters.color_range, AVCOL_RANGE_MPEG);
+}
+
+TEST_F(AnExport, KeepsHowThePictureIsTurned)
+{
+    ASSERT_EQ(cut(exportMovie("h264-rotated.mp4"), output(), fromTo(1.1, 3)), ExportStatus::Completed);
+    ASSERT_EQ(open(output()), Status::ReadyToPlay);
+    const auto turned = asset->tracks().front().preferredTransform;
+    ASSERT_EQ(open(exportMovie("h264-rotated.mp4")), Status::ReadyToPlay);
+    EXPECT_EQ(asset->tracks().front().preferredTransform, turned);
+    EXPECT_NE(turned, base::AffineTransform());
+}
+
+TEST_F(AnExport, HasItsIndexInFront)
+{
+    ASSERT_EQ(cut(exportMovie("two-tracks.mp4"), output(), fromTo(1, 3)), ExportStatus::Completed);
+    const std::string bytes = bytesOf(output());
+    EXPECT_LT(bytes.find("moov"), bytes.find("mdat"));
+}
+
+TEST_F(AnExport, EndsSoonWhenItIsCancelled)
+{
+    const auto session = sessionFor(exportMovie("h264-one-group.mp4"), output(), fromTo(0.5, 3));
+    std::atomic<bool> ended = false;
+    session->exportAsynchronously([&] { ended = true; });
+    session->cancelExport();
+    ASSERT_TRUE(waitFor([&] { return ended.load(); }));
+    EXPECT_EQ(session->status(), ExportStatus::Cancelled);
+    EXPECT_EQ(session->error(), nullptr);
+    EXPECT_TRUE(files().empty());
+}
+
+TEST_F(AnExport, EndsSoonWhenItIsCancelledOnTheWay)
+{
+    for (const char* name : {"h264-one-group.mp4", "h264.mp4", "two-tracks.mp4"}) {
+        ASSERT_EQ(open(exportMovie(name)), Status::ReadyToPlay);
+        const auto cancelled = std::make_shared<std::atomic<bool>>(false);
+        double reached = 0;
+        ffmpeg::ExportJob job{std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie(),
+                              output(),
+                              fromTo(0.5, 3),
+                              std::nullopt,
+                              cancelled,
+                              {},
+                              &log};
+        job.progress = [&](double part) {
+            EXPECT_GE(part, reached);
+            reached = part;
+            *cancelled = part > 0.4;
+        };
+        EXPECT_FALSE(job.run());
+        EXPECT_GT(reached, 0.4);
+        EXPECT_LT(reached, 0.5);
+        EXPECT_TRUE(files().empty());
+    }
+}
+
+TEST_F(AnExport, ReadsAMovieWhoseFileIsGone)
+{
+    std::filesystem::copy_file(exportMovie("h264.mp4"), output("source.mp4"));
+    const auto session = sessionFor(output("source.mp4"), output(), fromTo(1, 2));
+    ASSERT_EQ(open(output("source.mp4")), Status::ReadyToPlay);
+    std::filesystem::remove(output("source.mp4"));
+    EXPECT_EQ(run(session), ExportStatus::Completed) << errorText();
+    EXPECT_EQ(DecodedMovie(output()).all().size(), 30U);
+}
+
+TEST_F(AnExport, OfAnExportWhoseFileIsRemovedAtTheStartSucceedsAThousandTimes)
+{
+    base::WorkerQueue remover;
+    for (int i = 0; i < 1000; ++i) {
+        const std::string source = output("source.mp4");
+        std::filesystem::copy_file(exportMovie("h264-open.mp4"), source);
+        // The editor holds the movie open as it plays it; it asks for the removal and then for the export.
+        const auto played = media.assetWithURL(base::Url::fromPath(source));
+        ASSERT_TRUE(waitFor([&] { return played->duration().isNumeric(); }));
+        remover.post([source] { std::filesystem::remove(source); });
+        ASSERT_EQ(cut(source, output(), Range{at(i % 40 * 0.1), at(1)}), ExportStatus::Completed)
+            << i << ": " << errorText();
+        remover.finish();
+        ASSERT_EQ(files(), std::vector<std::string>{"out.mp4"});
+        std::filesystem::remove(output());
+    }
+}
+
+TEST_F(AnExport, MayTakeTheNameOfItsSourceWhenThatIsRemoved)
+{
+    const std::string source = output("movie.mp4");
+    std::filesystem::copy_file(exportMovie("h264.mp4"), source);
+    ASSERT_EQ(open(source), Status::ReadyToPlay);
+    base::WorkerQueue remover;
+    ffmpeg::ExportJob job{std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie(),
+                          source,
+                          fromTo(1, 2),
+                          std::nullopt,
+                          std::make_shared<std::atomic<bool>>(false),
+                          {},
+                          &log};
+    // As late as it can come before the name is given.
+    job.progress = [&](double part) {
+        if (part >= 1)
+            remover.post([&] { std::filesystem::remove(source); });
+    };
+    const auto result = job.run();
+    ASSERT_TRUE(result) << result.error()->description();
+    EXPECT_EQ(DecodedMovie(source).all().size(), 30U);
+}
+
+TEST_F(AnExport, DoesNotReplaceItsSourceWhenThatStays)
+{
+    const std::string source = output("movie.mp4");
+    std::filesystem::copy_file(exportMovie("h264.mp4"), source);
+    EXPECT_EQ(cut(source, source, fromTo(1, 2)), ExportStatus::Failed);
+    EXPECT_THAT(errorText(), HasSubstr("File exists"));
+    EXPECT_EQ(bytesOf(source), bytesOf(exportMovie("h264.mp4")));
+}
+
+class BadMovies : public AnExport, public testing::WithParamInterface<const char*> {};
+
+TEST_P(BadMovies, GiveAMovieOrAnErrorThatNamesThem)
+{
+    for (const auto& range : {std::optional<Range>(), std::optional(fromTo(0.4, 1.3)), std::optional(fromTo(1.2, 3))}) {
+        const auto status = cut(movie(GetParam()), output(), range);
+        if (status == ExportStatus::Completed) {
+            EXPECT_TRUE(DecodedMovie(output()).isGood() || std::string(GetParam()) == "audio-only.m4a");
+            std::filesystem::remove(output());
+        } else {
+            EXPECT_EQ(status, ExportStatus::Failed);
+            EXPECT_THAT(errorText(), HasSubstr(GetParam()));
+        }
+        EXPECT_TRUE(files().empty());
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(, BadMovies,
+                         testing::Values("empty.mp4", "not-a-movie.mp4", "no-moov.mp4", "truncated.mp4", "corrupt.mp4",
+                                         "audio-only.m4a", "one-frame.mp4", "size-change.ts", "edit-list.mp4",
+                                         "start-offset.mp4", "vfr.mkv", "non-square.mp4", "does-not-exist.mp4"),
+                         [](const auto& each) {
+                             std::string name = each.param;
+                             std::replace_if(
+                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
+                             return name;
+                         });
+
+TEST_F(AnExport, SaysWhatIsMissingOfATruncatedMovie)
+{
+    ASSERT_EQ(cut(movie("truncated.mp4"), output(), std::nullopt), ExportStatus::Completed) << errorText();
+    bool isSaid = false;
+    for (const std::string& line : log.texts(base::MemoryLog::Line::Kind::Message))
+        isSaid = isSaid || line.find("“truncated.mp4” ends before its index does") != std::string::npos;
+    EXPECT_TRUE(isSaid);
+    EXPECT_GT(DecodedMovie(output()).all().size(), 30U);
+}
+
+TEST_F(AnExport, OfOneThatChangesItsSizeShowsAllOfEachPicture)
+{
+    ASSERT_EQ(cut(movie("size-change.ts"), output(), std::nullopt), ExportStatus::Completed) << errorText();
+    EXPECT_TRUE(saysEncodedAsAWhole());
+    const auto pictures = DecodedMovie(output()).all();
+    EXPECT_EQ(pictures.size(), 60U);
+    EXPECT_EQ(pictures.front().number, 0);
+}
+
+TEST_F(AnExport, HasRoomForItsIndexAlsoWhereMorePacketsComeThanThought)
+{
+    ASSERT_EQ(open(exportMovie("h264-b.mp4")), Status::ReadyToPlay);
+    const auto source = std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie();
+    const auto cancelled = std::make_shared<std::atomic<bool>>(false);
+    std::vector<std::unique_ptr<ffmpeg::TrackSource>> tracks;
+    tracks.push_back(ffmpeg::openVideoSource(source, {at(0), at(5)}, ffmpeg::VideoMode::Copy, cancelled, {}).value());
+    auto file = ffmpeg::OutputFile::create(output()).value();
+    // As if the index had been thought to be nearly empty.
+    const ffmpeg::WriteJob job{*file, tracks, nullptr, source->timescale(), -1450, 5, cancelled, {}};
+    const auto written = ffmpeg::writeMovie(job);
+    ASSERT_TRUE(written) << written.error()->description();
+    EXPECT_TRUE(ffmpeg::checkOutput(*file, written.value(), cancelled));
+    ASSERT_TRUE(file->publish());
+    const std::string bytes = bytesOf(output());
+    EXPECT_LT(bytes.find("moov"), bytes.find("mdat"));
+    EXPECT_EQ(DecodedMovie(output()).all().size(), 150U);
+}
+
+} // namespace
+} // namespace tests
