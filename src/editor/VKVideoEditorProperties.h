@@ -1,8 +1,9 @@
 /// Everything that the editor keeps, each with a plain getter and setter that do nothing else. Main queue only, but for
-/// the two atomic flags.
+/// those that say so.
 #pragma once
 
 #include "base/SharedDictionary.h"
+#include "base/SharedValue.h"
 #include "overlay/VKVideoOverlayButton.h"
 #include "platform/media/Asset.h"
 #include "platform/media/ExportSession.h"
@@ -80,9 +81,9 @@ public:
     {
         m_overrideShareMessage = std::move(overrideShareMessage);
     }
-    /// The movie now shown.
-    const std::optional<base::Url>& videoURL() const { return m_videoURL; }
-    void setVideoURL(std::optional<base::Url> videoURL) { m_videoURL = std::move(videoURL); }
+    /// The movie now shown. Any thread: saving replaces it on the thread of its export.
+    std::optional<base::Url> videoURL() const { return m_videoURL.value(); }
+    void setVideoURL(std::optional<base::Url> videoURL) { m_videoURL.setValue(std::move(videoURL)); }
     /// The movie as received.
     const std::optional<base::Url>& originalVideoURL() const { return m_originalVideoURL; }
     void setOriginalVideoURL(std::optional<base::Url> originalVideoURL)
@@ -239,7 +240,7 @@ private:
     double m_editEndTime = 0;
     std::optional<base::Url> m_fileAttachmentURL;
     std::optional<std::string> m_overrideShareMessage;
-    std::optional<base::Url> m_videoURL;
+    base::SharedValue<std::optional<base::Url>> m_videoURL;
     std::optional<base::Url> m_originalVideoURL;
     std::optional<std::string> m_applicationName;
     std::optional<std::string> m_bundleIdentifier;

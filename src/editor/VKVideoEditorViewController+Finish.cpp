@@ -2,7 +2,10 @@
 
 #include "editor/VKVideoEditorViewController.h"
 
-#include "platform/hosting/ActivityType.h"
+#include "base/HandBack.h"
+#include "platform/sharing/ActivityTypes.h"
+#include "publishing/VKAudioMixUtility.h"
+#include "support/VKFileManagerExtensions.h"
 
 void VKVideoEditorViewController::doneAction()
 {
@@ -24,4 +27,39 @@ void VKVideoEditorViewController::saveAction()
         trimVideo();
         return;
     }
+    // The editor stays until the library has the movie, whoever else lets go of it: its end empties the store.
+    VKAudioMixUtility::mixAudioForMovie_withCompletionHandler(
+        m_platform, videoURL(),
+        [self = base::handedBackTo(m_platform.system.mainQueue, this->self<VKVideoEditorViewController>())](
+            const std::optional<base::Url>& output, const base::ErrorRef& error) { saveMixed(self, output, error); });
+}
+
+/// On the thread of the mix; at once, when there was no movie.
+void VKVideoEditorViewController::saveMixed(const std::shared_ptr<VKVideoEditorViewController>& self,
+                                            const std::optional<base::Url>& output, const base::ErrorRef& error)
+{
+    const platform::Platform& platform = self->m_platform;
+    if (error) {
+        platform.system.log.error("Error Mixing video Audio tracks");
+        platform.system.log.error(error->description());
+    } else {
+        if (const auto former = self->videoURL())
+            VKExtensions::_srRemoveFile_completion(platform.files, *former, [](const base::ErrorRef&) {});
+        self->setVideoURL(output);
+    }
+    platform.photos.performChanges(
+        [self](platform::PhotoLibraryChange& change) { change.createAssetFromVideoAtFileURL(self->videoURL()); },
+        [self](bool /*success*/, const base::ErrorRef& writeError) {
+            self->m_platform.system.mainQueue.post([self, writeError] { self->savedToLibrary(writeError); });
+        });
+}
+
+void VKVideoEditorViewController::savedToLibrary(const base::ErrorRef& error)
+{
+    if (error) {
+        base::Log& log = m_platform.system.log;
+        log.error("Error writing video to camera roll: " + std::to_string(error->code32()));
+        log.error(error->description());
+    }
+    doneAction();
 }

@@ -155,6 +155,9 @@ private:
     void buildPlayer();
     void observePlayerItem();
     void addPlayHeadObserver();
+    static void saveMixed(const std::shared_ptr<VKVideoEditorViewController>& self,
+                          const std::optional<base::Url>& output, const base::ErrorRef& error);
+    void savedToLibrary(const base::ErrorRef& error);
     /// Any thread.
     static void handThumbnailOver(base::MainQueue& mainQueue, const std::weak_ptr<VKVideoEditorViewController>& editor,
                                   double timestamp);

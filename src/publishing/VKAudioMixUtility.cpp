@@ -1,5 +1,6 @@
 #include "publishing/VKAudioMixUtility.h"
 
+#include "base/HandBack.h"
 #include "support/TempMovieNames.h"
 #include "support/VKErrorExtensions.h"
 #include "support/VKFileManagerExtensions.h"
@@ -8,7 +9,7 @@
 
 using platform::ExportSession;
 
-/// One mix under way. The asset and the session live on the main queue, and so they go there.
+/// One mix under way. The asset and the session go back to the main queue, on which they live.
 struct VKAudioMixUtility::Export {
     const platform::Platform& platform;
     base::Url output;
@@ -36,8 +37,12 @@ void VKAudioMixUtility::mixAudioForMovie_withCompletionHandler(const platform::P
 
 void VKAudioMixUtility::setUp(const std::shared_ptr<Export>& work, const base::Url& movie)
 {
-    work->asset = work->platform.media.assetWithURL(movie);
-    work->session = work->platform.media.exportSessionWithAsset(work->asset, platform::ExportPreset::HighestQuality);
+    platform::MediaFramework& media = work->platform.media;
+    base::MainQueue& main = work->platform.system.mainQueue;
+    const auto asset = media.assetWithURL(movie);
+    work->asset = base::handedBackTo(main, asset);
+    work->session =
+        base::handedBackTo(main, media.exportSessionWithAsset(asset, platform::ExportPreset::HighestQuality));
     work->session->setOutputURL(work->output);
     work->session->setOutputFileType(platform::FileType::Mpeg4);
     // The file is being opened: its tracks are known in a moment. The work keeps the asset until then.
@@ -71,11 +76,6 @@ void VKAudioMixUtility::finish(const std::shared_ptr<Export>& work)
     default:
         work->completion(work->session->outputURL(), nullptr);
     }
-    work->completion = nullptr;
-    system.mainQueue.post([work] {
-        work->session = nullptr;
-        work->asset = nullptr;
-    });
 }
 
 base::Url VKAudioMixUtility::tempFileURL(const platform::Platform& platform)

@@ -7,6 +7,7 @@
 #include "support/FakeCalendar.h"
 #include "support/FakeFileManager.h"
 #include "support/FakeMedia.h"
+#include "support/FakePhotoLibrary.h"
 #include "support/TestSystem.h"
 
 #include <map>
@@ -76,13 +77,14 @@ struct FakePlatform {
     FakeFileManager files;
     FakeCalendar calendar;
     FakeMediaFramework media;
+    FakePhotoLibrary photos;
     platform::Platform platform;
 
     explicit FakePlatform(base::Size size = kPhone, double scale = 1)
         : window(std::make_shared<platform::Window>(machine.mainQueue, size, scale)), images(*window),
           files(machine.system),
-          media(machine.mainQueue, notifications), platform{machine.system, notifications, device,   *window,
-                                                            images,         files,         calendar, media}
+          media(machine.mainQueue, notifications), platform{machine.system, notifications, device, *window, images,
+                                                            files,          calendar,      media,  photos}
     {
     }
 };

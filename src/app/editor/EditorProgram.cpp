@@ -1,5 +1,6 @@
 #include "app/editor/EditorProgram.h"
 
+#include "app/editor/MovieThumbnail.h"
 #include "app/editor/Script.h"
 #include "app/editor/StartTrace.h"
 #include "extension/VKVideoEditorExtensionContext.h"
@@ -8,6 +9,7 @@
 #include "linux/ffmpeg/CubebOutput.h"
 #include "linux/xdg/Chassis.h"
 #include "linux/xdg/MountTable.h"
+#include "support/VKFileManagerExtensions.h"
 
 #include <QGuiApplication>
 #include <QScreen>
@@ -82,10 +84,24 @@ EditorProgram::EditorProgram(const EditorOptions& options)
       m_device(deviceValues(options), [this] { return m_window->bounds().width(); }),
       m_images([this] { return m_window->scale(); }), m_files(m_system, mounts(options)),
       m_media(m_system, m_notifications,
-              {[this](const std::string& path) { return m_files.resolvedPath(path); }, ffmpeg::cubebOutput(m_log)}),
-      m_platform{m_system, m_notifications, m_device, *m_window, m_images, m_files, m_calendar, m_media},
+              {[this](const std::string& path) { return m_files.resolvedPath(path); }, ffmpeg::cubebOutput(m_log),
+               &m_works}),
+      m_photos(libraryOptions(), m_log, m_works), m_platform{m_system, m_notifications, m_device, *m_window, m_images,
+                                                             m_files,  m_calendar,      m_media,  m_photos},
       m_presenter(m_window, m_clock), m_connection(std::make_shared<dbus::ExtensionConnection>(m_mainQueue)),
-      m_payload(m_mainQueue, [this] { show(); })
+      m_payload(m_mainQueue, [this] { show(); }), m_busy(options.deviceRoot),
+      m_workWatch(m_mainQueue, m_works,
+                  {[this] {
+                       learnAboutRecording();
+                       m_busy.set();
+                   },
+                   [this] {
+                       m_busy.clear();
+                       if (m_leaving)
+                           leaveWhenDone();
+                   },
+                   [this](std::optional<double> progress) { m_presenter.showWork(progress); },
+                   [this] { m_presenter.hideWork(); }})
 {
     // Declares the classes that the declaration names.
     VKVideoEditorExtensionContext::classObject();
@@ -102,6 +118,8 @@ int EditorProgram::run()
         return 4;
     }
     QGuiApplication::exec();
+    // What was handed back on the way out goes while everything that it needs is there.
+    m_mainQueue.drain();
     return m_exitStatus;
 }
 
@@ -142,6 +160,7 @@ void EditorProgram::show()
         return;
     m_shown = true;
     markStart("payload");
+    learnAboutRecording();
     if (m_device.userInterfaceIdiom() == platform::InterfaceIdiom::Phone && !m_options.idiom
         && QGuiApplication::platformName() != "offscreen")
         m_presenter.showFullScreen();
@@ -175,10 +194,40 @@ void EditorProgram::disconnected()
     m_presenter.hide();
     m_window->setVisible(false);
     // The editors go with the controller, and empty the temporary store as they go.
+    if (const auto current = editor(); current && current->isExporting())
+        current->exportSession()->cancelExport(); // nobody is left to see what a trim would make
     m_window->setRootViewController(nullptr);
     m_extension = {};
     m_connection->flush();
-    QGuiApplication::exit(m_exitStatus); // quit() would ask the window, which never closes by itself
+    leaveWhenDone();
+}
+
+/// A save that is under way holds its editor, and the movie with it. Its end calls again.
+void EditorProgram::leaveWhenDone()
+{
+    m_leaving = true;
+    if (!m_workWatch.isWorking())
+        QGuiApplication::exit(m_exitStatus); // quit() would ask the window, which never closes by itself
+}
+
+/// The library names the movie after the app and the date of the recording as it came.
+void EditorProgram::learnAboutRecording()
+{
+    const auto current = editor();
+    if (!current || !current->originalVideoURL())
+        return;
+    const auto created = VKExtensions::_srGetCreationDateForFile(m_files, *current->originalVideoURL());
+    if (created)
+        m_recording.setValue({current->applicationName().value_or(""), created});
+}
+
+photos::LibraryOptions EditorProgram::libraryOptions()
+{
+    return {photos::UserDirectories::ofUser(),
+            [this](const std::string& path) { return m_files.resolvedPath(path); },
+            [this](const std::string&) { return m_recording.value(); },
+            [this](const std::string& path, int side) { return movieThumbnail(m_mainQueue, m_media, path, side); },
+            {}};
 }
 
 } // namespace app

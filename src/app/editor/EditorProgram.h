@@ -1,14 +1,20 @@
 /// The editor process: makes the platform on Linux, starts the extension in it, and ends with its host. GUI thread.
 ///
 /// From a connection to a host it takes the payload; the window opens once the payload has been loaded, or has not come
-/// in time. When the host closes the connection, or dies, the extension disappears and run() returns.
+/// in time. When the host closes the connection, or dies, the extension disappears and run() returns; a save that is
+/// under way then is finished first, without a window.
 #pragma once
 
 #include "app/editor/EditorOptions.h"
 #include "app/editor/PayloadWatch.h"
+#include "app/editor/WorkWatch.h"
+#include "base/SharedValue.h"
+#include "base/WorkList.h"
+#include "linux/dbus/BusyMark.h"
 #include "linux/dbus/ExtensionConnection.h"
 #include "linux/ffmpeg/FFmpegMediaFramework.h"
 #include "linux/icu/Calendar.h"
+#include "linux/photos/VideoLibrary.h"
 #include "linux/qt/MainLoop.h"
 #include "linux/qt/Presenter.h"
 #include "linux/qt/SvgImageCatalog.h"
@@ -49,6 +55,9 @@ private:
     void show();
     void closeRequested();
     void disconnected();
+    void leaveWhenDone();
+    photos::LibraryOptions libraryOptions();
+    void learnAboutRecording();
 
     EditorOptions m_options;
     base::SystemClock m_clock;
@@ -60,6 +69,8 @@ private:
     base::WorkerQueue m_defaultQueue;
     base::System m_system;
 
+    base::WorkList m_works;
+    base::SharedValue<photos::Recording> m_recording; ///< what the library calls it
     runtime::NotificationCenter m_notifications;
     std::shared_ptr<platform::Window> m_window;
     xdg::DeviceProfile m_device;
@@ -67,14 +78,18 @@ private:
     xdg::FileManager m_files;
     intl::Calendar m_calendar;
     ffmpeg::FFmpegMediaFramework m_media;
+    photos::VideoLibrary m_photos;
     platform::Platform m_platform;
     qtui::Presenter m_presenter;
 
     std::shared_ptr<dbus::ExtensionConnection> m_connection;
     platform::Extension m_extension;
     PayloadWatch m_payload;
+    dbus::BusyMark m_busy;
+    WorkWatch m_workWatch;
     std::unique_ptr<Script> m_script;
     bool m_shown = false;
+    bool m_leaving = false;
     bool m_pictureSeen = false;
     int m_exitStatus = 0;
 };

@@ -2,6 +2,7 @@
 
 #include "app/host/EditorDirectory.h"
 #include "app/host/Payload.h"
+#include "linux/dbus/BusyMark.h"
 #include "linux/dbus/HostConnection.h"
 
 #include <QObject>
@@ -173,7 +174,9 @@ void EditorSession::State::whenTimeIsUp()
         QMetaObject::invokeMethod(this, &State::end, Qt::QueuedConnection); // not inside the timer that it destroys
         return;
     }
-    process->signal(std::exchange(nextSignal, SIGKILL));
+    // One that has something to finish, a save for example, takes as long as that takes.
+    if (!dbus::BusyMark::isSet(directory.deviceRoot()))
+        process->signal(std::exchange(nextSignal, SIGKILL));
     timer.start(place.patience);
 }
 

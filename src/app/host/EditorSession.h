@@ -34,7 +34,8 @@ public:
     struct Place {
         std::string editorProgram;
         std::string directoriesRoot; ///< directories of dead editors in it are swept meanwhile
-        /// How long an editor may take to go after being asked, and after SIGTERM, before stronger means are used.
+        /// How long an editor that has nothing to finish may take to go after being asked, and after SIGTERM, before
+        /// stronger means are used.
         std::chrono::milliseconds patience = std::chrono::seconds(10);
     };
     struct Handlers {

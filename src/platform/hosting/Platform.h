@@ -6,6 +6,7 @@
 #include "platform/files/DateFormatter.h"
 #include "platform/files/FileManager.h"
 #include "platform/media/MediaFramework.h"
+#include "platform/photos/PhotoLibrary.h"
 #include "platform/views/Image.h"
 #include "platform/views/Screen.h"
 #include "runtime/NotificationCenter.h"
@@ -21,6 +22,7 @@ struct Platform {
     FileManager& files;
     Calendar& calendar;
     MediaFramework& media;
+    PhotoLibrary& photos;
 };
 
 } // namespace platform

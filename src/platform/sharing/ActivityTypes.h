@@ -7,7 +7,7 @@ inline constexpr const char* kActivityTypeMail = "Mail";
 inline constexpr const char* kActivityTypeMessage = "Message";
 inline constexpr const char* kActivityTypeCopyToPasteboard = "CopyToPasteboard";
 inline constexpr const char* kActivityTypePostToFacebook = "PostToFacebook";
-/// Saved to the user's library of videos.
+/// The movie was put into the user's library, or a trim of it was confirmed.
 inline constexpr const char* kActivityTypeSaveToCameraRoll = "SaveToCameraRoll";
 
 } // namespace platform

@@ -7,8 +7,10 @@
 //   wait               waits until the host closes the connection, then goes on
 //   tell=PIPE          writes the same into a named pipe, once somebody reads
 //   remove-movie       removes the movie that was handed over, as saving does
+//   busy               has something to finish from now on
 //   hang               stays, whatever the host does; only SIGKILL helps
 
+#include "linux/dbus/BusyMark.h"
 #include "linux/dbus/ExtensionConnection.h"
 #include "platform/views/Color.h"
 
@@ -132,6 +134,7 @@ int main(int argc, char* argv[])
 
     const auto proxy = connection.remoteObjectProxyWithErrorHandler(
         [](const base::ErrorRef& error) { std::fprintf(stderr, "fake editor: %s\n", error->description().c_str()); });
+    dbus::BusyMark busy(argument(argc, argv, "--device-root"));
     const char* const script = std::getenv("FAKE_EDITOR");
     for (const std::string& step : split(script ? script : "", ' ')) {
         const std::string word = step.substr(0, step.find('='));
@@ -155,6 +158,8 @@ int main(int argc, char* argv[])
             std::_Exit(std::atoi(value.c_str()));
         } else if (word == "crash") {
             std::abort();
+        } else if (word == "busy") {
+            busy.set();
         } else if (word == "hang") {
             std::signal(SIGTERM, SIG_IGN);
             for (;;)

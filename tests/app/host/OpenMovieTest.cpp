@@ -35,6 +35,23 @@ protected:
                                                                           {"XDG_CACHE_HOME", m_cache}});
     }
 
+    /// A session of the host that soon loses its patience.
+    std::unique_ptr<host::EditorSession> startImpatiently(const std::string& script,
+                                                          std::optional<host::EditorOutcome>& outcome)
+    {
+        ::setenv("FAKE_EDITOR", script.c_str(), 1);
+        dbus::EditRequest request;
+        request.movie = dbus::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+        request.movieName = "movie.mp4";
+        host::EditorSession::Handlers handlers;
+        handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
+        auto session = host::EditorSession::start(
+            std::move(request), {kPrograms + "/fake-editor", m_cache / "clipsa", std::chrono::milliseconds(20)},
+            std::move(handlers));
+        EXPECT_TRUE(session) << session.error()->description();
+        return session ? std::move(session).value() : nullptr;
+    }
+
     std::filesystem::path pipe(const char* name)
     {
         const auto path = m_directory.path() / name;
@@ -265,23 +282,31 @@ TEST_F(OpeningAMovie, TellsItsVersionAndHelp)
 TEST_F(OpeningAMovie, AnEditorThatDoesNotGoIsMadeToGo)
 {
     const auto there = pipe("there");
-    ::setenv("FAKE_EDITOR", ("tell=" + there.native() + " finish=save hang").c_str(), 1);
-    dbus::EditRequest request;
-    request.movie = dbus::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
-    request.movieName = "movie.mp4";
     std::optional<host::EditorOutcome> outcome;
-    host::EditorSession::Handlers handlers;
-    handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
-    auto session = host::EditorSession::start(
-        std::move(request), {kPrograms + "/fake-editor", m_cache / "clipsa", std::chrono::milliseconds(20)},
-        std::move(handlers));
-    ASSERT_TRUE(session) << session.error()->description();
+    auto session = startImpatiently("tell=" + there.native() + " finish=save hang", outcome);
     EXPECT_THAT(tests::whilePumping([&] { return tests::readPipe(there); }), HasSubstr("MovieURLKey"));
 
     EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
     EXPECT_EQ(outcome->end.signal, SIGKILL);
     EXPECT_THAT(outcome->activityTypes, testing::Optional(ElementsAre("save")));
-    session.value().reset();
+    session.reset();
+    EXPECT_THAT(directories(), IsEmpty());
+}
+
+TEST_F(OpeningAMovie, AnEditorThatHasSomethingToFinishIsWaitedFor)
+{
+    const auto finishing = pipe("finishing");
+    std::optional<host::EditorOutcome> busy, idle;
+    auto session = startImpatiently("busy finish=save wait tell=" + finishing.native(), busy);
+    auto other = startImpatiently("finish= hang", idle);
+    EXPECT_TRUE(tests::pumpUntil([&] { return idle.has_value(); })) << "it was killed, and that takes twice as long";
+    EXPECT_FALSE(busy);
+    EXPECT_THAT(tests::whilePumping([&] { return tests::readPipe(finishing); }), HasSubstr("MovieURLKey"));
+    EXPECT_TRUE(tests::pumpUntil([&] { return busy.has_value(); }));
+    EXPECT_EQ(busy->end.signal, 0);
+    EXPECT_EQ(busy->end.exitStatus, 0);
+    session.reset();
+    other.reset();
     EXPECT_THAT(directories(), IsEmpty());
 }
 
