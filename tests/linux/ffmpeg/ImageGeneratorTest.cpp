@@ -132,12 +132,12 @@ TEST_F(Images, LeaveOutWhatNobodySees)
 TEST_F(Images, OfManyGroupsDecodeEachOnceWhicheverOrderTheyAreAskedIn)
 {
     use(movie("groups.mp4"));
-    std::vector<int> numbers(60);
+    std::vector<int> numbers(24);
     std::iota(numbers.begin(), numbers.end(), 0);
     std::shuffle(numbers.begin(), numbers.end(), std::mt19937(5));
     for (const int each : numbers)
-        ask(MediaTime::make(each * 4 + 3, 30));
-    ASSERT_TRUE(waitForAnswers(60));
+        ask(MediaTime::make(each * 10 + 9, 30));
+    ASSERT_TRUE(waitForAnswers(24));
     for (const Answer& each : answers)
         EXPECT_EQ(each.number(), each.requested.value);
     EXPECT_LE(generator->decodedCount(), 240 + 8 * 8) << "each group once, and a few pictures behind each";
@@ -154,9 +154,14 @@ TEST_F(Images, ReadOnlyTheGroupsThatAreAskedFor)
 TEST_F(Images, OfOpenGroupsAreExactAroundTheirKeyframes)
 {
     use(movie("open-groups.mp4"));
-    for (int number = 119; number >= 0; --number)
-        ask(MediaTime::make(number, 30));
-    ASSERT_TRUE(waitForAnswers(120));
+    std::size_t asked = 0;
+    for (int number = 119; number >= 0; --number) {
+        if (number % 30 > 24 || number % 30 < 4) {
+            ask(MediaTime::make(number, 30));
+            ++asked;
+        }
+    }
+    ASSERT_TRUE(waitForAnswers(asked));
     for (const Answer& each : answers)
         EXPECT_EQ(each.number(), each.requested.value);
     for (const int number : {59, 61, 30, 29, 28, 27, 90})
@@ -177,11 +182,11 @@ TEST_F(Images, KeepIrregularTimes)
 {
     use(movie("vfr.mkv"));
     const auto time = [](int n) { return 33 * n + 2 * (7 * n % 11) + 400 * (n / 20); };
-    for (int n = 0; n < 79; ++n) {
+    for (int n = 0; n < 78; n += 3) {
         ask(MediaTime::make(time(n), 1000));
         ask(MediaTime::make(time(n + 1) - 1, 1000));
     }
-    ASSERT_TRUE(waitForAnswers(158));
+    ASSERT_TRUE(waitForAnswers(52));
     for (const Answer& each : answers) {
         EXPECT_EQ(MediaTime::make(each.number(), 1000), each.actual);
         EXPECT_FALSE(each.actual > each.requested);
@@ -325,6 +330,7 @@ TEST_F(Images, OfDamagedMoviesAreAnsweredOnceEach)
 {
     for (const char* name : {"truncated.mp4", "corrupt.mp4", "size-change.ts", "one-frame.mp4", "not-a-movie.mp4"}) {
         use(movie(name));
+        generator->setMaximumSize({64, 64});
         for (int i = 19; i >= 0; --i)
             ask(MediaTime::make(i, 5));
         ASSERT_TRUE(waitForAnswers(20)) << name;

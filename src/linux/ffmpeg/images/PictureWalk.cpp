@@ -23,10 +23,14 @@ PictureWalk::PictureWalk(std::shared_ptr<const Movie> movie, std::unique_ptr<Dem
       m_decoder(std::move(decoder)), m_cancelled(std::move(cancelled))
 {
     m_demuxer->select({m_track.stream});
-    if (m_demuxer->seeksByTable())
-        m_demuxer->seek(m_track.stream, m_track.origin); // some read their table only when they need it
-    else
+    if (!m_demuxer->seeksByTable()) {
         m_index = m_movie->packetIndex(m_cancelled);
+        return;
+    }
+    m_demuxer->seek(m_track.stream, m_track.origin); // some read their table only when they need it
+    const auto first = newPacket();
+    if (m_demuxer->read(*first) == 0 && first->pts != AV_NOPTS_VALUE && first->dts != AV_NOPTS_VALUE)
+        m_tableLag = std::max<std::int64_t>(0, first->pts - first->dts);
 }
 
 base::Result<std::unique_ptr<PictureWalk>> PictureWalk::open(std::shared_ptr<const Movie> movie, Cancelled cancelled)
@@ -95,8 +99,9 @@ std::optional<std::int64_t> PictureWalk::keyframeBefore(std::int64_t tick) const
         return found ? std::optional(found->pts) : std::nullopt;
     }
     AVStream& stream = m_demuxer->stream(m_track.stream);
-    const AVIndexEntry* found = avformat_index_get_entry_from_timestamp(&stream, tick, AVSEEK_FLAG_BACKWARD);
-    return found ? std::optional(found->timestamp) : std::nullopt;
+    const AVIndexEntry* found =
+        avformat_index_get_entry_from_timestamp(&stream, tick - m_tableLag, AVSEEK_FLAG_BACKWARD);
+    return found ? std::optional(found->timestamp + m_tableLag) : std::nullopt;
 }
 
 void PictureWalk::seek(std::int64_t tick)
@@ -120,7 +125,7 @@ void PictureWalk::seek(std::int64_t tick)
         m_demuxer->seekToStart(m_track.stream);
 }
 
-/// The table's times are those of decoding: what it led to can lie behind the tick.
+/// What the table led to lies behind the tick after all.
 void PictureWalk::seekFarther()
 {
     const std::int64_t second = std::max<std::int64_t>(1, av_rescale_q(1, {1, 1}, m_track.timeBase));

@@ -63,6 +63,8 @@ private:
     std::shared_ptr<const PacketIndex> m_index; ///< where the file has no table of its own
     std::deque<Owned<AVPacket>> m_ahead;        ///< read and not decoded
 
+    std::int64_t m_tableLag = 0; ///< the table's times are those of decoding, which is so much ahead of showing
+
     FrameRef m_current; ///< the last picture that came out, but one
     FrameRef m_next;    ///< the one behind it: known, so that the end of `m_current` is
     int m_threads = 1;
