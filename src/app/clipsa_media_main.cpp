@@ -3,6 +3,8 @@
 #include "app/host/CommandLine.h"
 #include "app/host/MakeThumbnails.h"
 #include "app/host/OpenMovie.h"
+#include "app/host/ProbeMovie.h"
+#include "app/host/SaveMovie.h"
 
 #include <cstdio>
 #include <string>
@@ -14,6 +16,16 @@ namespace {
 int run(const host::ThumbnailsCommand& command)
 {
     return host::makeThumbnails(command);
+}
+
+int run(const host::ProbeCommand& command)
+{
+    return host::probeMovie(command);
+}
+
+int run(const host::SaveCommand& command)
+{
+    return host::saveMovie(command);
 }
 
 } // namespace

@@ -15,6 +15,9 @@ const char* const kHelpText = R"(Clipsa looks at, trims, saves and shares a scre
                                 open MOVIE without a screen, and leave a picture of each step in DIR
   clipsa thumbnails MOVIE -n N -o DIR [--size WxH] [--force]
                                 leave N pictures of MOVIE, evenly spaced, in DIR
+  clipsa probe MOVIE [--json]   say what MOVIE is made of
+  clipsa save MOVIE [--app-name NAME]
+                                mix the sound of MOVIE and put it into the library of videos
   clipsa --help, --version
 
 Options of open, and of tour:

@@ -19,7 +19,17 @@ struct ThumbnailsCommand {
     bool force = false; ///< replaces files that are there
 };
 
-using MediaCommand = std::variant<ThumbnailsCommand>;
+struct ProbeCommand {
+    std::string movie;
+    bool json = false;
+};
+
+struct SaveCommand {
+    std::string movie;
+    std::string appName; ///< empty: the movie's file name without its extension
+};
+
+using MediaCommand = std::variant<ThumbnailsCommand, ProbeCommand, SaveCommand>;
 
 /// Whether `name` is one of these commands.
 bool isMediaCommand(const std::string& name);
