@@ -12,8 +12,9 @@ import playing
 import report
 import seeking
 import start
+import thumbnails
 
-KINDS = ("start", "seek", "scrub", "play", "memory")
+KINDS = ("start", "seek", "scrub", "play", "memory", "thumbnails")
 
 
 class Settings:
@@ -37,7 +38,7 @@ def main():
     parser.add_argument("kinds", nargs="*", metavar="KIND", help=f"what to measure, of: {' '.join(KINDS)} (all)")
     parser.add_argument("--rounds", type=int, default=15, help="how often each program starts (default: 15)")
     parser.add_argument("--seed", type=int, default=1, help="of the random positions (default: 1)")
-    parser.add_argument("--movie", help="a movie of yours instead of the made ones, for start, seek, scrub and play")
+    parser.add_argument("--movie", help="a movie of yours instead of the made ones, for all but memory")
     parser.add_argument("--top", help=argparse.SUPPRESS)
     arguments = parser.parse_args()
     for kind in arguments.kinds:
@@ -60,6 +61,8 @@ def main():
             playing.measure(settings, (own or [recording])[0])
         elif kind == "memory":
             memory.measure(settings, settings.movie("hour-4k.mp4"))
+        elif kind == "thumbnails":
+            thumbnails.measure(settings, (own or [settings.movie("ten-minutes-1080p60.mp4")])[0])
 
 
 if __name__ == "__main__":
