@@ -14,6 +14,8 @@ constexpr std::int64_t kBehind = 40;    ///< frames of AAC read behind the start
 constexpr double kSilent = 1.0 / 32768; ///< the last bit of 16
 /// Before a track's first sound there may be what its decoder needs to start: Opus 80 ms.
 constexpr double kPriming = 0.1;
+/// Samples by which the first packet of AAC lies before the sound at most; they are what the encoder made of nothing.
+constexpr std::int64_t kAacPriming = 2112;
 /// Where a movie's header is rounded to milliseconds, its end is no cut.
 constexpr double kRounding = 0.0015;
 
@@ -199,9 +201,12 @@ std::optional<CopiedTrack::Refusal> CopiedTrack::prepareStart()
     } else {
         if (!AacJoints::decode(m_packets->parameters(), pieces))
             return Refusal{"it is not the plain AAC that its header announces", 0};
+        const bool isWhole = m_from <= 0 && isFromStart && pieces.front().at >= m_from - kAacPriming;
         const bool isQuiet = (first == 0 || isSilent(pieces[first - 1].sound, 0, m_from - pieces[first - 1].at))
                              && isSilent(pieces[first].sound, 0, m_from - pieces[first].at);
-        if (isQuiet) {
+        if (isWhole) {
+            copied = 0;
+        } else if (isQuiet) {
             copied = first == 0 ? 0 : first - 1;
         } else {
             for (AacPiece& piece : pieces)

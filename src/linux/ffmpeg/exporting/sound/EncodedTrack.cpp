@@ -65,7 +65,8 @@ base::Result<void> LosslessTrack::describe(AVStream& output)
 base::Result<bool> LosslessTrack::next(AVPacket& packet)
 {
     av_packet_unref(&packet);
-    while (!m_encoder->receive(packet)) {
+    // The last packet of FLAC is an empty one that tells a checksum of all.
+    while (!m_encoder->receive(packet) || packet.size == 0) {
         if (m_hasEnded)
             return false;
         Planes samples;

@@ -1,0 +1,389 @@
+#include "SoundFiles.h"
+
+#include "linux/ffmpeg/exporting/sound/ChunkedEncoder.h"
+#include "linux/ffmpeg/exporting/sound/Limiter.h"
+#include "support/PrivateDirectory.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+
+namespace {
+
+using namespace tests;
+
+double decibels(double level)
+{
+    return 20 * std::log10(std::max(level, 1e-9));
+}
+
+/// The loudest moment, between the samples too: eight times as many, by a long filter.
+double truePeak(const std::vector<float>& samples)
+{
+    constexpr int kReach = 32;
+    constexpr int kPlaces = 8;
+    double peak = 0;
+    for (std::size_t i = kReach; i + kReach < samples.size(); ++i) {
+        if (std::abs(samples[i]) < 0.4f && std::abs(samples[i + 1]) < 0.4f)
+            continue;
+        for (int place = 0; place < kPlaces; ++place) {
+            double sum = 0;
+            for (int tap = -kReach + 1; tap <= kReach; ++tap) {
+                const double x = std::numbers::pi * (tap - static_cast<double>(place) / kPlaces);
+                const double window = 0.5 + 0.5 * std::cos(x / kReach);
+                sum += static_cast<double>(samples[i + static_cast<std::size_t>(tap + kReach) - kReach])
+                       * (x == 0 ? 1 : std::sin(x) / x) * window;
+            }
+            peak = std::max(peak, std::abs(sum));
+        }
+    }
+    return peak;
+}
+
+SoundTrackSpec track(Signal signal, const std::string& encoder = "aac", int rate = 48000, int channels = 2,
+                     double seconds = 5)
+{
+    SoundTrackSpec spec;
+    spec.signal = std::move(signal);
+    spec.encoder = encoder;
+    spec.rate = rate;
+    spec.channels = channels;
+    spec.seconds = seconds;
+    spec.bitRate = encoder == "aac" ? 192000 : 0;
+    return spec;
+}
+
+class Mixing : public testing::Test {
+protected:
+    std::string path(const std::string& name) const { return (directory.path() / name).string(); }
+    ExportedSound mix(const std::string& name, double from = 0, double to = -1)
+    {
+        const auto exported = exportSound(path(name), path("mix.mp4"), from, to, mixOfAll(path(name)));
+        EXPECT_EQ(exported.error, "");
+        EXPECT_EQ(exported.tracks, 1u);
+        return exported;
+    }
+
+    PrivateDirectory directory;
+};
+
+TEST_F(Mixing, EachTrackIsHeardAtItsOwnLevelOnBothSides)
+{
+    makeSoundFile(path("two.mp4"), {track(tone(440, 0.3)), track(tone(1000, 0.2), "aac", 48000, 1)});
+    EXPECT_EQ(mix("two.mp4").log, std::vector<std::string>{});
+    const auto mixed = decodeSound(path("mix.mp4"));
+    EXPECT_EQ(mixed.codec, "aac");
+    EXPECT_EQ(mixed.rate, 48000);
+    ASSERT_EQ(mixed.channels.size(), 2u);
+    for (const auto& channel : mixed.channels) {
+        EXPECT_NEAR(decibels(toneIn(channel, 48000, 440, 48000, 192000)), decibels(0.3), 0.1);
+        EXPECT_NEAR(decibels(toneIn(channel, 48000, 1000, 48000, 192000)), decibels(0.2), 0.1);
+    }
+}
+
+TEST_F(Mixing, TwoLoudTracksDoNotClipAndStayWhatTheyAreWhereTheyAreSoft)
+{
+    const auto loudFor = [](double frequency) {
+        return [=](double seconds, int) {
+            const double level = seconds > 2 && seconds < 3 ? 0.98 : 0.2;
+            return level * std::sin(2 * std::numbers::pi * frequency * seconds + 0.4);
+        };
+    };
+    makeSoundFile(path("loud.mp4"), {track(loudFor(440)), track(loudFor(997))});
+    mix("loud.mp4");
+    const auto mixed = decodeSound(path("mix.mp4"));
+    for (const auto& channel : mixed.channels) {
+        EXPECT_LT(truePeak(channel), 1.0);
+        EXPECT_GT(truePeak(channel), 0.8);
+        EXPECT_NEAR(decibels(toneIn(channel, 48000, 440, 24000, 90000)), decibels(0.2), 0.1);
+        EXPECT_NEAR(decibels(toneIn(channel, 48000, 997, 150000, 230000)), decibels(0.2), 0.1);
+    }
+}
+
+TEST_F(Mixing, SilenceStaysDigitalSilence)
+{
+    const auto silence = [](double, int) { return 0.0; };
+    makeSoundFile(path("silent.mp4"), {track(silence), track(silence, "aac", 44100, 1)});
+    mix("silent.mp4");
+    const auto mixed = decodeSound(path("mix.mp4"));
+    ASSERT_GT(mixed.length(), 230000u);
+    for (const auto& channel : mixed.channels)
+        EXPECT_TRUE(std::all_of(channel.begin(), channel.end(), [](float sample) { return sample == 0; }));
+}
+
+TEST_F(Mixing, TracksOfOtherRatesLayoutsStartsAndLengthsMeetInTheirPlaces)
+{
+    // A click every half second, in each track at the same moments.
+    const auto clicks = [](double frequency, double start) {
+        return [=](double seconds, int) {
+            const double within = std::fmod(seconds + start, 0.5);
+            return within < 0.008 ? 0.05 * std::sin(2 * std::numbers::pi * frequency * within) : 0.0;
+        };
+    };
+    auto late = track(clicks(250, 1.25), "flac", 24000, 1, 3);
+    late.start = 1.25;
+    makeSoundFile(path("many.mkv"),
+                  {track(clicks(250, 0)), late, track(clicks(250, 0), "pcm_s16le", 44100, 2, 4),
+                   track(clicks(250, 0), "flac", 32000, 2, 5), track(clicks(250, 0), "ac3", 48000, 6)});
+    mix("many.mkv");
+    const auto mixed = decodeSound(path("mix.mp4"));
+    EXPECT_EQ(mixed.rate, 48000);
+    EXPECT_NEAR(static_cast<double>(mixed.length()), 5 * 48000, 3000);
+    // Matroska has no time before 0: all of it moved by the first track's priming.
+    constexpr std::int64_t kMoved = 1024;
+    for (int click = 1; click < 9; ++click) {
+        const std::int64_t wanted = click * 24000 + kMoved;
+        double best = 0;
+        std::int64_t found = 0;
+        for (std::int64_t at = wanted - 480; at < wanted + 480; ++at) {
+            double sum = 0;
+            for (std::int64_t i = 0; i < 384; ++i)
+                sum += static_cast<double>(mixed.at(at + i, 0))
+                       * std::sin(2 * std::numbers::pi * 250 * static_cast<double>(i) / 48000);
+            if (sum > best) {
+                best = sum;
+                found = at;
+            }
+        }
+        EXPECT_LE(std::abs(found - wanted), 24) << "click " << click;
+        // All that sound at this moment add up, which they do only when they are in step; the one with six channels counts
+        // for more.
+        const double heard = best * 2 / 384;
+        EXPECT_GT(heard, click == 8 ? 0.22 : click < 3 ? 0.23 : 0.27) << "click " << click;
+    }
+}
+
+TEST_F(Mixing, ADamagedTrackIsNamedAndTheOthersAreHeard)
+{
+    makeSoundFile(path("good.mkv"), {track(tone(440, 0.2)), track(tone(1000, 0.2), "flac"), track(tone(3000, 0.1))});
+    // Of the second track nothing is left that could be decoded.
+    {
+        AVFormatContext* opened = nullptr;
+        ASSERT_GE(avformat_open_input(&opened, path("good.mkv").c_str(), nullptr, nullptr), 0);
+        ffmpeg::Owned<AVFormatContext> input(opened);
+        avformat_find_stream_info(opened, nullptr);
+        AVFormatContext* output = nullptr;
+        avformat_alloc_output_context2(&output, nullptr, nullptr, path("bad.mkv").c_str());
+        for (unsigned i = 0; i < input->nb_streams; ++i) {
+            AVStream* stream = avformat_new_stream(output, nullptr);
+            avcodec_parameters_copy(stream->codecpar, input->streams[i]->codecpar);
+            stream->time_base = input->streams[i]->time_base;
+        }
+        avio_open(&output->pb, path("bad.mkv").c_str(), AVIO_FLAG_WRITE);
+        ASSERT_GE(avformat_write_header(output, nullptr), 0);
+        const auto packet = ffmpeg::newPacket();
+        while (av_read_frame(input.get(), packet.get()) >= 0) {
+            if (packet->stream_index == 1) {
+                ASSERT_GE(av_packet_make_writable(packet.get()), 0);
+                for (int i = 0; i < packet->size; ++i)
+                    packet->data[i] = static_cast<std::uint8_t>(i * 31 + 7);
+            }
+            av_write_frame(output, packet.get());
+        }
+        av_write_trailer(output);
+        avio_closep(&output->pb);
+        avformat_free_context(output);
+    }
+    const auto exported = mix("bad.mkv");
+    ASSERT_EQ(exported.log.size(), 1u);
+    EXPECT_NE(exported.log.front().find("Sound track 2 of “bad.mkv”"), std::string::npos) << exported.log.front();
+    const auto mixed = decodeSound(path("mix.mp4"));
+    EXPECT_NEAR(decibels(toneIn(mixed.channels[0], 48000, 440, 48000, 192000)), decibels(0.2), 0.1);
+    EXPECT_NEAR(decibels(toneIn(mixed.channels[0], 48000, 3000, 48000, 192000)), decibels(0.1), 0.1);
+    EXPECT_LT(decibels(toneIn(mixed.channels[0], 48000, 1000, 48000, 192000)), -60);
+}
+
+TEST_F(Mixing, SixteenTracksAddUp)
+{
+    std::vector<SoundTrackSpec> tracks;
+    for (int i = 0; i < 16; ++i)
+        tracks.push_back(track(tone(300 + 100 * i, 0.03), "aac", i % 2 ? 44100 : 48000, 1 + i % 2, 3));
+    makeSoundFile(path("sixteen.mp4"), tracks);
+    mix("sixteen.mp4");
+    const auto mixed = decodeSound(path("mix.mp4"));
+    for (int i = 0; i < 16; ++i)
+        EXPECT_NEAR(decibels(toneIn(mixed.channels[1], 48000, 300 + 100 * i, 24000, 120000)), decibels(0.03), 0.2) << i;
+}
+
+TEST_F(Mixing, AMixOfNothingHasNoSoundAndWhatIsNoSoundIsLeftOut)
+{
+    makeSoundFile(path("two.mp4"), {track(tone(440, 0.3)), track(tone(1000, 0.2))});
+    EXPECT_EQ(exportSound(path("two.mp4"), path("mix.mp4"), 0, -1, platform::AudioMix{}).tracks, 0u);
+    auto inputs = mixOfAll(path("two.mp4"));
+    inputs.inputs.push_back({77});
+    const auto exported = exportSound(path("two.mp4"), path("mix.mp4"), 0, -1, inputs);
+    EXPECT_EQ(exported.tracks, 1u);
+    ASSERT_EQ(exported.log.size(), 1u);
+    EXPECT_NE(exported.log.front().find("Track 77"), std::string::npos);
+}
+
+TEST_F(Mixing, ASingleAacTrackKeepsItsPackets)
+{
+    makeSoundFile(path("one.mp4"), {track(speechLike(0.4))});
+    const auto exported = exportSound(path("one.mp4"), path("mix.mp4"), 0, -1, mixOfAll(path("one.mp4")));
+    EXPECT_EQ(exported.log, std::vector<std::string>{});
+    EXPECT_EQ(decodeSound(path("mix.mp4")).bytes, decodeSound(path("one.mp4")).bytes);
+}
+
+TEST_F(Mixing, TheRangeIsMixedToTheSample)
+{
+    makeSoundFile(path("two.mp4"), {track(speechLike(0.3)), track(tone(5000, 0.01), "aac", 48000, 1)});
+    const auto source = decodeSound(path("two.mp4"));
+    const double from = 1.2345;
+    mix("two.mp4", from, 4.2);
+    const auto mixed = decodeSound(path("mix.mp4"));
+    EXPECT_EQ(mixed.start, 0);
+    EXPECT_NEAR(static_cast<double>(mixed.length()), (4.2 - from) * 48000 + 512, 514);
+    double off = 0;
+    for (std::int64_t i = 2000; i < 100000; ++i) {
+        const double error = static_cast<double>(mixed.at(i, 0) - source.at(i + std::llround(from * 48000), 0));
+        off += error * error;
+    }
+    EXPECT_LT(decibels(std::sqrt(off / 98000)), -38) << "the tone of the other track and little else";
+}
+
+TEST(Limiting, LeavesEverythingAloneThatIsSoftEnough)
+{
+    ffmpeg::Limiter limiter(48000, 2);
+    ffmpeg::Planes samples(2, std::vector<float>(20000));
+    for (std::size_t i = 0; i < 20000; ++i)
+        samples[0][i] = samples[1][i] = static_cast<float>(0.88 * std::sin(0.05 * static_cast<double>(i)));
+    samples[1][10000] = 1.7f;
+    auto given = limiter.push(samples);
+    const auto rest = limiter.finish();
+    for (std::size_t channel = 0; channel < 2; ++channel)
+        given[channel].insert(given[channel].end(), rest[channel].begin(), rest[channel].end());
+    ASSERT_EQ(given[0].size(), 20000u);
+    for (std::size_t i = 0; i < 20000; ++i) {
+        ASSERT_LE(std::abs(given[1][i]), ffmpeg::Limiter::kCeiling + 1e-6f) << i;
+        if (i < 9500 || i > 10500) {
+            ASSERT_EQ(given[0][i], samples[0][i]) << i;
+        }
+    }
+    EXPECT_LT(std::abs(given[0][9990]), std::abs(samples[0][9990]) * 0.6f) << "both sides, or the sound would move";
+}
+
+TEST(Limiting, DoesNotDependOnHowTheSoundIsHandedIn)
+{
+    ffmpeg::Planes samples(1, std::vector<float>(30000));
+    for (std::size_t i = 0; i < 30000; ++i)
+        samples[0][i] = static_cast<float>((i / 3000 % 2 ? 1.6 : 0.5) * std::sin(0.3 * static_cast<double>(i)));
+    std::vector<float> whole;
+    for (const std::size_t step : {30000u, 1000u, 37u}) {
+        ffmpeg::Limiter limiter(48000, 1);
+        std::vector<float> given;
+        for (std::size_t from = 0; from < 30000; from += step) {
+            const std::size_t until = std::min<std::size_t>(from + step, 30000);
+            const auto some = limiter.push({{samples[0].begin() + static_cast<std::ptrdiff_t>(from),
+                                             samples[0].begin() + static_cast<std::ptrdiff_t>(until)}});
+            given.insert(given.end(), some[0].begin(), some[0].end());
+        }
+        const auto rest = limiter.finish();
+        given.insert(given.end(), rest[0].begin(), rest[0].end());
+        ASSERT_EQ(given.size(), 30000u);
+        if (whole.empty())
+            whole = given;
+        for (std::size_t i = 0; i < given.size(); ++i)
+            ASSERT_NEAR(given[i], whole[i], 1e-6) << step << ", " << i;
+        EXPECT_LT(truePeak(given), 0.91);
+    }
+}
+
+/// Gives a formula's samples.
+class Formula final : public ffmpeg::SampleSource {
+public:
+    Formula(Signal signal, std::int64_t length) : m_signal(std::move(signal)), m_length(length) {}
+    int rate() const override { return 48000; }
+    int channels() const override { return 2; }
+    int read(ffmpeg::Planes& into, int count) override
+    {
+        into.resize(2);
+        const auto got = std::min<std::int64_t>(count, m_length - m_at);
+        for (std::int64_t i = 0; i < got; ++i, ++m_at)
+            for (int channel = 0; channel < 2; ++channel)
+                into[static_cast<std::size_t>(channel)].push_back(
+                    static_cast<float>(m_signal(static_cast<double>(m_at) / 48000, channel)));
+        return static_cast<int>(got);
+    }
+
+private:
+    Signal m_signal;
+    std::int64_t m_length;
+    std::int64_t m_at = 0;
+};
+
+struct Packets {
+    std::vector<std::int64_t> times;
+    std::vector<float> sound;
+};
+
+Packets encodeIn(std::int64_t framesInChunk, std::int64_t length)
+{
+    Packets result;
+    auto encoder = ffmpeg::ChunkedEncoder::open(std::make_unique<Formula>(speechLike(0.5), length), 256000,
+                                                {framesInChunk, 2}, nullptr);
+    EXPECT_TRUE(encoder);
+    const AVCodec* codec = avcodec_find_decoder(AV_CODEC_ID_AAC);
+    ffmpeg::Owned<AVCodecContext> decoder(avcodec_alloc_context3(codec));
+    AVCodecParameters* parameters = avcodec_parameters_alloc();
+    EXPECT_TRUE(encoder.value()->model().describe(*parameters));
+    avcodec_parameters_to_context(decoder.get(), parameters);
+    avcodec_parameters_free(&parameters);
+    EXPECT_GE(avcodec_open2(decoder.get(), codec, nullptr), 0);
+    const auto packet = ffmpeg::newPacket();
+    const auto frame = ffmpeg::newFrame();
+    for (;;) {
+        const auto more = encoder.value()->next(*packet);
+        EXPECT_TRUE(more);
+        if (!more || !more.value())
+            return result;
+        result.times.push_back(packet->pts);
+        avcodec_send_packet(decoder.get(), packet.get());
+        while (avcodec_receive_frame(decoder.get(), frame.get()) >= 0) {
+            const auto* samples = reinterpret_cast<const float*>(frame->extended_data[0]);
+            result.sound.insert(result.sound.end(), samples, samples + frame->nb_samples);
+        }
+    }
+}
+
+TEST(ChunkedEncoding, HasThePacketsOfOneEncoderAndNoSeam)
+{
+    for (const std::int64_t length : {480000, 480001, 300 * 1024, 301 * 1024 - 1, 1000, 0}) {
+        SCOPED_TRACE(length);
+        const auto whole = encodeIn(100000, length);
+        const auto chunked = encodeIn(100, length);
+        EXPECT_EQ(chunked.times, whole.times);
+        if (length > 0) {
+            ASSERT_FALSE(whole.times.empty());
+            EXPECT_EQ(whole.times.front(), -1024);
+        }
+        ASSERT_EQ(chunked.sound.size(), whole.sound.size());
+        const auto wanted = speechLike(0.5);
+        // Nowhere is it farther from the sound than one encoder is anywhere.
+        double worst[2] = {0, 0};
+        for (std::size_t at = 1024;
+             at + 240 <= std::min<std::size_t>(whole.sound.size(), 1024 + static_cast<std::size_t>(length));
+             at += 240) {
+            double sum[2] = {0, 0};
+            for (std::size_t i = at; i < at + 240; ++i) {
+                const double truth = wanted(static_cast<double>(i - 1024) / 48000, 0);
+                sum[0] += std::pow(static_cast<double>(whole.sound[i]) - truth, 2);
+                sum[1] += std::pow(static_cast<double>(chunked.sound[i]) - truth, 2);
+            }
+            worst[0] = std::max(worst[0], std::sqrt(sum[0] / 240));
+            worst[1] = std::max(worst[1], std::sqrt(sum[1] / 240));
+        }
+        EXPECT_LT(decibels(worst[1]), decibels(worst[0]) + 1);
+    }
+}
+
+TEST(ChunkedEncoding, SharesTheWorkEvenlyAndKeepsTheMemorySmall)
+{
+    const auto tenMinutes = ffmpeg::ChunkedEncoder::plan(600 * 48000, 48000, 2, 1);
+    EXPECT_LE(tenMinutes.framesInChunk * 1024, 60 * 48000 + 1024);
+    EXPECT_EQ((600 * 48000 / 1024 + 1 + tenMinutes.framesInChunk) / tenMinutes.framesInChunk % 2, 0);
+    EXPECT_LE(ffmpeg::ChunkedEncoder::plan(3600 * 48000, 48000, 2, 16).framesInChunk * 1024, 10 * 48000);
+    EXPECT_GE(ffmpeg::ChunkedEncoder::plan(48000, 48000, 64, 1).framesInChunk * 1024, 9 * 48000);
+}
+
+} // namespace

@@ -1,0 +1,416 @@
+#include "SoundFiles.h"
+
+#include "linux/ffmpeg/exporting/sound/AacFrame.h"
+
+extern "C" {
+#include <libavutil/intreadwrite.h>
+}
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <memory>
+#include <random>
+
+namespace tests {
+
+using namespace ffmpeg;
+
+namespace {
+
+struct ClosingOutput {
+    void operator()(AVFormatContext* context) const
+    {
+        if (context->pb)
+            avio_closep(&context->pb);
+        avformat_free_context(context);
+    }
+};
+using Output = std::unique_ptr<AVFormatContext, ClosingOutput>;
+
+Output newOutput(const std::string& path)
+{
+    AVFormatContext* context = nullptr;
+    EXPECT_GE(avformat_alloc_output_context2(&context, nullptr, nullptr, path.c_str()), 0) << path;
+    Output output(context);
+    EXPECT_GE(avio_open(&context->pb, path.c_str(), AVIO_FLAG_WRITE), 0) << path;
+    return output;
+}
+
+Owned<AVCodecContext> newEncoder(const SoundTrackSpec& spec)
+{
+    const AVCodec* codec = avcodec_find_encoder_by_name(spec.encoder.c_str());
+    EXPECT_TRUE(codec) << spec.encoder;
+    Owned<AVCodecContext> context(avcodec_alloc_context3(codec));
+    context->sample_fmt = codec->sample_fmts ? codec->sample_fmts[0] : AV_SAMPLE_FMT_FLTP;
+    context->sample_rate = spec.rate;
+    context->time_base = {1, spec.rate};
+    context->flags |= AV_CODEC_FLAG_GLOBAL_HEADER | AV_CODEC_FLAG_BITEXACT;
+    context->bit_rate = spec.bitRate;
+    context->thread_count = 1;
+    if (spec.encoder == "aac")
+        av_opt_set_int(context->priv_data, "aac_pns", 0, 0); // noise that differs each time cannot be compared
+    av_channel_layout_default(&context->ch_layout, spec.channels);
+    EXPECT_GE(avcodec_open2(context.get(), codec, nullptr), 0) << spec.encoder;
+    return context;
+}
+
+void putSample(AVFrame& frame, int channel, int index, double value)
+{
+    const int channels = frame.ch_layout.nb_channels;
+    const bool isPlanar = av_sample_fmt_is_planar(static_cast<AVSampleFormat>(frame.format));
+    std::uint8_t* data = frame.extended_data[isPlanar ? channel : 0];
+    const int at = isPlanar ? index : index * channels + channel;
+    switch (av_get_packed_sample_fmt(static_cast<AVSampleFormat>(frame.format))) {
+    case AV_SAMPLE_FMT_S16:
+        reinterpret_cast<std::int16_t*>(data)[at] =
+            static_cast<std::int16_t>(std::lrint(std::clamp(value * 32768, -32768.0, 32767.0)));
+        break;
+    case AV_SAMPLE_FMT_S32:
+        reinterpret_cast<std::int32_t*>(data)[at] =
+            static_cast<std::int32_t>(std::llrint(std::clamp(value, -1.0, 0.999999) * 2147483648.0));
+        break;
+    default:
+        reinterpret_cast<float*>(data)[at] = static_cast<float>(value);
+    }
+}
+
+Owned<AVFrame> newSoundFrame(const AVCodecContext& encoder, int count, std::int64_t pts)
+{
+    auto frame = newFrame();
+    frame->format = encoder.sample_fmt;
+    frame->sample_rate = encoder.sample_rate;
+    frame->nb_samples = count;
+    frame->pts = pts;
+    av_channel_layout_copy(&frame->ch_layout, &encoder.ch_layout);
+    EXPECT_GE(av_frame_get_buffer(frame.get(), 0), 0);
+    return frame;
+}
+
+struct EncodedSound {
+    Owned<AVCodecContext> encoder;
+    std::vector<Owned<AVPacket>> packets;
+};
+
+EncodedSound encodeSound(const SoundTrackSpec& spec)
+{
+    EncodedSound encoded{newEncoder(spec), {}};
+    AVCodecContext& encoder = *encoded.encoder;
+    const int size = encoder.frame_size > 0 ? encoder.frame_size : 1024;
+    const auto total = static_cast<std::int64_t>(spec.seconds * spec.rate);
+    const auto drain = [&] {
+        for (auto packet = newPacket(); avcodec_receive_packet(&encoder, packet.get()) >= 0; packet = newPacket())
+            encoded.packets.push_back(std::move(packet));
+    };
+    for (std::int64_t at = 0; at < total; at += size) {
+        const int count = static_cast<int>(std::min<std::int64_t>(size, total - at));
+        const auto frame = newSoundFrame(encoder, count, at);
+        for (int channel = 0; channel < spec.channels; ++channel)
+            for (int i = 0; i < count; ++i)
+                putSample(*frame, channel, i, spec.signal(static_cast<double>(at + i) / spec.rate, channel));
+        EXPECT_GE(avcodec_send_frame(&encoder, frame.get()), 0);
+        drain();
+    }
+    avcodec_send_frame(&encoder, nullptr);
+    drain();
+    return encoded;
+}
+
+void writeTracks(const std::string& path, const std::vector<SoundTrackSpec>& specs, std::vector<EncodedSound> tracks)
+{
+    const auto output = newOutput(path);
+    for (std::size_t i = 0; i < tracks.size(); ++i) {
+        AVStream* stream = avformat_new_stream(output.get(), nullptr);
+        avcodec_parameters_from_context(stream->codecpar, tracks[i].encoder.get());
+        stream->codecpar->codec_tag = 0;
+        stream->time_base = {1, specs[i].rate};
+        stream->disposition = specs[i].isDefault ? AV_DISPOSITION_DEFAULT : 0;
+        if (!specs[i].language.empty())
+            av_dict_set(&stream->metadata, "language", specs[i].language.c_str(), 0);
+        if (!specs[i].handler.empty())
+            av_dict_set(&stream->metadata, "handler_name", specs[i].handler.c_str(), 0);
+    }
+    output->strict_std_compliance = FF_COMPLIANCE_EXPERIMENTAL; // for FLAC
+    AVDictionary* options = nullptr;
+    av_dict_set(&options, "avoid_negative_ts", path.ends_with(".mp4") ? "disabled" : "auto", 0);
+    ASSERT_GE(avformat_write_header(output.get(), &options), 0) << path;
+    av_dict_free(&options);
+    std::vector<std::size_t> next(tracks.size());
+    for (;;) {
+        std::size_t chosen = tracks.size();
+        double earliest = 0;
+        for (std::size_t i = 0; i < tracks.size(); ++i) {
+            if (next[i] == tracks[i].packets.size())
+                continue;
+            const double at = static_cast<double>(tracks[i].packets[next[i]]->pts) / specs[i].rate + specs[i].start;
+            if (chosen == tracks.size() || at < earliest) {
+                chosen = i;
+                earliest = at;
+            }
+        }
+        if (chosen == tracks.size())
+            break;
+        AVPacket& packet = *tracks[chosen].packets[next[chosen]++];
+        packet.pts += std::llround(specs[chosen].start * specs[chosen].rate);
+        packet.dts = packet.pts;
+        packet.stream_index = static_cast<int>(chosen);
+        av_packet_rescale_ts(&packet, {1, specs[chosen].rate}, output->streams[chosen]->time_base);
+        ASSERT_GE(av_interleaved_write_frame(output.get(), &packet), 0);
+    }
+    ASSERT_GE(av_write_trailer(output.get()), 0);
+}
+
+} // namespace
+
+void makeSoundFile(const std::string& path, const std::vector<SoundTrackSpec>& tracks)
+{
+    std::vector<EncodedSound> encoded;
+    for (const auto& track : tracks)
+        encoded.push_back(encodeSound(track));
+    writeTracks(path, tracks, std::move(encoded));
+}
+
+void makeSineWindowedFile(const std::string& path, const SoundTrackSpec& spec)
+{
+    // Each packet spans two frames, and needs each bent in its own way: two encoders make every other packet each.
+    EncodedSound both{newEncoder(spec), {}};
+    const auto frames = static_cast<std::int64_t>(spec.seconds * spec.rate) / kAacFrame;
+    std::vector<Owned<AVPacket>> made[2];
+    for (int odd = 0; odd < 2; ++odd) {
+        const auto encoder = newEncoder(spec);
+        const auto drain = [&] {
+            for (auto packet = newPacket(); avcodec_receive_packet(encoder.get(), packet.get()) >= 0;
+                 packet = newPacket())
+                made[odd].push_back(std::move(packet));
+        };
+        for (std::int64_t index = 0; index < frames; ++index) {
+            const auto frame = newSoundFrame(*encoder, kAacFrame, index * kAacFrame);
+            for (int channel = 0; channel < spec.channels; ++channel) {
+                auto* samples = reinterpret_cast<float*>(frame->extended_data[channel]);
+                for (int i = 0; i < kAacFrame; ++i)
+                    samples[i] = static_cast<float>(
+                        spec.signal(static_cast<double>(index * kAacFrame + i) / spec.rate, channel));
+                // Packet p spans the frames p - 1 and p.
+                if ((index + 1) % 2 == odd)
+                    bendForRisingHalf({samples, kAacFrame}, 1, 0);
+                else
+                    bendForFallingHalf({samples, kAacFrame}, 1, 0);
+            }
+            ASSERT_GE(avcodec_send_frame(encoder.get(), frame.get()), 0);
+            drain();
+        }
+        avcodec_send_frame(encoder.get(), nullptr);
+        drain();
+    }
+    for (std::size_t i = 0; i < made[0].size(); ++i) {
+        auto packet = std::move(made[i % 2][i]);
+        const auto windows = aacWindowsOf(*packet, spec.channels);
+        ASSERT_TRUE(windows && windows->isOfAll);
+        const bool isAtEnd = i <= 10 || i + 3 >= made[0].size();
+        ASSERT_TRUE(isAtEnd || windows->sequence == AacWindows::Sequence::Long) << "packet " << i << " is restless";
+        if (windows->sequence == AacWindows::Sequence::Long && windows->shape == 1) {
+            ASSERT_GE(av_packet_make_writable(packet.get()), 0);
+            setAacShape(*packet, *windows, 0);
+        }
+        both.packets.push_back(std::move(packet));
+    }
+    std::vector<EncodedSound> tracks;
+    tracks.push_back(std::move(both));
+    writeTracks(path, {spec}, std::move(tracks));
+}
+
+platform::AudioMix mixOfAll(const std::string& path)
+{
+    auto file = OpenFile::open(path);
+    const auto opened = Movie::open(std::move(file).value(), nullptr);
+    platform::AudioMix mix;
+    for (const auto& track : opened.value()->tracks())
+        if (track.type == platform::MediaType::Audio)
+            mix.inputs.push_back({track.trackID});
+    return mix;
+}
+
+ExportedSound exportSound(const std::string& from, const std::string& into, double start, double to,
+                          const std::optional<platform::AudioMix>& mix)
+{
+    ExportedSound result;
+    auto file = OpenFile::open(from);
+    if (!file) {
+        result.error = file.error()->description();
+        return result;
+    }
+    const auto opened = Movie::open(std::move(file).value(), nullptr);
+    if (!opened) {
+        result.error = opened.error()->description();
+        return result;
+    }
+    const ExportRange range{base::MediaTime::fromSeconds(start, 90000),
+                            to < 0 ? opened.value()->duration() : base::MediaTime::fromSeconds(to, 90000)};
+    auto sources = openSoundSources(opened.value(), range, mix, nullptr,
+                                    [&](const std::string& line) { result.log.push_back(line); });
+    if (!sources) {
+        result.error = sources.error()->description();
+        return result;
+    }
+    result.tracks = sources.value().size();
+    if (sources.value().empty())
+        return result;
+    const auto output = newOutput(into);
+    std::vector<AVRational> timeBases;
+    for (const auto& source : sources.value()) {
+        AVStream* stream = avformat_new_stream(output.get(), nullptr);
+        const auto described = source->describe(*stream);
+        EXPECT_TRUE(described);
+        timeBases.push_back(stream->time_base);
+    }
+    AVDictionary* options = nullptr;
+    av_dict_set(&options, "avoid_negative_ts", "disabled", 0);
+    av_dict_set(&options, "movie_timescale", "90000", 0);
+    output->strict_std_compliance = FF_COMPLIANCE_EXPERIMENTAL; // for FLAC
+    const int begun = avformat_write_header(output.get(), &options);
+    av_dict_free(&options);
+    EXPECT_GE(begun, 0);
+    if (begun < 0)
+        return result;
+    const auto packet = newPacket();
+    for (std::size_t i = 0; i < sources.value().size(); ++i) {
+        std::int64_t last = INT64_MIN;
+        for (;;) {
+            const auto more = sources.value()[i]->next(*packet);
+            if (!more) {
+                result.error = more.error()->description();
+                break;
+            }
+            if (!more.value())
+                break;
+            EXPECT_GT(packet->dts, last) << "decode times must grow";
+            EXPECT_GT(packet->duration, 0);
+            last = packet->dts;
+            packet->stream_index = static_cast<int>(i);
+            av_packet_rescale_ts(packet.get(), timeBases[i], output->streams[i]->time_base);
+            EXPECT_GE(av_write_frame(output.get(), packet.get()), 0);
+        }
+    }
+    EXPECT_GE(av_write_trailer(output.get()), 0);
+    return result;
+}
+
+DecodedSound decodeSound(const std::string& path, int track, bool everything)
+{
+    DecodedSound sound;
+    AVFormatContext* opened = nullptr;
+    AVDictionary* options = nullptr;
+    if (everything)
+        av_dict_set(&options, "ignore_editlist", "1", 0);
+    const int error = avformat_open_input(&opened, path.c_str(), nullptr, &options);
+    av_dict_free(&options);
+    EXPECT_GE(error, 0) << path;
+    if (error < 0)
+        return sound;
+    Owned<AVFormatContext> context(opened);
+    EXPECT_GE(avformat_find_stream_info(opened, nullptr), 0);
+    const AVStream* stream = nullptr;
+    for (unsigned i = 0, sounds = 0; i < context->nb_streams; ++i)
+        if (context->streams[i]->codecpar->codec_type == AVMEDIA_TYPE_AUDIO && static_cast<int>(sounds++) == track)
+            stream = context->streams[i];
+    EXPECT_TRUE(stream) << path << " has no sound track " << track;
+    if (!stream)
+        return sound;
+    const auto text = [&](const char* key) {
+        const auto* entry = av_dict_get(stream->metadata, key, nullptr, 0);
+        return std::string(entry ? entry->value : "");
+    };
+    sound.language = text("language");
+    sound.handler = text("handler_name");
+    sound.disposition = stream->disposition;
+    sound.codec = avcodec_get_name(stream->codecpar->codec_id);
+    sound.profile = stream->codecpar->profile;
+    const AVCodec* codec = avcodec_find_decoder(stream->codecpar->codec_id);
+    Owned<AVCodecContext> decoder(avcodec_alloc_context3(codec));
+    avcodec_parameters_to_context(decoder.get(), stream->codecpar);
+    decoder->pkt_timebase = stream->time_base;
+    if (everything)
+        decoder->flags2 |= AV_CODEC_FLAG2_SKIP_MANUAL;
+    EXPECT_GE(avcodec_open2(decoder.get(), codec, nullptr), 0);
+    const auto packet = newPacket();
+    const auto frame = newFrame();
+    bool isFirst = true;
+    const auto take = [&] {
+        while (avcodec_receive_frame(decoder.get(), frame.get()) >= 0) {
+            SwrContext* made = nullptr;
+            AVChannelLayout layout = frame->ch_layout;
+            swr_alloc_set_opts2(&made, &layout, AV_SAMPLE_FMT_FLTP, frame->sample_rate, &layout,
+                                static_cast<AVSampleFormat>(frame->format), frame->sample_rate, 0, nullptr);
+            Owned<SwrContext> converter(made);
+            swr_init(made);
+            std::vector<std::vector<float>> planes(static_cast<std::size_t>(frame->ch_layout.nb_channels),
+                                                   std::vector<float>(static_cast<std::size_t>(frame->nb_samples)));
+            std::vector<std::uint8_t*> pointers;
+            for (auto& plane : planes)
+                pointers.push_back(reinterpret_cast<std::uint8_t*>(plane.data()));
+            swr_convert(made, pointers.data(), frame->nb_samples,
+                        const_cast<const std::uint8_t**>(frame->extended_data), frame->nb_samples);
+            const std::int64_t at = av_rescale_q(frame->pts, stream->time_base, {1, frame->sample_rate});
+            if (isFirst)
+                sound.start = at;
+            isFirst = false;
+            sound.rate = frame->sample_rate;
+            sound.channels.resize(planes.size());
+            // Gaps are silent.
+            const std::int64_t gap = at - sound.start - static_cast<std::int64_t>(sound.length());
+            for (std::size_t channel = 0; channel < planes.size(); ++channel) {
+                if (gap > sound.rate / 500)
+                    sound.channels[channel].resize(sound.channels[channel].size() + static_cast<std::size_t>(gap));
+                sound.channels[channel].insert(sound.channels[channel].end(), planes[channel].begin(),
+                                               planes[channel].end());
+            }
+        }
+    };
+    while (av_read_frame(context.get(), packet.get()) >= 0) {
+        if (packet->stream_index == stream->index) {
+            if (sound.packets++ == 0)
+                sound.firstPts = av_rescale_q(packet->pts, stream->time_base, {1, stream->codecpar->sample_rate});
+            sound.bytes.emplace_back(packet->data, packet->data + packet->size);
+            if (avcodec_send_packet(decoder.get(), packet.get()) < 0)
+                ++sound.errors;
+            take();
+        }
+        av_packet_unref(packet.get());
+    }
+    avcodec_send_packet(decoder.get(), nullptr);
+    take();
+    return sound;
+}
+
+Signal speechLike(double level)
+{
+    return [=](double seconds, int channel) {
+        const double pi = std::numbers::pi;
+        double sum = 0;
+        for (int i = 1; i <= 5; ++i) {
+            const double frequency = 180.0 * i + 37.0 * channel;
+            // Each partial wanders and breathes in its own time.
+            sum += std::sin(2 * pi * frequency * seconds + 9 * std::sin(2 * pi * (0.31 + 0.13 * i) * seconds) * i)
+                   * (0.6 + 0.4 * std::sin(2 * pi * (1.7 + 0.6 * i) * seconds)) / i;
+        }
+        return level * sum / 2;
+    };
+}
+
+Signal humming(double level)
+{
+    return [=](double seconds, int channel) {
+        double sum = 0;
+        for (int i = 1; i <= 5; ++i)
+            sum += std::sin(2 * std::numbers::pi * (170.0 * i + 31.0 * channel) * seconds
+                            + 3 * std::sin(2 * std::numbers::pi * (0.11 + 0.03 * i) * seconds) * i)
+                   / i;
+        // With a little of each frequency, as there is in any room; nor does it begin at once.
+        auto noise = static_cast<std::uint32_t>(std::llround(seconds * 192000) * 2 + channel) * 2654435761u;
+        noise = (noise ^ noise >> 15) * 2246822519u;
+        sum += 0.01 * (static_cast<double>(noise ^ noise >> 13) / 2147483648.0 - 1);
+        return level * std::min(1.0, seconds / 0.5) * sum / 2;
+    };
+}
+
+} // namespace tests

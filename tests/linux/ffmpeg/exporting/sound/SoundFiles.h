@@ -1,0 +1,100 @@
+/// Makes sound files out of formulas, exports sound without pictures, and decodes what came out.
+#pragma once
+
+#include "linux/ffmpeg/exporting/sound/SoundSources.h"
+
+#include <cmath>
+#include <cstdint>
+#include <functional>
+#include <numbers>
+#include <string>
+#include <vector>
+
+namespace tests {
+
+/// The sample of a channel at a moment in seconds.
+using Signal = std::function<double(double seconds, int channel)>;
+
+struct SoundTrackSpec {
+    std::string encoder = "aac";
+    int rate = 48000;
+    int channels = 2;
+    std::int64_t bitRate = 0; ///< what the encoder takes by itself when 0
+    Signal signal;
+    double seconds = 6;
+    double start = 0;
+    std::string language = "";
+    std::string handler = "";
+    bool isDefault = true;
+};
+
+/// Writes a file with these sound tracks; the container by the name's ending.
+void makeSoundFile(const std::string& path, const std::vector<SoundTrackSpec>& tracks);
+
+/// A file of plain AAC whose windows are the other kind than our encoder makes: as many others' encoders choose them.
+void makeSineWindowedFile(const std::string& path, const SoundTrackSpec& track);
+
+struct ExportedSound {
+    std::vector<std::string> log;
+    std::size_t tracks = 0;
+    std::string error;
+};
+
+/// Writes the sound of a range (seconds; the whole movie when `to` is negative) as MP4.
+ExportedSound exportSound(const std::string& from, const std::string& into, double start, double to,
+                          const std::optional<platform::AudioMix>& mix = std::nullopt);
+/// A mix of all sound tracks of a file.
+platform::AudioMix mixOfAll(const std::string& path);
+
+struct DecodedSound {
+    int rate = 0;
+    std::int64_t start = 0; ///< where the first sample lies, in samples
+    std::vector<std::vector<float>> channels;
+    std::size_t packets = 0;
+    std::string codec;
+    int profile = 0;
+    std::string language, handler;
+    int disposition = 0;
+    int errors = 0;
+    std::int64_t firstPts = 0;                    ///< of the first packet, in samples
+    std::vector<std::vector<std::uint8_t>> bytes; ///< of each packet
+
+    std::size_t length() const { return channels.empty() ? 0 : channels.front().size(); }
+    /// The sample at a place on the time line; 0 where there is none.
+    float at(std::int64_t place, std::size_t channel) const
+    {
+        const std::int64_t index = place - start;
+        return index >= 0 && index < static_cast<std::int64_t>(length())
+                   ? channels[channel][static_cast<std::size_t>(index)]
+                   : 0.0f;
+    }
+};
+
+/// What a player hears, or (`everything`) what is in the packets although an edit list hides it.
+DecodedSound decodeSound(const std::string& path, int track = 0, bool everything = false);
+
+/// How loud a tone is in a part of a channel, as the peak of a sine.
+inline double toneIn(const std::vector<float>& samples, int rate, double frequency, std::size_t from, std::size_t until)
+{
+    double sine = 0;
+    double cosine = 0;
+    until = std::min(until, samples.size());
+    for (std::size_t i = from; i < until; ++i) {
+        const double angle = 2 * std::numbers::pi * frequency * static_cast<double>(i) / rate;
+        sine += static_cast<double>(samples[i]) * std::sin(angle);
+        cosine += static_cast<double>(samples[i]) * std::cos(angle);
+    }
+    return until > from ? 2 * std::hypot(sine, cosine) / static_cast<double>(until - from) : 0;
+}
+
+inline Signal tone(double frequency, double level)
+{
+    return [=](double seconds, int) { return level * std::sin(2 * std::numbers::pi * frequency * seconds); };
+}
+
+/// Sound that is nowhere like itself a little later: what is out of place by a sample is seen.
+Signal speechLike(double level);
+/// The same without anything that would make an encoder change its windows.
+Signal humming(double level);
+
+} // namespace tests
