@@ -32,6 +32,8 @@ void FFmpegExportSession::exportAsynchronously(std::function<void()> done)
         assert(m_status == Status::Unknown);
         m_status = Status::Waiting;
     }
+    if (m_engine->options.works)
+        m_underWay = m_engine->options.works->begin();
     auto self = std::static_pointer_cast<FFmpegExportSession>(shared_from_this());
     m_asset->whenLoaded([self, done = std::move(done)]() mutable { self->start(std::move(done)); });
 }
@@ -49,17 +51,21 @@ void FFmpegExportSession::start(std::function<void()> done)
         movie = nullptr;
         std::exchange(done, nullptr)();
     };
+    // Behind what is posted at the end: whoever waits for the end of all work finds that done.
+    auto underWay = m_underWay;
     // Whoever is told may wait for the main queue, so nobody waits there for the thread before it has told. The session
     // and the thread then end there: the former's asset lives on that queue.
     auto thread = std::make_shared<std::jthread>();
     base::MainQueue& main = m_engine->system.mainQueue;
     auto started = std::make_shared<std::atomic<bool>>(false);
-    *thread = std::jthread([self = std::move(self), work = std::move(work), thread, started, &main]() mutable {
+    *thread = std::jthread([self = std::move(self), work = std::move(work), thread, started, &main,
+                            underWay = std::move(underWay)]() mutable {
         started->wait(false); // until `thread` is what it refers to
         {
             auto now = std::move(work);
             now();
         }
+        self->m_underWay = nullptr;
         main.post([self = std::move(self), thread = std::move(thread)] {});
     });
     *started = true;
@@ -80,9 +86,12 @@ base::Result<void> FFmpegExportSession::work(const std::shared_ptr<const Movie>&
     job.mix = m_mix;
     job.cancelled = m_cancelled;
     // A second attempt, after copying failed, begins anew; what was told does not go back.
-    job.progress = [told = m_progress](double part) {
-        if (part > *told)
-            *told = part;
+    job.progress = [told = m_progress, underWay = m_underWay](double part) {
+        if (part <= *told)
+            return;
+        *told = part;
+        if (underWay)
+            underWay->setProgress(part);
     };
     job.log = &m_engine->system.log;
     return job.run();

@@ -44,6 +44,8 @@ private:
     std::optional<base::MediaTimeRange> m_range;
     std::optional<platform::AudioMix> m_mix;
 
+    std::shared_ptr<base::Work> m_underWay; ///< the main queue's, then the export's thread's
+
     // Any thread.
     std::shared_ptr<std::atomic<bool>> m_cancelled = std::make_shared<std::atomic<bool>>(false);
     std::shared_ptr<std::atomic<double>> m_progress = std::make_shared<std::atomic<double>>(0);
