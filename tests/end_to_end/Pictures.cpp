@@ -44,8 +44,9 @@ TEST_P(Picture, LooksAsItDid)
 }
 
 INSTANTIATE_TEST_SUITE_P(EndToEnd, Picture,
-                         testing::Values("phone", "phone-landscape", "phone-without-home-button", "phone-dark", "pad",
-                                         "pad-without-home-button", "pad-flat", "pad-dark"),
+                         testing::Values("phone", "phone-landscape", "phone-without-home-button", "phone-dark",
+                                         "phone-trim", "phone-dark-trim", "pad", "pad-without-home-button", "pad-flat",
+                                         "pad-dark", "pad-trim"),
                          [](const auto& picture) { return testName(picture.param); });
 
 TEST(TurningAPhone, ToItsSideAndBackShowsWhatWasThere)
@@ -58,12 +59,14 @@ TEST(TurningAPhone, ToItsSideAndBackShowsWhatWasThere)
             wait picture
             wait ready
             size 390 760
+            wait thumbnails
             picture before.png
             print {layout}
             size 760 390
             picture on-its-side.png
             print {layout}
             size 390 760
+            wait thumbnails
             picture after.png
             print {layout}
             tap Cancel)");

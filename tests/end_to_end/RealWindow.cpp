@@ -26,7 +26,7 @@ constexpr int kLong = 760;
 constexpr double kTopBar = 60;
 constexpr double kBottomBar = 44;
 constexpr double kStrip = 38;
-constexpr double kStripInset = 10;
+constexpr double kStripInset = 10 + 16; // to the pictures, behind a grip
 constexpr double kBarMiddle = kLong - kBottomBar / 2;
 constexpr double kStripMiddle = kLong - kBottomBar - kStrip / 2;
 

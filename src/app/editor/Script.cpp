@@ -10,6 +10,7 @@
 #include <QQuickWindow>
 
 #include <algorithm>
+#include <cctype>
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
@@ -37,6 +38,15 @@ std::shared_ptr<platform::View> viewNamed(const std::shared_ptr<platform::View>&
         if (auto found = viewNamed(*it, name))
             return found;
     return view->accessibility().name == name ? view : nullptr;
+}
+
+/// Words from `first` up to `end`, with spaces between them.
+std::string joined(const std::vector<std::string>& words, std::size_t first, std::size_t end)
+{
+    std::string line;
+    for (std::size_t i = first; i < end; ++i)
+        line += (i > first ? " " : "") + words[i];
+    return line;
 }
 
 std::string seconds(double value)
@@ -195,36 +205,49 @@ bool Script::waitForFrame(const Words& words) const
     return since >= 0 && since < kLongestFrame;
 }
 
+std::optional<base::Point> Script::middleOf(const std::string& name) const
+{
+    const auto view = viewNamed(m_program.window().rootViewController()->view(), name);
+    if (!view)
+        return std::nullopt;
+    return view->convertToRoot({view->bounds().width() / 2, view->bounds().height() / 2});
+}
+
 bool Script::tap(const Words& words)
 {
     m_program.presenter().commit(); // nobody touches what has not been on the screen
-    base::Point at;
-    if (words.size() == 3) {
-        at = {number(words[1]), number(words[2])};
-    } else {
-        const auto view = viewNamed(m_program.window().rootViewController()->view(), words.at(1));
-        if (!view)
-            return false;
-        at = view->convertToRoot({view->bounds().width() / 2, view->bounds().height() / 2});
-    }
+    const bool isPlace = words.size() == 3 && std::isdigit(static_cast<unsigned char>(words[1].front())) != 0;
+    const auto at =
+        isPlace ? base::Point{number(words[1]), number(words[2])} : middleOf(joined(words, 1, words.size()));
+    if (!at)
+        return false;
     SyntheticInput input(m_program.presenter().quickWindow());
-    input.press(at);
-    input.release(at);
+    input.press(*at);
+    input.release(*at);
     return true;
 }
 
 bool Script::drag(const Words& words)
 {
     constexpr int kSteps = 20;
-    if (words.size() != 5)
+    m_program.presenter().commit();
+    std::optional<base::Point> from;
+    base::Point to;
+    if (words.size() == 5) {
+        from = {number(words[1]), number(words[2])};
+        to = {number(words[3]), number(words[4])};
+    } else if (words.size() > 2) {
+        from = middleOf(joined(words, 1, words.size() - 1));
+        if (from)
+            to = {from->x + number(words.back()), from->y};
+    }
+    if (!from)
         return false;
-    const base::Point from{number(words[1]), number(words[2])};
-    const base::Point to{number(words[3]), number(words[4])};
     SyntheticInput input(m_program.presenter().quickWindow());
-    input.press(from);
+    input.press(*from);
     for (int i = 1; i <= kSteps; ++i) {
         const double part = double(i) / kSteps;
-        input.move({from.x + (to.x - from.x) * part, from.y + (to.y - from.y) * part});
+        input.move({from->x + (to.x - from->x) * part, from->y + (to.y - from->y) * part});
     }
     m_finger = to;
     return words.front() == "hold" || lift();
@@ -274,10 +297,7 @@ bool Script::transitions(const Words& words)
 
 void Script::print(const Words& words, std::size_t first) const
 {
-    std::string line;
-    for (std::size_t i = first; i < words.size(); ++i)
-        line += (i > first ? " " : "") + words[i];
-    report(filledIn(std::move(line)));
+    report(filledIn(joined(words, first, words.size())));
 }
 
 std::string Script::filledIn(std::string line) const

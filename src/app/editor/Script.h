@@ -9,7 +9,8 @@
 ///   wait frame [SECONDS]   until the picture of the present time is on the screen, or that of SECONDS or a later one
 ///   tap NAME  |  tap X Y   touch a control by its accessible name, or a place in points
 ///   drag X1 Y1 X2 Y2       touch, move in small steps, lift
-///   hold X1 Y1 X2 Y2       the same without lifting; `lift` does that
+///   drag NAME DX           the same from a control's middle, DX points to the right
+///   hold …                 the same without lifting; `lift` does that
 ///   key NAME               space, escape, return, left, right, home, end, tab, comma, period, undo, i, o
 ///   scheme light|dark
 ///   pause MILLISECONDS     let time pass
@@ -53,6 +54,7 @@ private:
     bool carryOut(const Words& words);
     bool waitFor(const std::string& what);
     bool waitForFrame(const Words& words) const;
+    std::optional<base::Point> middleOf(const std::string& name) const;
     bool tap(const Words& words);
     bool drag(const Words& words);
     bool lift();

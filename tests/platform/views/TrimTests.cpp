@@ -95,6 +95,17 @@ TEST_F(Trims, TheGripMovesFromWhereItIsNotToTheFinger)
     EXPECT_DOUBLE_EQ(scrubber->editingStartValue(), 1);
 }
 
+TEST_F(Trims, AFingerThatLiftsLeavesTheHandleWhereItWasPlaced)
+{
+    down(18);
+    move(118);
+    up(120);
+    EXPECT_EQ(scrubber->editingStartValue(), 10) << "fingers roll as they lift";
+    down(334);
+    up(284);
+    EXPECT_EQ(scrubber->editingEndValue(), 25) << "but a quick one may say nothing on the way";
+}
+
 TEST_F(Trims, AGripIsAsWideAsAThumb)
 {
     for (const double x : {1.0, 18.0, 39.0}) {
