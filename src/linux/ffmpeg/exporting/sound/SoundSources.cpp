@@ -110,6 +110,10 @@ std::unique_ptr<SampleSource> Opening::samplesOf(std::unique_ptr<TrackPackets> p
                                       [self = *this, track](const std::string& what) { self.tell(track, what); });
     if (!samples)
         tell(track, "is left out: it cannot be decoded");
+    else if (samples->isEmpty() && !isSet(m_cancelled)) {
+        tell(track, "is left out: there is no sound of it in the range");
+        return nullptr;
+    }
     return samples;
 }
 

@@ -121,8 +121,9 @@ bool TrackSamples::prepare(const AVFrame& frame)
     else
         av_channel_layout_copy(&from, &frame.ch_layout);
     // One channel is doubled by us: the library would make it quieter.
+    const bool isDoubled = channels == 1 && m_channels == 2;
     AVChannelLayout to{};
-    av_channel_layout_default(&to, channels == 1 ? 1 : m_channels);
+    av_channel_layout_default(&to, isDoubled ? 1 : m_channels);
     SwrContext* made = nullptr;
     const int result = swr_alloc_set_opts2(&made, &to, AV_SAMPLE_FMT_FLTP, m_rate, &from,
                                            static_cast<AVSampleFormat>(frame.format), frame.sample_rate, 0, nullptr);
@@ -137,6 +138,7 @@ bool TrackSamples::prepare(const AVFrame& frame)
     m_fromRate = frame.sample_rate;
     m_fromFormat = frame.format;
     m_fromChannels = channels;
+    m_given = isDoubled ? 1 : static_cast<std::size_t>(m_channels);
     m_resampled = INT64_MIN;
     return true;
 }
@@ -161,8 +163,7 @@ void TrackSamples::convert(const AVFrame& frame)
     const int most = swr_get_out_samples(m_resampler.get(), count);
     if (most < 0)
         return;
-    const std::size_t channels = m_fromChannels == 1 ? 1 : static_cast<std::size_t>(m_channels);
-    Planes samples(channels, std::vector<float>(static_cast<std::size_t>(most)));
+    Planes samples(m_given, std::vector<float>(static_cast<std::size_t>(most)));
     std::vector<std::uint8_t*> planes;
     for (auto& plane : samples)
         planes.push_back(reinterpret_cast<std::uint8_t*>(plane.data()));
@@ -181,8 +182,7 @@ void TrackSamples::drainResampler()
         return;
     const int most = swr_get_out_samples(m_resampler.get(), 0);
     if (most > 0 && swr_get_delay(m_resampler.get(), m_rate) > 0) {
-        const std::size_t channels = m_fromChannels == 1 ? 1 : static_cast<std::size_t>(m_channels);
-        Planes samples(channels, std::vector<float>(static_cast<std::size_t>(most)));
+        Planes samples(m_given, std::vector<float>(static_cast<std::size_t>(most)));
         std::vector<std::uint8_t*> planes;
         for (auto& plane : samples)
             planes.push_back(reinterpret_cast<std::uint8_t*>(plane.data()));
@@ -213,6 +213,11 @@ void TrackSamples::append(std::int64_t at, Planes samples)
         samples.resize(static_cast<std::size_t>(m_channels), samples.front());
     m_end = until;
     m_blocks.push_back({from, std::move(samples)});
+}
+
+bool TrackSamples::isEmpty()
+{
+    return decodeUntil(m_next + 1) == 0 && end() <= m_next;
 }
 
 int TrackSamples::read(Planes& into, int count)

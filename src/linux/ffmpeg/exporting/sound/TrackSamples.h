@@ -20,6 +20,9 @@ public:
     static std::unique_ptr<TrackSamples> open(std::unique_ptr<TrackPackets> packets, const ExportRange& range, int rate,
                                               int channels, std::function<void(const std::string&)> tell);
 
+    /// Whether there is no sound in the range; looks for the first.
+    bool isEmpty();
+
     int rate() const override { return m_rate; }
     int channels() const override { return m_channels; }
     int read(Planes& into, int count) override;
@@ -60,6 +63,7 @@ private:
 
     Owned<SwrContext> m_resampler;
     int m_fromRate = 0, m_fromFormat = -1, m_fromChannels = 0;
+    std::size_t m_given = 0;      ///< channels that the resampler gives
     std::int64_t m_resampled = 0; ///< where what the resampler gives next belongs
     std::deque<Block> m_blocks;
     std::int64_t m_end; ///< behind all that was decoded
