@@ -28,6 +28,11 @@ int run(const host::SaveCommand& command)
     return host::saveMovie(command);
 }
 
+int run(const host::SaveCommand& command)
+{
+    return host::saveMovie(command);
+}
+
 } // namespace
 
 int main(int argc, char* argv[])

@@ -29,7 +29,12 @@ struct SaveCommand {
     std::string appName; ///< empty: the movie's file name without its extension
 };
 
-using MediaCommand = std::variant<ThumbnailsCommand, ProbeCommand, SaveCommand>;
+struct SaveCommand {
+    std::string movie;
+    std::string appName; ///< empty: the movie's file name without its extension
+};
+
+using MediaCommand = std::variant<ThumbnailsCommand, ProbeCommand, SaveCommand, SaveCommand>;
 
 /// Whether `name` is one of these commands.
 bool isMediaCommand(const std::string& name);

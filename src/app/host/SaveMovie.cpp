@@ -1,0 +1,173 @@
+#include "app/host/SaveMovie.h"
+
+#include "app/host/EditorDirectory.h"
+#include "app/host/MediaTool.h"
+#include "app/host/OpenMovie.h"
+#include "app/host/ProgressBar.h"
+#include "linux/photos/VideoLibrary.h"
+#include "linux/xdg/FileManager.h"
+
+#include <atomic>
+#include <cerrno>
+#include <cstdio>
+#include <filesystem>
+#include <future>
+#include <optional>
+#include <utility>
+
+namespace host {
+
+namespace {
+
+namespace fs = std::filesystem;
+using platform::ExportSession;
+
+/// How much of the time that a save takes goes into the mix; what is left is copying.
+constexpr double kMixPart = 0.9;
+
+base::ErrorRef interrupted()
+{
+    return base::Error::fromErrno(ECANCELED, "cannot save the movie");
+}
+
+/// Writes the movie with all sound tracks as one. Null, or why not; ECANCELED when a signal came.
+base::ErrorRef mix(MediaTool& tool, const std::shared_ptr<platform::Asset>& asset, const std::string& output,
+                   ProgressBar& progress)
+{
+    platform::AudioMix mix;
+    for (const platform::AssetTrack& track : asset->tracksWithMediaType(platform::MediaType::Audio))
+        mix.inputs.push_back({track.trackID});
+    const auto session = tool.media().exportSessionWithAsset(asset, platform::ExportPreset::HighestQuality);
+    session->setOutputURL(base::Url::fromPath(output));
+    session->setOutputFileType(platform::FileType::Mpeg4);
+    session->setAudioMix(std::move(mix));
+
+    bool hasEnded = false;
+    const auto ended = std::make_shared<std::promise<void>>();
+    const auto end = ended->get_future();
+    base::MainQueue& main = tool.system().mainQueue;
+    session->exportAsynchronously([&main, &hasEnded, ended] {
+        main.post([&hasEnded] { hasEnded = true; });
+        ended->set_value();
+    });
+    if (!tool.runUntil([&] { return hasEnded; }, [&] { progress.show(kMixPart * session->progress()); })) {
+        session->cancelExport();
+        end.wait(); // its file must be gone before its directory
+        return interrupted();
+    }
+    return session->status() == ExportSession::Status::Completed ? nullptr : session->error();
+}
+
+/// The first picture, for the file managers; nothing where there is none. It must not keep a save from ending.
+std::optional<platform::Bitmap> firstPicture(MediaTool& tool, const std::shared_ptr<platform::Asset>& asset, int side)
+{
+    if (asset->tracksWithMediaType(platform::MediaType::Video).empty())
+        return std::nullopt;
+    platform::ImageRef picture;
+    bool came = false;
+    base::MainQueue& main = tool.system().mainQueue;
+    const auto generator = tool.media().imageGeneratorWithAsset(asset);
+    generator->setMaximumSize({static_cast<double>(side), static_cast<double>(side)});
+    generator->generateImagesAsynchronouslyForTimes(
+        {base::MediaTime::zero()}, [&](base::MediaTime, const platform::ImageRef& image, base::MediaTime, auto, auto&) {
+            main.post([&, image] {
+                picture = image;
+                came = true;
+            });
+        });
+    tool.runUntil([&] { return came; });
+    return picture ? std::optional(picture->bitmap()) : std::nullopt;
+}
+
+photos::Recording recordingOf(MediaTool& tool, const SaveCommand& command)
+{
+    photos::Recording recording;
+    recording.appName = command.appName.empty() ? fs::path(command.movie).stem().native() : command.appName;
+    xdg::FileManager files(tool.system(), {});
+    if (const auto attributes = files.attributesOfItem(command.movie))
+        recording.date = attributes.value().creationDate;
+    return recording;
+}
+
+/// Puts the file at `path` into the library; gives the new one's path.
+base::Result<std::string> publish(MediaTool& tool, const std::string& path, photos::LibraryOptions options,
+                                  ProgressBar& progress)
+{
+    std::atomic<bool> goOn{true};
+    std::string published;
+    base::ErrorRef failure;
+    std::promise<void> ended;
+    auto end = ended.get_future();
+    options.published = [&](const std::string& file) { published = file; };
+    options.goOn = [&] { return goOn.load(); };
+
+    base::WorkList works;
+    photos::VideoLibrary library(std::move(options), tool.system().log, works);
+    base::MainQueue& main = tool.system().mainQueue;
+    bool hasEnded = false;
+    library.performChanges(
+        [&](platform::PhotoLibraryChange& change) { change.createAssetFromVideoAtFileURL(base::Url::fromPath(path)); },
+        [&](bool /*the error says it*/, const base::ErrorRef& error) {
+            failure = error;
+            main.post([&hasEnded] { hasEnded = true; });
+            ended.set_value();
+        });
+    const auto showPart = [&] { progress.show(kMixPart + (1 - kMixPart) * works.progress().value_or(0)); };
+    // A signal that comes too late changes nothing: the movie is saved, and that is told.
+    if (!tool.runUntil([&] { return hasEnded; }, showPart))
+        goOn = false;
+    end.wait();
+    if (failure)
+        return failure;
+    return published;
+}
+
+base::Result<std::string> save(MediaTool& tool, const SaveCommand& command, ProgressBar& progress)
+{
+    const auto asset = tool.open(command.movie);
+    if (!asset)
+        return asset.error();
+    const auto root = editorDirectoriesRoot();
+    if (!root)
+        return root.error();
+    sweepEditorDirectories(root.value());
+    const auto directory = EditorDirectory::make(root.value());
+    if (!directory)
+        return directory.error();
+
+    std::string movie = directory.value().path() + "/mixed.mp4";
+    if (const base::ErrorRef error = mix(tool, asset.value(), movie, progress)) {
+        if (tool.interruption() != 0)
+            return error;
+        progress.clear();
+        std::fprintf(stderr, "clipsa: the sound of %s cannot be mixed (%s); it is saved as it is\n",
+                     command.movie.c_str(), error->description().c_str());
+        movie = fs::absolute(command.movie).native();
+    }
+
+    photos::LibraryOptions options;
+    options.directories = photos::UserDirectories::ofUser();
+    const photos::Recording recording = recordingOf(tool, command);
+    options.recording = [&recording](const std::string&) { return recording; };
+    const auto picture = firstPicture(tool, asset.value(), photos::kThumbnailSide);
+    options.thumbnail = [&picture](const std::string&, int) { return picture; };
+    if (tool.interruption() != 0)
+        return interrupted();
+    return publish(tool, movie, std::move(options), progress);
+}
+
+} // namespace
+
+int saveMovie(const SaveCommand& command)
+{
+    MediaTool tool;
+    ProgressBar progress("Saving");
+    const auto saved = save(tool, command, progress);
+    progress.clear();
+    if (!saved)
+        return tool.fail(saved.error());
+    std::printf("%s\n", saved.value().c_str());
+    return kExitDone;
+}
+
+} // namespace host

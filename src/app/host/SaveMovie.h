@@ -1,0 +1,12 @@
+/// `clipsa save`: mixes the sound of a movie and puts it into the user's library of videos, as the editor's Save does.
+#pragma once
+
+#include "app/host/MediaCommandLine.h"
+
+namespace host {
+
+/// Gives the exit status, and prints the path of the new file. Where the sound cannot be mixed the movie is saved as it
+/// is, which one line says. The movie itself is never touched; what is made on the way goes, also when a signal comes.
+int saveMovie(const SaveCommand& command);
+
+} // namespace host
