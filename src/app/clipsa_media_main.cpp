@@ -28,11 +28,6 @@ int run(const host::SaveCommand& command)
     return host::saveMovie(command);
 }
 
-int run(const host::SaveCommand& command)
-{
-    return host::saveMovie(command);
-}
-
 } // namespace
 
 int main(int argc, char* argv[])

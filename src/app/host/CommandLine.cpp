@@ -18,8 +18,6 @@ const char* const kHelpText = R"(Clipsa looks at, trims, saves and shares a scre
   clipsa probe MOVIE [--json]   say what MOVIE is made of
   clipsa save MOVIE [--app-name NAME]
                                 mix the sound of MOVIE and put it into the library of videos
-  clipsa save MOVIE [--app-name NAME]
-                                mix the sound of MOVIE and put it into the library of videos
   clipsa --help, --version
 
 Options of open, and of tour:

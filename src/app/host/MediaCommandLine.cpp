@@ -36,15 +36,6 @@ base::Result<void> takeText(std::string& text, Words& words)
     return {};
 }
 
-base::Result<void> takeText(std::string& text, Words& words)
-{
-    const auto value = words.value();
-    if (!value)
-        return value.error();
-    text = value.value();
-    return {};
-}
-
 /// "320x180".
 std::optional<base::Size> sizeIn(const std::string& text)
 {
@@ -146,34 +137,12 @@ base::Result<std::optional<MediaCommand>> parseSave(Words words)
     return std::optional<MediaCommand>(std::move(command));
 }
 
-base::Result<std::optional<MediaCommand>> parseSave(Words words)
-{
-    SaveCommand command;
-    while (words.advance()) {
-        if (words.isHelp())
-            return std::optional<MediaCommand>();
-        base::Result<void> taken;
-        if (!words.isOption())
-            taken = takeMovie(command.movie, words.word());
-        else if (words.word() == "--app-name")
-            taken = takeText(command.appName, words);
-        else
-            taken = usageError("save has no option " + words.word());
-        if (!taken)
-            return taken.error();
-    }
-    if (command.movie.empty())
-        return usageError("save needs a movie");
-    return std::optional<MediaCommand>(std::move(command));
-}
-
 struct Parser {
     const char* name;
     base::Result<std::optional<MediaCommand>> (*parse)(Words words);
 };
 
-constexpr Parser kParsers[] = {
-    {"thumbnails", parseThumbnails}, {"probe", parseProbe}, {"save", parseSave}, {"save", parseSave}};
+constexpr Parser kParsers[] = {{"thumbnails", parseThumbnails}, {"probe", parseProbe}, {"save", parseSave}};
 
 const Parser* parserOf(const std::string& name)
 {

@@ -29,12 +29,7 @@ struct SaveCommand {
     std::string appName; ///< empty: the movie's file name without its extension
 };
 
-struct SaveCommand {
-    std::string movie;
-    std::string appName; ///< empty: the movie's file name without its extension
-};
-
-using MediaCommand = std::variant<ThumbnailsCommand, ProbeCommand, SaveCommand, SaveCommand>;
+using MediaCommand = std::variant<ThumbnailsCommand, ProbeCommand, SaveCommand>;
 
 /// Whether `name` is one of these commands.
 bool isMediaCommand(const std::string& name);
