@@ -5,6 +5,7 @@
 #include "app/host/OpenMovie.h"
 #include "app/host/ProbeMovie.h"
 #include "app/host/SaveMovie.h"
+#include "app/host/TrimMovie.h"
 
 #include <cstdio>
 #include <string>
@@ -12,6 +13,11 @@
 #include <vector>
 
 namespace {
+
+int run(const host::TrimCommand& command)
+{
+    return host::trimMovie(command);
+}
 
 int run(const host::ThumbnailsCommand& command)
 {

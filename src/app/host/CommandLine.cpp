@@ -13,6 +13,8 @@ const char* const kHelpText = R"(Clipsa looks at, trims, saves and shares a scre
   clipsa service                serve recorders on the session bus, as org.clipsa.Clipsa
   clipsa tour MOVIE --output DIR [OPTION…]
                                 open MOVIE without a screen, and leave a picture of each step in DIR
+  clipsa trim MOVIE [--from T] [--to T] -o OUT [--force]
+                                leave what MOVIE shows from one time up to another in OUT
   clipsa thumbnails MOVIE -n N -o DIR [--size WxH] [--force]
                                 leave N pictures of MOVIE, evenly spaced, in DIR
   clipsa probe MOVIE [--json]   say what MOVIE is made of

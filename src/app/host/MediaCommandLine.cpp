@@ -1,5 +1,7 @@
 #include "app/host/MediaCommandLine.h"
 
+#include <algorithm>
+#include <cstdint>
 #include <utility>
 
 namespace host {
@@ -95,6 +97,44 @@ base::Result<std::optional<MediaCommand>> parseThumbnails(Words words)
     return std::optional<MediaCommand>(std::move(command));
 }
 
+base::Result<void> takeTrimOption(TrimCommand& command, Words& words)
+{
+    const std::string option = words.word();
+    if (option == "--force")
+        return takeFlag(command.force, words);
+    if (option == "-o" || option == "--output")
+        return takeText(command.output, words);
+    if (option != "--from" && option != "--to")
+        return usageError("trim has no option " + option);
+    const auto value = words.value();
+    if (!value)
+        return value.error();
+    const auto moment = momentIn(value.value());
+    if (!moment)
+        return usageError(option + " is a time like 12.5, 1:30 or 01:02:03.25, not \"" + value.value() + "\"");
+    (option == "--from" ? command.from : command.to.emplace()) = *moment;
+    return {};
+}
+
+base::Result<std::optional<MediaCommand>> parseTrim(Words words)
+{
+    TrimCommand command;
+    while (words.advance()) {
+        if (words.isHelp())
+            return std::optional<MediaCommand>();
+        const auto taken = words.isOption() ? takeTrimOption(command, words) : takeMovie(command.movie, words.word());
+        if (!taken)
+            return taken.error();
+    }
+    if (command.movie.empty())
+        return usageError("trim needs a movie");
+    if (command.output.empty())
+        return usageError("trim needs -o OUT, for the new movie");
+    if (command.to && !(*command.to > command.from))
+        return usageError("--to must be behind --from");
+    return std::optional<MediaCommand>(std::move(command));
+}
+
 base::Result<std::optional<MediaCommand>> parseProbe(Words words)
 {
     ProbeCommand command;
@@ -142,7 +182,8 @@ struct Parser {
     base::Result<std::optional<MediaCommand>> (*parse)(Words words);
 };
 
-constexpr Parser kParsers[] = {{"thumbnails", parseThumbnails}, {"probe", parseProbe}, {"save", parseSave}};
+constexpr Parser kParsers[] = {
+    {"trim", parseTrim}, {"thumbnails", parseThumbnails}, {"probe", parseProbe}, {"save", parseSave}};
 
 const Parser* parserOf(const std::string& name)
 {
@@ -153,6 +194,38 @@ const Parser* parserOf(const std::string& name)
 }
 
 } // namespace
+
+std::optional<base::MediaTime> momentIn(const std::string& text)
+{
+    constexpr std::size_t kMostParts = 3;
+    constexpr std::int32_t kTicks = 1'000'000;
+    const std::size_t point = text.find('.');
+    std::string fraction = point == std::string::npos ? "0" : text.substr(point + 1);
+    fraction.resize(std::min<std::size_t>(fraction.size(), 6)); // finer than any movie's clock
+    const auto ticks = wholeNumber(fraction);
+    if (!ticks || *ticks < 0)
+        return std::nullopt;
+    std::int64_t value = *ticks;
+    for (std::size_t digits = fraction.size(); digits < 6; ++digits)
+        value *= 10;
+
+    std::string whole = text.substr(0, point);
+    std::int64_t unit = kTicks;
+    for (std::size_t part = 1;; ++part) {
+        const std::size_t colon = whole.rfind(':');
+        const std::string last = colon == std::string::npos ? whole : whole.substr(colon + 1);
+        const auto number = wholeNumber(last);
+        if (!number || *number < 0 || (colon != std::string::npos && *number >= 60))
+            return std::nullopt;
+        value += *number * unit;
+        if (colon == std::string::npos)
+            return base::MediaTime::make(value, kTicks);
+        if (part == kMostParts)
+            return std::nullopt;
+        whole.resize(colon);
+        unit *= 60;
+    }
+}
 
 bool isMediaCommand(const std::string& name)
 {

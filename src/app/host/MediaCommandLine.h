@@ -3,6 +3,7 @@
 
 #include "app/host/Words.h"
 #include "base/Geometry.h"
+#include "base/MediaTime.h"
 
 #include <optional>
 #include <string>
@@ -24,12 +25,23 @@ struct ProbeCommand {
     bool json = false;
 };
 
+struct TrimCommand {
+    std::string movie;
+    base::MediaTime from = base::MediaTime::zero();
+    std::optional<base::MediaTime> to; ///< behind `from`; the movie's end when it is not given
+    std::string output;
+    bool force = false; ///< replaces a file that is there
+};
+
 struct SaveCommand {
     std::string movie;
     std::string appName; ///< empty: the movie's file name without its extension
 };
 
-using MediaCommand = std::variant<ThumbnailsCommand, ProbeCommand, SaveCommand>;
+using MediaCommand = std::variant<TrimCommand, ThumbnailsCommand, ProbeCommand, SaveCommand>;
+
+/// "12.5", "1:30" or "01:02:03.25", exact to the microsecond. Nothing when it is no time.
+std::optional<base::MediaTime> momentIn(const std::string& text);
 
 /// Whether `name` is one of these commands.
 bool isMediaCommand(const std::string& name);

@@ -326,8 +326,8 @@ TEST_F(AnExport, MayTakeTheNameOfItsSourceWhenThatIsRemoved)
                           {},
                           &log};
     // As late as it can come before the name is given.
-    job.progress = [&](double part) {
-        if (part >= 1)
+    job.progress = [&, isAsked = false](double part) mutable {
+        if (part >= 1 && !std::exchange(isAsked, true))
             remover.post([&] { std::filesystem::remove(source); });
     };
     const auto result = job.run();
