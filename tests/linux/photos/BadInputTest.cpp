@@ -239,6 +239,34 @@ std::string wayName(const testing::TestParamInfo<std::tuple<bool, int>>& way)
 
 INSTANTIATE_TEST_SUITE_P(Ways, AFullDisk, testing::Combine(testing::Bool(), testing::Range(0, 3)), &wayName);
 
+TEST_F(TheVideoLibraryRefuses, BothMoviesWhenOnlyOneCanGetItsName)
+{
+    auto with = options();
+    int steps = 0;
+    with.goOn = [&] {
+        // The second one's file goes before it is named, as on a disk that fails.
+        if (++steps == 2)
+            for (const std::string& file : namesIn(videos))
+                if (!PrivateDirectory::read(videos / file).starts_with(bytes.substr(0, 9)))
+                    fs::remove(videos / file);
+        return true;
+    };
+    const fs::path other = home.write("other.mp4", "another movie");
+    tests::Outcome outcome;
+    tests::whileRefusing({tests::noUnnamedFiles(), tests::noReflinks()}, [&] {
+        photos::VideoLibrary(with, log, works)
+            .performChanges(
+                [&](platform::PhotoLibraryChange& change) {
+                    change.createAssetFromVideoAtFileURL(base::Url::fromPath(source));
+                    change.createAssetFromVideoAtFileURL(base::Url::fromPath(other));
+                },
+                [&](bool success, const base::ErrorRef& error) {
+                    outcome = {1, success, error};
+                });
+    });
+    expectFailure(outcome, ENOENT);
+}
+
 TEST_F(TheVideoLibraryRefuses, OneOfTwoMoviesByTakingNeither)
 {
     tests::Outcome outcome;

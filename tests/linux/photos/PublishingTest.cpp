@@ -182,14 +182,20 @@ TEST_F(TheVideoLibrary, CanBeToldToGiveUpWhileItCopies)
                          [&] { expectFailure(save(base::Url::fromPath(source), with), ECANCELED); });
 }
 
-/// File systems that can do less than the one that the tests run on.
-class TheVideoLibraryOn : public tests::LibraryFixture,
-                          public testing::WithParamInterface<std::pair<const char*, std::vector<RefusedSystemCall>>> {};
+/// One that can do less than the one that the tests run on.
+struct FileSystem {
+    std::string name;
+    std::vector<RefusedSystemCall> refused;
+
+    friend void PrintTo(const FileSystem& system, std::ostream* stream) { *stream << system.name; }
+};
+
+class TheVideoLibraryOn : public tests::LibraryFixture, public testing::WithParamInterface<FileSystem> {};
 
 TEST_P(TheVideoLibraryOn, HoldsTheWholeMovieAndNothingElse)
 {
     recording.date = base::Date{1'500'000'000};
-    tests::whileRefusing(GetParam().second, [&] {
+    tests::whileRefusing(GetParam().refused, [&] {
         const auto outcome = save();
         EXPECT_TRUE(outcome.success) << outcome.text();
     });
@@ -203,7 +209,7 @@ TEST_P(TheVideoLibraryOn, HoldsTheWholeMovieAndNothingElse)
 TEST_P(TheVideoLibraryOn, NeverReplacesAFile)
 {
     home.write("Videos/" + name, "mine");
-    tests::whileRefusing(GetParam().second, [&] { EXPECT_TRUE(save().success); });
+    tests::whileRefusing(GetParam().refused, [&] { EXPECT_TRUE(save().success); });
     EXPECT_THAT(namesIn(videos), ElementsAre("Tux Racer 2026-11-21 15-04-05 (2).mp4", name));
     EXPECT_EQ(PrivateDirectory::read(videos / name), "mine");
 }
@@ -215,18 +221,16 @@ const RefusedSystemCall kNoLinks{SYS_linkat, EPERM};
 
 INSTANTIATE_TEST_SUITE_P(
     FileSystems, TheVideoLibraryOn,
-    testing::Values(std::pair("WithoutReflinks", std::vector{tests::noReflinks()}),
-                    std::pair("WithoutCopiesInTheKernel", std::vector{tests::noReflinks(), kNoCopies}),
-                    std::pair("WithoutAnyWayToCopy", std::vector{tests::noReflinks(), kNoCopies, kNoSendfile}),
-                    std::pair("WithoutUnnamedFiles", std::vector{tests::noUnnamedFiles()}),
-                    std::pair("WithoutUnnamedFilesOnAnOldKernel", std::vector{tests::noUnnamedFiles(EISDIR)}),
-                    std::pair("WithoutFlags", std::vector{tests::noUnnamedFiles(), kNoFlags}),
-                    std::pair("WithoutFlagsAndLinks", std::vector{tests::noUnnamedFiles(), kNoFlags, kNoLinks}),
-                    std::pair("WithoutLinks", std::vector{kNoLinks}),
-                    std::pair("WithoutFlushing", std::vector{RefusedSystemCall{SYS_fsync, EINVAL}}),
-                    std::pair("WithoutLocks",
-                              std::vector{tests::noUnnamedFiles(), RefusedSystemCall{SYS_flock, EOPNOTSUPP}})),
-    [](const auto& kind) { return std::string(kind.param.first); });
+    testing::Values(FileSystem{"WithoutReflinks", {tests::noReflinks()}},
+                    FileSystem{"WithoutCopiesInTheKernel", {tests::noReflinks(), kNoCopies}},
+                    FileSystem{"WithoutAnyWayToCopy", {tests::noReflinks(), kNoCopies, kNoSendfile}},
+                    FileSystem{"WithoutUnnamedFiles", {tests::noUnnamedFiles()}},
+                    FileSystem{"WithoutUnnamedFilesOnAnOldKernel", {tests::noUnnamedFiles(EISDIR)}},
+                    FileSystem{"WithoutFlags", {tests::noUnnamedFiles(), kNoFlags}},
+                    FileSystem{"WithoutFlagsAndLinks", {tests::noUnnamedFiles(), kNoFlags, kNoLinks}},
+                    FileSystem{"WithoutLinks", {kNoLinks}}, FileSystem{"WithoutFlushing", {{SYS_fsync, EINVAL}}},
+                    FileSystem{"WithoutLocks", {tests::noUnnamedFiles(), {SYS_flock, EOPNOTSUPP}}}),
+    [](const auto& kind) { return kind.param.name; });
 
 TEST_F(TheVideoLibrary, SweepsWhatWasLeftByOnesThatWereKilled)
 {

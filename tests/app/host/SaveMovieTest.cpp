@@ -1,0 +1,222 @@
+// `clipsa save`, as a program, on the test movies.
+#include "app/host/MediaCommandLine.h"
+#include "support/Program.h"
+#include "support/WithoutPrivileges.h"
+
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <chrono>
+#include <ctime>
+#include <filesystem>
+#include <fstream>
+#include <poll.h>
+#include <sys/inotify.h>
+#include <sys/stat.h>
+
+namespace {
+
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::StartsWith;
+
+using Words = std::vector<std::string>;
+namespace fs = std::filesystem;
+
+TEST(TheSaveCommand, TakesAMovieAndTheNameOfItsApp)
+{
+    const auto parsed = [](const Words& words) {
+        return std::get<host::SaveCommand>(host::parseMediaCommand(words).value().value());
+    };
+    EXPECT_EQ(parsed({"save", "m.mp4"}).movie, "m.mp4");
+    EXPECT_EQ(parsed({"save", "m.mp4"}).appName, "");
+    EXPECT_EQ(parsed({"save", "--app-name", "Tux Racer", "m.mp4"}).appName, "Tux Racer");
+    const auto refusal = [](const Words& words) { return host::parseMediaCommand(words).error()->description(); };
+    EXPECT_THAT(refusal({"save"}), HasSubstr("save needs a movie"));
+    EXPECT_THAT(refusal({"save", "a", "b"}), HasSubstr("both a and b"));
+    EXPECT_THAT(refusal({"save", "a", "-o", "b"}), HasSubstr("save has no option -o"));
+}
+
+class SavingFromAShell : public ::testing::Test {
+protected:
+    tests::PrivateDirectory home;
+    const fs::path videos = home.path() / "Videos";
+    /// A recording of 21 November 2026, 15:04:05 UTC.
+    fs::path recording(const std::string& movie)
+    {
+        const fs::path copy = home.path() / ("race" + fs::path(movie).extension().native());
+        fs::copy_file(fs::path(CLIPSA_TEST_MOVIES) / movie, copy);
+        const timespec times[] = {{0, UTIME_OMIT}, {1'795'273'445, 0}};
+        ::utimensat(AT_FDCWD, copy.c_str(), times, 0);
+        bytes = tests::PrivateDirectory::read(copy);
+        return copy;
+    }
+
+    tests::Program::Variables variables() const
+    {
+        const std::string at = home.path();
+        return {{"HOME", at},
+                {"XDG_CACHE_HOME", at + "/.cache"},
+                {"XDG_DATA_HOME", at + "/.local/share"},
+                {"TZ", "UTC"},
+                {"XDG_CONFIG_HOME", at + "/.config"}};
+    }
+    int run(Words words)
+    {
+        words.insert(words.begin(), {std::string(CLIPSA_BIN) + "/clipsa", "save"});
+        tests::Program program(words, variables());
+        const int status = program.wait();
+        out = program.output();
+        errors = program.errors();
+        return status;
+    }
+    static Words namesIn(const fs::path& folder)
+    {
+        Words names;
+        if (fs::is_directory(folder))
+            for (const auto& each : fs::directory_iterator(folder))
+                names.push_back(each.path().filename());
+        std::sort(names.begin(), names.end());
+        return names;
+    }
+    /// What a program that knows movies says of them.
+    static std::string ffprobe(const fs::path& movie, const std::string& entries)
+    {
+        tests::Program program({"ffprobe", "-v", "error", "-show_entries", entries, "-of", "csv=p=0", movie}, {});
+        EXPECT_EQ(program.wait(), 0) << program.errors();
+        return program.output();
+    }
+    /// The error is one line; nothing is left on the way, and the recording is as it was.
+    void expectFailure(const fs::path& movie)
+    {
+        EXPECT_THAT(out, IsEmpty());
+        EXPECT_THAT(errors, StartsWith("clipsa: "));
+        EXPECT_EQ(std::count(errors.begin(), errors.end(), '\n'), 1) << errors;
+        EXPECT_THAT(namesIn(home.path() / ".cache/clipsa"), IsEmpty());
+        EXPECT_EQ(tests::PrivateDirectory::read(movie), bytes);
+    }
+
+    std::string bytes;
+    std::string out;
+    std::string errors;
+};
+
+TEST_F(SavingFromAShell, PutsTheMovieIntoTheLibraryAndSaysWhere)
+{
+    const fs::path movie = recording("clock.mp4");
+    ASSERT_EQ(run({movie}), 0) << errors;
+    EXPECT_THAT(errors, IsEmpty()) << "no bar where there is no terminal, and the sound could be mixed";
+    const fs::path saved = videos / "race 2026-11-21 15-04-05.mp4";
+    EXPECT_EQ(out, saved.native() + "\n");
+    EXPECT_THAT(namesIn(videos), ElementsAre(saved.filename()));
+    EXPECT_EQ(ffprobe(saved, "stream=codec_type"), "video\naudio\n");
+    EXPECT_THAT(ffprobe(saved, "format=duration"), StartsWith(ffprobe(movie, "format=duration").substr(0, 3)));
+    struct stat status = {};
+    ASSERT_EQ(::stat(saved.c_str(), &status), 0);
+    EXPECT_EQ(status.st_mtim.tv_sec, 1'795'273'445) << "the recording's date";
+    EXPECT_EQ(tests::PrivateDirectory::read(movie), bytes) << "the user's own file is left as it is";
+    EXPECT_THAT(namesIn(home.path() / ".cache/clipsa"), IsEmpty()) << "what was made on the way has gone";
+    EXPECT_EQ(namesIn(home.path() / ".cache/thumbnails/large").size(), 1U);
+    EXPECT_THAT(tests::PrivateDirectory::read(home.path() / ".local/share/recently-used.xbel"),
+                HasSubstr("race%202026-11-21%2015-04-05.mp4"));
+}
+
+TEST_F(SavingFromAShell, MakesOneTrackOfAllSound)
+{
+    const fs::path movie = home.path() / "two.mp4";
+    tests::Program remux({"ffmpeg", "-v", "error", "-i", std::string(CLIPSA_TEST_MOVIES) + "/clock.mp4", "-i",
+                          std::string(CLIPSA_TEST_MOVIES) + "/clock.mp4", "-map", "0:v", "-map", "0:a:0", "-map",
+                          "1:a:0", "-c", "copy", movie},
+                         {});
+    ASSERT_EQ(remux.wait(), 0) << remux.errors();
+    ASSERT_EQ(ffprobe(movie, "stream=codec_type"), "video\naudio\naudio\n");
+    ASSERT_EQ(run({"--app-name", "Tux: Racer", movie}), 0) << errors;
+    const Words names = namesIn(videos);
+    ASSERT_EQ(names.size(), 1U);
+    EXPECT_THAT(names.front(), StartsWith("Tux- Racer 20"));
+    EXPECT_EQ(ffprobe(videos / names.front(), "stream=codec_type"), "video\naudio\n");
+}
+
+TEST_F(SavingFromAShell, TakesAMovieWithoutSound)
+{
+    ASSERT_EQ(run({recording("no-sound.mp4")}), 0) << errors;
+    EXPECT_EQ(ffprobe(videos / "race 2026-11-21 15-04-05.mp4", "stream=codec_type"), "video\n");
+}
+
+TEST_F(SavingFromAShell, SavesTheSameMovieTwice)
+{
+    const fs::path movie = recording("clock.mp4");
+    ASSERT_EQ(run({movie}), 0) << errors;
+    ASSERT_EQ(run({movie}), 0) << errors;
+    EXPECT_THAT(namesIn(videos), ElementsAre("race 2026-11-21 15-04-05 (2).mp4", "race 2026-11-21 15-04-05.mp4"));
+}
+
+TEST_F(SavingFromAShell, SaysWhyAMovieCannotBeOpened)
+{
+    EXPECT_EQ(run({home.path() / "nothing.mp4"}), 2);
+    EXPECT_THAT(errors, HasSubstr("there is no file"));
+    const fs::path movie = recording("not-a-movie.mp4");
+    EXPECT_EQ(run({movie}), 1);
+    EXPECT_THAT(errors, HasSubstr("is not a movie"));
+    expectFailure(movie);
+    EXPECT_FALSE(fs::exists(videos));
+}
+
+TEST_F(SavingFromAShell, SaysWhyTheLibraryTakesNothing)
+{
+    std::ofstream(videos.native()) << "a file";
+    const fs::path movie = recording("clock.mp4");
+    EXPECT_EQ(run({movie}), 1);
+    EXPECT_THAT(errors, HasSubstr(videos.native() + " is not a directory"));
+    expectFailure(movie);
+    EXPECT_EQ(tests::PrivateDirectory::read(videos), "a file");
+}
+
+TEST_F(SavingFromAShell, SaysWhyNothingMayBeWrittenInTheLibrary)
+{
+    const tests::WithoutPrivileges here;
+    fs::create_directory(videos);
+    fs::permissions(videos, fs::perms::owner_read | fs::perms::owner_exec);
+    const fs::path movie = recording("clock.mp4");
+    EXPECT_EQ(run({movie}), 1);
+    EXPECT_THAT(errors, HasSubstr("allow writing there"));
+    expectFailure(movie);
+}
+
+TEST_F(SavingFromAShell, SavesAMovieAsItIsWhenItsSoundCannotBeMixed)
+{
+    // There is room for the movie, but not for the mixed one, whose sound is better. In blocks of 512 bytes.
+    const fs::path movie = recording("clock.mp4");
+    ASSERT_LT(bytes.size(), 150'000U);
+    const std::string save = "trap '' XFSZ; ulimit -f 293; exec \"$0\" save \"$1\"";
+    tests::Program program({"sh", "-c", save, std::string(CLIPSA_BIN) + "/clipsa", movie}, variables());
+    EXPECT_EQ(program.wait(), 0) << program.errors();
+    EXPECT_THAT(program.errors(), StartsWith("clipsa: the sound of " + movie.native() + " cannot be mixed ("));
+    const fs::path saved = videos / "race 2026-11-21 15-04-05.mp4";
+    EXPECT_EQ(program.output(), saved.native() + "\n");
+    EXPECT_TRUE(tests::PrivateDirectory::read(saved) == bytes);
+    EXPECT_THAT(namesIn(home.path() / ".cache/clipsa"), IsEmpty());
+}
+
+TEST_F(SavingFromAShell, LeavesNothingBehindWhenItIsInterrupted)
+{
+    const fs::path movie = recording("long-gop.mp4");
+    const fs::path root = home.path() / ".cache/clipsa";
+    fs::create_directories(root);
+    const int watch = ::inotify_init1(IN_CLOEXEC);
+    ASSERT_GE(::inotify_add_watch(watch, root.c_str(), IN_CREATE), 0);
+    tests::Program program({std::string(CLIPSA_BIN) + "/clipsa", "save", movie}, variables());
+    pollfd begun = {watch, POLLIN, 0};
+    EXPECT_EQ(::poll(&begun, 1, 60'000), 1) << "nothing is begun";
+    ::close(watch);
+    program.signal(SIGINT);
+    EXPECT_EQ(program.wait(), 128 + SIGINT);
+    EXPECT_THAT(program.output(), IsEmpty());
+    EXPECT_THAT(program.errors(), IsEmpty());
+    EXPECT_THAT(namesIn(videos), IsEmpty());
+    EXPECT_THAT(namesIn(root), IsEmpty());
+    EXPECT_EQ(tests::PrivateDirectory::read(movie), bytes);
+}
+
+} // namespace
