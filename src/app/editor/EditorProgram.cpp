@@ -22,6 +22,9 @@ namespace app {
 
 namespace {
 
+/// Pictures for the strip stand back behind the player, whose seeks a finger waits for.
+constexpr int kImageNiceness = 10;
+
 constexpr base::Size kPhoneWindow{390, 760};   // points: a phone on a desktop
 constexpr base::Size kDesktopWindow{960, 640}; // points
 
@@ -85,7 +88,7 @@ EditorProgram::EditorProgram(const EditorOptions& options)
       m_images([this] { return m_window->scale(); }), m_files(m_system, mounts(options)),
       m_media(m_system, m_notifications,
               {[this](const std::string& path) { return m_files.resolvedPath(path); }, ffmpeg::cubebOutput(m_log),
-               &m_works}),
+               &m_works, kImageNiceness}),
       m_photos(libraryOptions(), m_log, m_works), m_platform{m_system, m_notifications, m_device, *m_window, m_images,
                                                              m_files,  m_calendar,      m_media,  m_photos},
       m_presenter(m_window, m_clock), m_connection(std::make_shared<dbus::ExtensionConnection>(m_mainQueue)),
