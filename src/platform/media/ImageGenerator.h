@@ -2,7 +2,8 @@
 ///
 /// Main queue only; the pictures come on a thread of the generator's. Requests are gathered and sorted, so that asking
 /// for one moment at a time costs no more than asking for all at once. What waits is given up when the generator goes:
-/// its handlers are not called.
+/// its handlers are not called. A handler must not wait for the main queue, because the one who lets go waits for a
+/// handler that runs.
 #pragma once
 
 #include "base/Error.h"
