@@ -1,0 +1,160 @@
+// The whole main job with the real processes: a recording is opened, cut and saved, and the recorder hears of it.
+#include "end_to_end/Machine.h"
+#include "end_to_end/SavedMovie.h"
+
+#include <gmock/gmock.h>
+
+#include <fstream>
+#include <numeric>
+#include <sys/stat.h>
+
+using namespace tests;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::SizeIs;
+
+namespace {
+
+class Save : public testing::Test {
+protected:
+    Save() : m_movie(m_machine.movie("clock.mp4")), m_bytes(PrivateDirectory::read(m_movie)) {}
+    void TearDown() override
+    {
+        EXPECT_EQ(PrivateDirectory::read(m_movie), m_bytes) << "the user's own file";
+        struct stat status = {};
+        ASSERT_EQ(::stat(m_movie.c_str(), &status), 0);
+        EXPECT_EQ(status.st_nlink, 1u);
+        EXPECT_THAT(m_machine.remains(), IsEmpty());
+    }
+
+    void setScript(const std::string& steps) { m_machine.setScript("wait picture\nwait ready\n" + steps); }
+    Child::End open() { return m_machine.open(m_movie, {"--app-name", "Tux Racer"}); }
+    std::filesystem::path library() const { return m_machine.home() / "Videos"; }
+    std::vector<std::filesystem::path> saved() const
+    {
+        std::vector<std::filesystem::path> found;
+        if (std::filesystem::is_directory(library()))
+            for (const auto& entry : std::filesystem::directory_iterator(library()))
+                found.push_back(entry.path());
+        return found;
+    }
+    void expectMixed(const std::filesystem::path& movie)
+    {
+        const auto mixed = samplesIn(movie, 0);
+        EXPECT_NEAR(levelOf(mixed, 440), levelOf(samplesIn(m_movie, 0), 440), 0.2) << "the app";
+        EXPECT_NEAR(levelOf(mixed, 880), levelOf(samplesIn(m_movie, 1), 880), 0.2) << "the microphone";
+        EXPECT_LT(levelOf(mixed, 660), -50);
+        EXPECT_THAT(samplesIn(movie, 1), IsEmpty()) << "one track";
+    }
+    static std::vector<int> numbers(int first, int last)
+    {
+        std::vector<int> all(static_cast<std::size_t>(last - first + 1));
+        std::iota(all.begin(), all.end(), first);
+        return all;
+    }
+
+    Machine m_machine;
+    const std::filesystem::path m_movie;
+    const std::string m_bytes;
+};
+
+} // namespace
+
+TEST_F(Save, PutsTheMovieIntoTheUsersVideosWithAllItsSoundMixed)
+{
+    setScript("tap Save");
+    const auto end = open();
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_EQ(end.out, "SaveToCameraRoll\n");
+    EXPECT_THAT(end.err, IsEmpty());
+
+    ASSERT_THAT(saved(), SizeIs(1));
+    const auto movie = saved().front();
+    EXPECT_EQ(movie.filename(), "Tux Racer 2024-05-17 09-30-00.mp4");
+    EXPECT_EQ(numbersIn(movie), numbers(0, 119));
+    expectMixed(movie);
+    struct stat status = {};
+    ASSERT_EQ(::stat(movie.c_str(), &status), 0);
+    EXPECT_EQ(status.st_mtim.tv_sec, 1715938200) << "the recording's date";
+}
+
+TEST_F(Save, SavesWhatWasCutAndTellsTheTrimAndTheSave)
+{
+    m_machine.keepReport();
+    setScript(R"(
+        key right
+        wait frame 1
+        key i
+        print {range}
+        key return
+        wait trimmed
+        wait frame 0
+        print {duration}
+        tap Save)");
+    const auto end = open();
+    EXPECT_EQ(end.out, "SaveToCameraRoll\nSaveToCameraRoll\n");
+    EXPECT_THAT(m_machine.report(), ElementsAre("1.000-4.000", "3.000"));
+    ASSERT_THAT(saved(), SizeIs(1));
+    EXPECT_EQ(numbersIn(saved().front()), numbers(30, 119));
+    expectMixed(saved().front());
+}
+
+TEST_F(Save, ASecondMovieOfTheSameNameTakesThePlaceOfNone)
+{
+    setScript("tap Save");
+    open();
+    open();
+    ASSERT_THAT(saved(), SizeIs(2));
+    for (const auto& movie : saved())
+        EXPECT_EQ(numbersIn(movie), numbers(0, 119)) << movie;
+}
+
+TEST_F(Save, IsFinishedWhenTheUserClosesMeanwhile)
+{
+    setScript("tap Save\ntap Cancel");
+    const auto end = open();
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_EQ(end.out, "SaveToCameraRoll\n");
+    ASSERT_THAT(saved(), SizeIs(1));
+    EXPECT_EQ(numbersIn(saved().front()), numbers(0, 119));
+}
+
+TEST_F(Save, IsFinishedWhenTheHostIsKilledMeanwhile)
+{
+    setScript("tap Save\nprint saving");
+    auto host = m_machine.start({"open", m_movie, "--app-name", "Tux Racer"});
+    ASSERT_TRUE(host.waitForText("saving\n"));
+    const auto editors = m_machine.processes("clipsa-editor");
+    host.signal(SIGKILL);
+    host.wait();
+    for (const pid_t editor : editors)
+        EXPECT_TRUE(waitForEnd(editor, Child::kDeadline));
+    ASSERT_THAT(saved(), SizeIs(1));
+    EXPECT_EQ(numbersIn(saved().front()), numbers(0, 119));
+    // The next one sweeps up what the dead host has left.
+    setScript("tap Cancel");
+    open();
+}
+
+TEST_F(Save, ALibraryThatCannotBeWrittenIsSaidAndTheHostIsToldAllTheSame)
+{
+    std::ofstream(library()) << "not a directory";
+    setScript("tap Save");
+    const auto end = open();
+    EXPECT_EQ(end.exitStatus, 0);
+    EXPECT_EQ(end.out, "SaveToCameraRoll\n");
+    EXPECT_THAT(end.err, HasSubstr("Error writing video to camera roll: "));
+    EXPECT_THAT(end.err, HasSubstr(library().native()));
+    EXPECT_EQ(PrivateDirectory::read(library()), "not a directory");
+}
+
+TEST_F(Save, ADamagedMovieIsSavedToo)
+{
+    const auto movie = m_machine.movie("corrupt.mp4");
+    setScript("tap Save");
+    const auto end = m_machine.open(movie);
+    EXPECT_EQ(end.out, "SaveToCameraRoll\n");
+    ASSERT_THAT(saved(), SizeIs(1));
+    EXPECT_GT(std::filesystem::file_size(saved().front()), 10'000u);
+}
