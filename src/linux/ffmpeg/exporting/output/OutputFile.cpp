@@ -48,7 +48,7 @@ base::Result<std::unique_ptr<OutputFile>> OutputFile::create(const std::string& 
         std::random_device random;
         char tag[16];
         std::snprintf(tag, sizeof tag, "%08x", random());
-        file->m_hiddenName = "." + file->m_name.substr(0, 200) + "." + tag + ".part";
+        file->m_hiddenName = '.' + file->m_name.substr(0, 200) + "." + tag + ".part";
         file->m_descriptor =
             openat(directory, file->m_hiddenName.c_str(), O_CREAT | O_EXCL | O_RDWR | O_CLOEXEC, kMode);
     }
