@@ -113,23 +113,25 @@ TEST_P(RandomCuts, HaveExactlyTheirPictures)
         EXPECT_NE(line.find("no group of pictures begins in the range"), std::string::npos) << line;
 }
 
-INSTANTIATE_TEST_SUITE_P(, RandomCuts,
-                         testing::Values(Kind{"h264.mp4", true, 1}, Kind{"h264-b.mp4", true, 2},
-                                         Kind{"h264-open.mp4", true, 3}, Kind{"h264-sparse.mp4", true, 4},
-                                         Kind{"h264-one-group.mp4", false, 5}, Kind{"h264-444.mp4", true, 6},
-                                         Kind{"h264-10bit.mp4", true, 7}, Kind{"h264-baseline.mp4", true, 8},
-                                         Kind{"h264-interlaced.mp4", true, 9}, Kind{"h264-in-band.mp4", true, 10},
-                                         Kind{"h264-changing.mp4", false, 11}, Kind{"h264-b.mkv", true, 12},
-                                         Kind{"h264-b.ts", true, 13}, Kind{"h264-fragmented.mp4", true, 14},
-                                         Kind{"h264-vfr.mp4", true, 15}, Kind{"h264-vfr.mkv", true, 16},
-                                         Kind{"h264-edit-list.mp4", true, 17}, Kind{"h264-rotated.mp4", true, 18},
-                                         Kind{"h264-late.mp4", true, 19}, Kind{"two-tracks.mp4", true, 20}),
-                         [](const auto& each) {
-                             std::string name = each.param.file;
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
-                         });
+INSTANTIATE_TEST_SUITE_P(
+    , RandomCuts,
+    testing::Values(Kind{"h264.mp4", true, 1}, Kind{"h264-b.mp4", true, 2}, Kind{"h264-open.mp4", true, 3},
+                    Kind{"h264-sparse.mp4", true, 4}, Kind{"h264-one-group.mp4", false, 5},
+                    Kind{"h264-444.mp4", true, 6}, Kind{"h264-10bit.mp4", true, 7}, Kind{"h264-baseline.mp4", true, 8},
+                    Kind{"h264-interlaced.mp4", true, 9}, Kind{"h264-in-band.mp4", true, 10},
+                    Kind{"h264-changing.mp4", false, 11}, Kind{"h264-b.mkv", true, 12}, Kind{"h264-b.ts", true, 13},
+                    Kind{"h264-fragmented.mp4", true, 14}, Kind{"h264-vfr.mp4", true, 15},
+                    Kind{"h264-vfr.mkv", true, 16}, Kind{"h264-edit-list.mp4", true, 17},
+                    Kind{"h264-rotated.mp4", true, 18}, Kind{"h264-late.mp4", true, 19},
+                    Kind{"two-tracks.mp4", true, 20}, Kind{"vp9.webm", true, 21}, Kind{"vp9-hidden.webm", true, 22},
+                    Kind{"vp9-444.mkv", true, 23}, Kind{"av1.mp4", true, 24}, Kind{"av1-hidden.mkv", true, 25},
+                    Kind{"vp8.webm", false, 26}, Kind{"mpeg4.mp4", false, 27}, Kind{"mjpeg.mov", false, 28}),
+    [](const auto& each) {
+        std::string name = each.param.file;
+        std::replace_if(
+            name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
+        return name;
+    });
 
 } // namespace
 } // namespace tests

@@ -131,7 +131,7 @@ private:
         context->io_close2 = closeAgain;
         context->flags |= AVFMT_FLAG_CUSTOM_IO;
         context->strict_std_compliance = FF_COMPLIANCE_EXPERIMENTAL; // for FLAC, which players know by now
-        context->avoid_negative_ts = AVFMT_AVOID_NEG_TS_DISABLED; // an edit list hides what is before 0
+        context->avoid_negative_ts = AVFMT_AVOID_NEG_TS_DISABLED;    // an edit list hides what is before 0
         copyMetadata(*context);
         for (const auto& source : m_job.tracks) {
             AVStream* stream = avformat_new_stream(context, nullptr);

@@ -46,9 +46,9 @@ base::Result<std::unique_ptr<OutputFile>> OutputFile::create(const std::string& 
     file->m_descriptor = openat(directory, ".", O_TMPFILE | O_RDWR | O_CLOEXEC, kMode);
     if (file->m_descriptor < 0 && (errno == EOPNOTSUPP || errno == EISDIR || errno == ENOENT || errno == EINVAL)) {
         std::random_device random;
-        char tag[16];
-        std::snprintf(tag, sizeof tag, "%08x", random());
-        file->m_hiddenName = '.' + file->m_name.substr(0, 200) + "." + tag + ".part";
+        char tag[32];
+        std::snprintf(tag, sizeof tag, ".%08x.part", random());
+        file->m_hiddenName.assign(1, '.').append(file->m_name, 0, 200).append(tag);
         file->m_descriptor =
             openat(directory, file->m_hiddenName.c_str(), O_CREAT | O_EXCL | O_RDWR | O_CLOEXEC, kMode);
     }

@@ -30,7 +30,8 @@ EncoderRequest requestFor(const AVStream& stream, const AVFrame& picture, AVRati
     request.isInterlaced = false;
     request.keyframeInterval =
         std::max(1, static_cast<int>(std::lround(av_q2d(request.frameRate) * kSecondsBetweenKeyframes)));
-    request.options = {{"preset", "veryfast"}, {"crf", kQuality}};
+    // Saving on pictures that few others look at is what shows in short movies.
+    request.options = {{"preset", "veryfast"}, {"crf", kQuality}, {"x264-params", "mbtree=0"}};
     return request;
 }
 
@@ -67,7 +68,7 @@ Result<void> EncodedVideoSource::describe(AVStream& output)
         behind += packet.pts != AV_NOPTS_VALUE && m_packets->outTick(packet.pts) >= m_end;
         return behind > PicturePackets::kFarthestReorder;
     };
-    auto feed = PictureFeed::start(*m_packets, m_start, isEnd);
+    auto feed = PictureFeed::start(*m_packets, m_start, PictureFeed::Before::Decode, isEnd);
     if (!feed)
         return feed.error();
     m_feed = std::move(feed).value();

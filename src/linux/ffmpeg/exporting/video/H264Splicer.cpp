@@ -112,7 +112,8 @@ base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDept
     request.options["preset"] = "veryfast";
     request.options["crf"] = kQuality;
     request.options["a53cc"] = "0";
-    std::string params = "sps-id=" + std::to_string(id) + ":stitchable=1:scenecut=0:keyint=infinite:bframes=0:ref=1";
+    std::string params =
+        "sps-id=" + std::to_string(id) + ":stitchable=1:scenecut=0:keyint=infinite:bframes=0:ref=1:mbtree=0";
     constexpr std::uint8_t kLowestSensibleLevel = 10;
     const bool isLevel1b = sps.level == 11 && (sps.constraints & 0x10);
     if (sps.level >= kLowestSensibleLevel && !isLevel1b)

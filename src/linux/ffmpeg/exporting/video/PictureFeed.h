@@ -16,8 +16,12 @@ public:
     /// A packet that ends the stretch; it is not decoded.
     using IsEnd = std::function<bool(const AVPacket&)>;
 
-    /// Goes to the keyframe before `from`. `packets` lives longer; nobody else reads it before this has ended.
-    static base::Result<std::unique_ptr<PictureFeed>> start(PicturePackets& packets, std::int64_t from, IsEnd isEnd);
+    enum class Before { Decode, Skip };
+
+    /// Goes to the keyframe before `from`, which is a tick of the output. Pictures before it come out too, but with
+    /// Before::Skip only what others need. `packets` lives longer; nobody else reads it before this has ended.
+    static base::Result<std::unique_ptr<PictureFeed>> start(PicturePackets& packets, std::int64_t from, Before before,
+                                                            IsEnd isEnd);
 
     /// The next picture in the order of presentation; null at the end. Packets that were damaged give none.
     base::Result<FrameRef> next();
@@ -25,10 +29,11 @@ public:
     Owned<AVPacket> takeEnd() { return std::move(m_end); }
 
 private:
-    PictureFeed(PicturePackets& packets, std::unique_ptr<VideoDecoder> decoder, IsEnd isEnd);
+    PictureFeed(PicturePackets& packets, std::unique_ptr<VideoDecoder> decoder, std::int64_t skipBefore, IsEnd isEnd);
 
     PicturePackets& m_packets;
     std::unique_ptr<VideoDecoder> m_decoder;
+    std::int64_t m_skipBefore;
     IsEnd m_isEnd;
     Owned<AVPacket> m_packet;
     Owned<AVPacket> m_end;

@@ -56,16 +56,16 @@ int PicturePackets::read(AVPacket& packet)
     return 0;
 }
 
-base::Result<PicturePacket> PicturePackets::look(const AVPacket& packet, const IsJoint& isJoint) const
+base::Result<PicturePacket> PicturePackets::look(const AVPacket& packet, const Splicer& splicer) const
 {
     if (packet.pts == AV_NOPTS_VALUE)
         return cannotCopy("its packets do not say when they are shown");
     const bool isKey = packet.flags & AV_PKT_FLAG_KEY;
-    return PicturePacket{outTick(packet.pts), isKey, isKey && isJoint(packet),
-                         (packet.flags & AV_PKT_FLAG_DISCARD) != 0};
+    return PicturePacket{outTick(packet.pts), isKey, isKey && splicer.isJoint(packet),
+                         (packet.flags & AV_PKT_FLAG_DISCARD) != 0, splicer.picturesHeldBack(packet)};
 }
 
-base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::int64_t end, const IsJoint& isJoint)
+base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::int64_t end, const Splicer& splicer)
 {
     seek(start);
     PacketWindow window;
@@ -74,7 +74,7 @@ base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::i
     int behindEnd = 0;
     std::int64_t visible = 0;
     while (read(*m_packet) == 0) {
-        const auto looked = look(*m_packet, isJoint);
+        const auto looked = look(*m_packet, splicer);
         if (!looked)
             return looked.error();
         const PicturePacket& each = looked.value();
@@ -99,7 +99,7 @@ base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::i
     return window;
 }
 
-base::Result<PacketWindow> PicturePackets::tailWindow(std::int64_t from, std::int64_t end, const IsJoint& isJoint)
+base::Result<PacketWindow> PicturePackets::tailWindow(std::int64_t from, std::int64_t end, const Splicer& splicer)
 {
     const std::int64_t second = track().timescale;
     from = std::min(from, m_movie->duration().convertedTo(track().timescale).value);
@@ -109,7 +109,7 @@ base::Result<PacketWindow> PicturePackets::tailWindow(std::int64_t from, std::in
         window.startsMovie = m_startsMovie;
         int behindEnd = 0;
         while (read(*m_packet) == 0) {
-            const auto looked = look(*m_packet, isJoint);
+            const auto looked = look(*m_packet, splicer);
             if (!looked)
                 return looked.error();
             const PicturePacket& each = looked.value();

@@ -5,9 +5,9 @@
 #pragma once
 
 #include "linux/ffmpeg/Movie.h"
+#include "linux/ffmpeg/exporting/video/Splicer.h"
 #include "linux/ffmpeg/exporting/video/VideoPlan.h"
 
-#include <functional>
 #include <memory>
 
 namespace ffmpeg {
@@ -40,16 +40,15 @@ public:
     /// As Demuxer::read.
     int read(AVPacket& packet);
 
-    using IsJoint = std::function<bool(const AVPacket&)>;
     /// The windows that planVideo() takes. The error says why times are not good enough to copy.
-    base::Result<PacketWindow> headWindow(std::int64_t start, std::int64_t end, const IsJoint& isJoint);
+    base::Result<PacketWindow> headWindow(std::int64_t start, std::int64_t end, const Splicer& splicer);
     /// `from` is `end`, or earlier when that was not early enough.
-    base::Result<PacketWindow> tailWindow(std::int64_t from, std::int64_t end, const IsJoint& isJoint);
+    base::Result<PacketWindow> tailWindow(std::int64_t from, std::int64_t end, const Splicer& splicer);
 
 private:
     PicturePackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer);
 
-    base::Result<PicturePacket> look(const AVPacket& packet, const IsJoint& isJoint) const;
+    base::Result<PicturePacket> look(const AVPacket& packet, const Splicer& splicer) const;
 
     std::shared_ptr<const Movie> m_movie;
     std::unique_ptr<Demuxer> m_demuxer;

@@ -18,13 +18,12 @@ constexpr int kMostWindows = 16; ///< looking back for a place to cut; each time
 
 Result<VideoPlan> planFor(PicturePackets& packets, const Splicer& splicer, std::int64_t start, std::int64_t end)
 {
-    const auto isJoint = [&](const AVPacket& packet) { return splicer.isJoint(packet); };
-    const auto head = packets.headWindow(start, end, isJoint);
+    const auto head = packets.headWindow(start, end, splicer);
     if (!head)
         return head.error();
     std::int64_t tailFrom = end;
     for (int tries = 0; tries < kMostWindows; ++tries) {
-        const auto tail = packets.tailWindow(tailFrom, end, isJoint);
+        const auto tail = packets.tailWindow(tailFrom, end, splicer);
         if (!tail)
             return tail.error();
         VideoPlan plan = planVideo(head.value(), tail.value(), start, end);
@@ -166,7 +165,7 @@ Result<void> SplicedVideoSource::beginStretch(State state)
         behind += pts > m_plan.lastPts;
         return behind > PicturePackets::kFarthestReorder;
     };
-    auto feed = PictureFeed::start(*m_packets, from, isEnd);
+    auto feed = PictureFeed::start(*m_packets, from, PictureFeed::Before::Skip, isEnd);
     if (!feed)
         return feed.error();
     m_feed = std::move(feed).value();

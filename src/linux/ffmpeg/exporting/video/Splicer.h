@@ -19,6 +19,8 @@ public:
 
     /// Whether nothing before this keyframe is needed for what follows it, and none of that is shown before it.
     virtual bool isJoint(const AVPacket& keyframe) const = 0;
+    /// How many more pictures this packet decodes for showing them later than it shows that were decoded before.
+    virtual int picturesHeldBack(const AVPacket& /*packet*/) const { return 0; }
     /// How far the stream says that its pictures are reordered; 0 when it does not.
     virtual int reorderDepth() const { return 0; }
 

@@ -67,11 +67,13 @@ std::size_t copyablePrefix(const std::vector<PicturePacket>& packets, std::size_
         earliest[i] = std::min(earliest[i + 1], packets[i].pts);
     std::size_t best = 0;
     std::int64_t latest = kBefore;
+    int heldBack = 0;
     for (std::size_t i = begin; i < packets.size(); ++i) {
         if (packets[i].isHidden || packets[i].pts >= end)
             break;
+        heldBack = packets[i].isJoint ? packets[i].heldBack : heldBack + packets[i].heldBack;
         latest = std::max(latest, packets[i].pts);
-        if (latest < earliest[i + 1] && (i + 1 < packets.size() || endsMovie))
+        if (heldBack <= 0 && latest < earliest[i + 1] && (i + 1 < packets.size() || endsMovie))
             best = i + 1 - begin;
     }
     return best;

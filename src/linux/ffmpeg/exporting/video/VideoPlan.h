@@ -1,7 +1,7 @@
 /// Which pictures of a range are copied and which are encoded again. A pure function; any thread.
 ///
 /// A copied stretch begins at a joint, a picture that nothing before it is needed for and nothing behind it looks past,
-/// and ends where no picture that is left out would be shown before one that is kept. What lies in the range before and
+/// and ends where no picture that is left out would be shown before one that is kept, and none is held back. What lies in the range before and
 /// behind that stretch is encoded again: so no picture outside of the range gets into the output.
 #pragma once
 
@@ -18,6 +18,7 @@ struct PicturePacket {
     bool isKey = false;
     bool isJoint = false;
     bool isHidden = false; ///< decoded but not shown: an edit list left it out
+    int heldBack = 0;      ///< pictures in it that are shown later, less those that it shows of earlier ones
 };
 
 /// Packets that follow each other in the order of decoding.

@@ -1,0 +1,106 @@
+#include "linux/ffmpeg/exporting/video/HiddenPictures.h"
+
+#include <algorithm>
+#include <vector>
+
+namespace ffmpeg {
+
+namespace {
+
+/// The frames of a superframe; the packet itself where it is none.
+std::vector<ByteView> framesOfVp9(ByteView packet)
+{
+    if (packet.empty() || (packet.back() & 0xE0) != 0xC0)
+        return {packet};
+    const auto count = static_cast<std::size_t>((packet.back() & 7) + 1);
+    const auto bytes = static_cast<std::size_t>((packet.back() >> 3 & 3) + 1);
+    const std::size_t index = 2 + count * bytes;
+    if (packet.size() < index || packet[packet.size() - index] != packet.back())
+        return {packet};
+    std::vector<ByteView> frames;
+    std::size_t at = 0;
+    const ByteView sizes = packet.subspan(packet.size() - index + 1);
+    for (std::size_t i = 0; i < count; ++i) {
+        std::size_t size = 0;
+        for (std::size_t k = 0; k < bytes; ++k)
+            size |= static_cast<std::size_t>(sizes[i * bytes + k]) << (8 * k);
+        if (size > packet.size() - index - at)
+            break;
+        if (size > 0)
+            frames.push_back(packet.subspan(at, size));
+        at += size;
+    }
+    return frames;
+}
+
+/// A number of 7 bits a byte, the lowest first.
+std::size_t leb128(ByteView bytes, std::size_t& at)
+{
+    std::size_t value = 0;
+    for (int i = 0; i < 8 && at < bytes.size(); ++i) {
+        const std::uint8_t byte = bytes[at++];
+        value |= static_cast<std::size_t>(byte & 0x7F) << (7 * i);
+        if (!(byte & 0x80))
+            break;
+    }
+    return value;
+}
+
+enum class Obu : std::uint8_t { SequenceHeader = 1, FrameHeader = 3, Frame = 6 };
+
+} // namespace
+
+PacketPictures picturesOfVp9(ByteView packet)
+{
+    PacketPictures found;
+    bool isFirst = true;
+    for (const ByteView frame : framesOfVp9(packet)) {
+        BitReader in(frame);
+        in.skip(2);
+        const std::uint32_t low = in.bit();
+        if (low + 2 * in.bit() == 3)
+            in.skip(1);
+        if (in.bit()) {
+            ++found.shownAgain;
+            continue;
+        }
+        const bool isKeyframe = !in.bit();
+        const bool isShown = in.bit();
+        found.hidden += !isShown;
+        found.startsGroup = found.startsGroup || (isFirst && isKeyframe && isShown);
+        isFirst = false;
+    }
+    return found;
+}
+
+PacketPictures picturesOfAv1(ByteView packet)
+{
+    PacketPictures found;
+    bool isFirst = true;
+    for (std::size_t at = 0; at < packet.size();) {
+        const std::uint8_t header = packet[at++];
+        const auto type = static_cast<Obu>(header >> 3 & 15);
+        if (header & 4)
+            ++at;
+        const std::size_t size = header & 2 ? leb128(packet, at) : packet.size() - std::min(at, packet.size());
+        if (at > packet.size() || size > packet.size() - at)
+            break;
+        found.hasHeader = found.hasHeader || type == Obu::SequenceHeader;
+        if ((type == Obu::FrameHeader || type == Obu::Frame) && size > 0) {
+            BitReader in(packet.subspan(at, size));
+            if (in.bit()) {
+                ++found.shownAgain;
+            } else {
+                const bool isKeyframe = in.bits(2) == 0;
+                const bool isShown = in.bit();
+                found.hidden += !isShown;
+                found.startsGroup = found.startsGroup || (isFirst && isKeyframe && isShown);
+            }
+            isFirst = false;
+        }
+        at += size;
+    }
+    return found;
+}
+
+} // namespace ffmpeg

@@ -1,0 +1,20 @@
+/// Pictures of VP9 and AV1 that are decoded now and shown later. Pure functions; any thread.
+#pragma once
+
+#include "linux/ffmpeg/exporting/video/Bits.h"
+
+namespace ffmpeg {
+
+struct PacketPictures {
+    int hidden = 0;           ///< decoded, not shown by this packet
+    int shownAgain = 0;       ///< shown by it, decoded before
+    bool startsGroup = false; ///< its first is a keyframe that is shown
+    bool hasHeader = false;   ///< AV1: a sequence header
+};
+
+/// What a VP9 packet holds; a superframe has several pictures.
+PacketPictures picturesOfVp9(ByteView packet);
+/// What an AV1 temporal unit holds.
+PacketPictures picturesOfAv1(ByteView packet);
+
+} // namespace ffmpeg

@@ -1,0 +1,99 @@
+#include "linux/ffmpeg/exporting/video/KeyframeSplicer.h"
+
+#include "linux/ffmpeg/exporting/CannotCopy.h"
+#include "linux/ffmpeg/exporting/video/HiddenPictures.h"
+#include "linux/ffmpeg/exporting/video/NalUnits.h"
+
+#include <algorithm>
+
+namespace ffmpeg {
+
+namespace {
+
+constexpr std::size_t kAv1ConfigurationBytes = 4; ///< of "av1C", before the sequence header
+constexpr std::uint8_t kAv1Marker = 0x81;
+
+int vp9Profile(AVPixelFormat format)
+{
+    const AVPixFmtDescriptor& about = *av_pix_fmt_desc_get(format);
+    const bool is420 = about.log2_chroma_w == 1 && about.log2_chroma_h == 1;
+    return (about.comp[0].depth > 8 ? 2 : 0) + (is420 ? 0 : 1);
+}
+
+} // namespace
+
+base::Result<std::unique_ptr<Splicer>> KeyframeSplicer::make(const AVStream& stream, const AVFrame& picture)
+{
+    std::unique_ptr<KeyframeSplicer> splicer(new KeyframeSplicer);
+    splicer->m_isAv1 = stream.codecpar->codec_id == AV_CODEC_ID_AV1;
+    splicer->m_format = static_cast<AVPixelFormat>(picture.format);
+    splicer->m_width = picture.width;
+    splicer->m_height = picture.height;
+    if (splicer->m_isAv1) {
+        const ByteView extradata = extradataOf(*stream.codecpar);
+        if (extradata.size() <= kAv1ConfigurationBytes || extradata[0] != kAv1Marker)
+            return cannotCopy("its sequence header is not in the file's header");
+        splicer->m_header.assign(extradata.begin() + kAv1ConfigurationBytes, extradata.end());
+    }
+    return std::unique_ptr<Splicer>(std::move(splicer));
+}
+
+bool KeyframeSplicer::isJoint(const AVPacket& keyframe) const
+{
+    const auto pictures = m_isAv1 ? picturesOfAv1(payloadOf(keyframe)) : picturesOfVp9(payloadOf(keyframe));
+    return pictures.startsGroup;
+}
+
+int KeyframeSplicer::picturesHeldBack(const AVPacket& packet) const
+{
+    const auto pictures = m_isAv1 ? picturesOfAv1(payloadOf(packet)) : picturesOfVp9(payloadOf(packet));
+    return pictures.hidden - pictures.shownAgain;
+}
+
+base::Result<void> KeyframeSplicer::prepare(EncoderRequest& request, int /*reorderDepth*/)
+{
+    // No picture before its time, and nearly without loss: it stands beside untouched ones.
+    if (m_isAv1) {
+        request.encoder = "libaom-av1";
+        request.options = {
+            {"usage", "realtime"}, {"cpu-used", "7"}, {"crf", "6"}, {"lag-in-frames", "0"}, {"row-mt", "1"}};
+    } else {
+        request.encoder = "libvpx-vp9";
+        request.profile = vp9Profile(m_format);
+        request.options = {{"deadline", "realtime"}, {"cpu-used", "7"},     {"crf", "4"},   {"b", "0"},
+                           {"lag-in-frames", "0"},   {"auto-alt-ref", "0"}, {"row-mt", "1"}};
+    }
+    return {};
+}
+
+base::Result<void> KeyframeSplicer::describe(AVCodecParameters& parameters)
+{
+    // Not every container says it, and the muxer asks.
+    parameters.format = m_format;
+    parameters.width = m_width;
+    parameters.height = m_height;
+    if (!m_isAv1)
+        parameters.profile = vp9Profile(m_format);
+    parameters.codec_tag = m_isAv1 ? MKTAG('a', 'v', '0', '1') : MKTAG('v', 'p', '0', '9');
+    return {};
+}
+
+base::Result<void> KeyframeSplicer::adoptCopied(AVPacket& packet)
+{
+    if (!m_isAv1 || !(packet.flags & AV_PKT_FLAG_KEY) || picturesOfAv1(payloadOf(packet)).hasHeader)
+        return {};
+    // Behind pictures of another encoder the header of the file alone is not enough.
+    Bytes whole = m_header;
+    whole.insert(whole.end(), packet.data, packet.data + packet.size);
+    AVBufferRef* buffer = av_buffer_alloc(whole.size() + AV_INPUT_BUFFER_PADDING_SIZE);
+    if (!buffer)
+        return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
+    std::fill_n(std::copy(whole.begin(), whole.end(), buffer->data), AV_INPUT_BUFFER_PADDING_SIZE, std::uint8_t{0});
+    av_buffer_unref(&packet.buf);
+    packet.buf = buffer;
+    packet.data = buffer->data;
+    packet.size = static_cast<int>(whole.size());
+    return {};
+}
+
+} // namespace ffmpeg

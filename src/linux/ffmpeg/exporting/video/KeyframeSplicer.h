@@ -1,0 +1,31 @@
+/// Joins VP9 and AV1 with what is encoded beside it: their keyframes bring all headers along.
+#pragma once
+
+#include "linux/ffmpeg/exporting/video/Bits.h"
+#include "linux/ffmpeg/exporting/video/Splicer.h"
+
+namespace ffmpeg {
+
+class KeyframeSplicer final : public Splicer {
+public:
+    static base::Result<std::unique_ptr<Splicer>> make(const AVStream& stream, const AVFrame& picture);
+
+    bool isJoint(const AVPacket& keyframe) const override;
+    int picturesHeldBack(const AVPacket& packet) const override;
+    base::Result<void> prepare(EncoderRequest& request, int reorderDepth) override;
+    base::Result<void> join(const AVCodecContext& /*encoder*/) override { return {}; }
+    base::Result<void> describe(AVCodecParameters& parameters) override;
+    base::Result<void> adoptCopied(AVPacket& packet) override;
+    base::Result<void> adoptEncoded(AVPacket& /*packet*/) override { return {}; }
+
+private:
+    KeyframeSplicer() = default;
+
+    bool m_isAv1 = false;
+    Bytes m_header; ///< AV1: what a keyframe must start with
+    AVPixelFormat m_format = AV_PIX_FMT_NONE;
+    int m_width = 0;
+    int m_height = 0;
+};
+
+} // namespace ffmpeg
