@@ -2,6 +2,7 @@
 
 #include "app/host/CommandLine.h"
 #include "app/host/MakeThumbnails.h"
+#include "app/host/MixMovie.h"
 #include "app/host/OpenMovie.h"
 #include "app/host/ProbeMovie.h"
 #include "app/host/SaveMovie.h"
@@ -17,6 +18,11 @@ namespace {
 int run(const host::TrimCommand& command)
 {
     return host::trimMovie(command);
+}
+
+int run(const host::MixCommand& command)
+{
+    return host::mixMovie(command);
 }
 
 int run(const host::ThumbnailsCommand& command)

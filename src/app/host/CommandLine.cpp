@@ -15,6 +15,8 @@ const char* const kHelpText = R"(Clipsa looks at, trims, saves and shares a scre
                                 open MOVIE without a screen, and leave a picture of each step in DIR
   clipsa trim MOVIE [--from T] [--to T] -o OUT [--force]
                                 leave what MOVIE shows from one time up to another in OUT
+  clipsa mix MOVIE -o OUT [--force]
+                                leave MOVIE in OUT, with all of its sound tracks mixed into one
   clipsa thumbnails MOVIE -n N -o DIR [--size WxH] [--force]
                                 leave N pictures of MOVIE, evenly spaced, in DIR
   clipsa probe MOVIE [--json]   say what MOVIE is made of

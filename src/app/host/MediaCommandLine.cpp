@@ -135,6 +135,31 @@ base::Result<std::optional<MediaCommand>> parseTrim(Words words)
     return std::optional<MediaCommand>(std::move(command));
 }
 
+base::Result<std::optional<MediaCommand>> parseMix(Words words)
+{
+    MixCommand command;
+    while (words.advance()) {
+        if (words.isHelp())
+            return std::optional<MediaCommand>();
+        base::Result<void> taken;
+        if (!words.isOption())
+            taken = takeMovie(command.movie, words.word());
+        else if (words.word() == "--force")
+            taken = takeFlag(command.force, words);
+        else if (words.word() == "-o" || words.word() == "--output")
+            taken = takeText(command.output, words);
+        else
+            taken = usageError("mix has no option " + words.word());
+        if (!taken)
+            return taken.error();
+    }
+    if (command.movie.empty())
+        return usageError("mix needs a movie");
+    if (command.output.empty())
+        return usageError("mix needs -o OUT, for the new movie");
+    return std::optional<MediaCommand>(std::move(command));
+}
+
 base::Result<std::optional<MediaCommand>> parseProbe(Words words)
 {
     ProbeCommand command;
@@ -182,8 +207,11 @@ struct Parser {
     base::Result<std::optional<MediaCommand>> (*parse)(Words words);
 };
 
-constexpr Parser kParsers[] = {
-    {"trim", parseTrim}, {"thumbnails", parseThumbnails}, {"probe", parseProbe}, {"save", parseSave}};
+constexpr Parser kParsers[] = {{"trim", parseTrim},
+                               {"mix", parseMix},
+                               {"thumbnails", parseThumbnails},
+                               {"probe", parseProbe},
+                               {"save", parseSave}};
 
 const Parser* parserOf(const std::string& name)
 {

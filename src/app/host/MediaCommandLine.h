@@ -33,12 +33,18 @@ struct TrimCommand {
     bool force = false; ///< replaces a file that is there
 };
 
+struct MixCommand {
+    std::string movie;
+    std::string output;
+    bool force = false; ///< replaces a file that is there
+};
+
 struct SaveCommand {
     std::string movie;
     std::string appName; ///< empty: the movie's file name without its extension
 };
 
-using MediaCommand = std::variant<TrimCommand, ThumbnailsCommand, ProbeCommand, SaveCommand>;
+using MediaCommand = std::variant<TrimCommand, MixCommand, ThumbnailsCommand, ProbeCommand, SaveCommand>;
 
 /// "12.5", "1:30" or "01:02:03.25", exact to the microsecond. Nothing when it is no time.
 std::optional<base::MediaTime> momentIn(const std::string& text);

@@ -1,92 +1,16 @@
 #include "app/host/TrimMovie.h"
 
-#include "app/host/MediaTool.h"
-#include "app/host/OpenMovie.h"
-#include "app/host/ProgressBar.h"
-#include "linux/dbus/EditRequest.h"
-
-#include <cerrno>
-#include <cstdio>
-#include <filesystem>
-#include <future>
-#include <system_error>
+#include "app/host/ExportMovie.h"
 
 namespace host {
 
-namespace {
-
-namespace fs = std::filesystem;
-using platform::ExportSession;
-
-base::ErrorRef refused(const std::string& why)
-{
-    return base::Error::make(dbus::kBadInputDomain, EEXIST, why);
-}
-
-/// Runs the session to its end; whatever it has written is gone, or under its name, when this returns.
-base::ErrorRef run(MediaTool& tool, const std::shared_ptr<ExportSession>& session)
-{
-    ProgressBar progress("Trimming");
-    const auto ended = std::make_shared<std::promise<void>>();
-    const auto end = ended->get_future();
-    const auto hasEnded = std::make_shared<bool>(false);
-    base::MainQueue& main = tool.system().mainQueue;
-    session->exportAsynchronously([&main, hasEnded, ended] {
-        main.post([hasEnded] { *hasEnded = true; });
-        ended->set_value();
-    });
-    if (!tool.runUntil([&] { return *hasEnded; }, [&] { progress.show(session->progress()); })) {
-        session->cancelExport();
-        end.wait();
-    }
-    if (session->status() == ExportSession::Status::Cancelled)
-        return base::Error::fromErrno(ECANCELED, "cannot trim the movie");
-    return session->error();
-}
-
-base::ErrorRef trim(MediaTool& tool, const TrimCommand& command)
-{
-    std::error_code error;
-    const fs::path output = fs::absolute(command.output, error);
-    const bool isThere = fs::exists(fs::symlink_status(output, error));
-    if (isThere && !command.force)
-        return refused(command.output + " is there already; give --force to replace it");
-    if (isThere && !fs::is_regular_file(output, error))
-        return refused(command.output + " is not a file that could be replaced");
-    if (fs::equivalent(command.movie, output, error))
-        return refused(command.output + " is the movie itself, which is never changed");
-    const auto asset = tool.open(command.movie);
-    if (!asset)
-        return asset.error();
-
-    // A file that is replaced is there until the new one is whole.
-    const fs::path written = isThere ? output.parent_path() / ("." + output.filename().native() + ".new") : output;
-    if (isThere)
-        fs::remove(written, error);
-    const auto session = tool.media().exportSessionWithAsset(asset.value(), platform::ExportPreset::HighestQuality);
-    session->setOutputURL(base::Url::fromPath(written.native()));
-    session->setOutputFileType(platform::FileType::Mpeg4);
-    const base::MediaTime length = command.to ? *command.to - command.from : base::MediaTime::positiveInfinity();
-    session->setTimeRange(base::MediaTimeRange{command.from, length});
-    if (base::ErrorRef failure = run(tool, session))
-        return failure;
-    if (isThere) {
-        fs::rename(written, output, error);
-        if (error)
-            return base::Error::fromErrno(error.value(), "cannot replace " + command.output);
-    }
-    return nullptr;
-}
-
-} // namespace
-
 int trimMovie(const TrimCommand& command)
 {
-    MediaTool tool;
-    const base::ErrorRef failure = trim(tool, command);
-    for (const std::string& line : tool.log().texts(base::MemoryLog::Line::Kind::Message))
-        std::fprintf(stderr, "clipsa: %s\n", line.c_str());
-    return failure ? tool.fail(failure) : kExitDone;
+    const auto setUp = [&](platform::ExportSession& session, const platform::Asset& /*asset*/) {
+        const base::MediaTime length = command.to ? *command.to - command.from : base::MediaTime::positiveInfinity();
+        session.setTimeRange(base::MediaTimeRange{command.from, length});
+    };
+    return exportMovie({"Trimming", command.movie, command.output, command.force, setUp});
 }
 
 } // namespace host

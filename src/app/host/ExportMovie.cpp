@@ -1,0 +1,90 @@
+#include "app/host/ExportMovie.h"
+
+#include "app/host/OpenMovie.h"
+#include "app/host/ProgressBar.h"
+#include "linux/dbus/EditRequest.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <filesystem>
+#include <future>
+#include <system_error>
+
+namespace host {
+
+namespace {
+
+namespace fs = std::filesystem;
+using platform::ExportSession;
+
+base::ErrorRef refused(const std::string& why)
+{
+    return base::Error::make(dbus::kBadInputDomain, EEXIST, why);
+}
+
+/// Runs the session to its end; whatever it has written is gone, or under its name, when this returns.
+base::ErrorRef run(MediaTool& tool, const std::shared_ptr<ExportSession>& session, const ExportOrder& order)
+{
+    ProgressBar progress(order.doing);
+    const auto ended = std::make_shared<std::promise<void>>();
+    const auto end = ended->get_future();
+    const auto hasEnded = std::make_shared<bool>(false);
+    base::MainQueue& main = tool.system().mainQueue;
+    session->exportAsynchronously([&main, hasEnded, ended] {
+        main.post([hasEnded] { *hasEnded = true; });
+        ended->set_value();
+    });
+    if (!tool.runUntil([&] { return *hasEnded; }, [&] { progress.show(session->progress()); })) {
+        session->cancelExport();
+        end.wait();
+    }
+    if (session->status() == ExportSession::Status::Cancelled)
+        return base::Error::fromErrno(ECANCELED, "cannot export the movie");
+    return session->error();
+}
+
+base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
+{
+    std::error_code error;
+    const fs::path output = fs::absolute(order.output, error);
+    const bool isThere = fs::exists(fs::symlink_status(output, error));
+    if (isThere && !order.force)
+        return refused(order.output + " is there already; give --force to replace it");
+    if (isThere && !fs::is_regular_file(output, error))
+        return refused(order.output + " is not a file that could be replaced");
+    if (fs::equivalent(order.movie, output, error))
+        return refused(order.output + " is the movie itself, which is never changed");
+    const auto asset = tool.open(order.movie);
+    if (!asset)
+        return asset.error();
+
+    // A file that is replaced is there until the new one is whole.
+    const fs::path written = isThere ? output.parent_path() / ("." + output.filename().native() + ".new") : output;
+    if (isThere)
+        fs::remove(written, error);
+    const auto session = tool.media().exportSessionWithAsset(asset.value(), platform::ExportPreset::HighestQuality);
+    session->setOutputURL(base::Url::fromPath(written.native()));
+    session->setOutputFileType(platform::FileType::Mpeg4);
+    order.setUp(*session, *asset.value());
+    if (base::ErrorRef failure = run(tool, session, order))
+        return failure;
+    if (isThere) {
+        fs::rename(written, output, error);
+        if (error)
+            return base::Error::fromErrno(error.value(), "cannot replace " + order.output);
+    }
+    return nullptr;
+}
+
+} // namespace
+
+int exportMovie(const ExportOrder& order)
+{
+    MediaTool tool;
+    const base::ErrorRef failure = carryOut(tool, order);
+    for (const std::string& line : tool.log().texts(base::MemoryLog::Line::Kind::Message))
+        std::fprintf(stderr, "clipsa: %s\n", line.c_str());
+    return failure ? tool.fail(failure) : kExitDone;
+}
+
+} // namespace host
