@@ -8,13 +8,14 @@ import sys
 import tempfile
 
 import memory
+import mixing
 import playing
 import report
 import seeking
 import start
 import thumbnails
 
-KINDS = ("start", "seek", "scrub", "play", "memory", "thumbnails")
+KINDS = ("start", "seek", "scrub", "play", "memory", "thumbnails", "mix")
 
 
 class Settings:
@@ -61,6 +62,8 @@ def main():
             playing.measure(settings, (own or [recording])[0])
         elif kind == "memory":
             memory.measure(settings, settings.movie("hour-4k.mp4"))
+        elif kind == "mix":
+            mixing.measure(settings, (own or [settings.movie("ten-minutes-two-tracks.mp4")])[0])
         elif kind == "thumbnails":
             thumbnails.measure(settings, (own or [settings.movie("ten-minutes-1080p60.mp4")])[0])
 
