@@ -125,7 +125,9 @@ INSTANTIATE_TEST_SUITE_P(
                     Kind{"h264-rotated.mp4", true, 18}, Kind{"h264-late.mp4", true, 19},
                     Kind{"two-tracks.mp4", true, 20}, Kind{"vp9.webm", true, 21}, Kind{"vp9-hidden.webm", true, 22},
                     Kind{"vp9-444.mkv", true, 23}, Kind{"av1.mp4", true, 24}, Kind{"av1-hidden.mkv", true, 25},
-                    Kind{"vp8.webm", false, 26}, Kind{"mpeg4.mp4", false, 27}, Kind{"mjpeg.mov", false, 28}),
+                    Kind{"vp8.webm", false, 26}, Kind{"mpeg4.mp4", false, 27}, Kind{"mjpeg.mov", false, 28},
+                    Kind{"hevc.mp4", true, 29}, Kind{"hevc-b.mkv", true, 30}, Kind{"hevc-open.mp4", false, 31},
+                    Kind{"hevc-10bit.mp4", true, 32}),
     [](const auto& each) {
         std::string name = each.param.file;
         std::replace_if(

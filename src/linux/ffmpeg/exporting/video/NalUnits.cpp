@@ -1,6 +1,7 @@
 #include "linux/ffmpeg/exporting/video/NalUnits.h"
 
 #include <algorithm>
+#include <array>
 
 namespace ffmpeg {
 
@@ -48,10 +49,11 @@ std::optional<std::vector<ByteView>> unitsBehindLengths(ByteView data, int lengt
 
 bool replacePayload(AVPacket& packet, const std::vector<ByteView>& units, int lengthSize)
 {
-    const auto header = static_cast<std::size_t>(lengthSize);
+    constexpr std::array<std::uint8_t, 4> kStartCode{0, 0, 0, 1};
+    const std::size_t header = lengthSize > 0 ? static_cast<std::size_t>(lengthSize) : kStartCode.size();
     std::size_t size = 0;
     for (const ByteView unit : units) {
-        if (lengthSize < 4 && unit.size() >> (8 * lengthSize) != 0)
+        if (lengthSize > 0 && lengthSize < 4 && unit.size() >> (8 * lengthSize) != 0)
             return false;
         size += header + unit.size();
     }
@@ -60,6 +62,8 @@ bool replacePayload(AVPacket& packet, const std::vector<ByteView>& units, int le
         return false;
     std::uint8_t* to = buffer->data;
     for (const ByteView unit : units) {
+        if (lengthSize == 0)
+            to = std::copy(kStartCode.begin(), kStartCode.end(), to);
         for (int i = lengthSize - 1; i >= 0; --i)
             *to++ = static_cast<std::uint8_t>(unit.size() >> (8 * i));
         to = std::copy(unit.begin(), unit.end(), to);

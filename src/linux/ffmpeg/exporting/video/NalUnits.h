@@ -15,7 +15,8 @@ std::vector<ByteView> unitsBetweenStartCodes(ByteView data);
 /// Units behind big-endian lengths of so many bytes. Nothing where a length leads beyond the end.
 std::optional<std::vector<ByteView>> unitsBehindLengths(ByteView data, int lengthSize);
 
-/// A packet's payload made of units behind lengths. False when one is too long for that, or memory ran out.
+/// A packet's payload made of units behind lengths of so many bytes; 0 puts start codes before them. False when one is
+/// too long for its length, or memory ran out.
 /// Times, flags and the rest of `packet` stay.
 bool replacePayload(AVPacket& packet, const std::vector<ByteView>& units, int lengthSize);
 

@@ -2,6 +2,7 @@
 
 #include "linux/ffmpeg/exporting/CannotCopy.h"
 #include "linux/ffmpeg/exporting/video/H264Splicer.h"
+#include "linux/ffmpeg/exporting/video/HevcSplicer.h"
 #include "linux/ffmpeg/exporting/video/KeyframeSplicer.h"
 
 namespace ffmpeg {
@@ -11,6 +12,8 @@ base::Result<std::unique_ptr<Splicer>> Splicer::make(const AVStream& stream, con
     switch (stream.codecpar->codec_id) {
     case AV_CODEC_ID_H264:
         return H264Splicer::make(stream);
+    case AV_CODEC_ID_HEVC:
+        return HevcSplicer::make(stream);
     case AV_CODEC_ID_VP9:
     case AV_CODEC_ID_AV1:
         return KeyframeSplicer::make(stream, picture);

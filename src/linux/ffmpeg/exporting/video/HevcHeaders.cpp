@@ -1,0 +1,187 @@
+#include "linux/ffmpeg/exporting/video/HevcHeaders.h"
+
+#include "linux/ffmpeg/exporting/video/NalUnits.h"
+
+#include <algorithm>
+
+namespace ffmpeg::hevc {
+
+namespace {
+
+constexpr int kHeaderBits = 16;
+constexpr int kProfileBits = 96;       ///< of a stream without layers in time
+constexpr std::size_t kBeginning = 64; ///< bytes that are enough for the numbers
+
+bool isIrap(Unit unit)
+{
+    return unit >= Unit::FirstIrap && unit <= Unit::LastIrap;
+}
+
+/// Where a set's stop bit stands.
+std::size_t endOf(const Bytes& payload)
+{
+    std::size_t bits = payload.size() * 8;
+    while (bits > 0 && !(payload[(bits - 1) / 8] >> (7 - (bits - 1) % 8) & 1))
+        --bits;
+    return bits > 0 ? bits - 1 : 0;
+}
+
+Bytes beginningOf(ByteView nal)
+{
+    return withoutEmulation(nal.first(std::min(nal.size(), kBeginning)));
+}
+
+} // namespace
+
+std::uint32_t idOfVps(ByteView nal)
+{
+    const Bytes payload = beginningOf(nal);
+    BitReader in(payload);
+    in.skip(kHeaderBits);
+    return in.bits(4);
+}
+
+std::optional<Sps> parseSps(ByteView nal)
+{
+    const Bytes payload = withoutEmulation(nal);
+    BitReader in(payload);
+    Sps sps;
+    in.skip(kHeaderBits);
+    sps.vps = in.bits(4);
+    if (in.bits(3) != 0)
+        return std::nullopt;
+    in.skip(1 + kProfileBits);
+    sps.id = in.ue();
+    if (in.ue() == 3)
+        in.skip(1);
+    in.ue();
+    in.ue();
+    if (in.bit())
+        for (int i = 0; i < 4; ++i)
+            in.ue();
+    in.ue();
+    in.ue();
+    in.ue();
+    in.skip(1);
+    in.ue();
+    sps.reorderPictures = in.ue();
+    if (in.isBeyond() || sps.id > 15)
+        return std::nullopt;
+    return sps;
+}
+
+Ids idsOfPps(ByteView nal)
+{
+    const Bytes payload = beginningOf(nal);
+    BitReader in(payload);
+    in.skip(kHeaderBits);
+    Ids ids;
+    ids.pps = in.ue();
+    ids.sps = in.ue();
+    return ids;
+}
+
+std::uint32_t ppsOfSlice(ByteView nal)
+{
+    const Bytes payload = beginningOf(nal);
+    BitReader in(payload);
+    in.skip(kHeaderBits + 1 + isIrap(unitOf(nal)));
+    return in.ue();
+}
+
+std::optional<Bytes> renumbered(ByteView set, const Ids& ids)
+{
+    const Bytes payload = withoutEmulation(set);
+    BitReader in(payload);
+    BitWriter out;
+    out.copy(payload, 0, kHeaderBits);
+    in.skip(kHeaderBits);
+    switch (unitOf(set)) {
+    case Unit::Vps:
+        in.skip(4);
+        out.bits(ids.vps, 4);
+        break;
+    case Unit::Sps: {
+        if (!parseSps(set))
+            return std::nullopt;
+        in.skip(4);
+        out.bits(ids.vps, 4);
+        const std::size_t at = in.position();
+        in.skip(3 + 1 + kProfileBits);
+        out.copy(payload, at, in.position());
+        in.ue();
+        out.ue(ids.sps);
+        break;
+    }
+    case Unit::Pps:
+        in.ue();
+        in.ue();
+        out.ue(ids.pps);
+        out.ue(ids.sps);
+        break;
+    default:
+        return std::nullopt;
+    }
+    const std::size_t end = endOf(payload);
+    if (in.position() > end)
+        return std::nullopt;
+    out.copy(payload, in.position(), end);
+    out.finish();
+    return withEmulation(out.bytes());
+}
+
+std::optional<Bytes> renumberedSlice(ByteView slice, std::uint32_t pps)
+{
+    constexpr std::size_t kNumberByte = 2; // the code of 0 is one bit, which stands in it
+    if (slice.size() <= kNumberByte || ppsOfSlice(slice) != 0 || pps < kFirstMovablePps || pps > kLastMovablePps)
+        return std::nullopt;
+    const Bytes payload = withoutEmulation(slice);
+    const std::size_t code = kHeaderBits + 1 + (isIrap(unitOf(slice)) ? 1 : 0);
+    BitWriter out;
+    out.copy(payload, 0, code);
+    out.ue(pps);
+    out.copy(payload, code + 1, (kNumberByte + 1) * 8);
+    Bytes bytes = out.bytes();
+    bytes.insert(bytes.end(), payload.begin() + kNumberByte + 1, payload.end());
+    return withEmulation(bytes);
+}
+
+std::optional<Configuration> Configuration::parse(ByteView extradata)
+{
+    constexpr std::size_t kArrays = 22;
+    Configuration configuration;
+    const auto add = [&](ByteView nal) {
+        if (nal.size() > 2 && isSet(nal))
+            configuration.sets.emplace_back(nal.begin(), nal.end());
+    };
+    if (extradata.size() > kArrays && extradata[0] == 1) {
+        configuration.lengthSize = (extradata[kArrays - 1] & 3) + 1;
+        std::size_t at = kArrays + 1;
+        for (int arrays = extradata[kArrays]; arrays > 0; --arrays) {
+            if (at + 3 > extradata.size())
+                return std::nullopt;
+            int count = extradata[at + 1] << 8 | extradata[at + 2];
+            at += 3;
+            for (; count > 0; --count) {
+                if (at + 2 > extradata.size())
+                    return std::nullopt;
+                const std::size_t size = static_cast<std::size_t>(extradata[at]) << 8 | extradata[at + 1];
+                at += 2;
+                if (size > extradata.size() - at)
+                    return std::nullopt;
+                add(extradata.subspan(at, size));
+                at += size;
+            }
+        }
+    } else {
+        for (const ByteView nal : unitsBetweenStartCodes(extradata))
+            add(nal);
+    }
+    for (const Unit unit : {Unit::Vps, Unit::Sps, Unit::Pps})
+        if (std::none_of(configuration.sets.begin(), configuration.sets.end(),
+                         [unit](const Bytes& set) { return unitOf(set) == unit; }))
+            return std::nullopt;
+    return configuration;
+}
+
+} // namespace ffmpeg::hevc

@@ -1,0 +1,197 @@
+#include "linux/ffmpeg/exporting/video/HevcSplicer.h"
+
+#include "linux/ffmpeg/exporting/CannotCopy.h"
+#include "linux/ffmpeg/exporting/video/NalUnits.h"
+
+#include <algorithm>
+#include <array>
+
+namespace ffmpeg {
+
+using hevc::Unit;
+
+namespace {
+
+constexpr std::uint32_t kMostSets = 16; ///< of the two kinds whose numbers end there
+constexpr int kStartCodes = 0;
+
+/// The lowest number from `first` to `last` that is free.
+std::optional<std::uint32_t> freeId(const std::set<std::uint32_t>& taken, std::uint32_t first, std::uint32_t last)
+{
+    for (std::uint32_t id = first; id <= last; ++id)
+        if (!taken.contains(id))
+            return id;
+    return std::nullopt;
+}
+
+} // namespace
+
+base::Result<std::unique_ptr<Splicer>> HevcSplicer::make(const AVStream& stream)
+{
+    auto header = hevc::Configuration::parse(extradataOf(*stream.codecpar));
+    if (!header)
+        return cannotCopy("its parameter sets are not in the file's header");
+    for (const Bytes& set : header->sets)
+        if (hevc::unitOf(set) == Unit::Sps && !hevc::parseSps(set))
+            return cannotCopy("a parameter set is damaged, or has layers");
+    std::unique_ptr<HevcSplicer> splicer(new HevcSplicer);
+    splicer->m_header = std::move(*header);
+    return std::unique_ptr<Splicer>(std::move(splicer));
+}
+
+std::vector<ByteView> HevcSplicer::unitsIn(const AVPacket& packet) const
+{
+    auto units = m_header.lengthSize == 0
+                     ? unitsBetweenStartCodes(payloadOf(packet))
+                     : unitsBehindLengths(payloadOf(packet), m_header.lengthSize).value_or(std::vector<ByteView>{});
+    std::erase_if(units, [](ByteView nal) { return nal.size() <= 2; });
+    return units;
+}
+
+/// Pictures of other kinds of keyframes may be shown before them, and need what stands before them.
+bool HevcSplicer::isJoint(const AVPacket& keyframe) const
+{
+    const auto units = unitsIn(keyframe);
+    return std::any_of(units.begin(), units.end(), [](ByteView nal) {
+        return hevc::unitOf(nal) == Unit::IdrWithLeading || hevc::unitOf(nal) == Unit::Idr;
+    });
+}
+
+int HevcSplicer::reorderDepth() const
+{
+    std::uint32_t depth = 0;
+    for (const Bytes& set : m_header.sets)
+        if (hevc::unitOf(set) == Unit::Sps)
+            depth = std::max(depth, hevc::parseSps(set)->reorderPictures);
+    return static_cast<int>(std::min<std::uint32_t>(depth, 16));
+}
+
+void HevcSplicer::see(const AVPacket& copied)
+{
+    for (const ByteView nal : unitsIn(copied))
+        if (hevc::unitOf(nal) <= Unit::LastPicture)
+            m_usedPps.insert(hevc::ppsOfSlice(nal));
+}
+
+/// Without those that nothing refers to: otherwise each export of an export would leave some more behind.
+std::vector<Bytes> HevcSplicer::usedSets() const
+{
+    if (m_usedPps.empty())
+        return m_header.sets;
+    std::set<std::uint32_t> sps;
+    std::set<std::uint32_t> vps;
+    for (const Bytes& set : m_header.sets)
+        if (hevc::unitOf(set) == Unit::Pps && m_usedPps.contains(hevc::idsOfPps(set).pps))
+            sps.insert(hevc::idsOfPps(set).sps);
+    for (const Bytes& set : m_header.sets)
+        if (hevc::unitOf(set) == Unit::Sps && sps.contains(hevc::parseSps(set)->id))
+            vps.insert(hevc::parseSps(set)->vps);
+    std::vector<Bytes> used = m_header.sets;
+    std::erase_if(used, [&](const Bytes& set) {
+        switch (hevc::unitOf(set)) {
+        case Unit::Vps:
+            return !vps.contains(hevc::idOfVps(set));
+        case Unit::Sps:
+            return !sps.contains(hevc::parseSps(set)->id);
+        default:
+            return !m_usedPps.contains(hevc::idsOfPps(set).pps);
+        }
+    });
+    return used;
+}
+
+base::Result<void> HevcSplicer::prepare(EncoderRequest& request, int /*reorderDepth*/)
+{
+    std::array<std::set<std::uint32_t>, 3> taken;
+    for (const Bytes& set : m_header.sets) {
+        if (hevc::unitOf(set) == Unit::Vps)
+            taken[0].insert(hevc::idOfVps(set));
+        else if (hevc::unitOf(set) == Unit::Sps)
+            taken[1].insert(hevc::parseSps(set)->id);
+        else
+            taken[2].insert(hevc::idsOfPps(set).pps);
+    }
+    const auto vps = freeId(taken[0], 1, kMostSets - 1);
+    const auto sps = freeId(taken[1], 1, kMostSets - 1);
+    const auto pps = freeId(taken[2], hevc::kFirstMovablePps, hevc::kLastMovablePps);
+    if (!vps || !sps || !pps)
+        return cannotCopy("all ids of parameter sets are taken");
+    m_ids = {*vps, *sps, *pps};
+    request.encoder = "libx265";
+    // Nearly without loss: it stands beside untouched pictures.
+    request.options = {{"preset", "veryfast"},
+                       {"x265-params", "crf=8:bframes=0:scenecut=0:open-gop=0:ref=1:cutree=0:info=0:aud=0:hrd=0:"
+                                       "repeat-headers=0:log-level=none"}};
+    return {};
+}
+
+base::Result<void> HevcSplicer::join(const AVCodecContext& encoder)
+{
+    const auto header =
+        hevc::Configuration::parse({encoder.extradata, static_cast<std::size_t>(encoder.extradata_size)});
+    if (!header)
+        return cannotCopy("the encoder did not tell its parameter sets");
+    for (const Bytes& set : header->sets) {
+        auto own = hevc::renumbered(set, m_ids);
+        if (!own)
+            return cannotCopy("the encoder's parameter sets make no sense");
+        m_encoderSets.push_back(std::move(*own));
+    }
+    return {};
+}
+
+base::Result<void> HevcSplicer::describe(AVCodecParameters& parameters)
+{
+    std::vector<Bytes> all = usedSets();
+    all.insert(all.end(), m_encoderSets.begin(), m_encoderSets.end());
+    std::stable_sort(all.begin(), all.end(),
+                     [](const Bytes& a, const Bytes& b) { return hevc::unitOf(a) < hevc::unitOf(b); });
+    Bytes bytes;
+    for (const Bytes& set : all) {
+        bytes.insert(bytes.end(), {0, 0, 0, 1});
+        bytes.insert(bytes.end(), set.begin(), set.end());
+    }
+    av_freep(&parameters.extradata);
+    parameters.extradata_size = 0;
+    parameters.extradata = static_cast<std::uint8_t*>(av_mallocz(bytes.size() + AV_INPUT_BUFFER_PADDING_SIZE));
+    if (!parameters.extradata)
+        return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
+    std::copy(bytes.begin(), bytes.end(), parameters.extradata);
+    parameters.extradata_size = static_cast<int>(bytes.size());
+    parameters.codec_tag = MKTAG('h', 'v', 'c', '1');
+    return {};
+}
+
+base::Result<void> HevcSplicer::adoptCopied(AVPacket& packet)
+{
+    std::vector<ByteView> units = unitsIn(packet);
+    for (const ByteView nal : units) {
+        const auto isSame = [&](const Bytes& set) {
+            return std::equal(set.begin(), set.end(), nal.begin(), nal.end());
+        };
+        if (hevc::isSet(nal) && std::none_of(m_header.sets.begin(), m_header.sets.end(), isSame))
+            return cannotCopy("its parameter sets change on the way");
+    }
+    std::erase_if(units, [](ByteView nal) { return hevc::isSet(nal) || hevc::unitOf(nal) == Unit::Delimiter; });
+    if (units.empty() || !replacePayload(packet, units, kStartCodes))
+        return cannotCopy("a packet is damaged");
+    return {};
+}
+
+base::Result<void> HevcSplicer::adoptEncoded(AVPacket& packet)
+{
+    std::vector<Bytes> slices;
+    for (const ByteView nal : unitsBetweenStartCodes(payloadOf(packet))) {
+        if (nal.size() <= 2 || hevc::unitOf(nal) > Unit::LastPicture)
+            continue;
+        auto slice = hevc::renumberedSlice(nal, m_ids.pps);
+        if (!slice)
+            return cannotCopy("the encoder's slices make no sense");
+        slices.push_back(std::move(*slice));
+    }
+    if (!replacePayload(packet, std::vector<ByteView>(slices.begin(), slices.end()), kStartCodes))
+        return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
+    return {};
+}
+
+} // namespace ffmpeg

@@ -1,0 +1,38 @@
+/// Joins HEVC with what x265 encodes: its parameter sets are given numbers of their own, and stand beside the stream's.
+#pragma once
+
+#include "linux/ffmpeg/exporting/video/HevcHeaders.h"
+#include "linux/ffmpeg/exporting/video/Splicer.h"
+
+#include <set>
+
+namespace ffmpeg {
+
+/// Its packets and its header have start codes; the muxer makes lengths of them.
+class HevcSplicer final : public Splicer {
+public:
+    static base::Result<std::unique_ptr<Splicer>> make(const AVStream& stream);
+
+    bool isJoint(const AVPacket& keyframe) const override;
+    int reorderDepth() const override;
+    bool wantsToSee() const override { return m_header.sets.size() > 3; }
+    void see(const AVPacket& copied) override;
+    base::Result<void> prepare(EncoderRequest& request, int reorderDepth) override;
+    base::Result<void> join(const AVCodecContext& encoder) override;
+    base::Result<void> describe(AVCodecParameters& parameters) override;
+    base::Result<void> adoptCopied(AVPacket& packet) override;
+    base::Result<void> adoptEncoded(AVPacket& packet) override;
+
+private:
+    HevcSplicer() = default;
+
+    std::vector<ByteView> unitsIn(const AVPacket& packet) const;
+    std::vector<Bytes> usedSets() const;
+
+    hevc::Configuration m_header;
+    std::set<std::uint32_t> m_usedPps; ///< empty when nobody looked
+    hevc::Ids m_ids;                   ///< the encoder's
+    std::vector<Bytes> m_encoderSets;
+};
+
+} // namespace ffmpeg
