@@ -29,12 +29,16 @@ bool isSilent(const Planes& sound, std::int64_t from, std::int64_t until)
            });
 }
 
-void silence(AacPiece& piece, std::int64_t from, std::int64_t until)
+void silenceBefore(AacPiece& piece, std::int64_t place)
 {
-    from = std::clamp<std::int64_t>(from - piece.at, 0, kAacFrame);
-    until = std::clamp<std::int64_t>(until - piece.at, 0, kAacFrame);
     for (auto& plane : piece.sound)
-        std::fill(plane.begin() + from, plane.begin() + std::max(from, until), 0.0f);
+        std::fill_n(plane.begin(), std::clamp<std::int64_t>(place - piece.at, 0, kAacFrame), 0.0f);
+}
+
+void silenceFrom(AacPiece& piece, std::int64_t place)
+{
+    for (auto& plane : piece.sound)
+        std::fill(plane.begin() + std::clamp<std::int64_t>(place - piece.at, 0, kAacFrame), plane.end(), 0.0f);
 }
 
 /// What MP4 carries and its players know.
@@ -168,7 +172,7 @@ std::optional<CopiedTrack::Refusal> CopiedTrack::prepareEnd()
     if (isQuiet)
         return std::nullopt;
     for (AacPiece& piece : pieces)
-        silence(piece, m_until, INT64_MAX);
+        silenceFrom(piece, m_until);
     auto joint = AacJoints(m_packets->parameters()).atEnd(pieces, last);
     if (!joint)
         return Refusal{"its packets cannot be joined to encoded ones at the end", 0};
@@ -210,7 +214,7 @@ std::optional<CopiedTrack::Refusal> CopiedTrack::prepareStart()
             copied = first == 0 ? 0 : first - 1;
         } else {
             for (AacPiece& piece : pieces)
-                silence(piece, INT64_MIN, m_from);
+                silenceBefore(piece, m_from);
             auto joint = AacJoints(m_packets->parameters()).atStart(pieces, first);
             if (!joint)
                 return Refusal{"its packets cannot be joined to encoded ones at the start", 0};
