@@ -1,0 +1,152 @@
+// Parameter sets as x264 and x265 write them, read and written anew.
+#include "linux/ffmpeg/exporting/ExportTest.h"
+#include "linux/ffmpeg/exporting/video/H264Headers.h"
+#include "linux/ffmpeg/exporting/video/HevcHeaders.h"
+#include "linux/ffmpeg/exporting/video/HiddenPictures.h"
+#include "linux/ffmpeg/exporting/video/NalUnits.h"
+
+#include <random>
+
+namespace tests {
+namespace {
+
+namespace h264 = ffmpeg::h264;
+namespace hevc = ffmpeg::hevc;
+
+TEST(Bits, ComeBackAsTheyWereWritten)
+{
+    std::mt19937 random(3);
+    ffmpeg::BitWriter out;
+    std::vector<std::uint32_t> values;
+    for (int i = 0; i < 1000; ++i) {
+        values.push_back(static_cast<std::uint32_t>(random() >> (random() % 31 + 1)));
+        out.ue(values.back());
+    }
+    out.finish();
+    ffmpeg::BitReader in(out.bytes());
+    for (const std::uint32_t value : values)
+        ASSERT_EQ(in.ue(), value);
+    EXPECT_FALSE(in.isBeyond());
+    in.bits(32);
+    EXPECT_TRUE(in.isBeyond());
+}
+
+TEST(Bits, HoldNoStartCode)
+{
+    const ffmpeg::Bytes payload{7, 0, 0, 0, 0, 0, 1, 0, 0, 3, 9, 0, 0, 2};
+    const ffmpeg::Bytes nal = ffmpeg::withEmulation(payload);
+    for (std::size_t i = 0; i + 2 < nal.size(); ++i)
+        EXPECT_FALSE(nal[i] == 0 && nal[i + 1] == 0 && nal[i + 2] < 3);
+    EXPECT_EQ(ffmpeg::withoutEmulation(nal), payload);
+}
+
+class Headers : public ExportTest {
+protected:
+    ffmpeg::Bytes headerOf(const std::string& name)
+    {
+        DecodedMovie movie(exportMovie(name));
+        const auto view = ffmpeg::extradataOf(*movie.stream().codecpar);
+        return {view.begin(), view.end()};
+    }
+};
+
+TEST_F(Headers, OfH264AreReadAndKeptAsTheyAre)
+{
+    for (const char* name : {"h264-b.mp4", "h264-444.mp4", "h264-10bit.mp4", "h264-baseline.mp4"}) {
+        const ffmpeg::Bytes header = headerOf(name);
+        const auto configuration = h264::Configuration::parse(header);
+        ASSERT_TRUE(configuration) << name;
+        EXPECT_EQ(configuration->bytes(), header) << name;
+        EXPECT_TRUE(h264::parseSps(configuration->sps.front())->restriction);
+    }
+    const auto b = h264::Configuration::parse(headerOf("h264-b.mp4"));
+    EXPECT_EQ(h264::parseSps(b->sps.front())->restriction->reorderFrames, 2U);
+}
+
+TEST_F(Headers, OfH264SayHowFarPicturesAreReordered)
+{
+    const auto configuration = h264::Configuration::parse(headerOf("h264-b.mp4"));
+    const ffmpeg::Bytes& sps = configuration->sps.front();
+    EXPECT_EQ(h264::withRestriction(sps, *h264::parseSps(sps)->restriction), sps) << "the same written again";
+    const auto changed = h264::withRestriction(sps, {1, 5});
+    ASSERT_TRUE(changed);
+    EXPECT_EQ(h264::parseSps(*changed)->restriction->reorderFrames, 1U);
+    EXPECT_EQ(h264::parseSps(*changed)->restriction->bufferedFrames, 5U);
+    EXPECT_EQ(h264::parseSps(*changed)->level, h264::parseSps(sps)->level);
+}
+
+TEST_F(Headers, ThatAreDamagedAreRefused)
+{
+    const ffmpeg::Bytes h264Header = headerOf("h264-b.mp4");
+    const ffmpeg::Bytes hevcHeader = headerOf("hevc.mp4");
+    for (std::size_t size = 0; size < h264Header.size() - 4; ++size)
+        h264::Configuration::parse(ffmpeg::ByteView(h264Header).first(size));
+    for (std::size_t size = 0; size < hevcHeader.size(); ++size)
+        hevc::Configuration::parse(ffmpeg::ByteView(hevcHeader).first(size));
+    std::mt19937 random(5);
+    for (int i = 0; i < 2000; ++i) {
+        ffmpeg::Bytes one = h264Header;
+        ffmpeg::Bytes other = hevcHeader;
+        one[random() % one.size()] = static_cast<std::uint8_t>(random());
+        other[random() % other.size()] = static_cast<std::uint8_t>(random());
+        if (const auto found = h264::Configuration::parse(one))
+            for (const auto& set : found->sps)
+                h264::withRestriction(set, {1, 2});
+        if (const auto found = hevc::Configuration::parse(other))
+            for (const auto& set : found->sets)
+                hevc::renumbered(set, {1, 1, 15});
+        ffmpeg::picturesOfAv1(other);
+        ffmpeg::picturesOfVp9(one);
+    }
+    EXPECT_FALSE(h264::Configuration::parse(ffmpeg::ByteView(h264Header).first(20)));
+}
+
+TEST_F(Headers, OfHevcGetOtherNumbers)
+{
+    const auto configuration = hevc::Configuration::parse(headerOf("hevc.mp4"));
+    ASSERT_TRUE(configuration);
+    for (const ffmpeg::Bytes& set : configuration->sets) {
+        const auto changed = hevc::renumbered(set, {3, 7, 20});
+        ASSERT_TRUE(changed);
+        EXPECT_EQ(hevc::unitOf(*changed), hevc::unitOf(set));
+        if (hevc::unitOf(set) == hevc::Unit::Vps) {
+            EXPECT_EQ(hevc::idOfVps(*changed), 3U);
+        }
+        if (hevc::unitOf(set) == hevc::Unit::Sps) {
+            EXPECT_EQ(hevc::parseSps(*changed)->id, 7U);
+            EXPECT_EQ(hevc::parseSps(*changed)->vps, 3U);
+        }
+        if (hevc::unitOf(set) == hevc::Unit::Pps) {
+            EXPECT_EQ(hevc::idsOfPps(*changed).pps, 20U);
+            EXPECT_EQ(hevc::idsOfPps(*changed).sps, 7U);
+        }
+        EXPECT_EQ(hevc::renumbered(*changed, {0, 0, 0}), set) << "and back";
+    }
+}
+
+TEST_F(Headers, OfExportsOfExportsDoNotPileUp)
+{
+    for (const char* name : {"h264-b.mp4", "hevc.mp4"}) {
+        std::string from = exportMovie(name);
+        for (int i = 0; i < 5; ++i) {
+            const std::string to = output(std::to_string(i) + name);
+            ASSERT_EQ(cut(from, to, fromTo(0.2, 10)), ExportStatus::Completed) << errorText();
+            from = to;
+            const Complaints complaints;
+            DecodedMovie decoded(from);
+            const auto pictures = decoded.all();
+            EXPECT_EQ(Complaints::texts(), "");
+            EXPECT_EQ(pictures.size(), (std::string(name) == "hevc.mp4" ? 120U : 150U) - unsigned(i + 1) * 6);
+            EXPECT_EQ(pictures.front().number, (i + 1) * 6);
+            const auto header = ffmpeg::extradataOf(*decoded.stream().codecpar);
+            if (const auto found = h264::Configuration::parse(header))
+                EXPECT_LE(found->sps.size(), 3U);
+            else
+                EXPECT_LE(hevc::Configuration::parse(header)->sets.size(), 9U);
+        }
+    }
+    EXPECT_FALSE(saysEncodedAsAWhole());
+}
+
+} // namespace
+} // namespace tests
