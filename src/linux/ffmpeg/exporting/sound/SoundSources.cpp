@@ -111,7 +111,8 @@ std::unique_ptr<SampleSource> Opening::samplesOf(std::unique_ptr<TrackPackets> p
     if (!samples)
         tell(track, "is left out: it cannot be decoded");
     else if (samples->isEmpty() && !isSet(m_cancelled)) {
-        tell(track, "is left out: there is no sound of it in the range");
+        tell(track, samples->isDamaged() ? "is left out: nothing of it can be decoded"
+                                         : "is left out: there is no sound of it in the range");
         return nullptr;
     }
     return samples;

@@ -71,7 +71,9 @@ int TrackSamples::decodeUntil(std::int64_t wanted)
         placeWaiting();
         drainResampler();
     }
-    if (std::exchange(m_isDamaged, false) && m_tell) {
+    // Of a track with nothing in it, whoever asks isEmpty() says so.
+    const bool hasSound = !m_blocks.empty() || m_hasGiven;
+    if (m_isDamaged && hasSound && m_tell) {
         m_tell("cannot be decoded everywhere; it is silent there");
         m_tell = nullptr;
     }
@@ -244,6 +246,7 @@ int TrackSamples::read(Planes& into, int count)
         m_blocks.pop_front();
     }
     m_next = until;
+    m_hasGiven = m_hasGiven || length > 0;
     return static_cast<int>(length);
 }
 

@@ -22,6 +22,8 @@ public:
 
     /// Whether there is no sound in the range; looks for the first.
     bool isEmpty();
+    /// Whether a part of what was read so far could not be decoded.
+    bool isDamaged() const { return m_isDamaged; }
 
     int rate() const override { return m_rate; }
     int channels() const override { return m_channels; }
@@ -57,6 +59,7 @@ private:
     Owned<AVPacket> m_packet;
     bool m_hasEnded = false;
     bool m_isDamaged = false;
+    bool m_hasGiven = false;
     std::vector<Owned<AVFrame>> m_waiting; ///< until enough are known to place the first
     std::unique_ptr<Placement> m_placement;
     int m_placedRate = 0;

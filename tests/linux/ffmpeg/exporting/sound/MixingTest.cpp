@@ -153,6 +153,43 @@ TEST_F(Mixing, TracksOfOtherRatesLayoutsStartsAndLengthsMeetInTheirPlaces)
     }
 }
 
+TEST_F(Mixing, AfterTenMinutesTheTracksAreStillInTheirPlaces)
+{
+    // A short tone every minute; the second track's half a minute later, at a rate that has to be changed.
+    const auto clicks = [](double offset) {
+        return [=](double seconds, int) {
+            const double within = std::fmod(seconds + offset, 60);
+            return within < 0.02 ? 0.4 * std::sin(2 * std::numbers::pi * 500 * within) : 0.0;
+        };
+    };
+    makeSoundFile(path("long.mp4"),
+                  {track(clicks(0), "aac", 16000, 1, 600), track(clicks(30), "libmp3lame", 11025, 1, 600)});
+    mix("long.mp4");
+    const DecodedSound sources[] = {decodeSound(path("long.mp4"), 0), decodeSound(path("long.mp4"), 1)};
+    const auto mixed = decodeSound(path("mix.mp4"));
+    ASSERT_EQ(mixed.rate, 16000);
+    const auto placeIn = [](const DecodedSound& sound, double around) {
+        double best = 0;
+        double found = 0;
+        const auto from = std::llround((around - 0.2) * sound.rate);
+        for (std::int64_t at = from; at < from + sound.rate * 2 / 5; ++at) {
+            double sum = 0;
+            for (std::int64_t i = 0; i < sound.rate / 50; ++i)
+                sum += static_cast<double>(sound.at(at + i, 0))
+                       * std::sin(2 * std::numbers::pi * 500 * static_cast<double>(i) / sound.rate);
+            if (sum > best) {
+                best = sum;
+                found = static_cast<double>(at) / sound.rate;
+            }
+        }
+        return found;
+    };
+    for (const int minute : {1, 5, 9}) {
+        EXPECT_NEAR(placeIn(mixed, minute * 60), placeIn(sources[0], minute * 60), 0.001) << minute;
+        EXPECT_NEAR(placeIn(mixed, minute * 60 + 30), placeIn(sources[1], minute * 60 + 30), 0.001) << minute;
+    }
+}
+
 TEST_F(Mixing, ADamagedTrackIsNamedAndTheOthersAreHeard)
 {
     makeSoundFile(path("good.mkv"), {track(tone(440, 0.2)), track(tone(1000, 0.2), "flac"), track(tone(3000, 0.1))});
