@@ -171,6 +171,7 @@ TEST_F(KeepingSound, AGapInTheSoundStaysAGap)
             if (packet->pts >= 48 * 1024)
                 packet->pts = packet->dts += 48000;
             av_write_frame(output, packet.get());
+            av_packet_unref(packet.get());
         }
         av_write_trailer(output);
         avio_closep(&output->pb);

@@ -216,6 +216,7 @@ TEST_F(Mixing, ADamagedTrackIsNamedAndTheOthersAreHeard)
                     packet->data[i] = static_cast<std::uint8_t>(i * 31 + 7);
             }
             av_write_frame(output, packet.get());
+            av_packet_unref(packet.get());
         }
         av_write_trailer(output);
         avio_closep(&output->pb);
