@@ -14,8 +14,9 @@ import report
 import seeking
 import start
 import thumbnails
+import trimming
 
-KINDS = ("start", "seek", "scrub", "play", "memory", "thumbnails", "mix")
+KINDS = ("start", "seek", "scrub", "play", "memory", "thumbnails", "trim", "mix")
 
 
 class Settings:
@@ -64,6 +65,8 @@ def main():
             memory.measure(settings, settings.movie("hour-4k.mp4"))
         elif kind == "mix":
             mixing.measure(settings, (own or [settings.movie("ten-minutes-two-tracks.mp4")])[0])
+        elif kind == "trim":
+            trimming.measure(settings, (own or [settings.movie("ten-minutes-1080p60.mp4")])[0])
         elif kind == "thumbnails":
             thumbnails.measure(settings, (own or [settings.movie("ten-minutes-1080p60.mp4")])[0])
 
