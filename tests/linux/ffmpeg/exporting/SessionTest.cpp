@@ -113,6 +113,28 @@ TEST_F(AnExport, DoesNotReplaceALinkThatLeadsNowhere)
     EXPECT_TRUE(std::filesystem::is_symlink(output()));
 }
 
+TEST_F(AnExport, DoesNotReplaceAFileThatComesMeanwhile)
+{
+    ASSERT_EQ(open(exportMovie("h264.mp4")), Status::ReadyToPlay);
+    ffmpeg::ExportJob job{std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie(),
+                          output(),
+                          fromTo(1, 2),
+                          std::nullopt,
+                          std::make_shared<std::atomic<bool>>(false),
+                          {},
+                          &log};
+    job.progress = [&](double) { std::ofstream(output()) << "mine"; };
+    for (const auto& calls : {std::vector<RefusedSystemCall>{}, std::vector<RefusedSystemCall>{noUnnamedFiles()}}) {
+        base::Result<void> result;
+        whileRefusing(calls, [&] { result = job.run(); });
+        ASSERT_FALSE(result);
+        EXPECT_THAT(result.error()->description(), HasSubstr("File exists"));
+        EXPECT_EQ(bytesOf(output()), "mine");
+        EXPECT_EQ(files(), std::vector<std::string>{"out.mp4"});
+        std::filesystem::remove(output());
+    }
+}
+
 TEST_F(AnExport, NeedsSomewhereToWriteTo)
 {
     EXPECT_EQ(cut(exportMovie("h264.mp4"), directory + "/none/out.mp4", fromTo(1, 2)), ExportStatus::Failed);
