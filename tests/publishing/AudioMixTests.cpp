@@ -25,6 +25,15 @@ protected:
     base::ErrorRef error;
     std::thread::id completedOn;
 
+    /// A session that runs lives until it ends.
+    void TearDown() override
+    {
+        fake.machine.drain();
+        if (const auto session = fake.media.exportSession(); session && session->isRunning())
+            session->finish(ExportSession::Status::Completed);
+        fake.machine.drain();
+    }
+
     void movieWithSoundTracks(int count)
     {
         fake.media.movies[kMovie] = tests::FakeMovie::lasting(10, {640, 360}, count);
@@ -102,6 +111,7 @@ TEST_F(AudioMix, TwoCallsInOneSecondHaveTheSameOutput)
     const auto second = fake.media.exportSession();
     EXPECT_NE(first, second);
     EXPECT_EQ(first->outputURL(), second->outputURL());
+    first->finish(ExportSession::Status::Completed);
 }
 
 TEST_F(AudioMix, SuccessGivesTheOutputAndNoError)
