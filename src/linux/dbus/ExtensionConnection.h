@@ -36,8 +36,8 @@ public:
     void setDisconnectedHandler(std::function<void()> handler);
 
     /// What the host hands over; fetched once, then remembered. Contents are loaded by the attachments: they complete
-    /// on a worker of the connection, in the order in which the host answers, which is the order in which they were
-    /// asked for unless one takes the host long. Text is a `std::string`, a colour a `platform::Color`; anything else,
+    /// on a worker of the connection, each when its answer has come: usually, but not always, in the order in which they
+    /// were asked for. Text is a `std::string`, a colour a `platform::Color`; anything else,
     /// text above 1 MiB and replies of a wrong form are errors of that attachment alone.
     base::Result<std::vector<platform::InputItem>> inputItems();
 
