@@ -7,7 +7,6 @@
 #include <cerrno>
 #include <cstdio>
 #include <filesystem>
-#include <future>
 #include <system_error>
 
 namespace host {
@@ -15,32 +14,10 @@ namespace host {
 namespace {
 
 namespace fs = std::filesystem;
-using platform::ExportSession;
 
 base::ErrorRef refused(const std::string& why)
 {
     return base::Error::make(dbus::kBadInputDomain, EEXIST, why);
-}
-
-/// Runs the session to its end; whatever it has written is gone, or under its name, when this returns.
-base::ErrorRef run(MediaTool& tool, const std::shared_ptr<ExportSession>& session, const ExportOrder& order)
-{
-    ProgressBar progress(order.doing);
-    const auto ended = std::make_shared<std::promise<void>>();
-    const auto end = ended->get_future();
-    const auto hasEnded = std::make_shared<bool>(false);
-    base::MainQueue& main = tool.system().mainQueue;
-    session->exportAsynchronously([&main, hasEnded, ended] {
-        main.post([hasEnded] { *hasEnded = true; });
-        ended->set_value();
-    });
-    if (!tool.runUntil([&] { return *hasEnded; }, [&] { progress.show(session->progress()); })) {
-        session->cancelExport();
-        end.wait();
-    }
-    if (session->status() == ExportSession::Status::Cancelled)
-        return base::Error::fromErrno(ECANCELED, "cannot export the movie");
-    return session->error();
 }
 
 base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
@@ -66,7 +43,8 @@ base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
     session->setOutputURL(base::Url::fromPath(written.native()));
     session->setOutputFileType(platform::FileType::Mpeg4);
     order.setUp(*session, *asset.value());
-    if (base::ErrorRef failure = run(tool, session, order))
+    ProgressBar progress(order.doing);
+    if (base::ErrorRef failure = tool.runExport(*session, [&] { progress.show(session->progress()); }))
         return failure;
     if (isThere) {
         fs::rename(written, output, error);

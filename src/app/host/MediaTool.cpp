@@ -54,8 +54,14 @@ struct MediaTool::Machine {
     base::WorkerQueue background;
     base::WorkerQueue standard;
     base::System system{log, clock, mainQueue, background, standard};
+    base::WorkList works;
     runtime::NotificationCenter center;
-    ffmpeg::FFmpegMediaFramework media{system, center, {}};
+    ffmpeg::FFmpegMediaFramework media{system, center, {{}, {}, &works}};
+
+    Machine()
+    {
+        works.setChangeHandler([this] { ::eventfd_write(woken.get(), 1); });
+    }
 
     void wait(std::optional<base::Instant> limit)
     {
@@ -72,7 +78,10 @@ struct MediaTool::Machine {
 
 MediaTool::MediaTool() : m_machine(std::make_unique<Machine>()) {}
 
-MediaTool::~MediaTool() = default;
+MediaTool::~MediaTool()
+{
+    finishWork();
+}
 
 const base::System& MediaTool::system() const
 {
@@ -126,6 +135,35 @@ bool MediaTool::runUntil(const std::function<bool()>& done, const std::function<
         machine.wait(limit);
     }
     return false;
+}
+
+base::ErrorRef MediaTool::runExport(platform::ExportSession& session, const std::function<void()>& meanwhile)
+{
+    session.exportAsynchronously([] {});
+    if (!runUntil([this] { return m_machine->works.isEmpty(); }, meanwhile)) {
+        session.cancelExport();
+        finishWork();
+    }
+    switch (session.status()) {
+    case platform::ExportSession::Status::Completed:
+        return nullptr;
+    case platform::ExportSession::Status::Failed:
+        return session.error();
+    default:
+        return base::Error::fromErrno(ECANCELED, "cannot export the movie");
+    }
+}
+
+/// Runs the main queue until nothing is under way that uses it, whatever signals come.
+void MediaTool::finishWork()
+{
+    Machine& machine = *m_machine;
+    while (!machine.works.isEmpty()) {
+        machine.mainQueue.runDue();
+        if (!machine.works.isEmpty())
+            machine.wait(machine.mainQueue.untilNext());
+    }
+    machine.mainQueue.drain();
 }
 
 int MediaTool::interruption() const

@@ -31,6 +31,9 @@ public:
     /// Runs the main queue until `done` holds. False when a signal came first, now or in an earlier call: what is under
     /// way must be given up then. `meanwhile`, if there is one, is called about ten times a second.
     bool runUntil(const std::function<bool()>& done, const std::function<void()>& meanwhile = {});
+    /// Starts `session` and runs the main queue until it has ended and its file is whole or gone. A signal cancels it,
+    /// and is told as ECANCELED. Null when the movie is there.
+    base::ErrorRef runExport(platform::ExportSession& session, const std::function<void()>& meanwhile);
     /// The signal that came; 0 when none did.
     int interruption() const;
 
@@ -40,6 +43,8 @@ public:
 
 private:
     struct Machine;
+
+    void finishWork();
 
     std::unique_ptr<Machine> m_machine;
 };

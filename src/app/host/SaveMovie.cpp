@@ -20,7 +20,6 @@ namespace host {
 namespace {
 
 namespace fs = std::filesystem;
-using platform::ExportSession;
 
 /// How much of the time that a save takes goes into the mix; what is left is copying.
 constexpr double kMixPart = 0.9;
@@ -42,20 +41,8 @@ base::ErrorRef mix(MediaTool& tool, const std::shared_ptr<platform::Asset>& asse
     session->setOutputFileType(platform::FileType::Mpeg4);
     session->setAudioMix(std::move(mix));
 
-    bool hasEnded = false;
-    const auto ended = std::make_shared<std::promise<void>>();
-    const auto end = ended->get_future();
-    base::MainQueue& main = tool.system().mainQueue;
-    session->exportAsynchronously([&main, &hasEnded, ended] {
-        main.post([&hasEnded] { hasEnded = true; });
-        ended->set_value();
-    });
-    if (!tool.runUntil([&] { return hasEnded; }, [&] { progress.show(kMixPart * session->progress()); })) {
-        session->cancelExport();
-        end.wait(); // its file must be gone before its directory
-        return interrupted();
-    }
-    return session->status() == ExportSession::Status::Completed ? nullptr : session->error();
+    // Its file must be gone before its directory, when it is given up.
+    return tool.runExport(*session, [&] { progress.show(kMixPart * session->progress()); });
 }
 
 /// The first picture, for the file managers; nothing where there is none. It must not keep a save from ending.
