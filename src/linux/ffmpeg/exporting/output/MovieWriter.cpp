@@ -130,6 +130,7 @@ private:
         context->io_open = openAgain;
         context->io_close2 = closeAgain;
         context->flags |= AVFMT_FLAG_CUSTOM_IO;
+        context->flush_packets = 0; // the buffer is written when it is full, not behind each packet
         context->strict_std_compliance = FF_COMPLIANCE_EXPERIMENTAL; // for FLAC, which players know by now
         context->avoid_negative_ts = AVFMT_AVOID_NEG_TS_DISABLED;    // an edit list hides what is before 0
         copyMetadata(*context);
