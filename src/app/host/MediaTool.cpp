@@ -78,10 +78,7 @@ struct MediaTool::Machine {
 
 MediaTool::MediaTool() : m_machine(std::make_unique<Machine>()) {}
 
-MediaTool::~MediaTool()
-{
-    finishWork();
-}
+MediaTool::~MediaTool() = default;
 
 const base::System& MediaTool::system() const
 {
@@ -140,10 +137,9 @@ bool MediaTool::runUntil(const std::function<bool()>& done, const std::function<
 base::ErrorRef MediaTool::runExport(platform::ExportSession& session, const std::function<void()>& meanwhile)
 {
     session.exportAsynchronously([] {});
-    if (!runUntil([this] { return m_machine->works.isEmpty(); }, meanwhile)) {
+    if (!runUntil([this] { return m_machine->works.isEmpty(); }, meanwhile))
         session.cancelExport();
-        finishWork();
-    }
+    finishWork();
     switch (session.status()) {
     case platform::ExportSession::Status::Completed:
         return nullptr;

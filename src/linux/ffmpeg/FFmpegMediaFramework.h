@@ -24,7 +24,8 @@ struct Options {
     std::function<std::string(const std::string&)> resolvePath;
     /// The device that is heard. Empty plays silently, by the system's clock.
     MakeAudioOutput audioOutput;
-    /// Where each export stands as work, with its progress, until its end has been told. Outlives them; may be null.
+    /// Where each export session stands as work, with its progress, until its end has been told or it goes without having
+    /// been started. Outlives them; may be null.
     base::WorkList* works = nullptr;
     /// By how much the threads that make images stand back: 10 lets a player beside them go first.
     int imageNiceness = 0;

@@ -17,6 +17,9 @@ std::shared_ptr<FFmpegExportSession> FFmpegExportSession::make(const std::shared
 FFmpegExportSession::FFmpegExportSession(std::shared_ptr<Engine> engine, std::shared_ptr<FFmpegAsset> asset)
     : m_engine(std::move(engine)), m_asset(std::move(asset))
 {
+    // Already now: whoever made it is about to start it, and nobody shall leave in between.
+    if (m_engine->options.works)
+        m_underWay = m_engine->options.works->begin();
 }
 
 void FFmpegExportSession::setOutputURL(std::optional<base::Url> url)
@@ -32,8 +35,6 @@ void FFmpegExportSession::exportAsynchronously(std::function<void()> done)
         assert(m_status == Status::Unknown);
         m_status = Status::Waiting;
     }
-    if (m_engine->options.works)
-        m_underWay = m_engine->options.works->begin();
     auto self = std::static_pointer_cast<FFmpegExportSession>(shared_from_this());
     m_asset->whenLoaded([self, done = std::move(done)]() mutable { self->start(std::move(done)); });
 }
