@@ -15,7 +15,9 @@ set(CLIPSA_SANITIZE "" CACHE STRING "Sanitizers to build with: empty, `address,u
 find_package(Threads REQUIRED)
 find_program(CCACHE_PROGRAM ccache)
 if(CCACHE_PROGRAM)
-    set(CMAKE_CXX_COMPILER_LAUNCHER ${CCACHE_PROGRAM})
+    # Paths below the checkout count as relative ones, so that what one build folder compiled serves all of them.
+    set(CMAKE_CXX_COMPILER_LAUNCHER ${CMAKE_COMMAND} -E env CCACHE_BASEDIR=${CMAKE_SOURCE_DIR} CCACHE_NOHASHDIR=1
+                                    ${CCACHE_PROGRAM})
 endif()
 
 add_library(clipsa-compile INTERFACE)

@@ -48,9 +48,9 @@ void removeDirectory(const std::string& path)
 }
 
 /// Takes the lock of a directory: held by nobody else as long as the result lives.
-dbus::FileDescriptor takeLock(int directory)
+posix::FileDescriptor takeLock(int directory)
 {
-    dbus::FileDescriptor lock(::openat(directory, "lock", O_RDWR | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
+    posix::FileDescriptor lock(::openat(directory, "lock", O_RDWR | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
     if (lock && ::flock(lock.get(), LOCK_EX | LOCK_NB) != 0)
         return {};
     return lock;
@@ -58,7 +58,7 @@ dbus::FileDescriptor takeLock(int directory)
 
 bool isDead(const std::string& path)
 {
-    const dbus::FileDescriptor directory(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+    const posix::FileDescriptor directory(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
     struct stat status = {};
     if (!directory || ::fstat(directory.get(), &status) != 0 || status.st_uid != ::geteuid())
         return false;
@@ -69,10 +69,10 @@ bool isDead(const std::string& path)
 }
 
 /// A lock that is held from the moment on which it has its name: nobody can find it free in between.
-base::Result<dbus::FileDescriptor> makeLock(const std::string& directory)
+base::Result<posix::FileDescriptor> makeLock(const std::string& directory)
 {
     const std::string early = directory + "/lock.new";
-    dbus::FileDescriptor lock(::open(early.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, S_IRUSR | S_IWUSR));
+    posix::FileDescriptor lock(::open(early.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, S_IRUSR | S_IWUSR));
     if (!lock || ::flock(lock.get(), LOCK_EX | LOCK_NB) != 0
         || ::rename(early.c_str(), (directory + "/lock").c_str()) != 0)
         return base::Error::fromErrno(errno, "cannot lock " + directory);
@@ -127,7 +127,7 @@ base::Result<EditorDirectory> EditorDirectory::make(const std::string& root)
     return directory;
 }
 
-EditorDirectory::EditorDirectory(std::string path, dbus::FileDescriptor lock)
+EditorDirectory::EditorDirectory(std::string path, posix::FileDescriptor lock)
     : m_path(std::move(path)), m_lock(std::move(lock))
 {
 }

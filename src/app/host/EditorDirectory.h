@@ -3,7 +3,7 @@
 #pragma once
 
 #include "base/Result.h"
-#include "linux/dbus/FileDescriptor.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <string>
 
@@ -41,10 +41,10 @@ public:
     int lock() const { return m_lock.get(); }
 
 private:
-    EditorDirectory(std::string path, dbus::FileDescriptor lock);
+    EditorDirectory(std::string path, posix::FileDescriptor lock);
 
     std::string m_path; // empty when moved away
-    dbus::FileDescriptor m_lock;
+    posix::FileDescriptor m_lock;
 };
 
 } // namespace host

@@ -1,7 +1,7 @@
 #include "app/host/EditorProcess.h"
 
 #include "linux/dbus/ExtensionConnection.h"
-#include "linux/dbus/FileDescriptor.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <QSocketNotifier>
 
@@ -101,7 +101,7 @@ std::string ProcessEnd::words() const
 
 struct EditorProcess::State {
     pid_t pid = 0;
-    dbus::FileDescriptor descriptor;
+    posix::FileDescriptor descriptor;
     std::function<void(ProcessEnd)> ended;
     std::optional<QSocketNotifier> notifier;
     bool running = true;
@@ -139,7 +139,7 @@ base::Result<std::unique_ptr<EditorProcess>> EditorProcess::start(const ProcessS
     if (const int error = spawn(start, state->pid); error != 0)
         return base::Error::fromErrno(error, "cannot start " + start.program);
     state->ended = std::move(ended);
-    state->descriptor = dbus::FileDescriptor(::pidfd_open(state->pid, 0));
+    state->descriptor = posix::FileDescriptor(::pidfd_open(state->pid, 0));
     if (!state->descriptor) {
         const auto error = base::Error::fromErrno(errno, "cannot watch " + start.program);
         ::kill(state->pid, SIGKILL);

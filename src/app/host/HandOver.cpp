@@ -1,6 +1,6 @@
 #include "app/host/HandOver.h"
 
-#include "linux/dbus/FileDescriptor.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -111,7 +111,7 @@ base::Result<HandOverWay> handOver(int source, const std::string& directory, con
     if (first == HandOverWay::HardLink && makeHardLink(source, status, path))
         return HandOverWay::HardLink;
 
-    const dbus::FileDescriptor target(
+    const posix::FileDescriptor target(
         ::open(path.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, S_IRUSR | S_IWUSR));
     if (!target)
         return base::Error::fromErrno(errno, "cannot make " + path);

@@ -35,9 +35,9 @@ base::ErrorRef cannotOpen(const std::string& path, int number)
 
 } // namespace
 
-base::Result<dbus::FileDescriptor> openInput(const std::string& path, Emptiness emptiness)
+base::Result<posix::FileDescriptor> openInput(const std::string& path, Emptiness emptiness)
 {
-    dbus::FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+    posix::FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
     if (!file)
         return cannotOpen(path, errno);
     if (const auto checked = checkInput(file.get(), path, emptiness); !checked)

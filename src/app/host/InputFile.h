@@ -3,7 +3,7 @@
 #pragma once
 
 #include "base/Result.h"
-#include "linux/dbus/FileDescriptor.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <string>
 
@@ -12,7 +12,7 @@ namespace host {
 enum class Emptiness { Allowed, Refused };
 
 /// Opens a regular file for reading, without waiting for a FIFO's other end.
-base::Result<dbus::FileDescriptor> openInput(const std::string& path, Emptiness emptiness);
+base::Result<posix::FileDescriptor> openInput(const std::string& path, Emptiness emptiness);
 
 /// Whether a descriptor that somebody sent is a regular file that can be read. Looks at nothing but the descriptor.
 base::Result<void> checkInput(int descriptor, const std::string& what, Emptiness emptiness);

@@ -24,14 +24,14 @@ namespace {
 constexpr base::Instant kMeanwhile = std::chrono::milliseconds(100);
 
 /// The signals as something to poll for; from its beginning on they end nothing by themselves.
-dbus::FileDescriptor openSignals()
+posix::FileDescriptor openSignals()
 {
     sigset_t signals;
     ::sigemptyset(&signals);
     for (const int number : {SIGINT, SIGTERM, SIGHUP})
         ::sigaddset(&signals, number);
     ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
-    return dbus::FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
+    return posix::FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
 }
 
 /// For ppoll(), rounded up: who is woken too early would spin.
@@ -44,8 +44,8 @@ int milliseconds(base::Instant time)
 } // namespace
 
 struct MediaTool::Machine {
-    dbus::FileDescriptor signals = openSignals();
-    dbus::FileDescriptor woken{::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)};
+    posix::FileDescriptor signals = openSignals();
+    posix::FileDescriptor woken{::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)};
     int interruption = 0;
 
     base::SystemClock clock;

@@ -31,7 +31,7 @@ void blockTerminationSignals()
 TerminationSignals::TerminationSignals(std::function<void(int number)> arrived)
 {
     const sigset_t signals = terminationSignals();
-    m_descriptor = dbus::FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
+    m_descriptor = posix::FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
     m_notifier = std::make_unique<QSocketNotifier>(m_descriptor.get(), QSocketNotifier::Read);
     QObject::connect(m_notifier.get(), &QSocketNotifier::activated, m_notifier.get(),
                      [descriptor = m_descriptor.get(), arrived = std::move(arrived)] {

@@ -1,7 +1,7 @@
 /// SIGINT, SIGTERM and SIGHUP as calls from the event loop. Lives on the main thread.
 #pragma once
 
-#include "linux/dbus/FileDescriptor.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <functional>
 #include <memory>
@@ -19,7 +19,7 @@ public:
     ~TerminationSignals();
 
 private:
-    dbus::FileDescriptor m_descriptor;
+    posix::FileDescriptor m_descriptor;
     std::unique_ptr<QSocketNotifier> m_notifier;
 };
 

@@ -1,6 +1,6 @@
 #include "app/host/WholeFile.h"
 
-#include "linux/dbus/FileDescriptor.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <cerrno>
 #include <cstdio>
@@ -52,7 +52,7 @@ base::Result<void> writeWholeFile(const std::filesystem::path& path, const std::
                                   bool replaces)
 {
     const std::string beside = path.parent_path() / ("." + path.filename().native() + "." + std::to_string(::getpid()));
-    const dbus::FileDescriptor file(::open(beside.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0666));
+    const posix::FileDescriptor file(::open(beside.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0666));
     if (!file)
         return cannotWrite(path, errno);
     int error = writeAll(file.get(), bytes);

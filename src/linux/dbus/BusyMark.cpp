@@ -22,7 +22,7 @@ bool BusyMark::set()
 {
     if (m_lock)
         return true;
-    FileDescriptor file(::open(m_path.c_str(), O_RDWR | O_CREAT | O_NOFOLLOW | O_CLOEXEC, S_IRUSR | S_IWUSR));
+    posix::FileDescriptor file(::open(m_path.c_str(), O_RDWR | O_CREAT | O_NOFOLLOW | O_CLOEXEC, S_IRUSR | S_IWUSR));
     if (!file || ::flock(file.get(), LOCK_EX | LOCK_NB) != 0)
         return false;
     m_lock = std::move(file);
@@ -31,7 +31,8 @@ bool BusyMark::set()
 
 bool BusyMark::isSet(const std::string& deviceRoot)
 {
-    const FileDescriptor file(::open(markPath(deviceRoot).c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
+    const posix::FileDescriptor file(
+        ::open(markPath(deviceRoot).c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
     return file && ::flock(file.get(), LOCK_SH | LOCK_NB) != 0 && errno == EWOULDBLOCK;
 }
 

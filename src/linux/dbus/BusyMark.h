@@ -2,7 +2,7 @@
 /// directory. The lock goes with the process, however that ends.
 #pragma once
 
-#include "linux/dbus/FileDescriptor.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <string>
 
@@ -22,7 +22,7 @@ public:
 
 private:
     std::string m_path;
-    FileDescriptor m_lock;
+    posix::FileDescriptor m_lock;
 };
 
 } // namespace dbus

@@ -50,11 +50,11 @@ base::Result<void> takeText(const std::string& key, const std::string& text, Edi
 
 } // namespace
 
-FileDescriptor descriptorFrom(const QVariant& value)
+posix::FileDescriptor descriptorFrom(const QVariant& value)
 {
     const auto descriptor = value.value<QDBusUnixFileDescriptor>();
-    return descriptor.isValid() ? FileDescriptor(::fcntl(descriptor.fileDescriptor(), F_DUPFD_CLOEXEC, 3))
-                                : FileDescriptor();
+    return descriptor.isValid() ? posix::FileDescriptor(::fcntl(descriptor.fileDescriptor(), F_DUPFD_CLOEXEC, 3))
+                                : posix::FileDescriptor();
 }
 
 base::Result<void> takeOptions(const QVariantMap& options, EditRequest& request)

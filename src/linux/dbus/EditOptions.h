@@ -16,6 +16,6 @@ base::Result<void> takeOptions(const QVariantMap& options, EditRequest& request)
 void takePlatformData(const QVariantMap& data, EditRequest& request);
 
 /// A duplicate of a descriptor that came with a message; empty when there is none.
-FileDescriptor descriptorFrom(const QVariant& value);
+posix::FileDescriptor descriptorFrom(const QVariant& value);
 
 } // namespace dbus

@@ -2,7 +2,7 @@
 /// files. Nothing in it has been checked before the host has prepared it; what is empty then gets its default.
 #pragma once
 
-#include "linux/dbus/FileDescriptor.h"
+#include "linux/posix/FileDescriptor.h"
 #include "platform/views/Color.h"
 
 #include <optional>
@@ -18,13 +18,13 @@ inline constexpr const char* kBadInputDomain = "org.clipsa.input";
 struct EditRequest {
     /// The movie: where it is, or an open file.
     std::string moviePath;
-    FileDescriptor movie;
+    posix::FileDescriptor movie;
     std::string movieName; ///< the file name that the editor's own copy gets
     std::string appName;
     std::string bundleIdentifier;
     /// A file to share with the movie: where it is, or an open file.
     std::string attachmentPath;
-    FileDescriptor attachment;
+    posix::FileDescriptor attachment;
     std::string attachmentName;
     std::optional<std::string> message;
     std::optional<platform::Color> tint;

@@ -74,15 +74,15 @@ base::ErrorRef cannotOpen(const std::string& path, int number)
 
 } // namespace
 
-LibraryDirectory::LibraryDirectory(std::string path, FileDescriptor directory)
+LibraryDirectory::LibraryDirectory(std::string path, posix::FileDescriptor directory)
     : m_path(std::move(path)), m_directory(std::move(directory))
 {
 }
 
 base::Result<LibraryDirectory> LibraryDirectory::open(const std::string& path)
 {
-    const auto openIt = [&] { return FileDescriptor(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC)); };
-    FileDescriptor directory = openIt();
+    const auto openIt = [&] { return posix::FileDescriptor(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC)); };
+    posix::FileDescriptor directory = openIt();
     int number = directory ? 0 : errno;
     // What a dangling link points to is not ours to make: most likely a disk is missing.
     if (number == ENOENT && !isLink(path)) {
@@ -106,7 +106,7 @@ void LibraryDirectory::sweep() const
     while (const dirent* entry = entries ? ::readdir(entries.get()) : nullptr) { // NOLINT(concurrency-mt-unsafe): ours
         if (!isHiddenName(entry->d_name))
             continue;
-        const FileDescriptor file(
+        const posix::FileDescriptor file(
             ::openat(descriptor(), entry->d_name, O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
         // Who writes one holds its lock.
         if (file && ::flock(file.get(), LOCK_EX | LOCK_NB) == 0)
@@ -126,7 +126,7 @@ void LibraryDirectory::remove(const std::string& name) const
     ::unlinkat(descriptor(), name.c_str(), 0);
 }
 
-NewFile::NewFile(const LibraryDirectory& directory, FileDescriptor file, std::string hiddenName)
+NewFile::NewFile(const LibraryDirectory& directory, posix::FileDescriptor file, std::string hiddenName)
     : m_directory(&directory), m_file(std::move(file)), m_hiddenName(std::move(hiddenName))
 {
 }
@@ -139,7 +139,7 @@ NewFile::~NewFile()
 
 base::Result<NewFile> NewFile::make(const LibraryDirectory& directory)
 {
-    FileDescriptor file(::openat(directory.descriptor(), ".", O_TMPFILE | O_RDWR | O_CLOEXEC, kMode));
+    posix::FileDescriptor file(::openat(directory.descriptor(), ".", O_TMPFILE | O_RDWR | O_CLOEXEC, kMode));
     if (file)
         return NewFile(directory, std::move(file), {});
     // EISDIR and ENOENT: kernels and file systems that do not know the flag.
@@ -152,7 +152,7 @@ base::Result<NewFile> NewFile::makeHidden(const LibraryDirectory& directory)
 {
     for (;;) {
         const std::string name = nextHiddenName();
-        FileDescriptor file(
+        posix::FileDescriptor file(
             ::openat(directory.descriptor(), name.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, kMode));
         if (!file && errno == EEXIST)
             continue;

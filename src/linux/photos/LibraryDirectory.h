@@ -5,8 +5,8 @@
 #pragma once
 
 #include "base/Result.h"
-#include "linux/photos/FileDescriptor.h"
 #include "linux/photos/LibraryName.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <ctime>
 #include <string>
@@ -28,10 +28,10 @@ public:
     void remove(const std::string& name) const;
 
 private:
-    LibraryDirectory(std::string path, FileDescriptor directory);
+    LibraryDirectory(std::string path, posix::FileDescriptor directory);
 
     std::string m_path;
-    FileDescriptor m_directory;
+    posix::FileDescriptor m_directory;
 };
 
 /// A file that is not in the library yet. `directory` outlives it.
@@ -52,7 +52,7 @@ public:
     base::Result<std::string> publish(const LibraryName& name);
 
 private:
-    NewFile(const LibraryDirectory& directory, FileDescriptor file, std::string hiddenName);
+    NewFile(const LibraryDirectory& directory, posix::FileDescriptor file, std::string hiddenName);
     static base::Result<NewFile> makeHidden(const LibraryDirectory& directory);
 
     /// 0, or errno.
@@ -61,7 +61,7 @@ private:
     int becomeHidden();
 
     const LibraryDirectory* m_directory;
-    FileDescriptor m_file;
+    posix::FileDescriptor m_file;
     std::string m_hiddenName; ///< empty: it has no name
 };
 

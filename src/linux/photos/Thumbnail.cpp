@@ -1,9 +1,9 @@
 #include "linux/photos/Thumbnail.h"
 
-#include "linux/photos/FileDescriptor.h"
 #include "linux/photos/GLibText.h"
 #include "linux/photos/MediaType.h"
 #include "linux/photos/VideoLibrary.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <cerrno>
 #include <cstdio>
@@ -88,7 +88,7 @@ base::Result<void> makePrivateDirectory(const fs::path& path)
 base::Result<void> writeAtOnce(const fs::path& path, const Bytes& bytes)
 {
     std::string part = (path.parent_path() / ".clipsa-XXXXXX").native();
-    const FileDescriptor file(::mkstemp(part.data()));
+    const posix::FileDescriptor file(::mkstemp(part.data()));
     if (!file)
         return base::Error::fromErrno(errno, "making a file in " + path.parent_path().native());
     int number = 0;

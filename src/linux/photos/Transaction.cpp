@@ -63,7 +63,7 @@ VideoLibrary::Transaction::open(const std::optional<base::Url>& url) const
     if (source.path.find('\0') != std::string::npos)
         return base::Error::fromErrno(ENOENT, doing);
     // Without waiting: it may be a pipe.
-    source.file = FileDescriptor(::open(source.path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    source.file = posix::FileDescriptor(::open(source.path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     struct stat status = {};
     if (!source.file || ::fstat(source.file.get(), &status) != 0)
         return base::Error::fromErrno(errno, doing);

@@ -2,9 +2,9 @@
 /// none. One thread.
 #pragma once
 
-#include "linux/photos/FileDescriptor.h"
 #include "linux/photos/LibraryDirectory.h"
 #include "linux/photos/VideoLibrary.h"
+#include "linux/posix/FileDescriptor.h"
 
 #include <cstdint>
 #include <string>
@@ -25,7 +25,7 @@ public:
 private:
     struct Source {
         std::string path;
-        FileDescriptor file;
+        posix::FileDescriptor file;
         std::uint64_t size = 0; ///< bytes
         base::Date date;        ///< of the recording
         LibraryName name;

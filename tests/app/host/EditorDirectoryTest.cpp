@@ -83,7 +83,8 @@ TEST_F(EditorDirectories, LiveAsLongAsSomebodyHasTheLock)
     auto directory = std::make_optional(make());
     const std::string path = directory->path();
     // What an editor inherits, and keeps when its host is killed.
-    std::optional<dbus::FileDescriptor> inherited(dbus::FileDescriptor(::fcntl(directory->lock(), F_DUPFD_CLOEXEC, 3)));
+    std::optional<posix::FileDescriptor> inherited(
+        posix::FileDescriptor(::fcntl(directory->lock(), F_DUPFD_CLOEXEC, 3)));
     std::filesystem::rename(path, path + "-kept"); // the host's end does not find it, as if it had been killed
     directory.reset();
     std::filesystem::rename(path + "-kept", path);

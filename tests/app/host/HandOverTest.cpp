@@ -1,6 +1,6 @@
 #include "app/host/HandOver.h"
 
-#include "linux/dbus/FileDescriptor.h"
+#include "linux/posix/FileDescriptor.h"
 #include "support/PrivateDirectory.h"
 
 #include <gmock/gmock.h>
@@ -26,7 +26,7 @@ protected:
     base::Result<host::HandOverWay> handOver(host::HandOverWay first = host::HandOverWay::HardLink,
                                              const host::CopyProgress& goOn = {})
     {
-        const dbus::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+        const posix::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
         return host::handOver(source.get(), m_target.path(), "movie.mp4", goOn, first);
     }
 
@@ -105,7 +105,7 @@ TEST_F(HandingOver, CopiesFromOneFileSystemToAnother)
         const tests::PrivateDirectory memory("/dev/shm");
         const auto source = intoMemory ? m_movie : memory.write("source.mp4", m_bytes);
         const auto target = intoMemory ? memory.path() : m_target.path();
-        const dbus::FileDescriptor file(::open(source.c_str(), O_RDONLY | O_CLOEXEC));
+        const posix::FileDescriptor file(::open(source.c_str(), O_RDONLY | O_CLOEXEC));
         const auto way = host::handOver(file.get(), target, "movie.mp4");
         ASSERT_TRUE(way) << way.error()->description();
         EXPECT_EQ(way.value(), host::HandOverWay::Copy);
@@ -127,7 +127,7 @@ TEST_F(HandingOver, TakesASourceThatMayOnlyBeRead)
 
 TEST_F(HandingOver, TakesAFileThatHasLostItsName)
 {
-    const dbus::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+    const posix::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
     std::filesystem::remove(m_movie);
     const auto way = host::handOver(source.get(), m_target.path(), "movie.mp4");
     ASSERT_TRUE(way);
@@ -136,7 +136,7 @@ TEST_F(HandingOver, TakesAFileThatHasLostItsName)
 
 TEST_F(HandingOver, LeavesThePositionOfTheDescriptorAlone)
 {
-    const dbus::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+    const posix::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
     ASSERT_EQ(::lseek(source.get(), 1000, SEEK_SET), 1000);
     ASSERT_TRUE(host::handOver(source.get(), m_target.path(), "movie.mp4", {}, host::HandOverWay::Copy));
     EXPECT_EQ(::lseek(source.get(), 0, SEEK_CUR), 1000);
@@ -174,7 +174,7 @@ TEST_F(HandingOver, LeavesNothingBehindWhenItIsStopped)
 
 TEST_F(HandingOver, SaysWhenItCannot)
 {
-    const dbus::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+    const posix::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
     EXPECT_FALSE(host::handOver(source.get(), m_target.path() / "nowhere", "movie.mp4"));
     EXPECT_FALSE(host::handOver(-1, m_target.path(), "movie.mp4"));
 }

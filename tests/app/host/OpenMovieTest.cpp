@@ -41,7 +41,7 @@ protected:
     {
         ::setenv("FAKE_EDITOR", script.c_str(), 1);
         dbus::EditRequest request;
-        request.movie = dbus::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+        request.movie = posix::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
         request.movieName = "movie.mp4";
         host::EditorSession::Handlers handlers;
         handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
@@ -225,7 +225,7 @@ TEST_F(OpeningAMovie, AnEditorEndsWithAHostThatWasKilledAndTheNextOneSweeps)
 
     tests::readPipe(noticed);
     {
-        const dbus::FileDescriptor lock(::open((left + "/lock").c_str(), O_RDWR | O_CLOEXEC));
+        const posix::FileDescriptor lock(::open((left + "/lock").c_str(), O_RDWR | O_CLOEXEC));
         ASSERT_EQ(::flock(lock.get(), LOCK_EX), 0) << "waits until the editor has gone";
     }
     EXPECT_EQ(start("finish= wait")->wait(), 0);
@@ -314,7 +314,7 @@ TEST_F(OpeningAMovie, AMovieThatCannotBeHandedOverIsSaid)
 {
     ::setenv("FAKE_EDITOR", "wait", 1);
     dbus::EditRequest request;
-    request.movie = dbus::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+    request.movie = posix::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
     request.movieName = "no/such/place.mp4";
     std::optional<host::EditorOutcome> outcome;
     host::EditorSession::Handlers handlers;

@@ -26,7 +26,7 @@ protected:
     dbus::EditRequest descriptor(const std::filesystem::path& movie, int flags = O_RDONLY)
     {
         dbus::EditRequest asked;
-        asked.movie = dbus::FileDescriptor(::open(movie.c_str(), flags | O_CLOEXEC));
+        asked.movie = posix::FileDescriptor(::open(movie.c_str(), flags | O_CLOEXEC));
         EXPECT_TRUE(asked.movie);
         return asked;
     }
@@ -147,7 +147,7 @@ TEST_F(Preparing, ChecksAnAttachment)
     ASSERT_TRUE(host::prepare(asked)) << "an empty file can be shared";
 
     asked = request(m_movie);
-    asked.attachment = dbus::FileDescriptor(::open(m_directory.path().c_str(), O_RDONLY | O_CLOEXEC));
+    asked.attachment = posix::FileDescriptor(::open(m_directory.path().c_str(), O_RDONLY | O_CLOEXEC));
     EXPECT_THAT(refusal(std::move(asked)), HasSubstr("directory"));
 
     asked = request(m_movie);

@@ -107,7 +107,7 @@ protected:
     QDBusUnixFileDescriptor movie()
     {
         const auto path = m_directory.write("movie.mp4", "moving pictures");
-        const dbus::FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
+        const posix::FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
         return QDBusUnixFileDescriptor(file.get());
     }
 

@@ -4,6 +4,7 @@
 #include "linux/ffmpeg/exporting/DecodedMovie.h"
 #include "platform/media/ExportSession.h"
 #include "support/EngineTest.h"
+#include "support/PrivateDirectory.h"
 
 #include <filesystem>
 #include <memory>
@@ -18,15 +19,9 @@ protected:
     using ExportStatus = platform::ExportSession::Status;
     using Range = base::MediaTimeRange;
 
-    ExportTest()
-    {
-        std::string pattern = (std::filesystem::temp_directory_path() / "clipsa-export-XXXXXX").string();
-        directory = mkdtemp(pattern.data());
-    }
-    ~ExportTest() override { std::filesystem::remove_all(directory); }
-
+    std::string directory() const { return m_directory.path().string(); }
     static std::string exportMovie(const std::string& name) { return movie("export/" + name); }
-    std::string output(const std::string& name = "out.mp4") const { return directory + "/" + name; }
+    std::string output(const std::string& name = "out.mp4") const { return directory() + "/" + name; }
     static Range fromTo(double start, double end) { return {at(start), at(end - start)}; }
 
     std::shared_ptr<platform::ExportSession> sessionFor(const std::string& from, const std::string& to,
@@ -58,7 +53,7 @@ protected:
     std::vector<std::string> files() const
     {
         std::vector<std::string> names;
-        for (const auto& each : std::filesystem::directory_iterator(directory))
+        for (const auto& each : std::filesystem::directory_iterator(directory()))
             names.push_back(each.path().filename());
         std::sort(names.begin(), names.end());
         return names;
@@ -71,7 +66,8 @@ protected:
         return false;
     }
 
-    std::string directory;
+private:
+    PrivateDirectory m_directory;
     base::ErrorRef lastError;
 };
 

@@ -137,7 +137,7 @@ TEST_F(AnExport, DoesNotReplaceAFileThatComesMeanwhile)
 
 TEST_F(AnExport, NeedsSomewhereToWriteTo)
 {
-    EXPECT_EQ(cut(exportMovie("h264.mp4"), directory + "/none/out.mp4", fromTo(1, 2)), ExportStatus::Failed);
+    EXPECT_EQ(cut(exportMovie("h264.mp4"), directory() + "/none/out.mp4", fromTo(1, 2)), ExportStatus::Failed);
     EXPECT_THAT(errorText(), HasSubstr("No such file or directory"));
     const auto session = sessionFor(exportMovie("h264.mp4"), output(), fromTo(1, 2));
     session->setOutputURL(std::nullopt);
@@ -147,13 +147,13 @@ TEST_F(AnExport, NeedsSomewhereToWriteTo)
 
 TEST_F(AnExport, SaysWhatCannotBeWrittenIntoADirectoryOfOthers)
 {
-    std::filesystem::permissions(directory, std::filesystem::perms::owner_read | std::filesystem::perms::owner_exec);
+    std::filesystem::permissions(directory(), std::filesystem::perms::owner_read | std::filesystem::perms::owner_exec);
     base::Result<void> result;
     std::thread([&] {
         const WithoutPrivileges without;
         result = runJob(exportMovie("h264.mp4"), fromTo(1, 2));
     }).join();
-    std::filesystem::permissions(directory, std::filesystem::perms::owner_all);
+    std::filesystem::permissions(directory(), std::filesystem::perms::owner_all);
     ASSERT_FALSE(result);
     EXPECT_THAT(result.error()->description(), HasSubstr("“out.mp4” cannot be written: Permission denied"));
     EXPECT_TRUE(files().empty());

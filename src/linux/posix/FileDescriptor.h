@@ -4,7 +4,7 @@
 #include <unistd.h>
 #include <utility>
 
-namespace dbus {
+namespace posix {
 
 class FileDescriptor {
 public:
@@ -29,4 +29,4 @@ private:
     int m_number = -1;
 };
 
-} // namespace dbus
+} // namespace posix
