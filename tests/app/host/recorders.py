@@ -81,10 +81,12 @@ def vanish():
     leaver, stayer = Recorder(), Recorder()
     leaver.edit()
     session = stayer.edit()
-    there = 0
-    while there < 2:
-        with open(os.environ["PIPE_THERE"]) as pipe:
-            there += pipe.read().count("MovieURLKey")
+    # Held open for writing too: it never ends between the two editors, so what the second one writes is not lost.
+    pipe = os.open(os.environ["PIPE_THERE"], os.O_RDWR)
+    told = b""
+    while told.count(b"MovieURLKey") < 2:
+        told += os.read(pipe, 65536)
+    os.close(pipe)
     leaver.bus.close()
     with open(os.environ["PIPE_CLOSED"]) as pipe:
         assert "MovieURLKey" in pipe.read()
