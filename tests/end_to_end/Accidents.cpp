@@ -21,9 +21,8 @@ protected:
     /// A host whose editor shows the movie.
     std::unique_ptr<Child> startEditing()
     {
-        auto host = std::make_unique<Child>(
-            std::vector<std::string>{std::filesystem::path(CLIPSA_BIN) / "clipsa", "open", m_movie},
-            m_machine.environment());
+        auto host = std::make_unique<Child>(std::vector<std::string>{program("clipsa"), "open", m_movie},
+                                            m_machine.environment());
         EXPECT_TRUE(host->waitForText("on the screen\n")) << host->wait(Milliseconds(0)).err;
         return host;
     }

@@ -54,7 +54,7 @@ Machine::Machine()
 
 fs::path Machine::movie(const std::string& name) const
 {
-    return movieFrom(fs::path(CLIPSA_TEST_MOVIES) / name);
+    return movieFrom(tests::movie(name));
 }
 
 fs::path Machine::movieFrom(const fs::path& source) const
@@ -83,7 +83,7 @@ void Machine::keepReport()
 
 Child Machine::start(const Words& words) const
 {
-    Words arguments = {fs::path(CLIPSA_BIN) / "clipsa"};
+    Words arguments = {program("clipsa")};
     arguments.insert(arguments.end(), words.begin(), words.end());
     return Child(arguments, environment());
 }

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "support/Child.h"
+#include "support/Paths.h"
 #include "support/PrivateDirectory.h"
 
 #include <filesystem>

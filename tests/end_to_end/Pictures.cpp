@@ -27,8 +27,8 @@ TEST_P(Picture, LooksAsItDid)
     const std::string name = GetParam();
     const PrivateDirectory made;
     Machine machine;
-    Child tool({fs::path(CLIPSA_SOURCE) / "tools/make-pictures", "--output", made.path(), "--only", name, "--clipsa",
-                fs::path(CLIPSA_BIN) / "clipsa", "--movies", fs::path(CLIPSA_TEST_MOVIES) / "pictures"},
+    Child tool({sourceFile("tools/make-pictures"), "--output", made.path(), "--only", name, "--clipsa",
+                program("clipsa"), "--movies", movie("pictures")},
                machine.environment());
     const auto end = tool.wait();
     ASSERT_EQ(end.exitStatus, 0) << end.err;
@@ -36,7 +36,7 @@ TEST_P(Picture, LooksAsItDid)
     for (const auto& file : fs::directory_iterator(made.path())) {
         SCOPED_TRACE(file.path().filename());
         const Screenshot now(file.path());
-        const Screenshot before(fs::path(CLIPSA_SOURCE) / "docs/pictures" / file.path().filename());
+        const Screenshot before(fs::path(sourceFile("docs/pictures")) / file.path().filename());
         ASSERT_FALSE(before.isNull()) << "docs/pictures does not have it";
         ASSERT_EQ(now.image().size(), before.image().size());
         EXPECT_LT(differenceOf(now.image(), before.image()), kLargestDifference) << kRemedy;

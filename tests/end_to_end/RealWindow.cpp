@@ -10,13 +10,13 @@ using testing::SizeIs;
 
 TEST_F(RealWindow, LooksAsInTheManualUprightAndOnItsSide)
 {
-    const auto movie = m_machine.movieFrom(fs::path(CLIPSA_TEST_MOVIES) / "pictures/phone.mp4");
+    const auto movie = m_machine.movieFrom(tests::movie("pictures/phone.mp4"));
     const timespec recorded{1715682240, 0}; // as tools/make-pictures has it: 2024-05-14 10:24 UTC
     const timespec times[2] = {recorded, recorded};
     ::utimensat(AT_FDCWD, movie.c_str(), times, 0);
     ASSERT_NO_FATAL_FAILURE(start(movie, {"--app-name", "Weekend trip"}));
     for (const char* name : {"phone@1x.png", "phone-landscape@1x.png", "phone@1x.png"}) {
-        const Screenshot wanted(fs::path(CLIPSA_SOURCE) / "docs/pictures" / name);
+        const Screenshot wanted(fs::path(sourceFile("docs/pictures")) / name);
         ASSERT_FALSE(wanted.isNull());
         m_screen.resize(wanted.width(), wanted.height());
         double difference = 0;

@@ -70,7 +70,7 @@ protected:
 
     void start(const fs::path& movie, const Machine::Words& options = {})
     {
-        Machine::Words words = {fs::path(CLIPSA_BIN) / "clipsa", "open", movie, "--device", "phone"};
+        Machine::Words words = {program("clipsa"), "open", movie, "--device", "phone"};
         words.insert(words.end(), options.begin(), options.end());
         m_host = std::make_unique<Child>(words, m_machine.environment());
         ASSERT_TRUE(m_screen.waitForWindow()) << m_host->wait(Milliseconds(0)).err;

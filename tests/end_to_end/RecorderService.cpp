@@ -16,12 +16,12 @@ protected:
     RecorderService()
     {
         // The bus starts the service when somebody asks for it, by the file that is installed.
-        std::string file = PrivateDirectory::read(fs::path(CLIPSA_SOURCE) / "packaging/org.clipsa.Clipsa.service.in");
+        std::string file = PrivateDirectory::read(sourceFile("packaging/org.clipsa.Clipsa.service.in"));
         const std::string place = "@CMAKE_INSTALL_FULL_BINDIR@";
         const std::size_t at = file.find(place);
         EXPECT_NE(at, std::string::npos);
         m_machine.write("home/data/dbus-1/services/org.clipsa.Clipsa.service",
-                        at == std::string::npos ? file : file.replace(at, place.size(), CLIPSA_BIN));
+                        at == std::string::npos ? file : file.replace(at, place.size(), program("")));
         m_machine.set("XDG_DATA_HOME", m_machine.home() / "data");
         m_machine.keepReport();
         m_machine.setScript("wait picture\nwait ready\nprint {title} {date}\ntap Cancel");
@@ -45,9 +45,8 @@ protected:
 
     Child::End record(const fs::path& movie)
     {
-        Child recorder(
-            {"/usr/bin/python3", fs::path(CLIPSA_SOURCE) / "docs/examples/record_and_edit.py", movie, "Notes"},
-            m_machine.environment());
+        Child recorder({"/usr/bin/python3", sourceFile("docs/examples/record_and_edit.py"), movie, "Notes"},
+                       m_machine.environment());
         return recorder.wait();
     }
 

@@ -5,6 +5,7 @@
 #include "linux/ffmpeg/FFmpegMediaFramework.h"
 #include "linux/ffmpeg/FFmpegPlayer.h"
 #include "support/MoviePictures.h"
+#include "support/Paths.h"
 #include "support/WaitUntil.h"
 
 #include <gtest/gtest.h>
@@ -20,7 +21,7 @@ protected:
     using Status = platform::PlayerItem::Status;
     using MediaTime = base::MediaTime;
 
-    static std::string movie(const std::string& name) { return std::string(CLIPSA_TEST_MOVIES) + "/" + name; }
+    static std::string movie(const std::string& name) { return tests::movie(name); }
     static MediaTime at(double seconds) { return MediaTime::fromSeconds(seconds, 90000); }
 
     bool waitFor(const std::function<bool()>& predicate) { return waitUntil(mainQueue, predicate); }

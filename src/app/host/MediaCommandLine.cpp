@@ -51,53 +51,50 @@ std::optional<base::Size> sizeIn(const std::string& text)
     return base::Size{double(*width), double(*height)};
 }
 
-base::Result<void> takeThumbnailsOption(ThumbnailsCommand& command, Words& words)
+base::Result<void> unknownOption(const std::string& command, const Words& words)
+{
+    return usageError(command + " has no option " + words.word());
+}
+
+// A command is read by an overload of each of these: takeOption takes the option that the words stand at, expectWhole
+// says what is still missing at their end.
+
+base::Result<void> takeOption(ThumbnailsCommand& command, Words& words)
 {
     const std::string option = words.word();
     if (option == "--force")
         return takeFlag(command.force, words);
-    if (option != "-n" && option != "--count" && option != "-o" && option != "--output" && option != "--size")
-        return usageError("thumbnails has no option " + option);
+    if (option == "-o" || option == "--output")
+        return takeText(command.output, words);
+    if (option != "-n" && option != "--count" && option != "--size")
+        return unknownOption("thumbnails", words);
     const auto value = words.value();
     if (!value)
         return value.error();
-    if (option == "-n" || option == "--count") {
-        command.count = wholeNumber(value.value()).value_or(0);
-        if (command.count < 1 || command.count > kMostThumbnails)
-            return usageError(option + " is a number from 1 to " + std::to_string(kMostThumbnails) + ", not \""
-                              + value.value() + "\"");
-    } else if (option == "--size") {
+    if (option == "--size") {
         const auto size = sizeIn(value.value());
         if (!size)
             return usageError("--size is a width and a height like 320x180, not \"" + value.value() + "\"");
         command.size = *size;
-    } else {
-        command.output = value.value();
+        return {};
     }
+    command.count = wholeNumber(value.value()).value_or(0);
+    if (command.count < 1 || command.count > kMostThumbnails)
+        return usageError(option + " is a number from 1 to " + std::to_string(kMostThumbnails) + ", not \""
+                          + value.value() + "\"");
     return {};
 }
 
-base::Result<std::optional<MediaCommand>> parseThumbnails(Words words)
+base::Result<void> expectWhole(const ThumbnailsCommand& command)
 {
-    ThumbnailsCommand command;
-    while (words.advance()) {
-        if (words.isHelp())
-            return std::optional<MediaCommand>();
-        const auto taken =
-            words.isOption() ? takeThumbnailsOption(command, words) : takeMovie(command.movie, words.word());
-        if (!taken)
-            return taken.error();
-    }
-    if (command.movie.empty())
-        return usageError("thumbnails needs a movie");
     if (command.count == 0)
         return usageError("thumbnails needs -n N, how many");
     if (command.output.empty())
         return usageError("thumbnails needs -o DIR, for its pictures");
-    return std::optional<MediaCommand>(std::move(command));
+    return {};
 }
 
-base::Result<void> takeTrimOption(TrimCommand& command, Words& words)
+base::Result<void> takeOption(TrimCommand& command, Words& words)
 {
     const std::string option = words.word();
     if (option == "--force")
@@ -105,7 +102,7 @@ base::Result<void> takeTrimOption(TrimCommand& command, Words& words)
     if (option == "-o" || option == "--output")
         return takeText(command.output, words);
     if (option != "--from" && option != "--to")
-        return usageError("trim has no option " + option);
+        return unknownOption("trim", words);
     const auto value = words.value();
     if (!value)
         return value.error();
@@ -116,102 +113,83 @@ base::Result<void> takeTrimOption(TrimCommand& command, Words& words)
     return {};
 }
 
-base::Result<std::optional<MediaCommand>> parseTrim(Words words)
+base::Result<void> expectWhole(const TrimCommand& command)
 {
-    TrimCommand command;
-    while (words.advance()) {
-        if (words.isHelp())
-            return std::optional<MediaCommand>();
-        const auto taken = words.isOption() ? takeTrimOption(command, words) : takeMovie(command.movie, words.word());
-        if (!taken)
-            return taken.error();
-    }
-    if (command.movie.empty())
-        return usageError("trim needs a movie");
     if (command.output.empty())
         return usageError("trim needs -o OUT, for the new movie");
     if (command.to && !(*command.to > command.from))
         return usageError("--to must be behind --from");
-    return std::optional<MediaCommand>(std::move(command));
+    return {};
 }
 
-base::Result<std::optional<MediaCommand>> parseMix(Words words)
+base::Result<void> takeOption(MixCommand& command, Words& words)
 {
-    MixCommand command;
-    while (words.advance()) {
-        if (words.isHelp())
-            return std::optional<MediaCommand>();
-        base::Result<void> taken;
-        if (!words.isOption())
-            taken = takeMovie(command.movie, words.word());
-        else if (words.word() == "--force")
-            taken = takeFlag(command.force, words);
-        else if (words.word() == "-o" || words.word() == "--output")
-            taken = takeText(command.output, words);
-        else
-            taken = usageError("mix has no option " + words.word());
-        if (!taken)
-            return taken.error();
-    }
-    if (command.movie.empty())
-        return usageError("mix needs a movie");
+    if (words.word() == "--force")
+        return takeFlag(command.force, words);
+    if (words.word() == "-o" || words.word() == "--output")
+        return takeText(command.output, words);
+    return unknownOption("mix", words);
+}
+
+base::Result<void> expectWhole(const MixCommand& command)
+{
     if (command.output.empty())
         return usageError("mix needs -o OUT, for the new movie");
-    return std::optional<MediaCommand>(std::move(command));
+    return {};
 }
 
-base::Result<std::optional<MediaCommand>> parseProbe(Words words)
+base::Result<void> takeOption(ProbeCommand& command, Words& words)
 {
-    ProbeCommand command;
+    if (words.word() == "--json")
+        return takeFlag(command.json, words);
+    return unknownOption("probe", words);
+}
+
+base::Result<void> expectWhole(const ProbeCommand&)
+{
+    return {};
+}
+
+base::Result<void> takeOption(SaveCommand& command, Words& words)
+{
+    if (words.word() == "--app-name")
+        return takeText(command.appName, words);
+    return unknownOption("save", words);
+}
+
+base::Result<void> expectWhole(const SaveCommand&)
+{
+    return {};
+}
+
+/// `words` stand at the command's name.
+template <typename Command> base::Result<std::optional<MediaCommand>> parse(const std::string& name, Words words)
+{
+    Command command;
     while (words.advance()) {
         if (words.isHelp())
             return std::optional<MediaCommand>();
-        base::Result<void> taken;
-        if (!words.isOption())
-            taken = takeMovie(command.movie, words.word());
-        else if (words.word() == "--json")
-            taken = takeFlag(command.json, words);
-        else
-            taken = usageError("probe has no option " + words.word());
+        const auto taken = words.isOption() ? takeOption(command, words) : takeMovie(command.movie, words.word());
         if (!taken)
             return taken.error();
     }
     if (command.movie.empty())
-        return usageError("probe needs a movie");
-    return std::optional<MediaCommand>(std::move(command));
-}
-
-base::Result<std::optional<MediaCommand>> parseSave(Words words)
-{
-    SaveCommand command;
-    while (words.advance()) {
-        if (words.isHelp())
-            return std::optional<MediaCommand>();
-        base::Result<void> taken;
-        if (!words.isOption())
-            taken = takeMovie(command.movie, words.word());
-        else if (words.word() == "--app-name")
-            taken = takeText(command.appName, words);
-        else
-            taken = usageError("save has no option " + words.word());
-        if (!taken)
-            return taken.error();
-    }
-    if (command.movie.empty())
-        return usageError("save needs a movie");
+        return usageError(name + " needs a movie");
+    if (const auto whole = expectWhole(command); !whole)
+        return whole.error();
     return std::optional<MediaCommand>(std::move(command));
 }
 
 struct Parser {
     const char* name;
-    base::Result<std::optional<MediaCommand>> (*parse)(Words words);
+    base::Result<std::optional<MediaCommand>> (*parse)(const std::string& name, Words words);
 };
 
-constexpr Parser kParsers[] = {{"trim", parseTrim},
-                               {"mix", parseMix},
-                               {"thumbnails", parseThumbnails},
-                               {"probe", parseProbe},
-                               {"save", parseSave}};
+constexpr Parser kParsers[] = {{"trim", parse<TrimCommand>},
+                               {"mix", parse<MixCommand>},
+                               {"thumbnails", parse<ThumbnailsCommand>},
+                               {"probe", parse<ProbeCommand>},
+                               {"save", parse<SaveCommand>}};
 
 const Parser* parserOf(const std::string& name)
 {
@@ -262,7 +240,7 @@ bool isMediaCommand(const std::string& name)
 
 base::Result<std::optional<MediaCommand>> parseMediaCommand(const std::vector<std::string>& words)
 {
-    return parserOf(words.front())->parse(Words(words, 1));
+    return parserOf(words.front())->parse(words.front(), Words(words, 1));
 }
 
 } // namespace host

@@ -1,12 +1,9 @@
 // The commands that need no window, as programs, on the test movies.
+#include "app/host/ClipsaProgram.h"
 #include "app/host/JsonObject.h"
 #include "app/host/MakeThumbnails.h"
-#include "app/host/MediaCommandLine.h"
-#include "support/Program.h"
 
 #include <QJsonArray>
-#include <QJsonDocument>
-#include <QJsonObject>
 #include <gmock/gmock.h>
 
 #include <algorithm>
@@ -24,26 +21,13 @@ using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::StartsWith;
 
-using Words = std::vector<std::string>;
+using tests::movie;
+using tests::namesIn;
+using tests::parsed;
+using tests::refusal;
+using tests::Words;
+
 namespace fs = std::filesystem;
-
-std::string movie(const std::string& name)
-{
-    return std::string(CLIPSA_TEST_MOVIES) + "/" + name;
-}
-
-template <typename Command> Command parsed(const Words& words)
-{
-    const auto command = host::parseMediaCommand(words);
-    EXPECT_TRUE(command) << command.error()->description();
-    return std::get<Command>(command.value().value());
-}
-
-std::string refusal(const Words& words)
-{
-    const auto command = host::parseMediaCommand(words);
-    return command ? "(accepted)" : command.error()->description();
-}
 
 TEST(MediaCommandLine, TakesWhatThumbnailsNeed)
 {
@@ -90,37 +74,12 @@ TEST(Thumbnails, AreNamedByPlaceAndTime)
     EXPECT_EQ(host::thumbnailName(9, 10, base::MediaTime::make(36'061'001, 1000)), "9_10-01-01.001.png");
 }
 
-class MediaTools : public ::testing::Test {
+class MediaTools : public tests::ClipsaProgram {
 protected:
-    int run(Words words, tests::Program::Variables variables = {})
-    {
-        words.insert(words.begin(), std::string(CLIPSA_BIN) + "/clipsa");
-        tests::Program program(words, variables);
-        const int status = program.wait();
-        out = program.output();
-        errors = program.errors();
-        return status;
-    }
-    QJsonObject probe(const std::string& name)
-    {
-        EXPECT_EQ(run({"probe", movie(name), "--json"}), 0) << errors;
-        return QJsonDocument::fromJson(QByteArray::fromStdString(out)).object();
-    }
-    Words files() const
-    {
-        Words names;
-        if (fs::exists(folder))
-            for (const auto& each : fs::directory_iterator(folder))
-                names.push_back(each.path().filename());
-        std::sort(names.begin(), names.end());
-        return names;
-    }
+    Words files() const { return namesIn(folder); }
     static std::size_t lines(const std::string& text) { return std::count(text.begin(), text.end(), '\n'); }
 
-    tests::PrivateDirectory directory;
     const fs::path folder = directory.path() / "pictures";
-    std::string out;
-    std::string errors;
 };
 
 TEST_F(MediaTools, LeaveThumbnailsInADirectory)
@@ -178,8 +137,7 @@ TEST_F(MediaTools, LeaveNothingHalfWrittenWhenInterrupted)
     const int watch = ::inotify_init1(IN_CLOEXEC);
     ASSERT_GE(::inotify_add_watch(watch, folder.c_str(), IN_MOVED_TO | IN_CREATE), 0);
     // Pictures of full size, so many that the first is there long before the last.
-    tests::Program program(
-        {std::string(CLIPSA_BIN) + "/clipsa", "thumbnails", movie("long-gop.mp4"), "-n", "1200", "-o", folder}, {});
+    tests::Program program(command({"thumbnails", movie("long-gop.mp4"), "-n", "1200", "-o", folder}), {});
     pollfd arrival = {watch, POLLIN, 0};
     EXPECT_EQ(::poll(&arrival, 1, 60'000), 1) << "no picture has come";
     ::close(watch);
@@ -200,7 +158,7 @@ TEST_F(MediaTools, ShowABarOnATerminal)
     int terminal = -1;
     const pid_t process = ::forkpty(&terminal, nullptr, nullptr, nullptr);
     if (process == 0) {
-        const std::string program = std::string(CLIPSA_BIN) + "/clipsa";
+        const std::string program = tests::program("clipsa");
         ::setenv("TERM", "xterm", 1);
         ::execl(program.c_str(), "clipsa", "thumbnails", movie("long-gop.mp4").c_str(), "-n", "50", "-o",
                 folder.c_str(), nullptr);
@@ -220,7 +178,7 @@ TEST_F(MediaTools, ShowABarOnATerminal)
 
 TEST_F(MediaTools, TellWhatAMovieIsMadeOf)
 {
-    const QJsonObject facts = probe("clock.mp4");
+    const QJsonObject facts = probe(movie("clock.mp4"));
     EXPECT_EQ(facts["container"], "MP4");
     EXPECT_EQ(facts["duration"], 4.0);
     const QJsonObject picture = facts["video"][0].toObject();
@@ -245,33 +203,33 @@ TEST_F(MediaTools, TellWhatAMovieIsMadeOf)
 
 TEST_F(MediaTools, TellHowAMovieIsTurnedTimedAndGrouped)
 {
-    EXPECT_EQ(probe("rotated.mp4")["video"][0]["rotation"], 270);
-    const QJsonObject turned = probe("rotated-clockwise.mp4")["video"][0].toObject();
+    EXPECT_EQ(probe(movie("rotated.mp4"))["video"][0]["rotation"], 270);
+    const QJsonObject turned = probe(movie("rotated-clockwise.mp4"))["video"][0].toObject();
     EXPECT_EQ(turned["rotation"], 90);
     EXPECT_EQ(turned["displayWidth"], 360);
-    EXPECT_EQ(probe("non-square.mp4")["video"][0]["displayWidth"], 640);
-    const QJsonObject uneven = probe("vfr.mkv")["video"][0].toObject();
+    EXPECT_EQ(probe(movie("non-square.mp4"))["video"][0]["displayWidth"], 640);
+    const QJsonObject uneven = probe(movie("vfr.mkv"))["video"][0].toObject();
     EXPECT_EQ(uneven["variableRate"], true);
     EXPECT_NEAR(uneven["averageRate"].toDouble(), 20.72, 0.01);
     EXPECT_NEAR(uneven["longestPicture"].toDouble(), 0.447, 0.001);
-    const QJsonObject grouped = probe("groups.mp4")["video"][0].toObject();
+    const QJsonObject grouped = probe(movie("groups.mp4"))["video"][0].toObject();
     EXPECT_EQ(grouped["keyframes"], 8);
     EXPECT_EQ(grouped["medianKeyframeDistance"], 1.0);
-    EXPECT_EQ(probe("vp9.webm")["video"][0]["variableRate"], false) << "its times are rounded to milliseconds";
-    EXPECT_EQ(probe("edit-list.mp4")["video"][0]["pictures"], 90) << "what is hidden is no picture";
-    EXPECT_EQ(probe("edit-list.mp4")["video"][0]["keyframes"], 1);
-    EXPECT_EQ(probe("audio-only.m4a")["video"].toArray().size(), 0);
-    EXPECT_EQ(probe("one-frame.mp4")["video"][0]["pictures"], 1);
+    EXPECT_EQ(probe(movie("vp9.webm"))["video"][0]["variableRate"], false) << "its times are rounded to milliseconds";
+    EXPECT_EQ(probe(movie("edit-list.mp4"))["video"][0]["pictures"], 90) << "what is hidden is no picture";
+    EXPECT_EQ(probe(movie("edit-list.mp4"))["video"][0]["keyframes"], 1);
+    EXPECT_EQ(probe(movie("audio-only.m4a"))["video"].toArray().size(), 0);
+    EXPECT_EQ(probe(movie("one-frame.mp4"))["video"][0]["pictures"], 1);
 }
 
 TEST_F(MediaTools, TellPeopleInWords)
 {
     EXPECT_EQ(run({"probe", movie("rotated-clockwise.mp4")}), 0);
-    EXPECT_THAT(out, HasSubstr("shown turned by 90° clockwise, as 360×640"));
-    EXPECT_THAT(out, HasSubstr("120 pictures, 30.00 a second"));
-    EXPECT_THAT(out, HasSubstr("“Microphone”, 48000 Hz, mono"));
+    EXPECT_THAT(printed, HasSubstr("shown turned by 90° clockwise, as 360×640"));
+    EXPECT_THAT(printed, HasSubstr("120 pictures, 30.00 a second"));
+    EXPECT_THAT(printed, HasSubstr("“Microphone”, 48000 Hz, mono"));
     EXPECT_EQ(run({"probe", movie("groups.mp4")}), 0);
-    EXPECT_THAT(out, HasSubstr("8 keyframes, 1.00 s apart (1.00 to 1.00 s)"));
+    EXPECT_THAT(printed, HasSubstr("8 keyframes, 1.00 s apart (1.00 to 1.00 s)"));
 }
 
 TEST(JsonObject, QuotesWhateverStandsInAFile)

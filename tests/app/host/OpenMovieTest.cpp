@@ -1,6 +1,7 @@
 // The program itself, with an editor that does what a test says.
 #include "app/host/EditorSession.h"
 #include "support/EventLoop.h"
+#include "support/Paths.h"
 #include "support/Program.h"
 
 #include <gmock/gmock.h>
@@ -18,8 +19,6 @@ using testing::StartsWith;
 
 namespace {
 
-const std::string kPrograms = CLIPSA_BIN;
-
 class OpeningAMovie : public ::testing::Test {
 protected:
     using Words = std::vector<std::string>;
@@ -27,12 +26,12 @@ protected:
     /// `script` is what the editor does; see fake_editor.cpp.
     std::unique_ptr<tests::Program> start(const std::string& script, const Words& options = {})
     {
-        Words words = {kPrograms + "/clipsa", "open", m_movie};
+        Words words = {tests::program("clipsa"), "open", m_movie};
         words.insert(words.end(), options.begin(), options.end());
-        return std::make_unique<tests::Program>(words,
-                                                tests::Program::Variables{{"FAKE_EDITOR", script},
-                                                                          {"CLIPSA_EDITOR", kPrograms + "/fake-editor"},
-                                                                          {"XDG_CACHE_HOME", m_cache}});
+        return std::make_unique<tests::Program>(
+            words, tests::Program::Variables{{"FAKE_EDITOR", script},
+                                             {"CLIPSA_EDITOR", tests::program("fake-editor")},
+                                             {"XDG_CACHE_HOME", m_cache}});
     }
 
     /// A session of the host that soon loses its patience.
@@ -46,7 +45,7 @@ protected:
         host::EditorSession::Handlers handlers;
         handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
         auto session = host::EditorSession::start(
-            std::move(request), {kPrograms + "/fake-editor", m_cache / "clipsa", std::chrono::milliseconds(20)},
+            std::move(request), {tests::program("fake-editor"), m_cache / "clipsa", std::chrono::milliseconds(20)},
             std::move(handlers));
         EXPECT_TRUE(session) << session.error()->description();
         return session ? std::move(session).value() : nullptr;
@@ -271,10 +270,10 @@ TEST_F(OpeningAMovie, TakesAMovieWhoseNameIsNoText)
 
 TEST_F(OpeningAMovie, TellsItsVersionAndHelp)
 {
-    tests::Program version({kPrograms + "/clipsa", "--version"}, {});
+    tests::Program version({tests::program("clipsa"), "--version"}, {});
     EXPECT_EQ(version.wait(), 0);
     EXPECT_THAT(version.output(), StartsWith("clipsa "));
-    tests::Program help({kPrograms + "/clipsa", "--help"}, {});
+    tests::Program help({tests::program("clipsa"), "--help"}, {});
     EXPECT_EQ(help.wait(), 0);
     EXPECT_THAT(help.output(), HasSubstr("clipsa open MOVIE"));
 }
@@ -320,7 +319,7 @@ TEST_F(OpeningAMovie, AMovieThatCannotBeHandedOverIsSaid)
     host::EditorSession::Handlers handlers;
     handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
     const auto session =
-        host::EditorSession::start(std::move(request), {kPrograms + "/fake-editor", m_cache / "clipsa"}, handlers);
+        host::EditorSession::start(std::move(request), {tests::program("fake-editor"), m_cache / "clipsa"}, handlers);
     ASSERT_TRUE(session);
     EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
     ASSERT_TRUE(outcome->error);

@@ -1,6 +1,5 @@
 // `clipsa save`, as a program, on the test movies.
-#include "app/host/MediaCommandLine.h"
-#include "support/Program.h"
+#include "app/host/ClipsaProgram.h"
 #include "support/WithoutPrivileges.h"
 
 #include <gmock/gmock.h>
@@ -21,32 +20,32 @@ using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::StartsWith;
 
-using Words = std::vector<std::string>;
+using tests::namesIn;
+using tests::parsed;
+using tests::refusal;
+using tests::Words;
+
 namespace fs = std::filesystem;
 
 TEST(TheSaveCommand, TakesAMovieAndTheNameOfItsApp)
 {
-    const auto parsed = [](const Words& words) {
-        return std::get<host::SaveCommand>(host::parseMediaCommand(words).value().value());
-    };
-    EXPECT_EQ(parsed({"save", "m.mp4"}).movie, "m.mp4");
-    EXPECT_EQ(parsed({"save", "m.mp4"}).appName, "");
-    EXPECT_EQ(parsed({"save", "--app-name", "Tux Racer", "m.mp4"}).appName, "Tux Racer");
-    const auto refusal = [](const Words& words) { return host::parseMediaCommand(words).error()->description(); };
+    EXPECT_EQ(parsed<host::SaveCommand>({"save", "m.mp4"}).movie, "m.mp4");
+    EXPECT_EQ(parsed<host::SaveCommand>({"save", "m.mp4"}).appName, "");
+    EXPECT_EQ(parsed<host::SaveCommand>({"save", "--app-name", "Tux Racer", "m.mp4"}).appName, "Tux Racer");
     EXPECT_THAT(refusal({"save"}), HasSubstr("save needs a movie"));
     EXPECT_THAT(refusal({"save", "a", "b"}), HasSubstr("both a and b"));
     EXPECT_THAT(refusal({"save", "a", "-o", "b"}), HasSubstr("save has no option -o"));
 }
 
-class SavingFromAShell : public ::testing::Test {
+class SavingFromAShell : public tests::ClipsaProgram {
 protected:
-    tests::PrivateDirectory home;
-    const fs::path videos = home.path() / "Videos";
+    const fs::path home = directory.path();
+    const fs::path videos = home / "Videos";
     /// A recording of 21 November 2026, 15:04:05 UTC.
-    fs::path recording(const std::string& movie)
+    fs::path recording(const std::string& name)
     {
-        const fs::path copy = home.path() / ("race" + fs::path(movie).extension().native());
-        fs::copy_file(fs::path(CLIPSA_TEST_MOVIES) / movie, copy);
+        const fs::path copy = home / ("race" + fs::path(name).extension().native());
+        fs::copy_file(tests::movie(name), copy);
         const timespec times[] = {{0, UTIME_OMIT}, {1'795'273'445, 0}};
         ::utimensat(AT_FDCWD, copy.c_str(), times, 0);
         bytes = tests::PrivateDirectory::read(copy);
@@ -55,30 +54,17 @@ protected:
 
     tests::Program::Variables variables() const
     {
-        const std::string at = home.path();
+        const std::string at = home;
         return {{"HOME", at},
                 {"XDG_CACHE_HOME", at + "/.cache"},
                 {"XDG_DATA_HOME", at + "/.local/share"},
                 {"TZ", "UTC"},
                 {"XDG_CONFIG_HOME", at + "/.config"}};
     }
-    int run(Words words)
+    int save(Words words)
     {
-        words.insert(words.begin(), {std::string(CLIPSA_BIN) + "/clipsa", "save"});
-        tests::Program program(words, variables());
-        const int status = program.wait();
-        out = program.output();
-        errors = program.errors();
-        return status;
-    }
-    static Words namesIn(const fs::path& folder)
-    {
-        Words names;
-        if (fs::is_directory(folder))
-            for (const auto& each : fs::directory_iterator(folder))
-                names.push_back(each.path().filename());
-        std::sort(names.begin(), names.end());
-        return names;
+        words.insert(words.begin(), "save");
+        return run(words, variables());
     }
     /// What a program that knows movies says of them.
     static std::string ffprobe(const fs::path& movie, const std::string& entries)
@@ -90,25 +76,23 @@ protected:
     /// The error is one line; nothing is left on the way, and the recording is as it was.
     void expectFailure(const fs::path& movie)
     {
-        EXPECT_THAT(out, IsEmpty());
+        EXPECT_THAT(printed, IsEmpty());
         EXPECT_THAT(errors, StartsWith("clipsa: "));
         EXPECT_EQ(std::count(errors.begin(), errors.end(), '\n'), 1) << errors;
-        EXPECT_THAT(namesIn(home.path() / ".cache/clipsa"), IsEmpty());
+        EXPECT_THAT(namesIn(home / ".cache/clipsa"), IsEmpty());
         EXPECT_EQ(tests::PrivateDirectory::read(movie), bytes);
     }
 
     std::string bytes;
-    std::string out;
-    std::string errors;
 };
 
 TEST_F(SavingFromAShell, PutsTheMovieIntoTheLibraryAndSaysWhere)
 {
     const fs::path movie = recording("clock.mp4");
-    ASSERT_EQ(run({movie}), 0) << errors;
+    ASSERT_EQ(save({movie}), 0) << errors;
     EXPECT_THAT(errors, IsEmpty()) << "no bar where there is no terminal, and the sound could be mixed";
     const fs::path saved = videos / "race 2026-11-21 15-04-05.mp4";
-    EXPECT_EQ(out, saved.native() + "\n");
+    EXPECT_EQ(printed, saved.native() + "\n");
     EXPECT_THAT(namesIn(videos), ElementsAre(saved.filename()));
     EXPECT_EQ(ffprobe(saved, "stream=codec_type"), "video\naudio\n");
     EXPECT_THAT(ffprobe(saved, "format=duration"), StartsWith(ffprobe(movie, "format=duration").substr(0, 3)));
@@ -116,22 +100,21 @@ TEST_F(SavingFromAShell, PutsTheMovieIntoTheLibraryAndSaysWhere)
     ASSERT_EQ(::stat(saved.c_str(), &status), 0);
     EXPECT_EQ(status.st_mtim.tv_sec, 1'795'273'445) << "the recording's date";
     EXPECT_EQ(tests::PrivateDirectory::read(movie), bytes) << "the user's own file is left as it is";
-    EXPECT_THAT(namesIn(home.path() / ".cache/clipsa"), IsEmpty()) << "what was made on the way has gone";
-    EXPECT_EQ(namesIn(home.path() / ".cache/thumbnails/large").size(), 1U);
-    EXPECT_THAT(tests::PrivateDirectory::read(home.path() / ".local/share/recently-used.xbel"),
+    EXPECT_THAT(namesIn(home / ".cache/clipsa"), IsEmpty()) << "what was made on the way has gone";
+    EXPECT_EQ(namesIn(home / ".cache/thumbnails/large").size(), 1U);
+    EXPECT_THAT(tests::PrivateDirectory::read(home / ".local/share/recently-used.xbel"),
                 HasSubstr("race%202026-11-21%2015-04-05.mp4"));
 }
 
 TEST_F(SavingFromAShell, MakesOneTrackOfAllSound)
 {
-    const fs::path movie = home.path() / "two.mp4";
-    tests::Program remux({"ffmpeg", "-v", "error", "-i", std::string(CLIPSA_TEST_MOVIES) + "/clock.mp4", "-i",
-                          std::string(CLIPSA_TEST_MOVIES) + "/clock.mp4", "-map", "0:v", "-map", "0:a:0", "-map",
-                          "1:a:0", "-c", "copy", movie},
+    const fs::path movie = home / "two.mp4";
+    tests::Program remux({"ffmpeg", "-v", "error", "-i", tests::movie("clock.mp4"), "-i", tests::movie("clock.mp4"),
+                          "-map", "0:v", "-map", "0:a:0", "-map", "1:a:0", "-c", "copy", movie},
                          {});
     ASSERT_EQ(remux.wait(), 0) << remux.errors();
     ASSERT_EQ(ffprobe(movie, "stream=codec_type"), "video\naudio\naudio\n");
-    ASSERT_EQ(run({"--app-name", "Tux: Racer", movie}), 0) << errors;
+    ASSERT_EQ(save({"--app-name", "Tux: Racer", movie}), 0) << errors;
     const Words names = namesIn(videos);
     ASSERT_EQ(names.size(), 1U);
     EXPECT_THAT(names.front(), StartsWith("Tux- Racer 20"));
@@ -140,24 +123,24 @@ TEST_F(SavingFromAShell, MakesOneTrackOfAllSound)
 
 TEST_F(SavingFromAShell, TakesAMovieWithoutSound)
 {
-    ASSERT_EQ(run({recording("no-sound.mp4")}), 0) << errors;
+    ASSERT_EQ(save({recording("no-sound.mp4")}), 0) << errors;
     EXPECT_EQ(ffprobe(videos / "race 2026-11-21 15-04-05.mp4", "stream=codec_type"), "video\n");
 }
 
 TEST_F(SavingFromAShell, SavesTheSameMovieTwice)
 {
     const fs::path movie = recording("clock.mp4");
-    ASSERT_EQ(run({movie}), 0) << errors;
-    ASSERT_EQ(run({movie}), 0) << errors;
+    ASSERT_EQ(save({movie}), 0) << errors;
+    ASSERT_EQ(save({movie}), 0) << errors;
     EXPECT_THAT(namesIn(videos), ElementsAre("race 2026-11-21 15-04-05 (2).mp4", "race 2026-11-21 15-04-05.mp4"));
 }
 
 TEST_F(SavingFromAShell, SaysWhyAMovieCannotBeOpened)
 {
-    EXPECT_EQ(run({home.path() / "nothing.mp4"}), 2);
+    EXPECT_EQ(save({home / "nothing.mp4"}), 2);
     EXPECT_THAT(errors, HasSubstr("there is no file"));
     const fs::path movie = recording("not-a-movie.mp4");
-    EXPECT_EQ(run({movie}), 1);
+    EXPECT_EQ(save({movie}), 1);
     EXPECT_THAT(errors, HasSubstr("is not a movie"));
     expectFailure(movie);
     EXPECT_FALSE(fs::exists(videos));
@@ -167,7 +150,7 @@ TEST_F(SavingFromAShell, SaysWhyTheLibraryTakesNothing)
 {
     std::ofstream(videos.native()) << "a file";
     const fs::path movie = recording("clock.mp4");
-    EXPECT_EQ(run({movie}), 1);
+    EXPECT_EQ(save({movie}), 1);
     EXPECT_THAT(errors, HasSubstr(videos.native() + " is not a directory"));
     expectFailure(movie);
     EXPECT_EQ(tests::PrivateDirectory::read(videos), "a file");
@@ -179,7 +162,7 @@ TEST_F(SavingFromAShell, SaysWhyNothingMayBeWrittenInTheLibrary)
     fs::create_directory(videos);
     fs::permissions(videos, fs::perms::owner_read | fs::perms::owner_exec);
     const fs::path movie = recording("clock.mp4");
-    EXPECT_EQ(run({movie}), 1);
+    EXPECT_EQ(save({movie}), 1);
     EXPECT_THAT(errors, HasSubstr("allow writing there"));
     expectFailure(movie);
 }
@@ -190,23 +173,23 @@ TEST_F(SavingFromAShell, SavesAMovieAsItIsWhenItsSoundCannotBeMixed)
     const fs::path movie = recording("clock.mp4");
     ASSERT_LT(bytes.size(), 150'000U);
     const std::string save = "trap '' XFSZ; ulimit -f 293; exec \"$0\" save \"$1\"";
-    tests::Program program({"sh", "-c", save, std::string(CLIPSA_BIN) + "/clipsa", movie}, variables());
+    tests::Program program({"sh", "-c", save, tests::program("clipsa"), movie}, variables());
     EXPECT_EQ(program.wait(), 0) << program.errors();
     EXPECT_THAT(program.errors(), StartsWith("clipsa: the sound of " + movie.native() + " cannot be mixed ("));
     const fs::path saved = videos / "race 2026-11-21 15-04-05.mp4";
     EXPECT_EQ(program.output(), saved.native() + "\n");
     EXPECT_TRUE(tests::PrivateDirectory::read(saved) == bytes);
-    EXPECT_THAT(namesIn(home.path() / ".cache/clipsa"), IsEmpty());
+    EXPECT_THAT(namesIn(home / ".cache/clipsa"), IsEmpty());
 }
 
 TEST_F(SavingFromAShell, LeavesNothingBehindWhenItIsInterrupted)
 {
     const fs::path movie = recording("long-gop.mp4");
-    const fs::path root = home.path() / ".cache/clipsa";
+    const fs::path root = home / ".cache/clipsa";
     fs::create_directories(root);
     const int watch = ::inotify_init1(IN_CLOEXEC);
     ASSERT_GE(::inotify_add_watch(watch, root.c_str(), IN_CREATE), 0);
-    tests::Program program({std::string(CLIPSA_BIN) + "/clipsa", "save", movie}, variables());
+    tests::Program program(command({"save", movie}), variables());
     pollfd begun = {watch, POLLIN, 0};
     EXPECT_EQ(::poll(&begun, 1, 60'000), 1) << "nothing is begun";
     ::close(watch);

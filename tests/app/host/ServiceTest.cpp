@@ -1,4 +1,5 @@
 // The service as it is installed: started by its bus for the first recorder that calls it.
+#include "support/Paths.h"
 #include "support/PrivateBus.h"
 #include "support/Program.h"
 
@@ -13,7 +14,6 @@ using testing::StartsWith;
 
 namespace {
 
-const std::string kSource = CLIPSA_SOURCE;
 const std::string kPython = "/usr/bin/python3"; // whose modules are the system's
 
 class Service : public ::testing::Test {
@@ -21,15 +21,15 @@ protected:
     /// A bus that knows our service file; what it starts has the variables of this process.
     void startBus(const std::string& script)
     {
-        std::string file = tests::PrivateDirectory::read(kSource + "/packaging/org.clipsa.Clipsa.service.in");
+        std::string file = tests::PrivateDirectory::read(tests::sourceFile("packaging/org.clipsa.Clipsa.service.in"));
         const std::string variable = "@CMAKE_INSTALL_FULL_BINDIR@";
         ASSERT_THAT(file, HasSubstr(variable));
-        file.replace(file.find(variable), variable.size(), CLIPSA_BIN);
+        file.replace(file.find(variable), variable.size(), tests::program(""));
         m_directory.write("data/dbus-1/services/org.clipsa.Clipsa.service", file);
         ::setenv("XDG_DATA_HOME", (m_directory.path() / "data").c_str(), 1);
         ::setenv("XDG_DATA_DIRS", "/nowhere", 1);
         ::setenv("XDG_CACHE_HOME", m_cache.c_str(), 1);
-        ::setenv("CLIPSA_EDITOR", CLIPSA_BIN "/fake-editor", 1);
+        ::setenv("CLIPSA_EDITOR", tests::program("fake-editor").c_str(), 1);
         ::setenv("FAKE_EDITOR", script.c_str(), 1);
         m_bus.emplace();
     }
@@ -44,7 +44,7 @@ protected:
 
     void expectScenario(const std::string& scenario)
     {
-        expectSuccess({kPython, kSource + "/tests/app/host/recorders.py", m_movie, scenario});
+        expectSuccess({kPython, tests::sourceFile("tests/app/host/recorders.py"), m_movie, scenario});
     }
 
     std::filesystem::path pipe(const char* variable)
@@ -112,7 +112,7 @@ TEST_F(Service, AnswersTheExampleInPython)
 {
     const auto report = m_directory.path() / "report";
     startBus("report=" + report.native() + " finish=save,share wait");
-    expectSuccess({kPython, kSource + "/docs/examples/record_and_edit.py", m_movie, "Tux Racer"});
+    expectSuccess({kPython, tests::sourceFile("docs/examples/record_and_edit.py"), m_movie, "Tux Racer"});
     EXPECT_EQ(m_output, "save\nshare\n");
     EXPECT_THAT(tests::PrivateDirectory::read(report), HasSubstr("AppNameKey=Tux Racer\n"));
 }
@@ -120,10 +120,10 @@ TEST_F(Service, AnswersTheExampleInPython)
 TEST_F(Service, TellsTheExampleInPythonWhatIsWrong)
 {
     startBus("exit=9");
-    tests::Program early({kPython, kSource + "/docs/examples/record_and_edit.py", m_movie}, {});
+    tests::Program early({kPython, tests::sourceFile("docs/examples/record_and_edit.py"), m_movie}, {});
     EXPECT_EQ(early.wait(), 1);
     EXPECT_EQ(early.errors(), "the editor ended early, with exit status 9\n");
-    tests::Program wrong({kPython, kSource + "/docs/examples/record_and_edit.py", "/dev/null"}, {});
+    tests::Program wrong({kPython, tests::sourceFile("docs/examples/record_and_edit.py"), "/dev/null"}, {});
     EXPECT_EQ(wrong.wait(), 1);
     EXPECT_THAT(wrong.errors(), HasSubstr("not a regular file"));
 }
@@ -132,14 +132,14 @@ TEST_F(Service, TheExampleInShellRecordsAndEdits)
 {
     const auto recorder = m_directory.write("recorder", "#!/bin/sh\necho moving pictures > \"$1\"\n");
     ::chmod(recorder.c_str(), 0700);
-    const std::string path = std::string(CLIPSA_BIN) + ":" + std::getenv("PATH");
+    const std::string path = tests::program("") + ":" + std::getenv("PATH");
     const auto run = [&](const std::string& script) {
         tests::Program example({"sh", "-c", "cd \"$0\" && exec \"$1\" Racer", m_directory.path(),
-                                kSource + "/docs/examples/record-and-edit.sh"},
+                                tests::sourceFile("docs/examples/record-and-edit.sh")},
                                {{"RECORDER", recorder},
                                 {"PATH", path},
                                 {"XDG_CACHE_HOME", m_cache},
-                                {"CLIPSA_EDITOR", CLIPSA_BIN "/fake-editor"},
+                                {"CLIPSA_EDITOR", tests::program("fake-editor")},
                                 {"FAKE_EDITOR", script}});
         EXPECT_EQ(example.wait(), 0) << example.errors();
         return example.output();

@@ -1,10 +1,7 @@
 // `clipsa trim`, as a program, on the test movies.
-#include "app/host/MediaCommandLine.h"
-#include "support/Program.h"
+#include "app/host/ClipsaProgram.h"
 
 #include <QJsonArray>
-#include <QJsonDocument>
-#include <QJsonObject>
 #include <gmock/gmock.h>
 
 #include <chrono>
@@ -19,26 +16,13 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-using Words = std::vector<std::string>;
+using tests::movie;
+using tests::namesIn;
+using tests::parsed;
+using tests::refusal;
+using tests::Words;
+
 namespace fs = std::filesystem;
-
-std::string movie(const std::string& name)
-{
-    return std::string(CLIPSA_TEST_MOVIES) + "/" + name;
-}
-
-host::TrimCommand parsed(const Words& words)
-{
-    const auto command = host::parseMediaCommand(words);
-    EXPECT_TRUE(command) << command.error()->description();
-    return std::get<host::TrimCommand>(command.value().value());
-}
-
-std::string refusal(const Words& words)
-{
-    const auto command = host::parseMediaCommand(words);
-    return command ? "(accepted)" : command.error()->description();
-}
 
 TEST(TrimCommandLine, TakesTimesAsPeopleWriteThem)
 {
@@ -58,13 +42,13 @@ TEST(TrimCommandLine, TakesTimesAsPeopleWriteThem)
 
 TEST(TrimCommandLine, TakesARange)
 {
-    const auto command = parsed({"trim", "--from", "1", "m.mp4", "--to=2.5", "-o", "out.mp4"});
+    const auto command = parsed<host::TrimCommand>({"trim", "--from", "1", "m.mp4", "--to=2.5", "-o", "out.mp4"});
     EXPECT_EQ(command.movie, "m.mp4");
     EXPECT_EQ(command.from.seconds(), 1);
     EXPECT_EQ(command.to->seconds(), 2.5);
     EXPECT_EQ(command.output, "out.mp4");
     EXPECT_FALSE(command.force);
-    const auto whole = parsed({"trim", "m.mp4", "--output", "o", "--force"});
+    const auto whole = parsed<host::TrimCommand>({"trim", "m.mp4", "--output", "o", "--force"});
     EXPECT_EQ(whole.from.seconds(), 0);
     EXPECT_FALSE(whole.to);
     EXPECT_TRUE(whole.force);
@@ -81,39 +65,11 @@ TEST(TrimCommandLine, SaysWhichWordIsWrong)
     EXPECT_THAT(refusal({"trim", "m", "n", "-o", "o"}), HasSubstr("both m and n"));
 }
 
-class Trim : public ::testing::Test {
-protected:
-    int run(Words words)
-    {
-        words.insert(words.begin(), {std::string(CLIPSA_BIN) + "/clipsa", "trim"});
-        tests::Program program(words, {});
-        const int status = program.wait();
-        errors = program.errors();
-        return status;
-    }
-    QJsonObject probe(const std::string& path)
-    {
-        tests::Program program({std::string(CLIPSA_BIN) + "/clipsa", "probe", path, "--json"}, {});
-        EXPECT_EQ(program.wait(), 0);
-        return QJsonDocument::fromJson(QByteArray::fromStdString(program.output())).object();
-    }
-    Words files() const
-    {
-        Words names;
-        for (const auto& each : fs::directory_iterator(directory.path()))
-            names.push_back(each.path().filename());
-        std::sort(names.begin(), names.end());
-        return names;
-    }
-
-    tests::PrivateDirectory directory;
-    const std::string out = directory.path() / "out.mp4";
-    std::string errors;
-};
+class Trim : public tests::ClipsaProgram {};
 
 TEST_F(Trim, HasWhatIsShownFromATimeUpToAnother)
 {
-    ASSERT_EQ(run({movie("groups.mp4"), "--from", "1", "--to", "3", "-o", out}), 0) << errors;
+    ASSERT_EQ(run({"trim", movie("groups.mp4"), "--from", "1", "--to", "3", "-o", out}), 0) << errors;
     EXPECT_THAT(errors, IsEmpty());
     const QJsonObject facts = probe(out);
     EXPECT_NEAR(facts["duration"].toDouble(), 2, 0.03);
@@ -122,14 +78,14 @@ TEST_F(Trim, HasWhatIsShownFromATimeUpToAnother)
 
 TEST_F(Trim, TakesAllOfAMovieWithoutTimes)
 {
-    ASSERT_EQ(run({movie("clock.mp4"), "-o", out}), 0) << errors;
+    ASSERT_EQ(run({"trim", movie("clock.mp4"), "-o", out}), 0) << errors;
     EXPECT_EQ(probe(out)["video"][0]["pictures"], 120);
     EXPECT_EQ(probe(out)["audio"].toArray().size(), 2);
 }
 
 TEST_F(Trim, SaysWhyAMovieIsEncodedAsAWhole)
 {
-    ASSERT_EQ(run({movie("clock.mp4"), "--from", "1", "-o", out}), 0) << errors;
+    ASSERT_EQ(run({"trim", movie("clock.mp4"), "--from", "1", "-o", out}), 0) << errors;
     EXPECT_THAT(errors, HasSubstr("“clock.mp4” is encoded as a whole: no group of pictures begins in the range"));
     EXPECT_EQ(probe(out)["video"][0]["pictures"], 90);
 }
@@ -137,47 +93,47 @@ TEST_F(Trim, SaysWhyAMovieIsEncodedAsAWhole)
 TEST_F(Trim, DoesNotReplaceAFileUnlessTold)
 {
     std::ofstream(out) << "mine";
-    EXPECT_EQ(run({movie("clock.mp4"), "-o", out}), 2);
+    EXPECT_EQ(run({"trim", movie("clock.mp4"), "-o", out}), 2);
     EXPECT_THAT(errors, HasSubstr("is there already; give --force"));
     EXPECT_EQ(tests::PrivateDirectory::read(out), "mine");
-    EXPECT_EQ(run({movie("clock.mp4"), "-o", out, "--force"}), 0) << errors;
+    EXPECT_EQ(run({"trim", movie("clock.mp4"), "-o", out, "--force"}), 0) << errors;
     EXPECT_EQ(probe(out)["video"][0]["pictures"], 120);
-    EXPECT_THAT(files(), ElementsAre("out.mp4"));
+    EXPECT_THAT(namesIn(directory.path()), ElementsAre("out.mp4"));
 }
 
 TEST_F(Trim, KeepsAFileThatItWasToReplaceWhenItFails)
 {
     std::ofstream(out) << "mine";
-    EXPECT_EQ(run({movie("clock.mp4"), "--from", "100", "-o", out, "--force"}), 1);
+    EXPECT_EQ(run({"trim", movie("clock.mp4"), "--from", "100", "-o", out, "--force"}), 1);
     EXPECT_THAT(errors, HasSubstr("“clock.mp4” cannot be exported: the range begins behind its end"));
     EXPECT_EQ(tests::PrivateDirectory::read(out), "mine");
-    EXPECT_THAT(files(), ElementsAre("out.mp4"));
+    EXPECT_THAT(namesIn(directory.path()), ElementsAre("out.mp4"));
 }
 
 TEST_F(Trim, NeverReplacesTheMovieItself)
 {
     fs::copy_file(movie("clock.mp4"), out);
-    EXPECT_EQ(run({out, "-o", out, "--force"}), 2);
+    EXPECT_EQ(run({"trim", out, "-o", out, "--force"}), 2);
     EXPECT_THAT(errors, HasSubstr("is the movie itself"));
     EXPECT_EQ(fs::file_size(out), fs::file_size(movie("clock.mp4")));
 }
 
 TEST_F(Trim, FailsInOneLine)
 {
-    EXPECT_EQ(run({movie("not-a-movie.mp4"), "-o", out}), 1);
+    EXPECT_EQ(run({"trim", movie("not-a-movie.mp4"), "-o", out}), 1);
     EXPECT_THAT(errors, HasSubstr("not-a-movie.mp4” is not a movie"));
     EXPECT_EQ(std::count(errors.begin(), errors.end(), '\n'), 1);
-    EXPECT_EQ(run({movie("nothing.mp4"), "-o", out}), 2);
-    EXPECT_EQ(run({movie("clock.mp4"), "-o", directory.path() / "none" / "out.mp4"}), 1);
+    EXPECT_EQ(run({"trim", movie("nothing.mp4"), "-o", out}), 2);
+    EXPECT_EQ(run({"trim", movie("clock.mp4"), "-o", directory.path() / "none" / "out.mp4"}), 1);
     EXPECT_THAT(errors, HasSubstr("“out.mp4” cannot be written: No such file or directory"));
-    EXPECT_THAT(files(), IsEmpty());
+    EXPECT_THAT(namesIn(directory.path()), IsEmpty());
 }
 
 // The moments are spread over the whole run: from the start of the program to beyond the end of the export.
 TEST_F(Trim, LeavesAWholeMovieOrNoneWheneverItIsKilled)
 {
     using Clock = std::chrono::steady_clock;
-    const Words words{std::string(CLIPSA_BIN) + "/clipsa", "trim", movie("groups.mp4"), "--from", "0.5", "-o", out};
+    const Words words = command({"trim", movie("groups.mp4"), "--from", "0.5", "-o", out});
     const auto begin = Clock::now();
     ASSERT_EQ(tests::Program(words, {}).wait(), 0);
     const auto whole = Clock::now() - begin;
@@ -193,7 +149,7 @@ TEST_F(Trim, LeavesAWholeMovieOrNoneWheneverItIsKilled)
             std::this_thread::yield();
         program.signal(i % 2 ? SIGKILL : SIGINT);
         const int status = program.wait();
-        const Words names = files();
+        const Words names = namesIn(directory.path());
         if (!names.empty()) {
             ASSERT_THAT(names, ElementsAre("out.mp4"));
             ASSERT_EQ(fs::file_size(out), size);

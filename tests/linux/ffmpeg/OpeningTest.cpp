@@ -135,7 +135,7 @@ TEST_F(Opening, WhatIsNoMovieFailsInWordsThatNameTheFile)
     expectFailure(movie("not-a-movie.mp4"));
     expectFailure(movie("no-moov.mp4"));
     expectFailure(movie("no-such-file.mp4"));
-    expectFailure(std::filesystem::path(CLIPSA_TEST_MOVIES).string());
+    expectFailure(movie(""));
     expectFailure("/dev/zero");
     expectFailure("/dev/null");
 }
@@ -200,7 +200,7 @@ TEST_F(Opening, AnotherFileAtTheSamePathIsAnotherMovie)
 TEST_F(Opening, PathsAreResolvedBeforeTheyAreOpened)
 {
     ffmpeg::Options options;
-    options.resolvePath = [](const std::string& path) { return std::string(CLIPSA_TEST_MOVIES) + path.substr(7); };
+    options.resolvePath = [](const std::string& path) { return tests::movie(path.substr(8)); };
     ffmpeg::FFmpegMediaFramework mounted(system, center, options);
     const auto found = mounted.playerItemWithAsset(mounted.assetWithURL(base::Url::fromPath("/device/clock.mp4")));
     ASSERT_TRUE(waitFor([&] { return found->status() != Status::Unknown; }));

@@ -4,6 +4,7 @@
 #include "linux/photos/RecentFiles.h"
 #include "linux/photos/Thumbnail.h"
 #include "support/Child.h"
+#include "support/Paths.h"
 
 #include <glib.h>
 #include <map>
@@ -228,7 +229,7 @@ TEST_F(ASavedMovie, IsFoundWhereTheUserHasSetTheDirectoryForVideos)
     const std::string movie = source.native();
     const auto run = [&](std::vector<std::string> environment) {
         environment.insert(environment.end(), {"HOME=" + home.path().native(), "TZ=UTC"});
-        tests::Child child({PHOTOS_PUBLISHER, movie}, environment);
+        tests::Child child({tests::program("photos-publisher"), movie}, environment);
         return child.wait();
     };
     const std::string date = "Tux Racer 2026-11-21 15-04-05.mp4\n";

@@ -3,6 +3,7 @@
 
 #include "linux/photos/LibraryFixture.h"
 #include "support/Child.h"
+#include "support/Paths.h"
 
 #include <glib.h>
 #include <memory>
@@ -21,7 +22,7 @@ class TracedPublisher {
 public:
     TracedPublisher(std::vector<std::string> words, std::vector<std::string> environment)
     {
-        words.insert(words.begin(), PHOTOS_PUBLISHER);
+        words.insert(words.begin(), tests::program("photos-publisher"));
         const auto pointersTo = [](std::vector<std::string>& texts) {
             std::vector<char*> pointers;
             for (std::string& text : texts)

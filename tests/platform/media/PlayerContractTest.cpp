@@ -2,6 +2,7 @@
 
 #include "support/EngineTest.h"
 #include "support/FakeMedia.h"
+#include "support/Paths.h"
 
 #include <algorithm>
 #include <chrono>
@@ -48,7 +49,7 @@ struct FakeRig final : Rig {
 
 struct RealRig final : Rig {
     platform::MediaFramework& media() override { return framework; }
-    base::Url movie() const override { return base::Url::fromPath(std::string(CLIPSA_TEST_MOVIES) + "/clock.mp4"); }
+    base::Url movie() const override { return base::Url::fromPath(tests::movie("clock.mp4")); }
     void letPlay(platform::Player& player, double seconds) override
     {
         auto& real = dynamic_cast<ffmpeg::FFmpegPlayer&>(player);
