@@ -30,6 +30,16 @@ bool isKnown(const AVStream& stream)
     return parameters.codec_type != AVMEDIA_TYPE_UNKNOWN;
 }
 
+bool isOfKind(const AVFormatContext& context, std::string_view kind)
+{
+    return std::string_view(context.iformat->name).find(kind) != std::string_view::npos;
+}
+
+bool hasTable(const AVFormatContext& context)
+{
+    return isOfKind(context, "mov") || isOfKind(context, "matroska");
+}
+
 } // namespace
 
 Demuxer::Demuxer(std::shared_ptr<OpenFile> file, Cancelled cancelled)
@@ -79,37 +89,43 @@ std::int64_t Demuxer::moveTo(void* self, std::int64_t offset, int whence)
 base::Result<std::unique_ptr<Demuxer>> Demuxer::open(std::shared_ptr<OpenFile> file, Cancelled cancelled)
 {
     std::unique_ptr<Demuxer> demuxer(new Demuxer(std::move(file), std::move(cancelled)));
-    auto* buffer = static_cast<std::uint8_t*>(av_malloc(kBufferSize));
-    demuxer->m_io.reset(avio_alloc_context(buffer, kBufferSize, 0, demuxer.get(), readBytes, nullptr, moveTo));
-
-    AVFormatContext* context = avformat_alloc_context();
-    context->pb = demuxer->m_io.get();
-    context->io_open = refuseToOpen;
-    context->interrupt_callback = {[](void* self) { return int(static_cast<Demuxer*>(self)->isCancelled()); },
-                                   demuxer.get()};
-    context->max_streams = 64;
-    context->probesize = 4 << 20;
-    context->max_analyze_duration = 2 * AV_TIME_BASE;
-    context->format_whitelist = av_strdup(kFormats);
-    int error = avformat_open_input(&context, nullptr, nullptr, nullptr); // frees the context when it fails
-    if (error >= 0) {
-        demuxer->m_context.reset(context);
-        // Movies with a header need no look at their packets, which would delay the first picture.
-        const bool known = demuxer->isMov() || demuxer->seeksByTable();
-        const auto streams = context->streams;
-        if (!known || context->nb_streams == 0
-            || !std::all_of(streams, streams + context->nb_streams, [](AVStream* each) { return isKnown(*each); }))
-            error = avformat_find_stream_info(context, nullptr);
-    }
-    if (error < 0)
+    if (const int error = demuxer->begin(); error < 0)
         return base::Error::make("ffmpeg", error,
                                  "“" + demuxer->m_file->name() + "” is not a movie that can be opened: " + textOf(error)
                                      + ".");
     return demuxer;
 }
 
+int Demuxer::begin()
+{
+    m_position = 0;
+    auto* buffer = static_cast<std::uint8_t*>(av_malloc(kBufferSize));
+    Owned<AVIOContext> io(avio_alloc_context(buffer, kBufferSize, 0, this, readBytes, nullptr, moveTo));
+    AVFormatContext* opened = avformat_alloc_context();
+    opened->pb = io.get();
+    opened->io_open = refuseToOpen;
+    opened->interrupt_callback = {[](void* self) { return int(static_cast<Demuxer*>(self)->isCancelled()); }, this};
+    opened->max_streams = 64;
+    opened->probesize = 4 << 20;
+    opened->max_analyze_duration = 2 * AV_TIME_BASE;
+    opened->format_whitelist = av_strdup(kFormats);
+    if (const int error = avformat_open_input(&opened, nullptr, nullptr, nullptr); error < 0)
+        return error; // it freed the context
+    Owned<AVFormatContext> context(opened);
+    // Movies with a header need no look at their packets, which would delay the first picture.
+    const auto streams = context->streams;
+    if (!hasTable(*context) || context->nb_streams == 0
+        || !std::all_of(streams, streams + context->nb_streams, [](AVStream* each) { return isKnown(*each); }))
+        if (const int error = avformat_find_stream_info(opened, nullptr); error < 0)
+            return error;
+    m_context = std::move(context); // before what it reads through
+    m_io = std::move(io);
+    return 0;
+}
+
 void Demuxer::select(const std::vector<int>& streams)
 {
+    m_selected = streams;
     for (int i = 0; i < streamCount(); ++i) {
         const bool wanted = std::find(streams.begin(), streams.end(), i) != streams.end();
         stream(i).discard = wanted ? AVDISCARD_DEFAULT : AVDISCARD_ALL;
@@ -148,19 +164,34 @@ bool Demuxer::seekToStart(int stream)
 {
     if (!seeksByTable())
         return seekToByte(0);
+    // Matroska's table is that of the pictures. Of the sound it knows what happened to be read, and its parser does not
+    // find its way from another place: only a new one begins where the file does.
+    if (!isMov() && this->stream(stream).codecpar->codec_type != AVMEDIA_TYPE_VIDEO)
+        return startOver();
     // Some formats search forwards from a negative time only; far enough before any start, and no overflow in sums.
     return seek(stream, INT64_MIN / 4) || seekToByte(0);
 }
 
+bool Demuxer::startOver()
+{
+    const std::int64_t position = m_position;
+    if (begin() < 0) {
+        m_position = position;
+        return false;
+    }
+    if (m_selected)
+        select(std::vector<int>(*m_selected));
+    return true;
+}
+
 bool Demuxer::seeksByTable() const
 {
-    const std::string_view name = m_context->iformat->name;
-    return isMov() || name.find("matroska") != std::string_view::npos;
+    return hasTable(*m_context);
 }
 
 bool Demuxer::isMov() const
 {
-    return std::string_view(m_context->iformat->name).find("mov") != std::string_view::npos;
+    return isOfKind(*m_context, "mov");
 }
 
 } // namespace ffmpeg

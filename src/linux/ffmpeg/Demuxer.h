@@ -7,6 +7,7 @@
 
 #include <atomic>
 #include <memory>
+#include <optional>
 #include <vector>
 
 namespace ffmpeg {
@@ -36,6 +37,7 @@ public:
     /// To the keyframe at or before `timestamp` of `stream`. False when the file cannot do that.
     bool seek(int stream, std::int64_t timestamp);
     bool seekToByte(std::int64_t position);
+    /// To the first packet of all. Streams and context may be others afterwards, of the same file: ask for them again.
     bool seekToStart(int stream);
 
     /// Whether the file's own table finds keyframes; a movie without one needs a PacketIndex.
@@ -45,6 +47,9 @@ public:
 private:
     Demuxer(std::shared_ptr<OpenFile> file, Cancelled cancelled);
 
+    int begin();
+    bool startOver();
+
     static int readBytes(void* self, std::uint8_t* into, int count);
     static std::int64_t moveTo(void* self, std::int64_t offset, int whence);
 
@@ -53,6 +58,7 @@ private:
     std::int64_t m_position = 0;
     Owned<AVIOContext> m_io;
     Owned<AVFormatContext> m_context;
+    std::optional<std::vector<int>> m_selected; ///< all when nobody said
 };
 
 } // namespace ffmpeg
