@@ -1,8 +1,7 @@
 // Random ranges of movies of every kind, each output decoded and compared with its source picture by picture.
-#include "linux/ffmpeg/exporting/ExportTest.h"
+#include "linux/ffmpeg/exporting/CutsTest.h"
 
 #include <random>
-#include <set>
 
 namespace tests {
 namespace {
@@ -20,75 +19,12 @@ void PrintTo(const Kind& kind, std::ostream* stream)
 }
 
 constexpr int kRanges = 20;
-constexpr double kTolerance = 0.001;
-constexpr double kAlike = 45; // dB
 
-class RandomCuts : public ExportTest, public testing::WithParamInterface<Kind> {
-protected:
-    /// What is expected of a range: the source's pictures with the times that they have in it.
-    struct Expected {
-        const DecodedPicture* picture;
-        double seconds;
-    };
-
-    std::vector<Expected> expected(double start, double end) const
-    {
-        std::vector<Expected> pictures;
-        for (const DecodedPicture& each : source) {
-            if (each.seconds >= end - 1e-7)
-                break;
-            if (each.seconds <= start + 1e-7)
-                pictures.clear();
-            pictures.push_back({&each, std::max(0.0, each.seconds - start)});
-        }
-        return pictures;
-    }
-
-    void check(const std::string& path, double start, double end)
-    {
-        const auto wanted = expected(start, end);
-        const Complaints complaints;
-        DecodedMovie decoded(path);
-        ASSERT_TRUE(decoded.isGood());
-        const auto got = decoded.all();
-        EXPECT_EQ(Complaints::texts(), "");
-        EXPECT_EQ(decoded.refused(), 0);
-        ASSERT_EQ(got.size(), wanted.size());
-        int copied = 0;
-        std::set<int> shown;
-        for (std::size_t i = 0; i < got.size(); ++i) {
-            ASSERT_EQ(got[i].number, wanted[i].picture->number) << "picture " << i;
-            ASSERT_NEAR(got[i].seconds, wanted[i].seconds, kTolerance) << "picture " << i;
-            copied += got[i].hash == wanted[i].picture->hash;
-            ASSERT_GT(likeness(got[i], *wanted[i].picture), kAlike) << "picture " << i;
-            shown.insert(got[i].number);
-        }
-        copies += copied;
-        const double last = wanted.back().seconds;
-        const double length = double(decoded.context().duration) / AV_TIME_BASE;
-        EXPECT_GT(length, last);
-        EXPECT_LE(length, end - start + 0.002);
-        for (const DecodedPicture& each : DecodedMovie(path, DecodedMovie::Edits::Ignore).all())
-            EXPECT_TRUE(shown.contains(each.number)) << each.number << " was removed";
-        for (const double part : {0.9, 0.1, 0.5}) {
-            const std::size_t which = std::size_t(part * double(got.size()));
-            EXPECT_EQ(decoded.numberAfterSeeking(got[which].seconds), got[which].number);
-        }
-    }
-
-    std::vector<DecodedPicture> source;
-    int copies = 0;
-};
+class RandomCuts : public CutsTest, public testing::WithParamInterface<Kind> {};
 
 TEST_P(RandomCuts, HaveExactlyTheirPictures)
 {
-    const std::string path = exportMovie(GetParam().file);
-    ASSERT_EQ(open(path), Status::ReadyToPlay);
-    source = DecodedMovie(path).all();
-    ASSERT_FALSE(source.empty());
-    const double origin = path.ends_with(".ts") ? source.front().seconds : 0;
-    for (DecodedPicture& each : source)
-        each.seconds -= origin;
+    ASSERT_NO_FATAL_FAILURE(take(exportMovie(GetParam().file)));
     const double length = asset->duration().seconds();
     std::mt19937 random(static_cast<unsigned>(GetParam().seed));
     std::uniform_real_distribution<double> moment(0, length);
@@ -99,18 +35,18 @@ TEST_P(RandomCuts, HaveExactlyTheirPictures)
             start = moment(random);
             end = moment(random);
         } while (end - start < 0.1 || expected(start, end).empty());
-        SCOPED_TRACE(std::to_string(i) + ": " + std::to_string(start) + " to " + std::to_string(end));
-        const Range range{MediaTime::fromSeconds(start, 90000), MediaTime::fromSeconds(end - start, 90000)};
-        ASSERT_EQ(cut(path, output(), range), ExportStatus::Completed) << errorText();
-        const std::int32_t ticks = asset->duration().timescale;
-        check(output(), range.start.convertedTo(ticks).seconds(), range.end().convertedTo(ticks).seconds());
-        std::filesystem::remove(output());
+        cutAndCheck(start, end);
     }
+    EXPECT_LE(worstLateness, kTolerance);
+    RecordProperty("worst_lateness_us", int(worstLateness * 1e6));
+    RecordProperty("worst_remains_per_mille", int(worstRemains * 1000));
     if (!GetParam().isCopied)
         return;
     EXPECT_GT(copies, 20);
     for (const std::string& line : log.texts(base::MemoryLog::Line::Kind::Message))
-        EXPECT_NE(line.find("no group of pictures begins in the range"), std::string::npos) << line;
+        if (line.find("is encoded as a whole") != std::string::npos) {
+            EXPECT_NE(line.find("no group of pictures begins in the range"), std::string::npos) << line;
+        }
 }
 
 INSTANTIATE_TEST_SUITE_P(
@@ -127,7 +63,10 @@ INSTANTIATE_TEST_SUITE_P(
                     Kind{"vp9-444.mkv", true, 23}, Kind{"av1.mp4", true, 24}, Kind{"av1-hidden.mkv", true, 25},
                     Kind{"vp8.webm", false, 26}, Kind{"mpeg4.mp4", false, 27}, Kind{"mjpeg.mov", false, 28},
                     Kind{"hevc.mp4", true, 29}, Kind{"hevc-b.mkv", true, 30}, Kind{"hevc-open.mp4", false, 31},
-                    Kind{"hevc-10bit.mp4", true, 32}),
+                    Kind{"hevc-10bit.mp4", true, 32}, Kind{"sound-late.mp4", true, 33},
+                    Kind{"sound-early.mp4", true, 34}, Kind{"sound-fragmented.mp4", true, 35},
+                    Kind{"sound-edit-list.mp4", true, 36}, Kind{"sound.mkv", true, 37}, Kind{"mp3.mov", true, 38},
+                    Kind{"pcm.mov", true, 39}, Kind{"opus.webm", true, 40}, Kind{"opus.mkv", true, 41}),
     [](const auto& each) {
         std::string name = each.param.file;
         std::replace_if(

@@ -1,6 +1,8 @@
 /// Makes sound files out of formulas, exports sound without pictures, and decodes what came out.
 #pragma once
 
+#include "linux/ffmpeg/exporting/sound/DecodedSound.h"
+
 #include "linux/ffmpeg/exporting/sound/SoundSources.h"
 
 #include <cmath>
@@ -45,33 +47,6 @@ ExportedSound exportSound(const std::string& from, const std::string& into, doub
                           const std::optional<platform::AudioMix>& mix = std::nullopt);
 /// A mix of all sound tracks of a file.
 platform::AudioMix mixOfAll(const std::string& path);
-
-struct DecodedSound {
-    int rate = 0;
-    std::int64_t start = 0; ///< where the first sample lies, in samples
-    std::vector<std::vector<float>> channels;
-    std::size_t packets = 0;
-    std::string codec;
-    int profile = 0;
-    std::string language, handler;
-    int disposition = 0;
-    int errors = 0;
-    std::int64_t firstPts = 0;                    ///< of the first packet, in samples
-    std::vector<std::vector<std::uint8_t>> bytes; ///< of each packet
-
-    std::size_t length() const { return channels.empty() ? 0 : channels.front().size(); }
-    /// The sample at a place on the time line; 0 where there is none.
-    float at(std::int64_t place, std::size_t channel) const
-    {
-        const std::int64_t index = place - start;
-        return index >= 0 && index < static_cast<std::int64_t>(length())
-                   ? channels[channel][static_cast<std::size_t>(index)]
-                   : 0.0f;
-    }
-};
-
-/// What a player hears, or (`everything`) what is in the packets although an edit list hides it.
-DecodedSound decodeSound(const std::string& path, int track = 0, bool everything = false);
 
 /// How loud a tone is in a part of a channel, as the peak of a sine.
 inline double toneIn(const std::vector<float>& samples, int rate, double frequency, std::size_t from, std::size_t until)
