@@ -4,9 +4,12 @@
 
 #include <gmock/gmock.h>
 
+#include <chrono>
+#include <csignal>
 #include <fstream>
 #include <numeric>
 #include <sys/stat.h>
+#include <thread>
 
 using namespace tests;
 using testing::ElementsAre;
@@ -135,6 +138,46 @@ TEST_F(Save, IsFinishedWhenTheHostIsKilledMeanwhile)
     // The next one sweeps up what the dead host has left.
     setScript("tap Cancel");
     open();
+}
+
+// The moments are spread over the whole save: from the tap to the end of the editor.
+TEST_F(Save, LeavesTheWholeMovieOrNothingWheneverTheEditorIsKilled)
+{
+    using Clock = std::chrono::steady_clock;
+    constexpr int kMoments = 24;
+    setScript("print saving\ntap Save");
+    const Machine::Words open = {"open", m_movie, "--app-name", "Tux Racer"};
+    auto first = m_machine.start(open);
+    ASSERT_TRUE(first.waitForText("saving\n"));
+    const auto begin = Clock::now();
+    ASSERT_EQ(first.wait().exitStatus, 0);
+    const auto whole = Clock::now() - begin;
+    ASSERT_THAT(saved(), SizeIs(1));
+    const std::string wanted = PrivateDirectory::read(saved().front());
+
+    int found = 0;
+    for (int i = 0; i < kMoments; ++i) {
+        SCOPED_TRACE("kill " + std::to_string(i));
+        std::filesystem::remove_all(library());
+        auto host = m_machine.start(open);
+        ASSERT_TRUE(host.waitForText("saving\n"));
+        const auto until = Clock::now() + whole * i / kMoments;
+        while (Clock::now() < until)
+            std::this_thread::yield();
+        for (const pid_t editor : m_machine.processes("clipsa-editor"))
+            ::kill(editor, SIGKILL);
+        const auto end = host.wait();
+        const auto movies = saved();
+        if (!movies.empty()) {
+            ASSERT_THAT(movies, SizeIs(1));
+            ASSERT_TRUE(PrivateDirectory::read(movies.front()) == wanted) << "not whole";
+            ++found;
+        } else {
+            EXPECT_NE(end.exitStatus, 0) << "the recorder was told of a save";
+        }
+        ASSERT_TRUE(PrivateDirectory::read(m_movie) == m_bytes) << "the user's own file";
+    }
+    EXPECT_LT(found, kMoments);
 }
 
 TEST_F(Save, ALibraryThatCannotBeWrittenIsSaidAndTheHostIsToldAllTheSame)

@@ -19,6 +19,7 @@ namespace host {
 namespace {
 
 constexpr std::string_view kPrefix = "editor-";
+constexpr const char* kLock = "lock";
 constexpr time_t kDay = 24 * 60 * 60;
 
 std::string environmentPath(const char* name)
@@ -34,15 +35,29 @@ std::string socketOutside(const std::string& directory)
     return runtime.empty() ? "" : runtime + "/clipsa-" + directory.substr(directory.rfind('/') + 1);
 }
 
-void removeDirectory(const std::string& path)
+/// False when something of it is left.
+bool removeAll(const std::filesystem::path& path)
 {
     // It gives up when somebody else removes an entry meanwhile, as libdbus does with its socket from its own thread.
     std::error_code error;
     for (int attempt = 0; attempt < 4; ++attempt) {
         std::filesystem::remove_all(path, error);
         if (!error)
-            break; // else: what cannot be removed at all is swept another time
+            return true;
     }
+    return false;
+}
+
+void removeDirectory(const std::string& path)
+{
+    // The lock last: a directory that has one is swept another time when we are killed here, or cannot remove it all.
+    std::error_code error;
+    bool isEmpty = true;
+    for (const auto& entry : std::filesystem::directory_iterator(path, error))
+        if (entry.path().filename() != kLock)
+            isEmpty &= removeAll(entry.path());
+    if (isEmpty)
+        removeAll(path);
     if (const std::string socket = socketOutside(path); !socket.empty())
         ::unlink(socket.c_str());
 }
@@ -50,7 +65,7 @@ void removeDirectory(const std::string& path)
 /// Takes the lock of a directory: held by nobody else as long as the result lives.
 posix::FileDescriptor takeLock(int directory)
 {
-    posix::FileDescriptor lock(::openat(directory, "lock", O_RDWR | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
+    posix::FileDescriptor lock(::openat(directory, kLock, O_RDWR | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
     if (lock && ::flock(lock.get(), LOCK_EX | LOCK_NB) != 0)
         return {};
     return lock;
@@ -62,7 +77,7 @@ bool isDead(const std::string& path)
     struct stat status = {};
     if (!directory || ::fstat(directory.get(), &status) != 0 || status.st_uid != ::geteuid())
         return false;
-    if (::faccessat(directory.get(), "lock", F_OK, AT_SYMLINK_NOFOLLOW) != 0)
+    if (::faccessat(directory.get(), kLock, F_OK, AT_SYMLINK_NOFOLLOW) != 0)
         // Being made just now, or left by somebody who died while making it.
         return errno == ENOENT && std::time(nullptr) - status.st_mtim.tv_sec > kDay;
     return static_cast<bool>(takeLock(directory.get()));
@@ -74,7 +89,7 @@ base::Result<posix::FileDescriptor> makeLock(const std::string& directory)
     const std::string early = directory + "/lock.new";
     posix::FileDescriptor lock(::open(early.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, S_IRUSR | S_IWUSR));
     if (!lock || ::flock(lock.get(), LOCK_EX | LOCK_NB) != 0
-        || ::rename(early.c_str(), (directory + "/lock").c_str()) != 0)
+        || ::rename(early.c_str(), (std::filesystem::path(directory) / kLock).c_str()) != 0)
         return base::Error::fromErrno(errno, "cannot lock " + directory);
     return lock;
 }

@@ -3,13 +3,12 @@
 #include "linux/photos/GLibText.h"
 #include "linux/photos/MediaType.h"
 #include "linux/photos/VideoLibrary.h"
-#include "linux/posix/FileDescriptor.h"
 
 #include <cerrno>
-#include <cstdio>
-#include <cstdlib>
 #include <filesystem>
+#include <glib.h>
 #include <map>
+#include <memory>
 #include <png.h>
 #include <sys/stat.h>
 #include <vector>
@@ -84,27 +83,16 @@ base::Result<void> makePrivateDirectory(const fs::path& path)
     return {};
 }
 
-/// Beside its name first, so that nobody reads half a picture. mkstemp() makes it private.
+/// Beside its name first, so that nobody reads half a picture.
 base::Result<void> writeAtOnce(const fs::path& path, const Bytes& bytes)
 {
-    std::string part = (path.parent_path() / ".clipsa-XXXXXX").native();
-    const posix::FileDescriptor file(::mkstemp(part.data()));
-    if (!file)
-        return base::Error::fromErrno(errno, "making a file in " + path.parent_path().native());
-    int number = 0;
-    for (std::size_t done = 0; number == 0 && done < bytes.size();) {
-        const ssize_t written = ::write(file.get(), bytes.data() + done, bytes.size() - done);
-        if (written >= 0)
-            done += static_cast<std::size_t>(written);
-        else if (errno != EINTR)
-            number = errno;
-    }
-    if (number == 0 && std::rename(part.c_str(), path.c_str()) != 0)
-        number = errno;
-    if (number == 0)
+    constexpr int kPrivate = 0600;
+    GError* raw = nullptr;
+    if (g_file_set_contents_full(path.c_str(), reinterpret_cast<const char*>(bytes.data()),
+                                 static_cast<gssize>(bytes.size()), G_FILE_SET_CONTENTS_CONSISTENT, kPrivate, &raw))
         return {};
-    ::unlink(part.c_str());
-    return base::Error::fromErrno(number, "writing " + path.native());
+    const std::unique_ptr<GError, decltype(&g_error_free)> error(raw, &g_error_free);
+    return base::Error::make(base::kPosixErrorDomain, EIO, error->message);
 }
 
 } // namespace

@@ -2,6 +2,7 @@
 
 #include "linux/dbus/HostConnection.h"
 #include "support/PrivateDirectory.h"
+#include "support/WithoutPrivileges.h"
 
 #include <gmock/gmock.h>
 
@@ -103,6 +104,22 @@ TEST_F(EditorDirectories, OfDeadEditorsAreSwept)
     EXPECT_FALSE(std::filesystem::exists(first));
     EXPECT_FALSE(std::filesystem::exists(second));
     EXPECT_TRUE(std::filesystem::exists(m_root));
+}
+
+TEST_F(EditorDirectories, ThatCannotBeRemovedAsAWholeAreSweptAnotherTime)
+{
+    const auto path = dead("editor-aaaaaa");
+    const auto stubborn = path / "private/Velkor";
+    {
+        const tests::WithoutPrivileges here;
+        std::filesystem::permissions(stubborn, std::filesystem::perms::owner_read | std::filesystem::perms::owner_exec);
+        sweep();
+    }
+    EXPECT_TRUE(std::filesystem::exists(stubborn / "movie.mp4"));
+    EXPECT_TRUE(std::filesystem::exists(path / "lock")) << "it says that nobody lives there";
+    std::filesystem::permissions(stubborn, std::filesystem::perms::owner_all);
+    EXPECT_EQ(sweep(), 1);
+    EXPECT_FALSE(std::filesystem::exists(path));
 }
 
 TEST_F(EditorDirectories, SweepingLeavesWhatIsNotAnEditors)

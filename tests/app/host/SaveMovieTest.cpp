@@ -10,8 +10,10 @@
 #include <filesystem>
 #include <fstream>
 #include <poll.h>
+#include <random>
 #include <sys/inotify.h>
 #include <sys/stat.h>
+#include <thread>
 
 namespace {
 
@@ -180,6 +182,58 @@ TEST_F(SavingFromAShell, SavesAMovieAsItIsWhenItsSoundCannotBeMixed)
     EXPECT_EQ(program.output(), saved.native() + "\n");
     EXPECT_TRUE(tests::PrivateDirectory::read(saved) == bytes);
     EXPECT_THAT(namesIn(home / ".cache/clipsa"), IsEmpty());
+}
+
+// The moments are spread over the whole run: from the start of the program to the thumbnail and beyond.
+TEST_F(SavingFromAShell, LeavesTheWholeMovieOrNothingWheneverItIsKilled)
+{
+    using Clock = std::chrono::steady_clock;
+    constexpr int kMoments = 200;
+    const fs::path root = home / ".cache/clipsa";
+    const fs::path movie = recording("one-frame.mp4");
+    tests::Program cut(
+        {"ffmpeg", "-v", "error", "-y", "-i", tests::movie("clock.mp4"), "-t", "1", "-map", "0", "-c", "copy", movie},
+        {});
+    ASSERT_EQ(cut.wait(), 0) << cut.errors();
+    bytes = tests::PrivateDirectory::read(movie);
+    const auto begin = Clock::now();
+    ASSERT_EQ(save({"--app-name", "Tux", movie}), 0) << errors;
+    const auto whole = Clock::now() - begin;
+    const Words saved = namesIn(videos);
+    ASSERT_EQ(saved.size(), 1U);
+    const std::string wanted = tests::PrivateDirectory::read(videos / saved.front());
+    ASSERT_EQ(ffprobe(videos / saved.front(), "stream=codec_type"), "video\naudio\n") << "mixed";
+
+    std::mt19937 random(5);
+    int found = 0;
+    int unfinished = 0;
+    for (int i = 0; i < kMoments; ++i) {
+        SCOPED_TRACE("kill " + std::to_string(i));
+        fs::remove_all(videos);
+        tests::Program program(command({"save", "--app-name", "Tux", movie}), variables());
+        const auto until = Clock::now() + whole * (random() % 1000) / 900;
+        while (Clock::now() < until)
+            std::this_thread::yield();
+        program.signal(SIGKILL);
+        program.wait();
+        const Words names = namesIn(videos);
+        if (!names.empty()) {
+            ASSERT_EQ(names, saved);
+            ASSERT_TRUE(tests::PrivateDirectory::read(videos / names.front()) == wanted) << "not whole";
+            ++found;
+        }
+        ASSERT_TRUE(tests::PrivateDirectory::read(movie) == bytes) << "the recording";
+        unfinished += !namesIn(root).empty();
+    }
+    EXPECT_GT(found, 0);
+    EXPECT_LT(found, kMoments);
+    EXPECT_GT(unfinished, 0) << "none was killed in the middle";
+    fs::remove_all(videos);
+    ASSERT_EQ(save({"--app-name", "Tux", movie}), 0) << errors;
+    // The next one sweeps up what the dead ones left; a directory of one that died while making it is empty.
+    for (const auto& left : fs::recursive_directory_iterator(root))
+        EXPECT_TRUE(left.is_directory() || left.file_size() == 0) << left.path();
+    EXPECT_EQ(namesIn(videos), saved);
 }
 
 TEST_F(SavingFromAShell, LeavesNothingBehindWhenItIsInterrupted)

@@ -136,8 +136,8 @@ protected:
             image.version = PNG_IMAGE_VERSION;
             image.format = PNG_FORMAT_RGBA;
             std::vector<std::uint8_t> pixels;
-            if (file.front() == '.')
-                continue;
+            if (!file.ends_with(".png"))
+                continue; // on its way
             EXPECT_TRUE(png_image_begin_read_from_file(&image, (thumbnails / file).c_str())) << image.message;
             pixels.resize(PNG_IMAGE_SIZE(image));
             EXPECT_TRUE(png_image_finish_read(&image, nullptr, pixels.data(), 0, nullptr)) << image.message;
