@@ -1,5 +1,6 @@
 // The extension's process. It is started by its host, gets the payload through a private connection, and ends with it.
 
+#include "app/editor/DisplayWatch.h"
 #include "app/editor/Drawing.h"
 #include "app/editor/EditorOptions.h"
 #include "app/editor/EditorProgram.h"
@@ -10,6 +11,7 @@
 
 #include <cstdio>
 #include <fcntl.h>
+#include <optional>
 
 int main(int argc, char* argv[])
 {
@@ -22,7 +24,9 @@ int main(int argc, char* argv[])
     // Keeps our directory alive as long as we live, but not as long as programs that we start.
     fcntl(dbus::kEditorLockDescriptor, F_SETFD, FD_CLOEXEC);
     app::chooseDrawing();
+    std::optional<app::DisplayWatch> watch(std::in_place);
     QGuiApplication application(argc, argv);
+    watch.reset();
     app::markStart("application");
     QGuiApplication::setApplicationName("Clipsa");
     QGuiApplication::setDesktopFileName("org.clipsa.Clipsa");

@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <ostream>
 #include <sys/stat.h>
+#include <utility>
 
 using namespace tests;
 using testing::AllOf;
@@ -49,6 +50,22 @@ TEST_F(BadInput, ADirectoryIsRefused)
 {
     expectRefused(m_machine.home());
     EXPECT_TRUE(std::filesystem::exists(m_machine.home()));
+}
+
+TEST_F(BadInput, WithoutADisplayThePersonReadsWhatIsMissing)
+{
+    const auto movie = m_machine.movie("clock.mp4");
+    m_machine.set("QT_QPA_PLATFORM", "xcb");
+    for (const auto& [display, words] :
+         {std::pair{"", "there is no display to open a window on; start Clipsa in a graphical session\n"},
+          std::pair{":987", "no window can be opened on the display :987; is it running"}}) {
+        m_machine.set("DISPLAY", display);
+        const auto end = m_machine.open(movie);
+        EXPECT_EQ(end.exitStatus, 3);
+        EXPECT_THAT(end.err, AllOf(StartsWith(std::string("clipsa-editor: ") + words), HasSubstr("is untouched: ")));
+        EXPECT_EQ(std::count(end.err.begin(), end.err.end(), '\n'), 2) << end.err;
+        EXPECT_THAT(m_machine.remains(), IsEmpty());
+    }
 }
 
 TEST_F(BadInput, AnEmptyFileIsRefused)
