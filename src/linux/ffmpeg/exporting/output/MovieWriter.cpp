@@ -23,6 +23,9 @@ constexpr std::int64_t kIndexBytesBeside = 64 << 10; ///< headers of tracks and 
 /// So long does one track go on before another has its turn: fewer chunks make a smaller index and larger reads.
 constexpr double kTurn = 0.5;
 
+/// How much more of the whole must be done before it is told again: whoever hears of each packet has no time to write.
+constexpr double kProgressStep = 0.001;
+
 struct Closing {
     void operator()(AVFormatContext* context) const { avformat_free_context(context); }
 };
@@ -221,7 +224,11 @@ private:
         double sum = 0;
         for (const Track& each : m_tracks)
             sum += each.done;
-        m_job.progress(sum / static_cast<double>(m_tracks.size()));
+        const double part = sum / static_cast<double>(m_tracks.size());
+        if (part < m_toldProgress + kProgressStep && part < 1)
+            return;
+        m_toldProgress = part;
+        m_job.progress(part);
     }
 
     Result<void> write(Track& track)
@@ -283,6 +290,7 @@ private:
     std::unique_ptr<AVFormatContext, Closing> m_context;
     std::vector<Track> m_tracks;
     std::int64_t m_reserved = 0;
+    double m_toldProgress = 0;
 };
 
 } // namespace
