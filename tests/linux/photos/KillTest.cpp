@@ -2,93 +2,17 @@
 // library holds the whole movie or nothing, and the recording is as it was.
 
 #include "linux/photos/LibraryFixture.h"
-#include "support/Child.h"
-#include "support/Paths.h"
+#include "linux/photos/TracedPublisher.h"
 
 #include <glib.h>
 #include <memory>
 #include <png.h>
-#include <sys/ptrace.h>
-#include <sys/wait.h>
 
 namespace {
 
 using testing::ElementsAre;
 using testing::IsEmpty;
 namespace fs = std::filesystem;
-
-/// A publisher that is stopped before and after each of its system calls. The thread that made it drives it.
-class TracedPublisher {
-public:
-    TracedPublisher(std::vector<std::string> words, std::vector<std::string> environment)
-    {
-        words.insert(words.begin(), tests::program("photos-publisher"));
-        const auto pointersTo = [](std::vector<std::string>& texts) {
-            std::vector<char*> pointers;
-            for (std::string& text : texts)
-                pointers.push_back(text.data());
-            pointers.push_back(nullptr);
-            return pointers;
-        };
-        posix_spawn_file_actions_t files;
-        ::posix_spawn_file_actions_init(&files);
-        ::posix_spawn_file_actions_addopen(&files, STDOUT_FILENO, "/dev/null", O_WRONLY, 0);
-        const int error = ::posix_spawn(&m_process, words.front().c_str(), &files, nullptr, pointersTo(words).data(),
-                                        pointersTo(environment).data());
-        ::posix_spawn_file_actions_destroy(&files);
-        if (error != 0)
-            throw std::runtime_error("cannot start the publisher");
-    }
-    ~TracedPublisher() { kill(); }
-    TracedPublisher(const TracedPublisher&) = delete;
-    TracedPublisher& operator=(const TracedPublisher&) = delete;
-
-    /// Until it has been stopped `stops` times, or has ended: gives the number of stops.
-    int run(int stops)
-    {
-        int count = 0;
-        while (count < stops && m_process > 0) {
-            int status = 0;
-            const pid_t thread = ::waitpid(-1, &status, __WALL);
-            if (thread < 0)
-                break;
-            if (WIFEXITED(status) || WIFSIGNALED(status)) {
-                if (thread == m_process) {
-                    m_process = -1;
-                    m_exitStatus = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-                }
-                continue;
-            }
-            if (!m_begun) {
-                m_begun = true;
-                ::ptrace(PTRACE_SETOPTIONS, thread, nullptr,
-                         PTRACE_O_TRACESYSGOOD | PTRACE_O_TRACECLONE | PTRACE_O_EXITKILL);
-            }
-            if (WSTOPSIG(status) == (SIGTRAP | 0x80) && ++count == stops)
-                break;
-            // Their first stop, and the one that it asks for itself, are for us; no other signals come.
-            ::ptrace(PTRACE_SYSCALL, thread, nullptr, nullptr);
-        }
-        return count;
-    }
-
-    void kill()
-    {
-        if (m_process <= 0)
-            return;
-        ::kill(m_process, SIGKILL);
-        int status = 0;
-        while (::waitpid(-1, &status, __WALL) > 0) {}
-        m_process = -1;
-    }
-
-    int exitStatus() const { return m_exitStatus; }
-
-private:
-    pid_t m_process = -1;
-    bool m_begun = false;
-    int m_exitStatus = -1;
-};
 
 class ASaveThatIsKilled : public tests::LibraryFixture, public testing::WithParamInterface<bool> {
 protected:
@@ -153,7 +77,7 @@ TEST_P(ASaveThatIsKilled, LeavesTheWholeMovieOrNothing)
 {
     int stops = 0;
     {
-        TracedPublisher whole(words(), environment());
+        tests::TracedPublisher whole(words(), environment());
         stops = whole.run(1'000'000);
         ASSERT_EQ(whole.exitStatus(), 0);
         ASSERT_TRUE(expectAllOrNothing());
@@ -167,7 +91,7 @@ TEST_P(ASaveThatIsKilled, LeavesTheWholeMovieOrNothing)
         const int stop = 1 + point * (stops - 1) / (points - 1);
         forgetAll();
         {
-            TracedPublisher publisher(words(), environment());
+            tests::TracedPublisher publisher(words(), environment());
             publisher.run(stop);
             publisher.kill();
         }
