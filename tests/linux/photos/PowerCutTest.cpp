@@ -51,9 +51,10 @@ TEST_P(APowerCutWith, FindsEitherNoNameOrAWholeMovie)
                && call.first == file;
     });
     EXPECT_GE(written, named) << "something is written behind the flush";
-    // And the directory, so that the name lasts when we say that the movie is saved.
+    // And the directory that it was given the name in, so that the name lasts when we say that the movie is saved.
+    const int directory = calls[static_cast<std::size_t>(named)].third;
     const auto lasting =
-        placeOf(calls, named, [&](const auto& call) { return call.number == SYS_fsync && call.first != file; });
+        placeOf(calls, named, [&](const auto& call) { return call.number == SYS_fsync && call.first == directory; });
     EXPECT_LT(lasting, end) << "the name is not flushed";
 }
 
