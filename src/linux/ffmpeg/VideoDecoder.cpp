@@ -35,6 +35,9 @@ base::Result<std::unique_ptr<VideoDecoder>> VideoDecoder::open(const AVStream& s
     context->thread_count = threads;
     context->thread_type = FF_THREAD_FRAME;
     context->max_pixels = kMostPixels;
+    // Behind a keyframe that is no new beginning of the stream the decoder thinks that pictures are damaged until it has
+    // given the keyframe; where few follow they would be lost. receive() knows better.
+    context->flags |= AV_CODEC_FLAG_OUTPUT_CORRUPT;
     if (hardware)
         hardware->offerTo(*context);
     if (error >= 0)
@@ -46,6 +49,8 @@ base::Result<std::unique_ptr<VideoDecoder>> VideoDecoder::open(const AVStream& s
 
 void VideoDecoder::send(const AVPacket& packet)
 {
+    if (m_firstKeyframe == AV_NOPTS_VALUE && (packet.flags & AV_PKT_FLAG_KEY))
+        m_firstKeyframe = packet.pts;
     // Pictures were taken out before, so the decoder has room; anything else it says is about a damaged packet.
     avcodec_send_packet(m_context.get(), &packet);
 }
@@ -69,6 +74,9 @@ FrameRef VideoDecoder::receive()
         std::int64_t pts = picture->best_effort_timestamp;
         if (pts == AV_NOPTS_VALUE)
             pts = m_lastPts == AV_NOPTS_VALUE ? m_track.origin : m_lastPts + m_step;
+        // What is shown before the first keyframe looks back at pictures that were not sent.
+        if ((picture->flags & AV_FRAME_FLAG_CORRUPT) && (m_firstKeyframe == AV_NOPTS_VALUE || pts < m_firstKeyframe))
+            continue;
         if (m_lastPts != AV_NOPTS_VALUE && pts > m_lastPts)
             m_step = pts - m_lastPts;
         m_lastPts = pts;
@@ -80,7 +88,7 @@ FrameRef VideoDecoder::receive()
 void VideoDecoder::flush()
 {
     avcodec_flush_buffers(m_context.get());
-    m_lastPts = AV_NOPTS_VALUE;
+    m_lastPts = m_firstKeyframe = AV_NOPTS_VALUE;
 }
 
 void VideoDecoder::setSkipsUnreferenced(bool skips)

@@ -35,7 +35,8 @@ private:
     Owned<AVFrame> m_frame;
     VideoTrack m_track;
     std::int64_t m_lastPts = AV_NOPTS_VALUE;
-    std::int64_t m_step = 1; ///< between the last two pictures: for one that has no time
+    std::int64_t m_firstKeyframe = AV_NOPTS_VALUE; ///< since the last flush
+    std::int64_t m_step = 1;                       ///< between the last two pictures: for one that has no time
 };
 
 } // namespace ffmpeg

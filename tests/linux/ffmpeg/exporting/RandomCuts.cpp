@@ -51,22 +51,22 @@ TEST_P(RandomCuts, HaveExactlyTheirPictures)
 
 INSTANTIATE_TEST_SUITE_P(
     , RandomCuts,
-    testing::Values(Kind{"h264.mp4", true, 1}, Kind{"h264-b.mp4", true, 2}, Kind{"h264-open.mp4", true, 3},
-                    Kind{"h264-sparse.mp4", true, 4}, Kind{"h264-one-group.mp4", false, 5},
-                    Kind{"h264-444.mp4", true, 6}, Kind{"h264-10bit.mp4", true, 7}, Kind{"h264-baseline.mp4", true, 8},
-                    Kind{"h264-interlaced.mp4", true, 9}, Kind{"h264-in-band.mp4", true, 10},
-                    Kind{"h264-changing.mp4", false, 11}, Kind{"h264-b.mkv", true, 12}, Kind{"h264-b.ts", true, 13},
-                    Kind{"h264-fragmented.mp4", true, 14}, Kind{"h264-vfr.mp4", true, 15},
-                    Kind{"h264-vfr.mkv", true, 16}, Kind{"h264-edit-list.mp4", true, 17},
-                    Kind{"h264-rotated.mp4", true, 18}, Kind{"h264-late.mp4", true, 19},
-                    Kind{"two-tracks.mp4", true, 20}, Kind{"vp9.webm", true, 21}, Kind{"vp9-hidden.webm", true, 22},
-                    Kind{"vp9-444.mkv", true, 23}, Kind{"av1.mp4", true, 24}, Kind{"av1-hidden.mkv", true, 25},
-                    Kind{"vp8.webm", false, 26}, Kind{"mpeg4.mp4", false, 27}, Kind{"mjpeg.mov", false, 28},
-                    Kind{"hevc.mp4", true, 29}, Kind{"hevc-b.mkv", true, 30}, Kind{"hevc-open.mp4", false, 31},
-                    Kind{"hevc-10bit.mp4", true, 32}, Kind{"sound-late.mp4", true, 33},
-                    Kind{"sound-early.mp4", true, 34}, Kind{"sound-fragmented.mp4", true, 35},
-                    Kind{"sound-edit-list.mp4", true, 36}, Kind{"sound.mkv", true, 37}, Kind{"mp3.mov", true, 38},
-                    Kind{"pcm.mov", true, 39}, Kind{"opus.webm", true, 40}, Kind{"opus.mkv", true, 41}),
+    testing::Values(
+        Kind{"h264.mp4", true, 1}, Kind{"h264-b.mp4", true, 2}, Kind{"h264-open.mp4", true, 3},
+        Kind{"h264-sparse.mp4", true, 4}, Kind{"h264-one-group.mp4", false, 5}, Kind{"h264-444.mp4", true, 6},
+        Kind{"h264-10bit.mp4", true, 7}, Kind{"h264-baseline.mp4", true, 8}, Kind{"h264-interlaced.mp4", true, 9},
+        Kind{"h264-in-band.mp4", true, 10}, Kind{"h264-changing.mp4", false, 11}, Kind{"h264-b.mkv", true, 12},
+        Kind{"h264-b.ts", true, 13}, Kind{"h264-fragmented.mp4", true, 14}, Kind{"h264-vfr.mp4", true, 15},
+        Kind{"h264-vfr.mkv", true, 16}, Kind{"h264-edit-list.mp4", true, 17}, Kind{"h264-rotated.mp4", true, 18},
+        Kind{"h264-late.mp4", true, 19}, Kind{"two-tracks.mp4", true, 20}, Kind{"vp9.webm", true, 21},
+        Kind{"vp9-hidden.webm", true, 22}, Kind{"vp9-444.mkv", true, 23}, Kind{"av1.mp4", true, 24},
+        Kind{"av1-hidden.mkv", true, 25}, Kind{"vp8.webm", false, 26}, Kind{"mpeg4.mp4", false, 27},
+        Kind{"mjpeg.mov", false, 28}, Kind{"hevc.mp4", true, 29}, Kind{"hevc-b.mkv", true, 30},
+        Kind{"hevc-open.mp4", false, 31}, Kind{"hevc-10bit.mp4", true, 32}, Kind{"sound-late.mp4", true, 33},
+        Kind{"sound-early.mp4", true, 34}, Kind{"sound-fragmented.mp4", true, 35},
+        Kind{"sound-edit-list.mp4", true, 36}, Kind{"sound.mkv", true, 37}, Kind{"mp3.mov", true, 38},
+        Kind{"pcm.mov", true, 39}, Kind{"opus.webm", true, 40}, Kind{"opus.mkv", true, 41},
+        Kind{"h264-422.mp4", true, 42}, Kind{"h264-full-range.mp4", true, 43}, Kind{"hevc-422.mp4", true, 44}),
     [](const auto& each) {
         std::string name = each.param.file;
         std::replace_if(

@@ -135,7 +135,7 @@ std::vector<std::int64_t> decodingTimes(int depth, const std::vector<std::int64_
     for (const std::int64_t pts : shown) {
         auto packet = ffmpeg::newPacket();
         packet->pts = pts;
-        const auto done = line.push(std::move(packet));
+        const auto done = line.push(std::move(packet), false);
         if (fails)
             *fails = *fails || !done;
     }
@@ -161,6 +161,27 @@ TEST(PictureLine, SaysWhenPicturesAreReorderedFartherThanItWasTold)
     EXPECT_TRUE(fails);
 }
 
+TEST(PictureLine, LetsNobodyBeginAtAKeyframeThatIsLookedPastSoonBeforeAnEnd)
+{
+    ffmpeg::PictureLine line(1, 10, std::nullopt, 1000);
+    const auto push = [&](std::int64_t pts, bool isKey, bool isJoint) {
+        auto packet = ffmpeg::newPacket();
+        packet->pts = pts;
+        packet->flags = isKey ? AV_PKT_FLAG_KEY : 0;
+        EXPECT_TRUE(line.push(std::move(packet), isJoint));
+    };
+    // Two pictures follow the keyframe at 40, and one those at 10 and 70.
+    for (const std::int64_t pts : {0, 10, 20, 30, 40, 50, 55, 60, 70, 80})
+        push(pts, pts % 30 == 0 || pts % 30 == 10, pts % 30 == 0);
+    line.finish();
+    std::vector<std::int64_t> keyframes;
+    const auto packet = ffmpeg::newPacket();
+    while (line.pop(*packet))
+        if (packet->flags & AV_PKT_FLAG_KEY)
+            keyframes.push_back(packet->pts);
+    EXPECT_THAT(keyframes, ElementsAre(0, 30, 40, 60));
+}
+
 TEST(PictureLine, EndsTheLastPictureWithTheRange)
 {
     ffmpeg::PictureLine line(0, 10, 20, 23);
@@ -168,7 +189,7 @@ TEST(PictureLine, EndsTheLastPictureWithTheRange)
         auto packet = ffmpeg::newPacket();
         packet->pts = pts;
         packet->duration = 10;
-        EXPECT_TRUE(line.push(std::move(packet)));
+        EXPECT_TRUE(line.push(std::move(packet), false));
     }
     line.finish();
     std::vector<std::int64_t> durations;

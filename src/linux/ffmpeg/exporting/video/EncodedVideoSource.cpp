@@ -138,7 +138,8 @@ Result<void> EncodedVideoSource::moveOut()
 {
     while (auto packet = m_encoder->take()) {
         packet->pts -= m_start;
-        if (auto done = m_line.push(std::move(packet)); !done)
+        const bool isJoint = packet->flags & AV_PKT_FLAG_KEY;
+        if (auto done = m_line.push(std::move(packet), isJoint); !done)
             return done;
     }
     return {};

@@ -8,12 +8,15 @@
 namespace ffmpeg {
 
 PictureLine::PictureLine(int depth, std::int64_t step, std::optional<std::int64_t> last, std::int64_t end)
-    : m_depth(depth), m_step(std::max<std::int64_t>(1, step)), m_last(last), m_end(end)
+    : m_depth(depth), m_step(std::max<std::int64_t>(1, step)), m_last(last), m_end(end),
+      m_followers(2 * static_cast<std::size_t>(std::max(depth, 0)))
 {
 }
 
-base::Result<void> PictureLine::push(Owned<AVPacket> packet)
+base::Result<void> PictureLine::push(Owned<AVPacket> packet, bool isJoint)
 {
+    if (isJoint)
+        forgetLateKeyframes();
     if (m_count == 0)
         m_first = packet->pts;
     m_pending.push(packet->pts);
@@ -30,16 +33,17 @@ base::Result<void> PictureLine::push(Owned<AVPacket> packet)
         packet->duration = m_step;
     const std::int64_t rest = std::max<std::int64_t>(1, m_end - packet->pts);
     packet->duration = m_last && packet->pts == *m_last ? rest : std::min(packet->duration, rest);
-    m_packets.push_back(std::move(packet));
+    m_packets.push_back({std::move(packet), isJoint});
     return {};
 }
 
 void PictureLine::finish(std::optional<std::int64_t> end)
 {
     m_finished = true;
+    forgetLateKeyframes();
     if (m_packets.empty())
         return;
-    AVPacket& last = *m_packets.back();
+    AVPacket& last = *m_packets.back().packet;
     if (!m_last)
         last.duration = end ? std::max<std::int64_t>(1, *end - last.pts) : last.duration;
     else if (last.pts != *m_last) // the whole track shall last as long as its pictures
@@ -47,13 +51,20 @@ void PictureLine::finish(std::optional<std::int64_t> end)
                                                  std::max<std::int64_t>(1, m_end - last.pts));
 }
 
+void PictureLine::forgetLateKeyframes()
+{
+    for (std::size_t i = m_packets.size() - std::min(m_packets.size(), m_followers); i < m_packets.size(); ++i)
+        if (!m_packets[i].isJoint)
+            m_packets[i].packet->flags &= ~AV_PKT_FLAG_KEY;
+}
+
 bool PictureLine::pop(AVPacket& packet)
 {
     // The last one is held back: its duration is known at the end.
-    if (m_packets.size() < (m_finished ? 1U : 2U))
+    if (m_packets.size() < (m_finished ? 1 : m_followers + 2))
         return false;
     av_packet_unref(&packet);
-    av_packet_move_ref(&packet, m_packets.front().get());
+    av_packet_move_ref(&packet, m_packets.front().packet.get());
     m_packets.pop_front();
     return true;
 }

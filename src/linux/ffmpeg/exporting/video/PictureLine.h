@@ -3,6 +3,9 @@
 ///
 /// The i-th packet is decoded when the (i - depth)-th picture is shown: so times of decoding grow, are never behind those
 /// of presentation, and need not be known of the source (Matroska does not keep them).
+///
+/// Keyframes that later pictures look past lead decoders astray where the stream ends or begins anew soon behind them:
+/// FFmpeg's loses what it has not given by then. Such are no longer told to be keyframes, so that nobody begins there.
 #pragma once
 
 #include "base/Result.h"
@@ -23,8 +26,9 @@ public:
     /// lasts so long.
     PictureLine(int depth, std::int64_t step, std::optional<std::int64_t> last, std::int64_t end);
 
-    /// The packet's pts is set, and its duration where it is known. Fails when pictures are reordered more than `depth`.
-    base::Result<void> push(Owned<AVPacket> packet);
+    /// The packet's pts is set, and its duration where it is known; `isJoint` when nothing before it is needed for what
+    /// follows. Fails when pictures are reordered more than `depth`.
+    base::Result<void> push(Owned<AVPacket> packet, bool isJoint);
     /// Nothing more comes. `end` replaces the one that was known before, where the last was not.
     void finish(std::optional<std::int64_t> end = std::nullopt);
     /// False when more must be pushed first, or all have come out.
@@ -33,11 +37,19 @@ public:
     std::int64_t count() const { return m_count; }
 
 private:
+    struct Waiting {
+        Owned<AVPacket> packet;
+        bool isJoint;
+    };
+
+    void forgetLateKeyframes();
+
     int m_depth;
     std::int64_t m_step;
     std::optional<std::int64_t> m_last;
     std::int64_t m_end;
-    std::deque<Owned<AVPacket>> m_packets;
+    std::deque<Waiting> m_packets;
+    std::size_t m_followers; ///< that a keyframe needs
     std::priority_queue<std::int64_t, std::vector<std::int64_t>, std::greater<>> m_pending;
     std::int64_t m_count = 0;
     std::int64_t m_first = 0;

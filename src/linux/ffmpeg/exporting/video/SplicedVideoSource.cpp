@@ -197,7 +197,8 @@ Result<void> SplicedVideoSource::encodeSome()
         packet->pts -= m_start;
         if (auto done = m_splicer->adoptEncoded(*packet); !done)
             return done;
-        if (auto done = m_line->push(std::move(packet)); !done)
+        const bool isJoint = packet->flags & AV_PKT_FLAG_KEY;
+        if (auto done = m_line->push(std::move(packet), isJoint); !done)
             return done;
     }
     if (frame.value())
@@ -239,12 +240,13 @@ Result<void> SplicedVideoSource::copyOne()
         && !std::equal(header, header + size, parameters.extradata, parameters.extradata + parameters.extradata_size))
         return cannotCopy("its header changes on the way");
     m_lastDts = std::max(m_lastDts, packet->dts);
+    const bool isJoint = (packet->flags & AV_PKT_FLAG_KEY) && m_splicer->isJoint(*packet);
     if (auto done = m_splicer->adoptCopied(*packet); !done)
         return done;
     av_packet_free_side_data(packet.get());
     packet->duration = m_packets->outTicks(packet->duration);
     packet->pts = std::max<std::int64_t>(0, pts - m_start);
-    return m_line->push(std::move(packet));
+    return m_line->push(std::move(packet), isJoint);
 }
 
 Result<void> SplicedVideoSource::endCopying(bool isExpected)
