@@ -165,5 +165,13 @@ TEST_F(Headers, OfExportsOfExportsDoNotPileUp)
     EXPECT_FALSE(saysEncodedAsAWhole());
 }
 
+TEST(HevcHeaders, TheFirstPictureOfAnOpenGroupBecomesABeginning)
+{
+    // An open group's (21) and one that is shown behind others but needs none of them (19); both would have what was
+    // decoded before forgotten.
+    EXPECT_EQ(hevc::closed(ffmpeg::Bytes{0x2A, 0x01, 0xE0, 0x12}), (ffmpeg::Bytes{0x24, 0x01, 0xA0, 0x12}));
+    EXPECT_EQ(hevc::closed(ffmpeg::Bytes{0x26, 0x01, 0xE0, 0x12}), (ffmpeg::Bytes{0x28, 0x01, 0xA0, 0x12}));
+}
+
 } // namespace
 } // namespace tests

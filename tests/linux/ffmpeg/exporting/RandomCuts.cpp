@@ -62,7 +62,7 @@ INSTANTIATE_TEST_SUITE_P(
         Kind{"vp9-hidden.webm", true, 22}, Kind{"vp9-444.mkv", true, 23}, Kind{"av1.mp4", true, 24},
         Kind{"av1-hidden.mkv", true, 25}, Kind{"vp8.webm", false, 26}, Kind{"mpeg4.mp4", false, 27},
         Kind{"mjpeg.mov", false, 28}, Kind{"hevc.mp4", true, 29}, Kind{"hevc-b.mkv", true, 30},
-        Kind{"hevc-open.mp4", false, 31}, Kind{"hevc-10bit.mp4", true, 32}, Kind{"sound-late.mp4", true, 33},
+        Kind{"hevc-open.mp4", true, 31}, Kind{"hevc-10bit.mp4", true, 32}, Kind{"sound-late.mp4", true, 33},
         Kind{"sound-early.mp4", true, 34}, Kind{"sound-fragmented.mp4", true, 35},
         Kind{"sound-edit-list.mp4", true, 36}, Kind{"sound.mkv", true, 37}, Kind{"mp3.mov", true, 38},
         Kind{"pcm.mov", true, 39}, Kind{"opus.webm", true, 40}, Kind{"opus.mkv", true, 41},

@@ -12,8 +12,8 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-/// One packet a word, in the order of decoding: the time, with J for a joint, K for another keyframe, H for one that an
-/// edit list hides, and + for one that holds a picture back.
+/// One packet a word, in the order of decoding: the time, with J for a joint, O for one that can be made a joint, K for
+/// another keyframe, H for one that an edit list hides, and + for one that holds a picture back.
 PacketWindow window(const std::string& words, bool startsMovie = true, bool endsMovie = true)
 {
     PacketWindow result;
@@ -23,7 +23,8 @@ PacketWindow window(const std::string& words, bool startsMovie = true, bool ends
     for (std::string word; in >> word;) {
         PicturePacket packet{std::stoll(word)};
         packet.isJoint = word.find('J') != std::string::npos;
-        packet.isKey = packet.isJoint || word.find('K') != std::string::npos;
+        packet.isOpenJoint = word.find('O') != std::string::npos;
+        packet.isKey = packet.isJoint || packet.isOpenJoint || word.find('K') != std::string::npos;
         packet.isHidden = word.find('H') != std::string::npos;
         packet.heldBack = word.find('+') != std::string::npos ? 1 : word.find('-') != std::string::npos ? -1 : 0;
         result.packets.push_back(packet);
@@ -71,6 +72,24 @@ TEST(VideoPlan, DoesNotJoinWhereLaterPicturesLookBack)
     EXPECT_THAT(plan("0J 1 2 5K 3 4 6 7", 1, 7).reason, HasSubstr("no group of pictures begins"));
     EXPECT_EQ(plan("0J 1 2 5K 3 4 6 9J 10", 1, 11).copyFrom, 9);
     EXPECT_THAT(plan("0J 1 2 5J 3 4 6 7", 1, 7).reason, HasSubstr("no group of pictures begins"));
+}
+
+TEST(VideoPlan, JoinsAnOpenGroupWithoutWhatIsShownBeforeItsFirstPicture)
+{
+    const auto found = plan("0J 1 2 6O 4 3 5 7 8", 1, 9);
+    ASSERT_TRUE(found.copies()) << found.reason;
+    EXPECT_TRUE(found.joinsOpenGroup);
+    EXPECT_EQ(found.firstPts, 1);
+    EXPECT_EQ(found.copyFrom, 6);
+    EXPECT_EQ(found.lastCopied, 8);
+    EXPECT_THAT(found.tail, IsEmpty());
+    EXPECT_THAT(plan("0J 1 2 6O 4 3 5 9 7 8", 4, 8).tail, ElementsAre(7));
+    EXPECT_FALSE(plan("0J 1 2 6O 4 3 5 7 8", 6, 9).encodesHead());
+    // What nobody looks past needs no making.
+    EXPECT_FALSE(plan("0J 1 2 3JO 4 5", 1, 5).joinsOpenGroup);
+    EXPECT_TRUE(plan("0J 1 4JO 2 3 5", 1, 6).joinsOpenGroup);
+    // A picture that is shown before it comes late: it is not of its group.
+    EXPECT_THAT(plan("0J 1 2 6O 4 3 7 5 8", 1, 9).reason, HasSubstr("no group of pictures begins"));
 }
 
 TEST(VideoPlan, TakesTheFirstPictureOfAllForAJointWhateverItsKind)

@@ -146,6 +146,20 @@ std::optional<Bytes> renumberedSlice(ByteView slice, std::uint32_t pps)
     return withEmulation(bytes);
 }
 
+Bytes closed(ByteView slice)
+{
+    constexpr int kTypeShift = 1;
+    constexpr std::uint8_t kAllButType = 0x81;
+    // In front of it others are shown yet: it must not say that they are to be forgotten.
+    constexpr std::size_t kFlagByte = 2;
+    constexpr std::uint8_t kForgetsOthers = 0x40;
+    const Unit unit = unitOf(slice) == Unit::IdrWithLeading ? Unit::Idr : Unit::Bla;
+    Bytes payload = withoutEmulation(slice);
+    payload[0] = static_cast<std::uint8_t>((payload[0] & kAllButType) | static_cast<int>(unit) << kTypeShift);
+    payload[kFlagByte] = static_cast<std::uint8_t>(payload[kFlagByte] & ~kForgetsOthers);
+    return withEmulation(payload);
+}
+
 std::optional<Configuration> Configuration::parse(ByteView extradata)
 {
     constexpr std::size_t kArrays = 22;

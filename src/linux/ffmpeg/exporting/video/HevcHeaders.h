@@ -14,8 +14,10 @@ namespace ffmpeg::hevc {
 
 enum class Unit : std::uint8_t {
     FirstIrap = 16,
+    Bla = 18, ///< a beginning in the middle of a stream, with nothing shown before it
     IdrWithLeading = 19,
     Idr = 20,
+    Cra = 21, ///< what is shown before it may need what stands before it
     LastIrap = 23,
     LastPicture = 31,
     Vps = 32,
@@ -62,6 +64,9 @@ std::uint32_t ppsOfSlice(ByteView nal);
 std::optional<Bytes> renumbered(ByteView set, const Ids& ids);
 /// A slice that referred to picture set 0. Nothing when it refers to another.
 std::optional<Bytes> renumberedSlice(ByteView slice, std::uint32_t pps);
+
+/// A slice of an open group's first picture as one of a group that nothing is shown before.
+Bytes closed(ByteView slice);
 
 /// The sets of a stream's header, "hvcC" or between start codes.
 struct Configuration {

@@ -53,7 +53,16 @@ bool HevcSplicer::isJoint(const AVPacket& keyframe) const
 {
     const auto units = unitsIn(keyframe);
     return std::any_of(units.begin(), units.end(), [](ByteView nal) {
-        return hevc::unitOf(nal) == Unit::IdrWithLeading || hevc::unitOf(nal) == Unit::Idr;
+        const Unit unit = hevc::unitOf(nal);
+        return unit == Unit::Bla || unit == Unit::IdrWithLeading || unit == Unit::Idr;
+    });
+}
+
+bool HevcSplicer::isOpenJoint(const AVPacket& keyframe) const
+{
+    const auto units = unitsIn(keyframe);
+    return std::any_of(units.begin(), units.end(), [](ByteView nal) {
+        return hevc::unitOf(nal) >= Unit::FirstIrap && hevc::unitOf(nal) <= Unit::Cra;
     });
 }
 
@@ -159,6 +168,19 @@ base::Result<void> HevcSplicer::describe(AVCodecParameters& parameters)
     std::copy(bytes.begin(), bytes.end(), parameters.extradata);
     parameters.extradata_size = static_cast<int>(bytes.size());
     parameters.codec_tag = MKTAG('h', 'v', 'c', '1');
+    return {};
+}
+
+base::Result<void> HevcSplicer::close(AVPacket& openJoint)
+{
+    std::vector<Bytes> changed;
+    std::vector<ByteView> units = unitsIn(openJoint);
+    changed.reserve(units.size()); // the views lead into them
+    for (ByteView& nal : units)
+        if (hevc::unitOf(nal) >= Unit::FirstIrap && hevc::unitOf(nal) <= Unit::Cra)
+            nal = changed.emplace_back(hevc::closed(nal));
+    if (!replacePayload(openJoint, units, m_header.lengthSize))
+        return cannotCopy("a packet is damaged");
     return {};
 }
 

@@ -14,12 +14,14 @@ public:
     static base::Result<std::unique_ptr<Splicer>> make(const AVStream& stream);
 
     bool isJoint(const AVPacket& keyframe) const override;
+    bool isOpenJoint(const AVPacket& keyframe) const override;
     int reorderDepth() const override;
     bool wantsToSee() const override { return m_header.sets.size() > 3; }
     void see(const AVPacket& copied) override;
     base::Result<void> prepare(EncoderRequest& request, int reorderDepth) override;
     base::Result<void> join(const AVCodecContext& encoder) override;
     base::Result<void> describe(AVCodecParameters& parameters) override;
+    base::Result<void> close(AVPacket& openJoint) override;
     base::Result<void> adoptCopied(AVPacket& packet) override;
     base::Result<void> adoptEncoded(AVPacket& packet) override;
 

@@ -61,8 +61,12 @@ base::Result<PicturePacket> PicturePackets::look(const AVPacket& packet, const S
     if (packet.pts == AV_NOPTS_VALUE)
         return cannotCopy("its packets do not say when they are shown");
     const bool isKey = packet.flags & AV_PKT_FLAG_KEY;
-    return PicturePacket{outTick(packet.pts), isKey, isKey && splicer.isJoint(packet),
-                         (packet.flags & AV_PKT_FLAG_DISCARD) != 0, splicer.picturesHeldBack(packet)};
+    return PicturePacket{outTick(packet.pts),
+                         isKey,
+                         isKey && splicer.isJoint(packet),
+                         isKey && splicer.isOpenJoint(packet),
+                         (packet.flags & AV_PKT_FLAG_DISCARD) != 0,
+                         splicer.picturesHeldBack(packet)};
 }
 
 base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::int64_t end, const Splicer& splicer)
@@ -73,6 +77,7 @@ base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::i
     int behindStart = 0;
     int behindEnd = 0;
     std::int64_t visible = 0;
+    std::optional<std::int64_t> openJoint;
     while (read(*m_packet) == 0) {
         const auto looked = look(*m_packet, splicer);
         if (!looked)
@@ -83,15 +88,19 @@ base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::i
             window.startsMovie = false;
         }
         window.packets.push_back(each);
+        if (openJoint && each.pts > *openJoint)
+            return window; // all that is shown before it was decoded right behind it
+        if (each.isOpenJoint && !each.isHidden && each.pts > start && !openJoint)
+            openJoint = each.pts;
         if (each.pts <= start && !each.isHidden)
             visible = std::max(visible, each.pts);
         behindStart += each.pts > start;
         behindEnd += each.pts >= end;
-        if (each.isJoint && !each.isHidden && each.pts > start && window.packets.size() > 1)
+        if (each.isJoint && !each.isOpenJoint && !each.isHidden && each.pts > start && window.packets.size() > 1)
             return window;
         // What is visible at the start is a joint itself: all that follows can be copied.
         const PicturePacket& first = window.packets.front();
-        const bool startsWithIt = first.isJoint && !first.isHidden && first.pts >= visible;
+        const bool startsWithIt = (first.isJoint || first.isOpenJoint) && !first.isHidden && first.pts >= visible;
         if (behindEnd > kFarthestReorder || (startsWithIt && behindStart > kFarthestReorder))
             return window;
     }

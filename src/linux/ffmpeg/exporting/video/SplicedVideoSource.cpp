@@ -158,10 +158,13 @@ Result<void> SplicedVideoSource::beginStretch(State state)
     }
     const std::int64_t from = state == State::Head ? m_plan.firstPts : m_plan.tail.front();
     m_lastEncoded = kNone;
+    m_hasReachedJoint = false;
     const auto isEnd = [this, behind = 0](const AVPacket& packet) mutable {
         const std::int64_t pts = m_packets->outTick(packet.pts);
-        if (m_state == State::Head)
-            return pts == m_plan.copyFrom;
+        if (m_state == State::Head) {
+            m_hasReachedJoint = m_hasReachedJoint || pts == m_plan.copyFrom;
+            return m_hasReachedJoint && (!m_plan.joinsOpenGroup || pts > m_plan.copyFrom);
+        }
         behind += pts > m_plan.lastPts;
         return behind > PicturePackets::kFarthestReorder;
     };
@@ -203,10 +206,10 @@ Result<void> SplicedVideoSource::encodeSome()
     }
     if (frame.value())
         return {};
-    m_copied = m_feed->takeEnd();
+    m_copied = m_plan.joinsOpenGroup ? nullptr : m_feed->takeEnd(); // which is behind an open joint
     m_feed.reset();
     m_encoder.reset();
-    return beginStretch(m_state == State::Head && m_copied ? State::Copy : State::Ended);
+    return beginStretch(m_state == State::Head && m_hasReachedJoint ? State::Copy : State::Ended);
 }
 
 Result<void> SplicedVideoSource::copyOne()
@@ -223,10 +226,15 @@ Result<void> SplicedVideoSource::copyOne()
         if (packet->pts == AV_NOPTS_VALUE)
             return cannotCopy("its packets do not say when they are shown");
         const std::int64_t pts = m_packets->outTick(packet->pts);
+        const bool isOpenJoint = m_plan.joinsOpenGroup && pts == m_plan.copyFrom && !m_isPastJoint;
         m_isPastJoint = m_isPastJoint || pts == m_plan.copyFrom;
-        if (m_isPastJoint)
+        if (isOpenJoint)
+            if (auto done = m_splicer->close(*packet); !done)
+                return done;
+        if (m_isPastJoint && (!m_plan.joinsOpenGroup || pts >= m_plan.copyFrom))
             break;
-        av_packet_unref(packet.get()); // what lies between the keyframe that was found and the joint
+        // What lies between the keyframe that was found and the joint, or behind it but is shown before.
+        av_packet_unref(packet.get());
     }
     const std::int64_t pts = m_packets->outTick(packet->pts);
     if (m_plan.copyTo && pts == *m_plan.copyTo)

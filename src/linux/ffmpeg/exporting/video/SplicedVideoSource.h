@@ -55,7 +55,8 @@ private:
     std::int64_t m_lastEncoded;
     std::unique_ptr<PictureLine> m_line;
     State m_state = State::Head;
-    bool m_isPastJoint = false;
+    bool m_hasReachedJoint = false;          ///< decoding the head
+    bool m_isPastJoint = false;              ///< copying
     std::int64_t m_lastDts = AV_NOPTS_VALUE; ///< of what was copied, in the stream's ticks
     Owned<AVPacket> m_copied;                ///< where copying begins, when it was read already
 };

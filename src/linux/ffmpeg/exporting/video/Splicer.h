@@ -19,6 +19,8 @@ public:
 
     /// Whether nothing before this keyframe is needed for what follows it, and none of that is shown before it.
     virtual bool isJoint(const AVPacket& keyframe) const = 0;
+    /// Whether the former can be said of it, and what follows it and is shown before it can be left out.
+    virtual bool isOpenJoint(const AVPacket& /*keyframe*/) const { return false; }
     /// How many more pictures this packet decodes for showing them later than it shows that were decoded before.
     virtual int picturesHeldBack(const AVPacket& /*packet*/) const { return 0; }
     /// How far the stream says that its pictures are reordered; 0 when it does not.
@@ -36,6 +38,8 @@ public:
     virtual base::Result<void> describe(AVCodecParameters& parameters) = 0;
 
     // What becomes of packets. They keep their times.
+    /// An open joint becomes a joint. The pictures that are shown before it are not copied. Comes before adoptCopied().
+    virtual base::Result<void> close(AVPacket& /*openJoint*/) { return {}; }
     virtual base::Result<void> adoptCopied(AVPacket& packet) = 0;
     virtual base::Result<void> adoptEncoded(AVPacket& packet) = 0;
 };

@@ -39,19 +39,28 @@ bool haveTimesOfTheirOwn(const std::vector<PicturePacket>& packets)
                        [&](const PicturePacket& each) { return each.isHidden || seen.insert(each.pts).second; });
 }
 
-/// The first joint that shows no picture before `firstPts`, and behind which nothing earlier than itself is shown.
-std::optional<std::size_t> findJoint(const PacketWindow& head, std::int64_t firstPts)
+struct Joint {
+    std::size_t index;
+    bool isOpen;
+};
+
+/// The first joint that shows no picture before `firstPts`, and behind which nothing earlier than itself is shown; but
+/// right behind an open one there may be such.
+std::optional<Joint> findJoint(const PacketWindow& head, std::int64_t firstPts)
 {
     std::int64_t shown = kBefore;
     for (std::size_t i = 0; i < head.packets.size(); ++i) {
         const PicturePacket& each = head.packets[i];
         if (!each.isHidden && each.pts >= firstPts && each.pts > shown) {
-            const bool nothingEarlier =
-                std::all_of(head.packets.begin() + static_cast<std::ptrdiff_t>(i) + 1, head.packets.end(),
-                            [&](const PicturePacket& later) { return later.pts > each.pts; });
+            const auto isLater = [&](const PicturePacket& other) { return other.pts > each.pts; };
+            const auto behind = head.packets.begin() + static_cast<std::ptrdiff_t>(i) + 1;
             // The movie's first picture needs none before it, whatever its kind.
-            if ((each.isJoint || (head.startsMovie && i == 0 && each.isKey)) && nothingEarlier)
-                return i;
+            if ((each.isJoint || (head.startsMovie && i == 0 && each.isKey))
+                && std::all_of(behind, head.packets.end(), isLater))
+                return Joint{i, false};
+            if (each.isOpenJoint
+                && std::all_of(std::find_if(behind, head.packets.end(), isLater), head.packets.end(), isLater))
+                return Joint{i, true};
         }
         shown = std::max(shown, each.pts);
     }
@@ -108,18 +117,24 @@ VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int
         return encodeAll(plan, "several pictures have the same time");
 
     const auto joint = findJoint(head, plan.firstPts);
-    if (!joint || head.packets[*joint].pts >= end)
+    if (!joint || head.packets[joint->index].pts >= end)
         return encodeAll(plan, "no group of pictures begins in the range");
-    plan.copyFrom = head.packets[*joint].pts;
+    plan.copyFrom = head.packets[joint->index].pts;
+    plan.joinsOpenGroup = joint->isOpen;
 
     // Where both windows overlap, the stretch begins inside the tail's.
-    const auto& packets = tail.packets;
+    std::vector<PicturePacket> packets = tail.packets;
     const auto found = std::find_if(packets.begin(), packets.end(),
                                     [&](const PicturePacket& each) { return each.pts == plan.copyFrom; });
-    const auto begin = found == packets.end() ? std::size_t{0} : static_cast<std::size_t>(found - packets.begin());
+    const bool overlap = found != packets.end();
+    const auto begin = overlap ? static_cast<std::size_t>(found - packets.begin()) : std::size_t{0};
+    if (overlap && joint->isOpen)
+        packets.erase(
+            std::remove_if(found, packets.end(), [&](const PicturePacket& each) { return each.pts < plan.copyFrom; }),
+            packets.end());
     const std::size_t count = copyablePrefix(packets, begin, end, tail.endsMovie);
     if (count == 0) {
-        if (found != packets.end() || tail.startsMovie)
+        if (overlap || tail.startsMovie)
             return encodeAll(plan, "no picture can be copied before the end of the range");
         plan.wantsEarlierTail = true;
         return plan;

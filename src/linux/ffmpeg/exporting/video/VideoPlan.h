@@ -17,6 +17,8 @@ struct PicturePacket {
     std::int64_t pts;
     bool isKey = false;
     bool isJoint = false;
+    /// It can be made a joint by leaving out what is decoded behind it and shown before it.
+    bool isOpenJoint = false;
     bool isHidden = false; ///< decoded but not shown: an edit list left it out
     int heldBack = 0;      ///< pictures in it that are shown later, less those that it shows of earlier ones
 };
@@ -38,6 +40,8 @@ struct VideoPlan {
     std::int64_t firstPts = 0;
     /// The joint. Pictures from the first up to here are encoded.
     std::int64_t copyFrom = 0;
+    /// The joint must be made one: pictures that follow it and are shown before it are encoded, not copied.
+    bool joinsOpenGroup = false;
     /// The first packet, in the order of decoding, that is not copied. Nothing: up to the end of the stream.
     std::optional<std::int64_t> copyTo;
     /// The last picture, in the order of presentation, that is copied.
