@@ -207,9 +207,11 @@ std::optional<base::MediaTime> momentIn(const std::string& text)
     constexpr std::int32_t kTicks = 1'000'000;
     const std::size_t point = text.find('.');
     std::string fraction = point == std::string::npos ? "0" : text.substr(point + 1);
+    if (!std::all_of(fraction.begin(), fraction.end(), [](char each) { return each >= '0' && each <= '9'; }))
+        return std::nullopt;
     fraction.resize(std::min<std::size_t>(fraction.size(), 6)); // finer than any movie's clock
     const auto ticks = wholeNumber(fraction);
-    if (!ticks || *ticks < 0)
+    if (!ticks)
         return std::nullopt;
     std::int64_t value = *ticks;
     for (std::size_t digits = fraction.size(); digits < 6; ++digits)
@@ -221,7 +223,7 @@ std::optional<base::MediaTime> momentIn(const std::string& text)
         const std::size_t colon = whole.rfind(':');
         const std::string last = colon == std::string::npos ? whole : whole.substr(colon + 1);
         const auto number = wholeNumber(last);
-        if (!number || *number < 0 || (colon != std::string::npos && *number >= 60))
+        if (!number || (colon != std::string::npos && *number >= 60))
             return std::nullopt;
         value += *number * unit;
         if (colon == std::string::npos)
