@@ -51,10 +51,7 @@ void VKAudioMixUtility::setUp(const std::shared_ptr<Export>& work, const base::U
 
 void VKAudioMixUtility::start(const std::shared_ptr<Export>& work)
 {
-    platform::AudioMix mix;
-    for (const platform::AssetTrack& track : work->asset->tracksWithMediaType(platform::MediaType::Audio))
-        mix.inputs.push_back({track.trackID});
-    work->session->setAudioMix(std::move(mix));
+    work->session->setAudioMix(platform::audioMixOfAllTracks(*work->asset));
     work->session->exportAsynchronously([work] { finish(work); });
 }
 

@@ -5,7 +5,6 @@
 #include "linux/dbus/EditRequest.h"
 
 #include <cerrno>
-#include <cstdio>
 #include <filesystem>
 #include <system_error>
 
@@ -48,8 +47,11 @@ base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
         return failure;
     if (isThere) {
         fs::rename(written, output, error);
-        if (error)
+        if (error) {
+            std::error_code ignored;
+            fs::remove(written, ignored);
             return base::Error::fromErrno(error.value(), "cannot replace " + order.output);
+        }
     }
     return nullptr;
 }
@@ -60,8 +62,7 @@ int exportMovie(const ExportOrder& order)
 {
     MediaTool tool;
     const base::ErrorRef failure = carryOut(tool, order);
-    for (const std::string& line : tool.log().texts(base::MemoryLog::Line::Kind::Message))
-        std::fprintf(stderr, "clipsa: %s\n", line.c_str());
+    tool.tellLog(base::MemoryLog::Line::Kind::Message);
     return failure ? tool.fail(failure) : kExitDone;
 }
 

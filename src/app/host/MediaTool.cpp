@@ -16,6 +16,7 @@
 #include <poll.h>
 #include <sys/eventfd.h>
 #include <sys/signalfd.h>
+#include <unistd.h>
 
 namespace host {
 
@@ -34,7 +35,7 @@ posix::FileDescriptor openSignals()
     return posix::FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
 }
 
-/// For ppoll(), rounded up: who is woken too early would spin.
+/// For poll(), rounded up: who is woken too early would spin.
 int milliseconds(base::Instant time)
 {
     const auto rounded = std::chrono::ceil<std::chrono::milliseconds>(time).count();
@@ -50,6 +51,7 @@ struct MediaTool::Machine {
 
     base::SystemClock clock;
     base::MemoryLog log;
+    std::size_t told = 0; ///< lines of it
     base::MainQueue mainQueue{clock, [this] { ::eventfd_write(woken.get(), 1); }};
     base::WorkerQueue background;
     base::WorkerQueue standard;
@@ -90,9 +92,12 @@ platform::MediaFramework& MediaTool::media()
     return m_machine->media;
 }
 
-const base::MemoryLog& MediaTool::log() const
+void MediaTool::tellLog(base::MemoryLog::Line::Kind kind)
 {
-    return m_machine->log;
+    const auto lines = m_machine->log.lines();
+    for (std::size_t& i = m_machine->told; i < lines.size(); ++i)
+        if (lines[i].kind == kind)
+            std::fprintf(stderr, "clipsa: %s\n", lines[i].text.c_str());
 }
 
 base::Result<std::shared_ptr<platform::Asset>> MediaTool::open(const std::string& path)

@@ -21,8 +21,9 @@ public:
 
     const base::System& system() const;
     platform::MediaFramework& media();
-    /// What the engine says while it works. Nothing of it is printed: a command prints its own one line.
-    const base::MemoryLog& log() const;
+    /// Prints, on standard error, what of that kind has been logged since this was called last: what the engine says
+    /// while it works is only kept, because most of a failure is told by the command's own one line.
+    void tellLog(base::MemoryLog::Line::Kind kind);
 
     /// Opens a movie and waits for it. The error names the file and says what is wrong with it; ECANCELED when a signal
     /// came first.

@@ -33,13 +33,10 @@ base::ErrorRef interrupted()
 base::ErrorRef mix(MediaTool& tool, const std::shared_ptr<platform::Asset>& asset, const std::string& output,
                    ProgressBar& progress)
 {
-    platform::AudioMix mix;
-    for (const platform::AssetTrack& track : asset->tracksWithMediaType(platform::MediaType::Audio))
-        mix.inputs.push_back({track.trackID});
     const auto session = tool.media().exportSessionWithAsset(asset, platform::ExportPreset::HighestQuality);
     session->setOutputURL(base::Url::fromPath(output));
     session->setOutputFileType(platform::FileType::Mpeg4);
-    session->setAudioMix(std::move(mix));
+    session->setAudioMix(platform::audioMixOfAllTracks(*asset));
 
     // Its file must be gone before its directory, when it is given up.
     return tool.runExport(*session, [&] { progress.show(kMixPart * session->progress()); });
@@ -123,10 +120,12 @@ base::Result<std::string> save(MediaTool& tool, const SaveCommand& command, Prog
         return directory.error();
 
     std::string movie = directory.value().path() + "/mixed.mp4";
-    if (const base::ErrorRef error = mix(tool, asset.value(), movie, progress)) {
-        if (tool.interruption() != 0)
-            return error;
-        progress.clear();
+    const base::ErrorRef error = mix(tool, asset.value(), movie, progress);
+    if (tool.interruption() != 0 && error)
+        return error;
+    progress.clear();
+    tool.tellLog(base::MemoryLog::Line::Kind::Message); // what is left out of the mix
+    if (error) {
         std::fprintf(stderr, "clipsa: the sound of %s cannot be mixed (%s); it is saved as it is\n",
                      command.movie.c_str(), error->description().c_str());
         movie = fs::absolute(command.movie).native();
@@ -153,6 +152,7 @@ int saveMovie(const SaveCommand& command)
     progress.clear();
     if (!saved)
         return tool.fail(saved.error());
+    tool.tellLog(base::MemoryLog::Line::Kind::Error); // what the library could not do beside it
     std::printf("%s\n", saved.value().c_str());
     return kExitDone;
 }

@@ -6,7 +6,8 @@
 namespace host {
 
 /// Gives the exit status, and prints the path of the new file. Where the sound cannot be mixed the movie is saved as it
-/// is, which one line says. The movie itself is never touched; what is made on the way goes, also when a signal comes.
+/// is, which one line says; others say what is left out of the mix, and that there is no thumbnail or no entry among the
+/// recent files. The movie itself is never touched; what is made on the way goes, also when a signal comes.
 int saveMovie(const SaveCommand& command);
 
 } // namespace host

@@ -18,4 +18,9 @@ struct AudioMix {
     friend bool operator==(const AudioMix&, const AudioMix&) = default;
 };
 
+class Asset;
+
+/// Each sound track of `asset`, once it is loaded, in its order. Main queue only.
+AudioMix audioMixOfAllTracks(const Asset& asset);
+
 } // namespace platform

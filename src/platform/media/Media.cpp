@@ -1,4 +1,5 @@
 #include "platform/media/Asset.h"
+#include "platform/media/AudioMix.h"
 #include "platform/media/PlayerLayer.h"
 
 #include <algorithm>
@@ -13,6 +14,14 @@ std::vector<AssetTrack> Asset::tracksWithMediaType(MediaType type) const
     std::copy_if(all.begin(), all.end(), std::back_inserter(found),
                  [type](const AssetTrack& track) { return track.type == type; });
     return found;
+}
+
+AudioMix audioMixOfAllTracks(const Asset& asset)
+{
+    AudioMix mix;
+    for (const AssetTrack& track : asset.tracksWithMediaType(MediaType::Audio))
+        mix.inputs.push_back({track.trackID});
+    return mix;
 }
 
 PlayerLayer::~PlayerLayer()

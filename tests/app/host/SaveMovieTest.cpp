@@ -184,6 +184,32 @@ TEST_F(SavingFromAShell, SavesAMovieAsItIsWhenItsSoundCannotBeMixed)
     EXPECT_THAT(namesIn(home / ".cache/clipsa"), IsEmpty());
 }
 
+TEST_F(SavingFromAShell, SaysWhatDidNotComeAlongWithTheMovie)
+{
+    fs::create_directories(home / ".local/share");
+    std::ofstream(home / ".local/share/recently-used.xbel") << "<xbel> broken";
+    ASSERT_EQ(save({recording("clock.mp4")}), 0) << errors;
+    const fs::path saved = videos / "race 2026-11-21 15-04-05.mp4";
+    EXPECT_EQ(printed, saved.native() + "\n");
+    EXPECT_THAT(errors, StartsWith("clipsa: " + saved.native() + " is not among the recent files: "));
+    EXPECT_EQ(std::count(errors.begin(), errors.end(), '\n'), 1) << errors;
+}
+
+TEST_F(SavingFromAShell, SaysWhichSoundIsLeftOut)
+{
+    const fs::path movie = home / "silenced.mkv";
+    tests::Program remux(
+        {"ffmpeg", "-nostdin", "-v", "error", "-i", tests::movie("clock.mp4"), "-map", "0", "-c", "copy", movie}, {});
+    ASSERT_EQ(remux.wait(), 0) << remux.errors();
+    std::string file = tests::PrivateDirectory::read(movie);
+    const std::size_t codec = file.rfind("A_AAC");
+    ASSERT_NE(codec, std::string::npos);
+    std::ofstream(movie, std::ios::binary) << file.replace(codec, 5, "A_XYZ");
+    ASSERT_EQ(save({movie}), 0) << errors;
+    EXPECT_THAT(errors, StartsWith("clipsa: Track 3 of “silenced.mkv” is left out of the mix: "));
+    EXPECT_EQ(std::count(errors.begin(), errors.end(), '\n'), 1) << errors;
+}
+
 // The moments are spread over the whole run: from the start of the program to the thumbnail and beyond.
 TEST_F(SavingFromAShell, LeavesTheWholeMovieOrNothingWheneverItIsKilled)
 {

@@ -1,5 +1,6 @@
 // `clipsa trim`, as a program, on the test movies.
 #include "app/host/ClipsaProgram.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <QJsonArray>
 #include <gmock/gmock.h>
@@ -36,7 +37,8 @@ TEST(TrimCommandLine, TakesTimesAsPeopleWriteThem)
     EXPECT_EQ(seconds("1:30"), 90);
     EXPECT_EQ(seconds("01:02:03.25"), 3723.25);
     EXPECT_EQ(host::momentIn("0.0333333333"), base::MediaTime::make(33333, 1'000'000));
-    for (const char* text : {"", ".", "1.", ".5", "-1", "x", "1:", ":1", "1:60", "1:2:3:4", "1e3", "1,5", "1:-1", " 1"})
+    for (const char* text : {"", ".", "1.", ".5", "-1", "x", "1:", ":1", "1:60", "1:2:3:4", "1e3", "1,5", "1:-1", " 1",
+                             "0.1234567x", "0.123456-7", "1.1234567 "})
         EXPECT_EQ(seconds(text), -1) << text;
 }
 
@@ -106,6 +108,17 @@ TEST_F(Trim, KeepsAFileThatItWasToReplaceWhenItFails)
     std::ofstream(out) << "mine";
     EXPECT_EQ(run({"trim", movie("clock.mp4"), "--from", "100", "-o", out, "--force"}), 1);
     EXPECT_THAT(errors, HasSubstr("“clock.mp4” cannot be exported: the range begins behind its end"));
+    EXPECT_EQ(tests::PrivateDirectory::read(out), "mine");
+    EXPECT_THAT(namesIn(directory.path()), ElementsAre("out.mp4"));
+}
+
+TEST_F(Trim, KeepsAFileThatCannotBeReplacedAndLeavesNothingBesideIt)
+{
+    std::ofstream(out) << "mine";
+    tests::whileRefusing({{SYS_rename, EPERM}, {SYS_renameat, EPERM}}, [&] {
+        EXPECT_EQ(run({"trim", movie("clock.mp4"), "-o", out, "--force"}), 1);
+    });
+    EXPECT_THAT(errors, HasSubstr("cannot replace " + out));
     EXPECT_EQ(tests::PrivateDirectory::read(out), "mine");
     EXPECT_THAT(namesIn(directory.path()), ElementsAre("out.mp4"));
 }
