@@ -123,7 +123,7 @@ int EditorProgram::run()
     QGuiApplication::exec();
     // What was handed back on the way out goes while everything that it needs is there.
     m_mainQueue.drain();
-    return m_exitStatus;
+    return 0;
 }
 
 base::Result<void> EditorProgram::start()
@@ -210,7 +210,7 @@ void EditorProgram::leaveWhenDone()
 {
     m_leaving = true;
     if (!m_workWatch.isWorking())
-        QGuiApplication::exit(m_exitStatus); // quit() would ask the window, which never closes by itself
+        QGuiApplication::exit(); // quit() would ask the window, which never closes by itself
 }
 
 /// The library names the movie after the app and the date of the recording as it came.

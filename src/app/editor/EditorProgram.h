@@ -91,7 +91,6 @@ private:
     bool m_shown = false;
     bool m_leaving = false;
     bool m_pictureSeen = false;
-    int m_exitStatus = 0;
 };
 
 } // namespace app

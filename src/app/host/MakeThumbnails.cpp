@@ -36,7 +36,7 @@ public:
 
     fs::path path(std::size_t index) const
     {
-        return m_folder / thumbnailName(static_cast<int>(index), command().count, m_times[index]);
+        return m_folder / thumbnailName(static_cast<int>(index), m_command.count, m_times[index]);
     }
 
     void take(std::size_t index, const platform::ImageRef& image, const base::ErrorRef& error)
@@ -59,8 +59,6 @@ public:
     }
 
 private:
-    const ThumbnailsCommand& command() const { return m_command; }
-
     base::Result<void> write(std::size_t index, const platform::Image& image) const
     {
         const auto png = ffmpeg::pngOf(image.bitmap());
