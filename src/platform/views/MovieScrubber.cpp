@@ -14,8 +14,6 @@ namespace {
 constexpr double kMostThumbnails = 200;
 /// How far, in points, a handle is put beyond the zoomed strip at most: out of sight is enough.
 constexpr double kOutOfSight = 60;
-/// Free above and below the pictures, so that the play head stands out of them; in points.
-constexpr double kTrackInset = 4;
 /// Over what is to be cut away.
 constexpr Color kShade{0, 0, 0, 0.62};
 

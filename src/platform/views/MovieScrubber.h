@@ -52,6 +52,8 @@ class MovieScrubber final : public Control {
 public:
     /// The strip's own height in points.
     static constexpr double kHeight = 38;
+    /// Free above and below the pictures, so that the play head stands out of them; in points.
+    static constexpr double kTrackInset = 4;
     /// How far from the play head, in points, a finger still takes it: half of what a thumb covers.
     static constexpr double kGrabDistance = 22;
     /// How far beyond a grip, in points, a finger still takes it, so that it is as wide as a thumb.

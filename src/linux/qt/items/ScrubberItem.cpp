@@ -13,7 +13,6 @@ namespace qtui {
 
 namespace {
 
-constexpr double kTrackInset = 4; ///< above and below the strip, so that the play head stands out of it
 constexpr double kTrackCorner = 6;
 /// Ticks of a zoomed strip: they grow with what they stand for.
 constexpr double kTickWidth = 1;
@@ -66,7 +65,10 @@ platform::ImageRef pictureAt(double timestamp, const std::map<double, platform::
 std::vector<Sprite> ScrubberItem::draw(platform::View& view)
 {
     const auto& scrubber = dynamic_cast<const platform::MovieScrubber&>(view);
-    const auto inset = [](const base::Rect& rect) { return toQRectF(rect).adjusted(0, kTrackInset, 0, -kTrackInset); };
+    const auto inset = [](const base::Rect& rect) {
+        constexpr double kInset = platform::MovieScrubber::kTrackInset;
+        return toQRectF(rect).adjusted(0, kInset, 0, -kInset);
+    };
     TrackState state{inset(scrubber.stripRect()), inset(scrubber.trackRect()), scrubber.timestamps(),
                      scrubber.thumbnails(),       scrubber.isZoomed(),         scrubber.visibleStart(),
                      scrubber.visibleEnd(),       stage().generation};
