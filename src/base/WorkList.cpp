@@ -1,13 +1,15 @@
 #include "base/WorkList.h"
 
 #include <algorithm>
+#include <mutex>
 #include <utility>
+#include <vector>
 
 namespace base {
 
 /// Shared with the works, which may outlive the list.
 struct WorkList::State {
-    mutable std::mutex mutex;
+    std::mutex mutex;
     std::vector<const Entry*> entries;
 
     std::mutex handlerMutex; ///< held while the handler runs, so that the list's end can wait for it

@@ -3,9 +3,7 @@
 
 #include <functional>
 #include <memory>
-#include <mutex>
 #include <optional>
-#include <vector>
 
 namespace base {
 
@@ -29,8 +27,8 @@ public:
     /// Of all that is under way together, from 0 to 1; nothing when there is none, or when none of it is known.
     std::optional<double> progress() const;
 
-    /// Called, on any thread, whenever one of the above may have changed; not after the list has gone. Once, before the
-    /// first work.
+    /// Called, on any thread, whenever one of the above may have changed; not after the list has gone. Takes the place of
+    /// the former handler, which runs no more once this returns; not from inside of one.
     void setChangeHandler(std::function<void()> handler);
 
 private:
