@@ -20,9 +20,9 @@ struct ShownFrame {
 
 class FrameCache {
 public:
-    /// All cached pictures together. Large ones take a quarter of it at most in full, because the decoder keeps the memory
-    /// of what it has given out: ten at 1920 × 1080, two at 3840 × 2160. Ten seconds at 60 a second fit when those that are farthest are
-    /// small: 613 pictures of 480 × 270 beside four in full.
+    /// All cached pictures together. Large ones take a quarter of it at most in full, because the decoder keeps the
+    /// memory of what it has given out: ten at 1920 × 1080, two at 3840 × 2160. Ten seconds at 60 a second fit when
+    /// those that are farthest are small: 613 pictures of 480 × 270 beside four in full.
     static constexpr std::size_t kMostBytes = 128u << 20;
 
     enum class Overflow { Drop, Reduce };
