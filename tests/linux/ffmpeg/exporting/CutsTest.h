@@ -64,8 +64,13 @@ protected:
         checkPictures(start, end);
         if (!HasFatalFailure())
             checkSounds(start, end);
+        if (!HasFatalFailure())
+            checkFile();
         std::filesystem::remove(output());
     }
+
+    /// What more is to be seen of the output.
+    virtual void checkFile() {}
 
     /// Pictures that are the source's, bit for bit, in all cuts together.
     int copies = 0;
