@@ -1,42 +1,15 @@
-// The two handles of a scrubber: taking them, their limits, zooming, and what keys and assistive technology do to them.
-#include "ScrubberFixture.h"
+// The two handles of a scrubber: taking them, their limits, and what keys and assistive technology do to them.
+#include "TrimFixture.h"
 
 namespace {
 
 using base::Rect;
 using platform::Key;
-using platform::MovieScrubber;
 using platform::ScrubberHandle;
 using testing::ElementsAre;
 using testing::IsEmpty;
-
-constexpr base::Instant kZoomDelay = std::chrono::milliseconds(500);
-
-/// The track is 10 points a second: from 26 to 326 of a strip of 352.
-struct Trims : tests::Scrubbers {
-    Trims()
-    {
-        scrubber->setFrame(Rect::make(0, 100, 352, 38));
-        scrubber->setEditable(true);
-        scrubber->setMinimumTrimLength(1);
-        scrubber->setZoomDelay(0.5);
-        scrubber->reloadData();
-        scrubber->setValue(15);
-        window->commit();
-        movie->requested.clear();
-    }
-    void down(double x) { window->touchDown({1, {x, 119}, {}}); }
-    void move(double x) { window->touchMove({1, {x, 119}, {}}); }
-    void up(double x) { window->touchUp({1, {x, 119}, {}}); }
-    double startX() const { return scrubber->startHandle()->frame().maxX(); }
-    double endX() const { return scrubber->endHandle()->frame().minX(); }
-    std::vector<std::string> said() { return std::exchange(movie->said, {}); }
-    void enter()
-    {
-        scrubber->setEditing_animated(true, false);
-        said();
-    }
-};
+using tests::kZoomDelay;
+using tests::Trims;
 
 TEST_F(Trims, TheGripsStandAtTheEndsOfTheStrip)
 {
@@ -263,135 +236,6 @@ TEST_F(Trims, TheDelegateMayTakeItAwayWhileAHandleIsTaken)
     tap(18, 119);
     machine.advance(kZoomDelay);
     EXPECT_EQ(scrubber, nullptr);
-}
-
-// Zooming
-
-TEST_F(Trims, AHandleHeldStillSpreadsTheSecondsAroundItOverTheStrip)
-{
-    down(18);
-    move(118);
-    machine.advance(kZoomDelay - std::chrono::milliseconds(1));
-    EXPECT_FALSE(scrubber->isZoomed());
-    machine.advance(std::chrono::milliseconds(1));
-    ASSERT_TRUE(scrubber->isZoomed());
-    EXPECT_EQ(scrubber->editingStartValue(), 10);
-    EXPECT_EQ(startX(), 126) << "it stays under the finger";
-    said();
-    // Four seconds over 300 points: 75 points a second.
-    move(118 + 75);
-    EXPECT_DOUBLE_EQ(scrubber->editingStartValue(), 11);
-    move(118 + 75 + 1.25);
-    EXPECT_NEAR(scrubber->editingStartValue(), 11 + 1.0 / 60, 1e-9) << "one picture of sixty a second";
-    up(118 + 75 + 1.25);
-    EXPECT_FALSE(scrubber->isZoomed());
-    EXPECT_NEAR(scrubber->editingStartValue(), 11 + 1.0 / 60, 1e-9);
-    EXPECT_NEAR(startX(), 26 + 10 * (11 + 1.0 / 60), 1e-6);
-}
-
-TEST_F(Trims, AFingerThatMovesOnIsNotStill)
-{
-    down(18);
-    machine.advance(std::chrono::milliseconds(400));
-    move(30);
-    machine.advance(std::chrono::milliseconds(400));
-    EXPECT_FALSE(scrubber->isZoomed());
-    move(32);
-    machine.advance(std::chrono::milliseconds(100));
-    EXPECT_TRUE(scrubber->isZoomed()) << "rolling a little is still";
-}
-
-TEST_F(Trims, AFingerThatHasLeftNeverZooms)
-{
-    down(18);
-    up(18);
-    down(160);
-    machine.advance(kZoomDelay);
-    EXPECT_FALSE(scrubber->isZoomed());
-    up(160);
-    down(18);
-    up(18);
-    down(18);
-    machine.advance(std::chrono::milliseconds(499));
-    EXPECT_FALSE(scrubber->isZoomed());
-}
-
-TEST_F(Trims, ADelayOfZeroMeansNever)
-{
-    scrubber->setZoomDelay(0);
-    down(18);
-    machine.advance(std::chrono::seconds(5));
-    EXPECT_FALSE(scrubber->isZoomed());
-}
-
-TEST_F(Trims, TheEndsOfTheMovieStayInsideTheZoomedStrip)
-{
-    down(18);
-    machine.advance(kZoomDelay);
-    EXPECT_EQ(startX(), 26);
-    EXPECT_EQ(scrubber->timestamps().front(), 0);
-    move(0);
-    EXPECT_EQ(scrubber->editingStartValue(), 0);
-    up(0);
-    down(334);
-    machine.advance(kZoomDelay);
-    EXPECT_EQ(endX(), 326);
-    EXPECT_EQ(scrubber->timestamps().front(), 26);
-}
-
-TEST_F(Trims, AShortMovieIsZoomedToAQuarter)
-{
-    movie->duration = 8;
-    scrubber->reloadData();
-    down(18);
-    machine.advance(kZoomDelay);
-    move(18 + 300);
-    EXPECT_NEAR(scrubber->editingStartValue(), 2, 1e-9);
-}
-
-TEST_F(Trims, TheOtherHandleIsJustOutOfSightWhileZoomed)
-{
-    movie->duration = 3600 * 24;
-    scrubber->reloadData();
-    down(18);
-    machine.advance(kZoomDelay);
-    EXPECT_GT(endX(), 352);
-    EXPECT_LT(scrubber->trimFrame()->frame().width(), 1000) << "not as wide as a day at this scale";
-}
-
-TEST_F(Trims, ThePicturesOfTheZoomedMomentsAreAskedForAndTheOthersKept)
-{
-    const auto overview = scrubber->timestamps();
-    for (const double timestamp : overview)
-        scrubber->setThumbnailImage_forTimestamp(picture(), timestamp);
-    down(18);
-    move(118);
-    machine.advance(kZoomDelay);
-    const auto zoomed = scrubber->timestamps();
-    EXPECT_EQ(zoomed.size(), overview.size());
-    EXPECT_NEAR(zoomed.front(), 10 - 4.0 / 3, 1e-9);
-    EXPECT_EQ(movie->requested, zoomed);
-    scrubber->setThumbnailImage_forTimestamp(picture(), zoomed[3]);
-    EXPECT_EQ(scrubber->thumbnails().size(), overview.size() + 1);
-    movie->requested.clear();
-    up(118);
-    EXPECT_EQ(scrubber->timestamps(), overview);
-    EXPECT_THAT(movie->requested, IsEmpty());
-    EXPECT_EQ(scrubber->thumbnails().size(), overview.size());
-}
-
-TEST_F(Trims, AReloadLetsGoOfAHandleAndKeepsTheRange)
-{
-    down(18);
-    move(118);
-    machine.advance(kZoomDelay);
-    scrubber->reloadData();
-    EXPECT_FALSE(scrubber->isZoomed());
-    EXPECT_EQ(scrubber->held(), ScrubberHandle::None);
-    EXPECT_EQ(scrubber->editingStartValue(), 10);
-    EXPECT_TRUE(scrubber->isEditing());
-    move(218);
-    EXPECT_EQ(scrubber->editingStartValue(), 10);
 }
 
 TEST_F(Trims, AnotherMovieIsChosenWhole)
