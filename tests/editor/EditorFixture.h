@@ -84,6 +84,14 @@ protected:
         fake->machine.advance(platform::Window::kTransitionDuration);
         fake->window->commit();
     }
+    /// Enters trim mode and moves both handles, in seconds.
+    void trimFrom(double start, double end)
+    {
+        editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
+        editor->movieScrubber_editingStartValueDidChange(*editor->avTrimmer(), start);
+        editor->movieScrubber_editingEndValueDidChange(*editor->avTrimmer(), end);
+        settle();
+    }
     void tap(double x, double y)
     {
         fake->window->touchDown({1, {x, y}, {}});

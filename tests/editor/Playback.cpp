@@ -5,16 +5,7 @@ using platform::PlayerItem;
 
 namespace {
 
-class Playback : public EditorTest {
-protected:
-    void trimFrom(double start, double end)
-    {
-        editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
-        editor->movieScrubber_editingStartValueDidChange(*editor->avTrimmer(), start);
-        editor->movieScrubber_editingEndValueDidChange(*editor->avTrimmer(), end);
-        settle();
-    }
-};
+class Playback : public EditorTest {};
 
 } // namespace
 

@@ -133,9 +133,11 @@ TEST_F(Thumbnails, ThePicturesMayComeAfterTheEditorHasGone)
 {
     open();
     const auto request = generator()->requests[0];
+    const std::weak_ptr<VKVideoEditorViewController> watched = editor;
     editor.reset();
     fake->window->setRootViewController(nullptr);
     container.reset();
+    EXPECT_TRUE(watched.expired()) << "what is asked for does not keep it";
     std::thread([&] {
         request.handler(request.time, picture(), request.time, platform::ImageGenerator::Result::Succeeded, nullptr);
     }).join();

@@ -1,4 +1,5 @@
-#include "EditorFixture.h"
+// What a confirmed trim exports, and what comes of it.
+#include "TrimmingFixture.h"
 
 #include "platform/sharing/ActivityTypes.h"
 #include "support/WaitUntil.h"
@@ -14,29 +15,7 @@ using Line = base::MemoryLog::Line::Kind;
 
 namespace {
 
-class Trimming : public EditorTest {
-protected:
-    void trimFrom(double start, double end)
-    {
-        editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
-        editor->movieScrubber_editingStartValueDidChange(*editor->avTrimmer(), start);
-        editor->movieScrubber_editingEndValueDidChange(*editor->avTrimmer(), end);
-        settle();
-    }
-    void confirm(double start, double end)
-    {
-        trimFrom(start, end);
-        editor->saveAction();
-    }
-    std::shared_ptr<tests::FakeExportSession> session() const { return fake->media.exportSession(); }
-    /// The trim ends well, with a movie that lasts `seconds`.
-    void succeed(double seconds)
-    {
-        fake->media.movies[editor->trimFilePath()->path()] = tests::FakeMovie::lasting(seconds);
-        session()->finish(ExportSession::Status::Completed);
-        settle();
-    }
-};
+class Trimming : public TrimmingTest {};
 
 } // namespace
 
@@ -236,30 +215,6 @@ TEST_F(Trimming, AfterAFailureAnotherTrimThatSucceedsFreesTheEditor)
     EXPECT_FALSE(editor->isTrimming());
 }
 
-TEST_F(Trimming, AShakeLeavesTheModeUnlessAnExportRuns)
-{
-    open();
-    editor->becomeFirstResponder();
-    confirm(2, 5);
-    fake->window->motion(platform::MotionSubtype::Shake);
-    EXPECT_TRUE(editor->isTrimming());
-    succeed(5);
-    trimFrom(1, 3);
-    fake->window->motion(platform::MotionSubtype::Shake);
-    EXPECT_FALSE(editor->isTrimming());
-}
-
-TEST_F(Trimming, LeavingTheModeKeepsTheRange)
-{
-    open();
-    trimFrom(2, 5);
-    editor->undoAction();
-    EXPECT_EQ(editor->editStartTime(), 2);
-    EXPECT_EQ(editor->editEndTime(), 5);
-    EXPECT_EQ(editor->videoURL()->path(), kMovie);
-    EXPECT_EQ(fake->media.exportSessionCount(), 0U);
-}
-
 TEST_F(Trimming, EveryConfirmedTrimIsTold)
 {
     open();
@@ -282,32 +237,6 @@ TEST_F(Trimming, NothingIsConfirmedWhileTheShareSheetIsUp)
     EXPECT_FALSE(editor->isExporting());
     EXPECT_TRUE(editor->activityTypes()->empty());
     EXPECT_FALSE(fake->machine.log.contains(Line::Message, "saveAction"));
-}
-
-TEST_F(Trimming, TheConfirmButtonConfirms)
-{
-    open();
-    trimFrom(2, 5);
-    tap(editor->trimButton()->view());
-    ASSERT_TRUE(session());
-    EXPECT_TRUE(session()->isRunning());
-}
-
-TEST_F(Trimming, ThePadsBarInTheModeAndAfterIt)
-{
-    makePlatform(tests::FakePlatform::kPad);
-    open();
-    trimFrom(2, 5);
-    EXPECT_EQ(top(), pad(editor->cancelTrimButton(), {editor->playButton(), editor->trimButton()}));
-    editor->undoAction();
-    EXPECT_EQ(top(), pad(editor->doneButton(), {editor->playButton(), editor->shareButton(), editor->saveButton()}));
-}
-
-TEST_F(Trimming, BeforeTheModeWasEverEnteredThePreviewStillOffersCancel)
-{
-    open();
-    editor->previewMode();
-    EXPECT_EQ(top(), phoneTop(editor->cancelButton(), editor->saveButton()));
 }
 
 TEST_F(Trimming, ARunningExportKeepsItsEditorUntilTheMainQueueTakesItBack)
@@ -336,84 +265,4 @@ TEST_F(Trimming, AMovieThatCannotBeOpenedIsStillExportedAndFailsThere)
     EXPECT_FALSE(session()->asset->url());
     session()->finish(ExportSession::Status::Failed, session()->asset->error());
     EXPECT_TRUE(editor->isExporting());
-}
-
-TEST_F(Trimming, TheKeysIAndOSetTheEndsAtThePlayHeadAndEnterTheMode)
-{
-    using platform::Key;
-    open();
-    editor->becomeFirstResponder();
-    editor->avTrimmer()->setValue(3);
-    EXPECT_TRUE(fake->window->keyDown(Key::Character, 'i'));
-    settle();
-    EXPECT_TRUE(editor->isTrimming());
-    EXPECT_TRUE(editor->avTrimmer()->isEditing());
-    EXPECT_EQ(editor->editStartTime(), 3);
-    EXPECT_EQ(editor->editEndTime(), 10);
-    EXPECT_EQ(top(), phoneTop(editor->cancelTrimButton(), editor->trimButton()));
-    EXPECT_NEAR(player().currentTime().seconds(), 3, 1e-9) << "the picture at the handle";
-
-    editor->avTrimmer()->setValue(7.5);
-    EXPECT_TRUE(fake->window->keyDown(Key::Character, 'o'));
-    EXPECT_EQ(editor->editEndTime(), 7.5);
-}
-
-TEST_F(Trimming, EnterConfirmsOnceAndOnlyInTheMode)
-{
-    using platform::Key;
-    open();
-    editor->becomeFirstResponder();
-    fake->window->keyDown(Key::Return);
-    EXPECT_EQ(fake->media.exportSessionCount(), 0U);
-    trimFrom(2, 5);
-    fake->window->keyDown(Key::Return);
-    fake->window->keyDown(Key::Return);
-    EXPECT_EQ(fake->media.exportSessionCount(), 1U);
-    session()->finish(ExportSession::Status::Failed);
-    fake->window->keyDown(Key::Return);
-    EXPECT_EQ(fake->media.exportSessionCount(), 2U) << "as the button does";
-}
-
-TEST_F(Trimming, EscapeLeavesTheModeFirstAndThenCloses)
-{
-    using platform::Key;
-    open();
-    editor->becomeFirstResponder();
-    trimFrom(2, 5);
-    fake->window->keyDown(Key::Escape);
-    EXPECT_FALSE(editor->isTrimming());
-    EXPECT_TRUE(delegate->finishes.empty());
-    fake->window->keyDown(Key::Escape);
-    EXPECT_EQ(delegate->finishes.size(), 1U);
-}
-
-TEST_F(Trimming, AFingerTakesAHandleAndTheBarsFollow)
-{
-    open();
-    const base::Rect strip = stripFrame();
-    const double y = strip.minY() + 19;
-    fake->window->touchDown({1, {strip.minX() + 18, y}, {}});
-    settle();
-    EXPECT_TRUE(editor->isTrimming());
-    EXPECT_EQ(top(), phoneTop(editor->cancelTrimButton(), editor->trimButton()));
-    fake->window->touchMove({1, {strip.minX() + 18 + 154, y}, {}});
-    fake->window->touchUp({1, {strip.minX() + 18 + 154, y}, {}});
-    settle();
-    EXPECT_NEAR(editor->editStartTime(), 5, 0.01);
-    EXPECT_FALSE(editor->isScrubbing());
-    EXPECT_NEAR(player().currentTime().seconds(), 5, 0.01);
-    tap(editor->trimButton()->view());
-    ASSERT_TRUE(session());
-    EXPECT_NEAR(session()->timeRange->start.seconds(), 5, 0.01);
-}
-
-TEST_F(Trimming, CancellingAndTakingTheOtherHandleStartsFromTheWholeMovie)
-{
-    open();
-    editor->avTrimmer()->moveHandle(platform::ScrubberHandle::Start, 4);
-    editor->undoAction();
-    EXPECT_EQ(editor->editStartTime(), 4);
-    editor->avTrimmer()->moveHandle(platform::ScrubberHandle::End, 8);
-    EXPECT_EQ(editor->editStartTime(), 0) << "what the strip shows is what is cut";
-    EXPECT_EQ(editor->editEndTime(), 8);
 }
