@@ -53,14 +53,13 @@ public:
     /// Whether an item of any kind, dangling links included, has this path.
     bool holds(const std::string& path) const { return find(normalised(path)) != m_items.end(); }
 
-    /// Makes the operation fail on this path (a move: from it) until heal(). Gives the error that callers will get.
+    /// Makes the operation fail on this path (a move: from it) from now on. Gives the error that callers will get.
     base::ErrorRef fail(FileOperation operation, const std::string& path, int number)
     {
         base::ErrorRef error = base::Error::fromErrno(number, "scripted: " + path);
         m_failures[{operation, normalised(path)}] = error;
         return error;
     }
-    void heal() { m_failures.clear(); }
 
     platform::FileManager& defaultManager() override { return shared ? *shared : *this; }
     const base::System& system() const override { return m_system; }
