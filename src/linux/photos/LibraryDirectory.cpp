@@ -1,6 +1,6 @@
 #include "linux/photos/LibraryDirectory.h"
 
-#include "linux/photos/CopyContents.h"
+#include "linux/posix/CopyContents.h"
 
 #include <atomic>
 #include <cerrno>
@@ -229,10 +229,11 @@ int NewFile::becomeHidden()
     if (!hidden)
         return static_cast<int>(hidden.error()->code());
     NewFile& copy = hidden.value();
-    if (const auto copied =
-            copyContents(descriptor(), copy.descriptor(), static_cast<std::uint64_t>(status.st_size), {});
-        !copied)
-        return static_cast<int>(copied.error()->code());
+    if (!posix::shareContents(descriptor(), copy.descriptor()))
+        if (const int number =
+                posix::copyContents(descriptor(), copy.descriptor(), static_cast<std::uint64_t>(status.st_size), {});
+            number != 0)
+            return number;
     if (const auto sealed = copy.seal(status.st_mtim); !sealed)
         return static_cast<int>(sealed.error()->code());
     m_file = std::move(copy.m_file);

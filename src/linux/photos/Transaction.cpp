@@ -1,6 +1,6 @@
 #include "linux/photos/Transaction.h"
 
-#include "linux/photos/CopyContents.h"
+#include "linux/posix/CopyContents.h"
 
 #include <cerrno>
 #include <cmath>
@@ -43,6 +43,18 @@ const char* remedy(std::int64_t number)
         return "make it a directory, or choose another one for videos";
     default:
         return "save again, or copy the movie by hand";
+    }
+}
+
+base::ErrorRef notCopied(int number)
+{
+    switch (number) {
+    case ENODATA:
+        return base::Error::make(base::kPosixErrorDomain, number, "it became shorter while it was copied");
+    case ECANCELED:
+        return base::Error::make(base::kPosixErrorDomain, number, "it was given up");
+    default:
+        return base::Error::fromErrno(number, "copying it");
     }
 }
 
@@ -137,12 +149,16 @@ base::Result<NewFile> VideoLibrary::Transaction::copy(const Source& source, cons
     auto file = NewFile::make(directory);
     if (!file)
         return file;
-    const auto goOn = [&](double part) {
+    const auto goOn = [&](std::uint64_t copied) {
+        const double part = static_cast<double>(copied) / static_cast<double>(source.size);
         m_work.setProgress((done + part) / static_cast<double>(m_sources.size()));
         return !m_options.goOn || m_options.goOn();
     };
-    if (const auto copied = copyContents(source.file.get(), file.value().descriptor(), source.size, goOn); !copied)
-        return copied.error();
+    const int from = source.file.get();
+    const int to = file.value().descriptor();
+    if (!posix::shareContents(from, to))
+        if (const int number = posix::copyContents(from, to, source.size, goOn); number != 0)
+            return notCopied(number);
     if (const auto sealed = file.value().seal(timespecOf(source.date)); !sealed)
         return sealed.error();
     return file;

@@ -1,19 +1,21 @@
-#include "linux/photos/CopyContents.h"
+#include "linux/posix/CopyContents.h"
 
 #include <algorithm>
 #include <cerrno>
+#include <cstddef>
+#include <iterator>
 #include <linux/fs.h>
 #include <sys/ioctl.h>
 #include <sys/sendfile.h>
 #include <unistd.h>
 #include <vector>
 
-namespace photos {
+namespace posix {
 
 namespace {
 
-/// Large enough to cost nothing, small enough that the progress moves.
-constexpr std::uint64_t kStep = 64 * 1024 * 1024;
+/// Large enough to cost nothing, small enough to stop soon, and that the progress moves.
+constexpr std::uint64_t kStep = 16 * 1024 * 1024;
 constexpr std::size_t kBuffer = 1024 * 1024;
 
 /// Copies up to `count` bytes at `offset`: the number of bytes, 0 at the end, -1 with errno.
@@ -57,33 +59,36 @@ bool isRefusal(int number)
 
 } // namespace
 
-base::Result<void> copyContents(int from, int to, std::uint64_t size, const std::function<bool(double)>& goOn)
+bool shareContents(int from, int to)
+{
+    return ::ioctl(to, FICLONE, from) == 0;
+}
+
+int copyContents(int from, int to, std::optional<std::uint64_t> size,
+                 const std::function<bool(std::uint64_t copied)>& goOn)
 {
     static constexpr CopyStep kWays[] = {copyInKernel, copyWithSendfile, copyByHand};
-
-    if (::ioctl(to, FICLONE, from) == 0)
-        return {};
     const CopyStep* way = std::begin(kWays);
     std::uint64_t done = 0;
-    while (done < size) {
-        const auto count = static_cast<std::size_t>(std::min(kStep, size - done));
+    while (!size || done < *size) {
+        const auto count = static_cast<std::size_t>(size ? std::min(kStep, *size - done) : kStep);
         const ssize_t copied = (*way)(from, to, static_cast<off_t>(done), count);
         const bool last = way + 1 == std::end(kWays);
         if (copied < 0 && errno == EINTR)
             continue;
         if (copied < 0 && (last || !isRefusal(errno)))
-            return base::Error::fromErrno(errno, "copying it");
+            return errno;
         if (copied == 0 && last)
-            return base::Error::make(base::kPosixErrorDomain, ENODATA, "it became shorter while it was copied");
+            return size ? ENODATA : 0;
         if (copied <= 0) {
             ++way; // a way that gives nothing on a strange file system is not the end of the file
             continue;
         }
         done += static_cast<std::uint64_t>(copied);
-        if (goOn && !goOn(static_cast<double>(done) / static_cast<double>(size)))
-            return base::Error::make(base::kPosixErrorDomain, ECANCELED, "it was given up");
+        if (goOn && !goOn(done))
+            return ECANCELED;
     }
-    return {};
+    return 0;
 }
 
-} // namespace photos
+} // namespace posix
