@@ -96,4 +96,9 @@ void VideoDecoder::setSkipsUnreferenced(bool skips)
     m_context->skip_frame = skips ? AVDISCARD_NONREF : AVDISCARD_DEFAULT;
 }
 
+void VideoDecoder::setMendsGaps(bool mends)
+{
+    m_context->error_concealment = mends || !canLeaveGaps() ? FF_EC_GUESS_MVS | FF_EC_DEBLOCK : 0;
+}
+
 } // namespace ffmpeg

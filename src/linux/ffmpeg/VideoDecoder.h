@@ -27,6 +27,10 @@ public:
     void flush();
     /// Leaves out pictures that no other picture refers to. For packets sent from now on.
     void setSkipsUnreferenced(bool skips);
+    /// Makes up what is missing of a picture, which is slow. For packets sent from now on, if it canLeaveGaps(); decoders
+    /// of several threads always do.
+    void setMendsGaps(bool mends);
+    bool canLeaveGaps() const { return m_context->thread_count == 1; }
 
 private:
     VideoDecoder(Owned<AVCodecContext> context, const VideoTrack& track);

@@ -124,8 +124,10 @@ std::optional<ImageWorkers::Job> ImageWorkers::next(Worker& worker)
             m_changed.notify_all(); // what came late and lies behind in the group is anybody's now
         if (chosen) {
             const int threads = worker.group && allLieIn(worker, *worker.group) ? processors() : 1;
-            Job job{std::move((*chosen)->second), (*chosen)->first, threads};
-            m_waiting.erase(*chosen);
+            Job job{std::move((*chosen)->second), (*chosen)->first, threads, PictureWalk::Then::Rest};
+            const auto behind = m_waiting.erase(*chosen);
+            if (worker.group && behind != m_waiting.end() && worker.walk->groupOf(behind->first) == *worker.group)
+                job.then = PictureWalk::Then::GoOn;
             worker.tick = job.tick;
             return job;
         }
@@ -185,7 +187,7 @@ void ImageWorkers::make(Worker& worker, const Job& job)
     if (walk.threads() != job.threads && !walk.goesOnTo(job.tick))
         walk.setThreads(job.threads);
     const std::int64_t before = walk.decodedCount();
-    const FrameRef frame = walk.at(job.tick);
+    const FrameRef frame = walk.at(job.tick, job.then);
     m_decodedCount += walk.decodedCount() - before;
     answer(job.request, frame, failure(movie, "has no picture at that time that can be decoded"));
 }

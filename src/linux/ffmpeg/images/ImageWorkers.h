@@ -54,6 +54,7 @@ private:
         Request request;
         std::int64_t tick;
         int threads;
+        PictureWalk::Then then;
     };
     using Waiting = std::multimap<std::int64_t, Request>; ///< by tick
 

@@ -7,20 +7,16 @@ namespace ffmpeg {
 
 namespace {
 
-/// Of packets that were read ahead; broken files claim any size.
-constexpr std::size_t kMostBytesAhead = 16u << 20;
-
-bool isShown(const AVPacket& packet)
-{
-    return !(packet.flags & AV_PKT_FLAG_DISCARD);
-}
+/// Packets since the keyframe. A decoder that is drained gives its picture sooner, but has to begin anew behind it; who
+/// comes back to the group must not wait long for that.
+constexpr int kMostToDrain = 300;
 
 } // namespace
 
 PictureWalk::PictureWalk(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer,
                          std::unique_ptr<VideoDecoder> decoder, Cancelled cancelled)
     : m_movie(std::move(movie)), m_track(*m_movie->video()), m_demuxer(std::move(demuxer)),
-      m_decoder(std::move(decoder)), m_cancelled(std::move(cancelled))
+      m_decoder(std::move(decoder)), m_cancelled(std::move(cancelled)), m_ahead(m_demuxer->stream(m_track.stream))
 {
     m_demuxer->select({m_track.stream});
     if (!m_demuxer->seeksByTable()) {
@@ -63,15 +59,15 @@ std::int64_t PictureWalk::groupOf(std::int64_t tick) const
     return keyframeBefore(tick).value_or(kNever);
 }
 
-FrameRef PictureWalk::at(std::int64_t tick)
+FrameRef PictureWalk::at(std::int64_t tick, Then then)
 {
     if (!goesOnTo(tick))
         seek(tick);
     while (!*m_cancelled) {
         if (m_next && m_next->pts() <= tick)
             m_current = std::exchange(m_next, nullptr);
-        else if (!m_next && !m_ended)
-            decodeSome(tick);
+        else if (!m_next && !m_ended && !isFound(tick))
+            decodeSome(tick, then);
         else if (m_current)
             return m_current;
         else if (!m_fromStart)
@@ -107,10 +103,12 @@ std::optional<std::int64_t> PictureWalk::keyframeBefore(std::int64_t tick) const
 void PictureWalk::seek(std::int64_t tick)
 {
     m_decoder->flush();
-    m_ahead.clear();
+    m_ahead.restart();
+    m_inside.clear();
+    m_sentCount = 0;
     m_current = m_next = nullptr;
     m_positioned = m_awaitsKeyframe = true;
-    m_readAll = m_finishing = m_ended = false;
+    m_finishing = m_ended = m_hasUntimed = false;
     m_keyframe = kNever;
     m_soughtTick = tick;
     m_stepBack = 0;
@@ -141,10 +139,20 @@ void PictureWalk::seekFarther()
     }
 }
 
-void PictureWalk::decodeSome(std::int64_t tick)
+/// Whether nothing that is still to come is shown between the current picture and `tick`.
+bool PictureWalk::isFound(std::int64_t tick) const
+{
+    return m_current && !m_hasUntimed
+           && std::none_of(m_inside.begin(), m_inside.end(),
+                           [&](std::int64_t pts) { return pts > m_current->pts() && pts <= tick; })
+           && !m_ahead.isAnyShown(m_current->pts(), tick);
+}
+
+void PictureWalk::decodeSome(std::int64_t tick, Then then)
 {
     if (FrameRef frame = m_decoder->receive()) {
         ++m_decodedCount;
+        std::erase_if(m_inside, [&](std::int64_t pts) { return pts <= frame->pts(); });
         // Broken files give pictures out of order; time does not go back for them.
         if (frame->pts() >= m_keyframe && (!m_current || frame->pts() > m_current->pts()))
             m_next = std::move(frame);
@@ -154,52 +162,45 @@ void PictureWalk::decodeSome(std::int64_t tick)
         m_ended = true;
         return;
     }
-    readAhead();
-    if (m_ahead.empty()) {
+    m_ahead.fill(*m_demuxer);
+    const bool isInside = std::any_of(m_inside.begin(), m_inside.end(), [&](std::int64_t pts) { return pts <= tick; });
+    const bool drains = then == Then::Rest && isInside && !m_hasUntimed && m_sentCount <= kMostToDrain
+                        && !m_ahead.isAnyShown(kNever, tick);
+    if (m_ahead.isEmpty() || drains) {
         m_decoder->finish();
         m_finishing = true;
+        m_positioned = m_positioned && !drains;
         return;
     }
-    const Owned<AVPacket> packet = std::move(m_ahead.front());
-    m_ahead.pop_front();
+    sendFirst(tick);
+}
+
+void PictureWalk::sendFirst(std::int64_t tick)
+{
+    const AVPacket& first = m_ahead.first();
     if (m_awaitsKeyframe && !m_fromStart) {
-        if (!(packet->flags & AV_PKT_FLAG_KEY))
+        if (!(first.flags & AV_PKT_FLAG_KEY)) {
+            m_ahead.take();
             return;
-        if (packet->pts != AV_NOPTS_VALUE)
-            m_keyframe = packet->pts;
+        }
+        if (first.pts != AV_NOPTS_VALUE)
+            m_keyframe = first.pts;
         if (m_keyframe > tick) {
             m_ended = true; // nothing from here on is what was looked for
             return;
         }
     }
     m_awaitsKeyframe = false;
-    m_decoder->setSkipsUnreferenced(isPassed(*packet, tick));
-    m_decoder->send(*packet);
-}
-
-void PictureWalk::readAhead()
-{
-    std::size_t bytes = 0;
-    for (const auto& each : m_ahead)
-        bytes += static_cast<std::size_t>(std::max(0, each->size));
-    while (!m_readAll && m_ahead.size() < kAhead && bytes < kMostBytesAhead) {
-        Owned<AVPacket> packet = newPacket();
-        m_readAll = m_demuxer->read(*packet) != 0;
-        if (m_readAll)
-            return;
-        bytes += static_cast<std::size_t>(std::max(0, packet->size));
-        m_ahead.push_back(std::move(packet));
-    }
-}
-
-/// Whether another picture takes the place of this one before `tick`, or it is never shown.
-bool PictureWalk::isPassed(const AVPacket& packet, std::int64_t tick) const
-{
-    if (packet.pts == AV_NOPTS_VALUE || packet.pts > tick)
-        return false;
-    return !isShown(packet) || std::any_of(m_ahead.begin(), m_ahead.end(), [&](const Owned<AVPacket>& each) {
-        return each->pts != AV_NOPTS_VALUE && each->pts > packet.pts && each->pts <= tick && isShown(*each);
-    });
+    const bool isPassed = m_ahead.isFirstPassed(tick);
+    const Owned<AVPacket> standIn = m_ahead.standInForFirst(tick, !m_decoder->canLeaveGaps());
+    const Owned<AVPacket> packet = m_ahead.take();
+    m_hasUntimed = m_hasUntimed || packet->pts == AV_NOPTS_VALUE;
+    if (!isPassed && !(packet->flags & AV_PKT_FLAG_DISCARD))
+        m_inside.push_back(packet->pts);
+    ++m_sentCount;
+    m_decoder->setSkipsUnreferenced(isPassed);
+    m_decoder->setMendsGaps(!standIn);
+    m_decoder->send(standIn ? *standIn : *packet);
 }
 
 } // namespace ffmpeg

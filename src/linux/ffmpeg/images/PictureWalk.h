@@ -2,19 +2,19 @@
 /// group of pictures twice on the way. Keeps two pictures and a few packets. One thread.
 ///
 /// A look at the packets ahead tells which pictures nobody will see: those that no other refers to are left out then,
-/// however irregular the times are.
+/// however irregular the times are. It also tells when a picture is the last one before a tick.
 #pragma once
 
 #include "linux/ffmpeg/Demuxer.h"
 #include "linux/ffmpeg/Movie.h"
 #include "linux/ffmpeg/VideoDecoder.h"
+#include "linux/ffmpeg/images/PacketsAhead.h"
 
 #include <cstdint>
-#include <deque>
-#include <functional>
 #include <limits>
 #include <memory>
 #include <optional>
+#include <vector>
 
 namespace ffmpeg {
 
@@ -26,9 +26,14 @@ public:
     /// The same for all ticks whose pictures are decoded from one keyframe; it grows with the ticks.
     std::int64_t groupOf(std::int64_t tick) const;
 
+    enum class Then {
+        GoOn, ///< later ticks of the same group are likely
+        Rest  ///< none is known: it may cost a new start
+    };
+
     /// The last picture at or before `tick`; before all pictures, the first. Null when it was cancelled, or when the movie
     /// gives none. Ticks may go back, too; that costs a new start at a keyframe.
-    FrameRef at(std::int64_t tick);
+    FrameRef at(std::int64_t tick, Then then = Then::GoOn);
 
     /// Whether it goes on to `tick` where it stands, without a new start.
     bool goesOnTo(std::int64_t tick) const;
@@ -42,8 +47,6 @@ public:
 
 private:
     static constexpr std::int64_t kNever = std::numeric_limits<std::int64_t>::min();
-    /// Packets: pictures are not reordered farther than that.
-    static constexpr std::size_t kAhead = 17;
 
     PictureWalk(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer,
                 std::unique_ptr<VideoDecoder> decoder, Cancelled cancelled);
@@ -51,9 +54,9 @@ private:
     std::optional<std::int64_t> keyframeBefore(std::int64_t tick) const;
     void seek(std::int64_t tick);
     void seekFarther();
-    void decodeSome(std::int64_t tick);
-    void readAhead();
-    bool isPassed(const AVPacket& packet, std::int64_t tick) const;
+    bool isFound(std::int64_t tick) const;
+    void decodeSome(std::int64_t tick, Then then);
+    void sendFirst(std::int64_t tick);
 
     std::shared_ptr<const Movie> m_movie;
     VideoTrack m_track;
@@ -61,7 +64,10 @@ private:
     std::unique_ptr<VideoDecoder> m_decoder;
     Cancelled m_cancelled;
     std::shared_ptr<const PacketIndex> m_index; ///< where the file has no table of its own
-    std::deque<Owned<AVPacket>> m_ahead;        ///< read and not decoded
+    PacketsAhead m_ahead;
+    std::vector<std::int64_t> m_inside; ///< when the pictures are shown that the decoder has and has not given
+    bool m_hasUntimed = false;          ///< there is one of which nobody knows
+    int m_sentCount = 0;                ///< packets since the seek
 
     std::int64_t m_tableLag = 0; ///< the table's times are those of decoding, which is so much ahead of showing
 
@@ -72,7 +78,6 @@ private:
     bool m_fromStart = false; ///< nothing lies before the first packet since the seek
     bool m_awaitsKeyframe = false;
     std::int64_t m_keyframe = kNever; ///< what comes before it refers to what was not decoded
-    bool m_readAll = false;
     bool m_finishing = false;
     bool m_ended = false;
     std::int64_t m_soughtTick = 0;

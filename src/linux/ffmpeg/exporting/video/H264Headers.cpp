@@ -39,7 +39,7 @@ void readHigh(BitReader& in, Sps& sps)
 {
     sps.chromaFormat = in.ue();
     if (sps.chromaFormat == 3)
-        in.skip(1);
+        sps.hasSeparatePlanes = in.bit() != 0;
     sps.lumaDepth = in.ue() + 8;
     sps.chromaDepth = in.ue() + 8;
     in.skip(1);
@@ -51,12 +51,18 @@ void readHigh(BitReader& in, Sps& sps)
     }
 }
 
-void skipPictureOrder(BitReader& in)
+/// A number of bits of which the file can claim anything.
+int bitCount(std::uint32_t beyondFour)
 {
-    const std::uint32_t type = in.ue();
-    if (type == 0) {
-        in.ue();
-    } else if (type == 1) {
+    return static_cast<int>(std::min<std::uint32_t>(beyondFour, 12)) + 4;
+}
+
+void readPictureOrder(BitReader& in, Sps& sps)
+{
+    sps.orderType = in.ue();
+    if (sps.orderType == 0) {
+        sps.orderBits = bitCount(in.ue());
+    } else if (sps.orderType == 1) {
         in.skip(1);
         in.se();
         in.se();
@@ -124,13 +130,14 @@ std::optional<Sps> parseSps(ByteView nal)
     sps.id = in.ue();
     if (isHigh(sps.profile))
         readHigh(in, sps);
-    in.ue();
-    skipPictureOrder(in);
+    sps.frameNumBits = bitCount(in.ue());
+    readPictureOrder(in, sps);
     sps.referenceFrames = in.ue();
-    in.skip(1);
-    in.ue();
-    in.ue();
-    if (!in.bit())
+    sps.hasFrameNumGaps = in.bit() != 0;
+    sps.macroblocks = in.ue() + 1;
+    sps.macroblocks *= in.ue() + 1;
+    sps.isProgressive = in.bit() != 0;
+    if (!sps.isProgressive)
         in.skip(1);
     in.skip(1);
     if (in.bit())

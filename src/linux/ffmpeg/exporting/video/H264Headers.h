@@ -36,7 +36,14 @@ struct Sps {
     std::uint32_t chromaFormat = 1;
     std::uint32_t lumaDepth = 8;
     std::uint32_t chromaDepth = 8;
+    bool hasSeparatePlanes = false;
+    int frameNumBits = 4;
+    std::uint32_t orderType = 0;
+    int orderBits = 4; ///< of the picture order count, of type 0
     std::uint32_t referenceFrames = 0;
+    bool hasFrameNumGaps = false;
+    std::uint32_t macroblocks = 0; ///< of a picture that is not interlaced
+    bool isProgressive = true;
     /// How far pictures are reordered, and how many a decoder keeps. Nothing when it is not said.
     struct Restriction {
         std::uint32_t reorderFrames;
