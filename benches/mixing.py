@@ -1,21 +1,10 @@
 """Mixing the two sound tracks of a ten-minute recording into one: by `clipsa mix`, and by ffmpeg's amix."""
 
 import os
-import subprocess
 import tempfile
-import time
 
+import commands
 import report
-
-
-def run(command):
-    """Seconds on the clock, and the processor's."""
-    before = os.times()
-    start = time.monotonic()
-    subprocess.run(command, check=True, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL)
-    now = os.times()
-    return (time.monotonic() - start,
-            now.children_user + now.children_system - before.children_user - before.children_system)
 
 
 def measure(settings, movie):
@@ -23,10 +12,12 @@ def measure(settings, movie):
     theirs = []
     for turn in range(max(3, settings.rounds // 3) + 1):
         with tempfile.TemporaryDirectory(prefix="clipsa-bench-") as folder:
-            taken = run([settings.program("clipsa"), "mix", movie, "-o", os.path.join(folder, "clipsa.mp4")])
-            peers = run(["ffmpeg", "-nostdin", "-v", "error", "-i", movie, "-filter_complex",
-                         "[0:a:0][0:a:1]amix=normalize=0[mix]", "-map", "0:v", "-map", "[mix]", "-c:v", "copy", "-c:a",
-                         "aac", "-b:a", "256k", os.path.join(folder, "ffmpeg.mp4")])
+            taken = commands.timed(
+                [settings.program("clipsa"), "mix", movie, "-o", os.path.join(folder, "clipsa.mp4")])
+            peers = commands.timed(
+                ["ffmpeg", "-nostdin", "-v", "error", "-i", movie, "-filter_complex",
+                 "[0:a:0][0:a:1]amix=normalize=0[mix]", "-map", "0:v", "-map", "[mix]", "-c:v", "copy", "-c:a", "aac",
+                 "-b:a", "256k", os.path.join(folder, "ffmpeg.mp4")])
         if turn > 0:  # the first fills the page cache
             ours.append(taken)
             theirs.append(peers)

@@ -24,7 +24,7 @@ def ratio(name, ours, theirs, unit, digits=0):
 
     def part(what, of):
         a, b = of(ours), of(theirs)
-        quotient = f"{a / b:.2f}" if a >= 0.1 * b else f"{a / b:.2g}"
+        quotient = "–" if b <= 0 else f"{a / b:.2f}" if a >= 0.1 * b else f"{a / b:.2g}"  # clocks have coarse ticks
         return f"{what} {quotient} ({a:.{digits}f} : {b:.{digits}f} {unit})"
 
     parts = [part("median" if len(ours) > 1 else "once", statistics.median)]

@@ -6,16 +6,11 @@ import subprocess
 import tempfile
 import time
 
+import commands
 import report
 
 COUNT = 20
 WIDTH, HEIGHT = 135, 76
-
-
-def length_of(movie):
-    return float(subprocess.run(
-        ["ffprobe", "-v", "error", "-show_entries", "format=duration", "-of", "default=nokey=1:noprint_wrappers=1",
-         movie], check=True, capture_output=True, text=True).stdout)
 
 
 def first_and_all(command, folder):
@@ -31,12 +26,7 @@ def first_and_all(command, folder):
     os.close(ended)
     if process.wait() != 0:
         raise RuntimeError(" ".join(command) + " failed")
-    return first or time.monotonic() - start, time.monotonic() - start, processor_since(before)
-
-
-def processor_since(before):
-    now = os.times()
-    return now.children_user + now.children_system - before.children_user - before.children_system
+    return first or time.monotonic() - start, time.monotonic() - start, commands.processor_since(before)
 
 
 def one_by_one(command_at, times):
@@ -47,11 +37,11 @@ def one_by_one(command_at, times):
         subprocess.run(command_at(index, at), check=True, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL,
                        stderr=subprocess.DEVNULL)
         first = first or time.monotonic() - start
-    return first, time.monotonic() - start, processor_since(before)
+    return first, time.monotonic() - start, commands.processor_since(before)
 
 
 def measure(settings, movie):
-    times = [length_of(movie) * index / COUNT for index in range(COUNT)]
+    times = [commands.length_of(movie) * index / COUNT for index in range(COUNT)]
     clock = "{:02d}:{:02d}:{:02d}".format
     results = {"clipsa": [], "thumbnailer": [], "ffmpeg": []}
     for turn in range(max(3, settings.rounds // 3) + 1):

@@ -4,10 +4,9 @@ import os
 import statistics
 import subprocess
 import tempfile
-import time
 
+import commands
 import report
-from thumbnails import length_of, processor_since
 
 ENCODED_SECONDS = 60  # of the movie; encoding all of it would take longer than everything else together
 
@@ -20,21 +19,18 @@ def keyframes_of(movie):
 
 
 def timed(command, output):
-    """Seconds, and the processor's, of a program that writes `output` anew."""
+    """As commands.timed; the program writes `output` anew."""
     if os.path.exists(output):
         os.remove(output)
-    before = os.times()
-    start = time.monotonic()
-    subprocess.run(command, check=True, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL)
-    return time.monotonic() - start, processor_since(before)
+    return commands.timed(command)
 
 
 def measure(settings, movie):
     keyframes = keyframes_of(movie)
-    length = length_of(movie)
+    length = commands.length_of(movie)
     at_keyframe = keyframes[1]
     step = keyframes[2] - keyframes[1]
-    # Up to the end; and from one picture behind a keyframe, so that a whole group but one picture is encoded again.
+    # From one picture behind a keyframe a whole group but that picture is encoded again.
     starts = {"from a keyframe": at_keyframe, "from the middle of a group": at_keyframe + step / 2,
               "from behind a keyframe": at_keyframe + 0.02}
     report.heading(f"Trimming to the end, Clipsa : ffmpeg -c copy: {settings.show(movie)}, keyframes {step:.1f} s apart")
