@@ -165,6 +165,19 @@ TEST_F(Headers, OfExportsOfExportsDoNotPileUp)
     EXPECT_FALSE(saysEncodedAsAWhole());
 }
 
+TEST(NalUnits, EndBeforeZerosThatBelongToNobody)
+{
+    const ffmpeg::Bytes lengths{0, 0, 0, 4, 0x68, 1, 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 2, 0x65, 2};
+    const auto behind = ffmpeg::unitsBehindLengths(lengths, 4);
+    ASSERT_EQ(behind->size(), 2U);
+    EXPECT_EQ(behind->front().size(), 2U);
+    EXPECT_EQ(behind->back().size(), 2U);
+    const ffmpeg::Bytes codes{0, 0, 0, 1, 0x68, 1, 0, 0, 0, 1, 0x65, 2, 0};
+    ASSERT_EQ(ffmpeg::unitsBetweenStartCodes(codes).size(), 2U);
+    for (const ffmpeg::ByteView unit : ffmpeg::unitsBetweenStartCodes(codes))
+        EXPECT_EQ(unit.size(), 2U);
+}
+
 TEST(HevcHeaders, TheFirstPictureOfAnOpenGroupBecomesABeginning)
 {
     // An open group's (21) and one that is shown behind others but needs none of them (19); both would have what was

@@ -66,7 +66,8 @@ INSTANTIATE_TEST_SUITE_P(
         Kind{"sound-early.mp4", true, 34}, Kind{"sound-fragmented.mp4", true, 35},
         Kind{"sound-edit-list.mp4", true, 36}, Kind{"sound.mkv", true, 37}, Kind{"mp3.mov", true, 38},
         Kind{"pcm.mov", true, 39}, Kind{"opus.webm", true, 40}, Kind{"opus.mkv", true, 41},
-        Kind{"h264-422.mp4", true, 42}, Kind{"h264-full-range.mp4", true, 43}, Kind{"hevc-422.mp4", true, 44}),
+        Kind{"h264-422.mp4", true, 42}, Kind{"h264-full-range.mp4", true, 43}, Kind{"hevc-422.mp4", true, 44},
+        Kind{"h264-fields.mp4", true, 45}, Kind{"h264-fields-apart.mp4", false, 46}),
     [](const auto& each) {
         std::string name = each.param.file;
         std::replace_if(

@@ -29,6 +29,9 @@ base::Result<std::unique_ptr<Splicer>> H264Splicer::make(const AVStream& stream)
     std::unique_ptr<H264Splicer> splicer(new H264Splicer);
     splicer->m_hasStartCodes = h264::Configuration::hasStartCodes(extradata);
     splicer->m_header = std::move(*header);
+    for (auto* sets : {&splicer->m_header.sps, &splicer->m_header.pps})
+        for (Bytes& nal : *sets)
+            nal.resize(withoutTrailingZeros(nal).size());
     for (const Bytes& nal : splicer->m_header.sps) {
         const auto sps = h264::parseSps(nal);
         if (!sps)

@@ -165,6 +165,7 @@ std::optional<Configuration> Configuration::parse(ByteView extradata)
     constexpr std::size_t kArrays = 22;
     Configuration configuration;
     const auto add = [&](ByteView nal) {
+        nal = withoutTrailingZeros(nal);
         if (nal.size() > 2 && isSet(nal))
             configuration.sets.emplace_back(nal.begin(), nal.end());
     };

@@ -12,10 +12,9 @@ std::vector<ByteView> unitsBetweenStartCodes(ByteView data)
     const auto end = [&](std::size_t at) {
         if (!begin)
             return;
-        while (at > *begin && data[at - 1] == 0)
-            --at; // zeros before a start code belong to nobody
-        if (at > *begin)
-            units.push_back(data.subspan(*begin, at - *begin));
+        const ByteView unit = withoutTrailingZeros(data.subspan(*begin, at - *begin));
+        if (!unit.empty())
+            units.push_back(unit);
     };
     for (std::size_t at = 0; at + 3 <= data.size(); ++at) {
         if (data[at] == 0 && data[at + 1] == 0 && data[at + 2] == 1) {
@@ -40,8 +39,9 @@ std::optional<std::vector<ByteView>> unitsBehindLengths(ByteView data, int lengt
         at += header;
         if (length > data.size() - at)
             return std::nullopt;
-        if (length > 0)
-            units.push_back(data.subspan(at, length));
+        const ByteView unit = withoutTrailingZeros(data.subspan(at, length));
+        if (!unit.empty())
+            units.push_back(unit);
         at += length;
     }
     return units;

@@ -12,8 +12,16 @@ namespace ffmpeg {
 
 /// Units between start codes.
 std::vector<ByteView> unitsBetweenStartCodes(ByteView data);
-/// Units behind big-endian lengths of so many bytes. Nothing where a length leads beyond the end.
+/// Units behind big-endian lengths of so many bytes, without trailing zeros. Nothing where a length leads beyond the end.
 std::optional<std::vector<ByteView>> unitsBehindLengths(ByteView data, int lengthSize);
+
+/// No unit ends with a zero. But some files count in what stood before the next start code when they were made.
+inline ByteView withoutTrailingZeros(ByteView unit)
+{
+    while (!unit.empty() && unit.back() == 0)
+        unit = unit.first(unit.size() - 1);
+    return unit;
+}
 
 /// A packet's payload made of units behind lengths of so many bytes; 0 puts start codes before them. False when one is
 /// too long for its length, or memory ran out.
