@@ -134,7 +134,8 @@ int main(int argc, char* argv[])
 
     const auto proxy = connection.remoteObjectProxyWithErrorHandler(
         [](const base::ErrorRef& error) { std::fprintf(stderr, "fake editor: %s\n", error->description().c_str()); });
-    dbus::BusyMark busy(argument(argc, argv, "--device-root"));
+    // Never destroyed: it stays busy until the kernel ends it, as sanitizers take their time on the way out.
+    static auto& busy = *new dbus::BusyMark(argument(argc, argv, "--device-root"));
     const char* const script = std::getenv("FAKE_EDITOR");
     for (const std::string& step : split(script ? script : "", ' ')) {
         const std::string word = step.substr(0, step.find('='));
