@@ -2,11 +2,14 @@
 #pragma once
 
 #include "linux/ffmpeg/exporting/DecodedMovie.h"
+#include "linux/ffmpeg/exporting/ExportJob.h"
 #include "platform/media/ExportSession.h"
 #include "support/EngineTest.h"
 #include "support/PrivateDirectory.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <filesystem>
+#include <fstream>
 #include <memory>
 #include <optional>
 #include <string>
@@ -47,6 +50,31 @@ protected:
     ExportStatus cut(const std::string& from, const std::string& to, std::optional<Range> range)
     {
         return run(sessionFor(from, to, range));
+    }
+    /// The work without the session, on this thread.
+    base::Result<void> runJob(const std::string& from, std::optional<Range> range)
+    {
+        EXPECT_EQ(open(from), Status::ReadyToPlay);
+        ffmpeg::ExportJob job;
+        job.movie = std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie();
+        job.output = output();
+        job.range = range;
+        job.cancelled = std::make_shared<std::atomic<bool>>(false);
+        job.log = &log;
+        return job.run();
+    }
+    base::Result<void> runJobRefusing(const std::vector<RefusedSystemCall>& calls, const std::string& from,
+                                      std::optional<Range> range)
+    {
+        EXPECT_EQ(open(from), Status::ReadyToPlay);
+        base::Result<void> result;
+        whileRefusing(calls, [&] { result = runJob(from, range); });
+        return result;
+    }
+    static std::string bytesOf(const std::string& path)
+    {
+        std::ifstream file(path, std::ios::binary);
+        return {std::istreambuf_iterator<char>(file), {}};
     }
     std::string errorText() const { return lastError ? lastError->description() : ""; }
     /// Names of what lies in the directory.

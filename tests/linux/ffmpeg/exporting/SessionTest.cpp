@@ -1,18 +1,9 @@
-// What whoever exports sees: status, errors, the file, the threads.
-#include "linux/ffmpeg/exporting/ExportJob.h"
+// What whoever exports sees: status, errors, ranges, what is kept.
 #include "linux/ffmpeg/exporting/ExportTest.h"
-#include "linux/ffmpeg/exporting/output/MovieWriter.h"
-#include "linux/ffmpeg/exporting/output/OutputCheck.h"
-#include "linux/ffmpeg/exporting/video/VideoSources.h"
-#include "support/RefusedSystemCalls.h"
-#include "support/WithoutPrivileges.h"
 
 #include <gmock/gmock.h>
 
-#include <csignal>
-#include <fstream>
 #include <limits>
-#include <sys/resource.h>
 #include <thread>
 
 namespace tests {
@@ -20,35 +11,7 @@ namespace {
 
 using testing::HasSubstr;
 
-std::string bytesOf(const std::string& path)
-{
-    std::ifstream file(path, std::ios::binary);
-    return {std::istreambuf_iterator<char>(file), {}};
-}
-
-class AnExport : public ExportTest {
-protected:
-    /// The work without the session, on this thread.
-    base::Result<void> runJob(const std::string& from, std::optional<Range> range)
-    {
-        EXPECT_EQ(open(from), Status::ReadyToPlay);
-        ffmpeg::ExportJob job;
-        job.movie = std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie();
-        job.output = output();
-        job.range = range;
-        job.cancelled = std::make_shared<std::atomic<bool>>(false);
-        job.log = &log;
-        return job.run();
-    }
-    base::Result<void> runJobRefusing(const std::vector<RefusedSystemCall>& calls, const std::string& from,
-                                      std::optional<Range> range)
-    {
-        EXPECT_EQ(open(from), Status::ReadyToPlay);
-        base::Result<void> result;
-        whileRefusing(calls, [&] { result = runJob(from, range); });
-        return result;
-    }
-};
+class AnExport : public ExportTest {};
 
 TEST_F(AnExport, TellsItsEndOnceOnAThreadOfItsOwn)
 {
@@ -96,102 +59,6 @@ TEST_F(AnExport, LeavesTheSourceAsItIs)
     EXPECT_EQ(bytesOf(exportMovie("h264-b.mp4")), before);
 }
 
-TEST_F(AnExport, DoesNotReplaceAFile)
-{
-    std::ofstream(output()) << "mine";
-    EXPECT_EQ(cut(exportMovie("h264.mp4"), output(), fromTo(1, 2)), ExportStatus::Failed);
-    EXPECT_THAT(errorText(), HasSubstr("out.mp4"));
-    EXPECT_THAT(errorText(), HasSubstr("File exists"));
-    EXPECT_EQ(bytesOf(output()), "mine");
-}
-
-TEST_F(AnExport, DoesNotReplaceALinkThatLeadsNowhere)
-{
-    const auto session = sessionFor(exportMovie("h264.mp4"), output(), std::nullopt);
-    std::filesystem::create_symlink("/nowhere", output());
-    EXPECT_EQ(run(session), ExportStatus::Failed);
-    EXPECT_TRUE(std::filesystem::is_symlink(output()));
-}
-
-TEST_F(AnExport, DoesNotReplaceAFileThatComesMeanwhile)
-{
-    ASSERT_EQ(open(exportMovie("h264.mp4")), Status::ReadyToPlay);
-    ffmpeg::ExportJob job{std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie(),
-                          output(),
-                          fromTo(1, 2),
-                          std::nullopt,
-                          std::make_shared<std::atomic<bool>>(false),
-                          {},
-                          &log};
-    job.progress = [&](double) { std::ofstream(output()) << "mine"; };
-    for (const auto& calls : {std::vector<RefusedSystemCall>{}, std::vector<RefusedSystemCall>{noUnnamedFiles()}}) {
-        base::Result<void> result;
-        whileRefusing(calls, [&] { result = job.run(); });
-        ASSERT_FALSE(result);
-        EXPECT_THAT(result.error()->description(), HasSubstr("File exists"));
-        EXPECT_EQ(bytesOf(output()), "mine");
-        EXPECT_EQ(files(), std::vector<std::string>{"out.mp4"});
-        std::filesystem::remove(output());
-    }
-}
-
-TEST_F(AnExport, NeedsSomewhereToWriteTo)
-{
-    EXPECT_EQ(cut(exportMovie("h264.mp4"), directory() + "/none/out.mp4", fromTo(1, 2)), ExportStatus::Failed);
-    EXPECT_THAT(errorText(), HasSubstr("No such file or directory"));
-    const auto session = sessionFor(exportMovie("h264.mp4"), output(), fromTo(1, 2));
-    session->setOutputURL(std::nullopt);
-    EXPECT_EQ(run(session), ExportStatus::Failed);
-    EXPECT_THAT(errorText(), HasSubstr("there is no file to write to"));
-}
-
-TEST_F(AnExport, SaysWhatCannotBeWrittenIntoADirectoryOfOthers)
-{
-    std::filesystem::permissions(directory(), std::filesystem::perms::owner_read | std::filesystem::perms::owner_exec);
-    base::Result<void> result;
-    std::thread([&] {
-        const WithoutPrivileges without;
-        result = runJob(exportMovie("h264.mp4"), fromTo(1, 2));
-    }).join();
-    std::filesystem::permissions(directory(), std::filesystem::perms::owner_all);
-    ASSERT_FALSE(result);
-    EXPECT_THAT(result.error()->description(), HasSubstr("“out.mp4” cannot be written: Permission denied"));
-    EXPECT_TRUE(files().empty());
-}
-
-TEST_F(AnExport, LeavesNothingOnAFullDisk)
-{
-    for (const auto& calls : {std::vector<RefusedSystemCall>{{SYS_pwrite64, ENOSPC}},
-                              std::vector<RefusedSystemCall>{{SYS_pwrite64, ENOSPC}, noUnnamedFiles()}}) {
-        const auto result = runJobRefusing(calls, exportMovie("h264.mp4"), fromTo(1, 2));
-        ASSERT_FALSE(result);
-        EXPECT_THAT(result.error()->description(), HasSubstr("“out.mp4” cannot be written: the disk is full"));
-        EXPECT_TRUE(files().empty());
-    }
-}
-
-TEST_F(AnExport, LeavesNothingOfAFileThatMayNotGrowFurther)
-{
-    rlimit before{};
-    getrlimit(RLIMIT_FSIZE, &before);
-    std::signal(SIGXFSZ, SIG_IGN);
-    const rlimit small{90'000, before.rlim_max};
-    setrlimit(RLIMIT_FSIZE, &small);
-    const auto result = runJob(exportMovie("h264-sparse.mp4"), std::nullopt);
-    setrlimit(RLIMIT_FSIZE, &before);
-    ASSERT_FALSE(result);
-    EXPECT_THAT(result.error()->description(), HasSubstr("“out.mp4” cannot be written: File too large"));
-    EXPECT_TRUE(files().empty());
-}
-
-TEST_F(AnExport, IsWholeAlsoWhereEveryFileHasAName)
-{
-    const auto result = runJobRefusing({noUnnamedFiles()}, exportMovie("h264.mp4"), fromTo(1, 2));
-    ASSERT_TRUE(result) << result.error()->description();
-    EXPECT_EQ(files(), std::vector<std::string>{"out.mp4"});
-    EXPECT_EQ(DecodedMovie(output()).all().size(), 30U);
-}
-
 TEST_F(AnExport, HasTheRangeThatLiesInTheMovie)
 {
     ASSERT_EQ(cut(exportMovie("h264.mp4"), output("late.mp4"), Range{at(4), at(1000)}), ExportStatus::Completed);
@@ -219,7 +86,8 @@ TEST_F(AnExport, RefusesRangesThatHoldNothing)
 
 TEST_F(AnExport, KeepsEveryPacketWhenNothingIsCut)
 {
-    for (const char* name : {"h264-b.mp4", "h264-open.mp4", "h264-one-group.mp4", "h264-b.mkv", "h264-b.ts"}) {
+    for (const char* name :
+         {"h264-b.mp4", "h264-open.mp4", "h264-one-group.mp4", "h264-b.mkv", "h264-b.ts", "hevc-open.mp4"}) {
         ASSERT_EQ(cut(exportMovie(name), output(), std::nullopt), ExportStatus::Completed) << errorText();
         const auto source = DecodedMovie(exportMovie(name)).all();
         const auto copy = DecodedMovie(output()).all();
@@ -262,13 +130,6 @@ TEST_F(AnExport, KeepsHowThePictureIsTurned)
     EXPECT_NE(turned, base::AffineTransform());
 }
 
-TEST_F(AnExport, HasItsIndexInFront)
-{
-    ASSERT_EQ(cut(exportMovie("two-tracks.mp4"), output(), fromTo(1, 3)), ExportStatus::Completed);
-    const std::string bytes = bytesOf(output());
-    EXPECT_LT(bytes.find("moov"), bytes.find("mdat"));
-}
-
 TEST_F(AnExport, EndsSoonWhenItIsCancelled)
 {
     const auto session = sessionFor(exportMovie("h264-one-group.mp4"), output(), fromTo(0.5, 3));
@@ -304,66 +165,6 @@ TEST_F(AnExport, EndsSoonWhenItIsCancelledOnTheWay)
         EXPECT_LT(reached, 0.5);
         EXPECT_TRUE(files().empty());
     }
-}
-
-TEST_F(AnExport, ReadsAMovieWhoseFileIsGone)
-{
-    std::filesystem::copy_file(exportMovie("h264.mp4"), output("source.mp4"));
-    const auto session = sessionFor(output("source.mp4"), output(), fromTo(1, 2));
-    ASSERT_EQ(open(output("source.mp4")), Status::ReadyToPlay);
-    std::filesystem::remove(output("source.mp4"));
-    EXPECT_EQ(run(session), ExportStatus::Completed) << errorText();
-    EXPECT_EQ(DecodedMovie(output()).all().size(), 30U);
-}
-
-TEST_F(AnExport, OfAnExportWhoseFileIsRemovedAtTheStartSucceedsAThousandTimes)
-{
-    base::WorkerQueue remover;
-    for (int i = 0; i < 1000; ++i) {
-        const std::string source = output("source.mp4");
-        std::filesystem::copy_file(exportMovie("h264-open.mp4"), source);
-        // The editor holds the movie open as it plays it; it asks for the removal and then for the export.
-        const auto played = media.assetWithURL(base::Url::fromPath(source));
-        ASSERT_TRUE(waitFor([&] { return played->duration().isNumeric(); }));
-        remover.post([source] { std::filesystem::remove(source); });
-        ASSERT_EQ(cut(source, output(), Range{at(i % 40 * 0.1), at(1)}), ExportStatus::Completed)
-            << i << ": " << errorText();
-        remover.finish();
-        ASSERT_EQ(files(), std::vector<std::string>{"out.mp4"});
-        std::filesystem::remove(output());
-    }
-}
-
-TEST_F(AnExport, MayTakeTheNameOfItsSourceWhenThatIsRemoved)
-{
-    const std::string source = output("movie.mp4");
-    std::filesystem::copy_file(exportMovie("h264.mp4"), source);
-    ASSERT_EQ(open(source), Status::ReadyToPlay);
-    base::WorkerQueue remover;
-    ffmpeg::ExportJob job{std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie(),
-                          source,
-                          fromTo(1, 2),
-                          std::nullopt,
-                          std::make_shared<std::atomic<bool>>(false),
-                          {},
-                          &log};
-    // As late as it can come before the name is given.
-    job.progress = [&, isAsked = false](double part) mutable {
-        if (part >= 1 && !std::exchange(isAsked, true))
-            remover.post([&] { std::filesystem::remove(source); });
-    };
-    const auto result = job.run();
-    ASSERT_TRUE(result) << result.error()->description();
-    EXPECT_EQ(DecodedMovie(source).all().size(), 30U);
-}
-
-TEST_F(AnExport, DoesNotReplaceItsSourceWhenThatStays)
-{
-    const std::string source = output("movie.mp4");
-    std::filesystem::copy_file(exportMovie("h264.mp4"), source);
-    EXPECT_EQ(cut(source, source, fromTo(1, 2)), ExportStatus::Failed);
-    EXPECT_THAT(errorText(), HasSubstr("File exists"));
-    EXPECT_EQ(bytesOf(source), bytesOf(exportMovie("h264.mp4")));
 }
 
 class BadMovies : public AnExport, public testing::WithParamInterface<const char*> {};
@@ -412,25 +213,5 @@ TEST_F(AnExport, OfOneThatChangesItsSizeShowsAllOfEachPicture)
     EXPECT_EQ(pictures.size(), 60U);
     EXPECT_EQ(pictures.front().number, 0);
 }
-
-TEST_F(AnExport, HasRoomForItsIndexAlsoWhereMorePacketsComeThanThought)
-{
-    ASSERT_EQ(open(exportMovie("h264-b.mp4")), Status::ReadyToPlay);
-    const auto source = std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie();
-    const auto cancelled = std::make_shared<std::atomic<bool>>(false);
-    std::vector<std::unique_ptr<ffmpeg::TrackSource>> tracks;
-    tracks.push_back(ffmpeg::openVideoSource(source, {at(0), at(5)}, ffmpeg::VideoMode::Copy, cancelled, {}).value());
-    auto file = ffmpeg::OutputFile::create(output()).value();
-    // As if the index had been thought to be nearly empty.
-    const ffmpeg::WriteJob job{*file, tracks, nullptr, source->timescale(), -1450, 5, cancelled, {}};
-    const auto written = ffmpeg::writeMovie(job);
-    ASSERT_TRUE(written) << written.error()->description();
-    EXPECT_TRUE(ffmpeg::checkOutput(*file, written.value(), cancelled));
-    ASSERT_TRUE(file->publish());
-    const std::string bytes = bytesOf(output());
-    EXPECT_LT(bytes.find("moov"), bytes.find("mdat"));
-    EXPECT_EQ(DecodedMovie(output()).all().size(), 150U);
-}
-
 } // namespace
 } // namespace tests
