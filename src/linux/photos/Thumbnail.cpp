@@ -11,6 +11,7 @@
 #include <memory>
 #include <png.h>
 #include <sys/stat.h>
+#include <system_error>
 #include <vector>
 
 namespace photos {
@@ -75,7 +76,8 @@ Bytes pngOf(platform::Bitmap bitmap, Texts texts)
 /// Private, as it is asked of all who write there.
 base::Result<void> makePrivateDirectory(const fs::path& path)
 {
-    if (path.has_relative_path() && !fs::exists(path.parent_path()))
+    std::error_code ignored; // what cannot be looked at cannot be made either
+    if (path.has_relative_path() && !fs::exists(path.parent_path(), ignored))
         if (auto made = makePrivateDirectory(path.parent_path()); !made)
             return made;
     if (::mkdir(path.c_str(), 0700) != 0 && errno != EEXIST)

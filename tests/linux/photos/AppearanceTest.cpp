@@ -174,6 +174,14 @@ TEST_F(ASavedMovie, IsSavedAllTheSameWhereNoThumbnailAndNoListCanBeWritten)
     EXPECT_THAT(errors(), ElementsAre(HasSubstr(".cache/thumbnails"), HasSubstr("recently-used.xbel")));
 }
 
+TEST_F(ASavedMovie, IsSavedAllTheSameWhereThePlaceOfThumbnailsLeadsRoundInCircles)
+{
+    fs::create_symlink(".cache", home.path() / ".cache");
+    EXPECT_TRUE(saveWithPicture().success);
+    EXPECT_EQ(tests::namesIn(videos), std::vector{name});
+    EXPECT_THAT(errors(), ElementsAre(HasSubstr("no thumbnail of")));
+}
+
 using Bookmarks = std::unique_ptr<GBookmarkFile, decltype(&g_bookmark_file_free)>;
 
 Bookmarks bookmarksIn(const fs::path& list)
