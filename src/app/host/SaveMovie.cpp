@@ -13,6 +13,7 @@
 #include <filesystem>
 #include <future>
 #include <optional>
+#include <system_error>
 #include <utility>
 
 namespace host {
@@ -128,7 +129,8 @@ base::Result<std::string> save(MediaTool& tool, const SaveCommand& command, Prog
     if (error) {
         std::fprintf(stderr, "clipsa: the sound of %s cannot be mixed (%s); it is saved as it is\n",
                      command.movie.c_str(), error->description().c_str());
-        movie = fs::absolute(command.movie).native();
+        std::error_code ignored; // a relative path was opened a moment ago
+        movie = fs::absolute(command.movie, ignored).native();
     }
 
     photos::LibraryOptions options;
