@@ -2,6 +2,7 @@
 #pragma once
 
 #include "app/host/MediaCommandLine.h"
+#include "support/Names.h"
 #include "support/Paths.h"
 #include "support/Program.h"
 
@@ -9,8 +10,6 @@
 #include <QJsonObject>
 #include <gtest/gtest.h>
 
-#include <algorithm>
-#include <filesystem>
 #include <string>
 #include <vector>
 
@@ -30,17 +29,6 @@ inline std::string refusal(const Words& words)
 {
     const auto command = host::parseMediaCommand(words);
     return command ? "(accepted)" : command.error()->description();
-}
-
-/// The names of what is in a directory, in order; none when it is not there.
-inline Words namesIn(const std::filesystem::path& directory)
-{
-    Words names;
-    if (std::filesystem::is_directory(directory))
-        for (const auto& each : std::filesystem::directory_iterator(directory))
-            names.push_back(each.path().filename());
-    std::sort(names.begin(), names.end());
-    return names;
 }
 
 class ClipsaProgram : public ::testing::Test {

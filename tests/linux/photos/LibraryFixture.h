@@ -2,9 +2,9 @@
 #pragma once
 
 #include "linux/photos/VideoLibrary.h"
+#include "support/Names.h"
 #include "support/PrivateDirectory.h"
 
-#include <algorithm>
 #include <ctime>
 #include <filesystem>
 #include <gmock/gmock.h>
@@ -29,17 +29,6 @@ inline base::Date localDate(int year, int month, int day, int hour, int minute, 
     time.tm_sec = second;
     time.tm_isdst = -1;
     return {static_cast<double>(std::mktime(&time))};
-}
-
-inline std::vector<std::string> namesIn(const fs::path& directory)
-{
-    std::vector<std::string> names;
-    std::error_code ignored;
-    if (fs::is_directory(directory, ignored))
-        for (const auto& entry : fs::directory_iterator(directory))
-            names.push_back(entry.path().filename());
-    std::sort(names.begin(), names.end());
-    return names;
 }
 
 inline double modified(const fs::path& file)
