@@ -10,7 +10,8 @@ namespace host {
 const char* const kHelpText = R"(Clipsa looks at, trims, saves and shares a screen recording.
 
   clipsa open MOVIE [OPTION…]   open MOVIE in the editor; print what was done with it, one activity a line
-  clipsa service                serve recorders on the session bus, as org.clipsa.Clipsa
+  clipsa service [--idle-seconds N]
+                                serve recorders on the session bus, as org.clipsa.Clipsa
   clipsa tour MOVIE --output DIR [OPTION…]
                                 open MOVIE without a screen, and leave a picture of each step in DIR
   clipsa trim MOVIE [--from T] [--to T] -o OUT [--force]
