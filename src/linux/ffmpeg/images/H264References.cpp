@@ -189,15 +189,18 @@ bool H264References::addReferences(const Slice& slice, const Sps& sps, Picture& 
         const Slice::List& about = slice.lists[which];
         std::vector<Reference> list = listOf(slice, which);
         std::uint32_t frameNum = slice.frameNum;
-        auto front = list.begin();
+        std::ptrdiff_t front = 0;
         for (const Slice::Move& move : about.moves) {
             frameNum = (move.adds ? frameNum + move.apart + 1 : frameNum - move.apart - 1) & lastFrameNum(sps);
-            const auto found =
-                std::find_if(front, list.end(), [&](const Reference& each) { return each.frameNum == frameNum; });
-            if (found == list.end())
-                return false; // missing, or put there twice
-            std::rotate(front, found, found + 1);
-            ++front;
+            const auto moved = std::find_if(m_references.begin(), m_references.end(),
+                                            [&](const Reference& each) { return each.frameNum == frameNum; });
+            if (moved == m_references.end())
+                return false;
+            // One that was put in front before stays there too: it can be weighted in two ways.
+            list.erase(std::remove_if(list.begin() + front, list.end(),
+                                      [&](const Reference& each) { return each.number == moved->number; }),
+                       list.end());
+            list.insert(list.begin() + front++, *moved);
         }
         list.resize(std::min<std::size_t>(list.size(), about.count));
         for (const Reference& each : list)

@@ -36,7 +36,7 @@ void PacketsAhead::fill(Demuxer& demuxer)
     std::size_t bytes = 0;
     for (const Entry& each : m_entries)
         bytes += sizeOf(*each.packet);
-    while (!m_readAll && m_entries.size() < kEnough && bytes < kMostBytes) {
+    while (!m_readAll && m_entries.size() < m_enough && bytes < kMostBytes) {
         Owned<AVPacket> packet = newPacket();
         m_readAll = demuxer.read(*packet) != 0;
         if (m_readAll)
@@ -90,7 +90,7 @@ Owned<AVPacket> PacketsAhead::standInForFirst(std::int64_t tick, bool isWhole) c
 
 bool PacketsAhead::isAnyShown(std::int64_t pts, std::int64_t tick) const
 {
-    if (!m_readAll && m_entries.size() + 1 < kEnough)
+    if (!m_readAll && m_entries.size() + 1 < m_enough)
         return true; // nobody knows
     return std::any_of(m_entries.begin(), m_entries.end(), [&](const Entry& each) {
         const AVPacket& packet = *each.packet;

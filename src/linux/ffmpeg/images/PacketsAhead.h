@@ -14,7 +14,13 @@ namespace ffmpeg {
 
 class PacketsAhead {
 public:
-    explicit PacketsAhead(const AVStream& stream) : m_references(H264References::of(*stream.codecpar)) {}
+    /// Packets: pictures are not reordered farther than that.
+    static constexpr std::size_t kEnough = 17;
+
+    explicit PacketsAhead(const AVStream& stream, std::size_t enough = kEnough)
+        : m_enough(enough), m_references(H264References::of(*stream.codecpar))
+    {
+    }
 
     /// The next packet is one of another place.
     void restart();
@@ -35,9 +41,6 @@ public:
     bool isAnyShown(std::int64_t pts, std::int64_t tick) const;
 
 private:
-    /// Packets: pictures are not reordered farther than that.
-    static constexpr std::size_t kEnough = 17;
-
     struct Entry {
         Owned<AVPacket> packet;
         H264References::Picture picture;
@@ -45,6 +48,7 @@ private:
 
     bool isPassed(std::size_t index, std::int64_t tick) const;
 
+    const std::size_t m_enough;
     std::unique_ptr<H264References> m_references; ///< null where the stream does not tell
     std::deque<Entry> m_entries;
     bool m_readAll = false;
