@@ -98,15 +98,18 @@ private:
         for (std::size_t i = 0; i < got.size(); ++i) {
             ASSERT_EQ(got[i].number, wanted[i].picture->number) << "picture " << i;
             ASSERT_NEAR(got[i].seconds, wanted[i].seconds, kTolerance) << "picture " << i;
-            copies += got[i].hash == wanted[i].picture->hash;
-            ASSERT_GT(likeness(got[i], *wanted[i].picture), kAlike) << "picture " << i;
+            const bool isCopy = got[i].hash == wanted[i].picture->hash;
+            copies += isCopy;
+            ASSERT_TRUE(isCopy || likeness(got[i], *wanted[i].picture) > kAlike)
+                << "picture " << i << ": " << likeness(got[i], *wanted[i].picture) << " dB";
             shown.insert(got[i].number);
         }
         const double last = wanted.back().seconds;
         const double length = double(decoded.context().duration) / AV_TIME_BASE;
         EXPECT_GT(length, last);
         EXPECT_LE(length, end - start + 0.002);
-        for (const DecodedPicture& each : DecodedMovie(output(), DecodedMovie::Edits::Ignore).all())
+        for (const DecodedPicture& each :
+             DecodedMovie(output(), DecodedMovie::Edits::Ignore).all(DecodedMovie::Look::AtNumbers))
             EXPECT_TRUE(shown.contains(each.number)) << each.number << " was removed";
         for (const double part : {0.9, 0.1, 0.5}) {
             const std::size_t which = std::size_t(part * double(got.size()));

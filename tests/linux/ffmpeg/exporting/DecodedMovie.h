@@ -10,7 +10,9 @@
 #include <cmath>
 #include <cstdint>
 #include <cstdio>
+#include <cstring>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace tests {
@@ -51,6 +53,7 @@ public:
 class DecodedMovie {
 public:
     enum class Edits { Follow, Ignore };
+    enum class Look { AtNumbers, AtEverything };
 
     explicit DecodedMovie(const std::string& path, Edits edits = Edits::Follow)
     {
@@ -84,11 +87,11 @@ public:
     /// Packets that the decoder refused.
     int refused() const { return m_refused; }
 
-    std::vector<DecodedPicture> all()
+    std::vector<DecodedPicture> all(Look look = Look::AtEverything)
     {
         std::vector<DecodedPicture> pictures;
-        decode([&](const DecodedPicture& each) {
-            pictures.push_back(each);
+        decode(look, [&](DecodedPicture each) {
+            pictures.push_back(std::move(each));
             return true;
         });
         return pictures;
@@ -102,7 +105,7 @@ public:
             return -1;
         avcodec_flush_buffers(m_decoder.get());
         int number = -1;
-        decode([&](const DecodedPicture& each) {
+        decode(Look::AtNumbers, [&](const DecodedPicture& each) {
             if (each.seconds > seconds + 1e-4)
                 return false;
             number = each.number;
@@ -112,7 +115,7 @@ public:
     }
 
 private:
-    template <typename Take> void decode(Take take)
+    template <typename Take> void decode(Look look, Take take)
     {
         const auto packet = ffmpeg::newPacket();
         const auto frame = ffmpeg::newFrame();
@@ -127,54 +130,70 @@ private:
             m_refused += error < 0 && more;
             av_packet_unref(packet.get());
             while ((error = avcodec_receive_frame(m_decoder.get(), frame.get())) >= 0) {
-                if (!take(pictureOf(*frame)))
+                if (!take(pictureOf(*frame, look)))
                     return;
             }
             m_refused += error != AVERROR(EAGAIN) && error != AVERROR_EOF;
         }
     }
 
-    DecodedPicture pictureOf(const AVFrame& frame)
+    DecodedPicture pictureOf(const AVFrame& frame, Look look)
     {
         DecodedPicture picture;
         picture.seconds = double(frame.best_effort_timestamp) * av_q2d(stream().time_base);
         picture.duration = double(frame.pkt_duration) * av_q2d(stream().time_base);
-        const AVPixFmtDescriptor& about = *av_pix_fmt_desc_get(AVPixelFormat(frame.format));
-        const int depth = about.comp[0].depth;
-        const int bytes = depth > 8 ? 2 : 1;
-        const auto width = std::size_t(frame.width);
-        picture.luma.reserve(width * std::size_t(frame.height));
-        for (int y = 0; y < frame.height; ++y) {
-            const std::uint8_t* row = frame.data[0] + std::ptrdiff_t(y) * frame.linesize[0];
-            for (std::size_t x = 0; x < width; ++x)
-                picture.luma.push_back(bytes == 1 ? row[x]
-                                                  : std::uint8_t((row[2 * x] | row[2 * x + 1] << 8) >> (depth - 8)));
+        picture.number = numberOf(frame);
+        if (look == Look::AtNumbers)
+            return picture;
+        picture.luma.resize(std::size_t(frame.width) * std::size_t(frame.height));
+        auto luma = picture.luma.begin();
+        for (int y = 0; y < frame.height; ++y, luma += frame.width) {
+            if (depthOf(frame) == 8)
+                std::copy_n(rowOf(frame, 0, y), frame.width, luma);
+            else
+                for (int x = 0; x < frame.width; ++x)
+                    luma[x] = lumaAt(frame, x, y);
         }
-        std::uint64_t hash = 1469598103934665603U;
+        const AVPixFmtDescriptor& about = *av_pix_fmt_desc_get(AVPixelFormat(frame.format));
+        const int bytes = depthOf(frame) > 8 ? 2 : 1;
+        picture.hash = 1469598103934665603U;
         for (int plane = 0; plane < 3 && frame.data[plane]; ++plane) {
             const int rows = plane ? AV_CEIL_RSHIFT(frame.height, about.log2_chroma_h) : frame.height;
             const int columns = plane ? AV_CEIL_RSHIFT(frame.width, about.log2_chroma_w) : frame.width;
-            for (int y = 0; y < rows; ++y) {
-                const std::uint8_t* row = frame.data[plane] + std::ptrdiff_t(y) * frame.linesize[plane];
-                for (int x = 0; x < columns * bytes; ++x)
-                    hash = (hash ^ row[x]) * 1099511628211U;
-            }
+            for (int y = 0; y < rows; ++y)
+                addTo(picture.hash, rowOf(frame, plane, y), std::size_t(columns) * std::size_t(bytes));
         }
-        picture.hash = hash;
-        picture.number = numberOf(picture.luma, frame.width);
         return picture;
     }
 
-    static int numberOf(const std::vector<std::uint8_t>& luma, int width)
+    static int depthOf(const AVFrame& frame) { return av_pix_fmt_desc_get(AVPixelFormat(frame.format))->comp[0].depth; }
+    static const std::uint8_t* rowOf(const AVFrame& frame, int plane, int y)
     {
-        const int perRow = width >= 640 ? 16 : 8;
+        return frame.data[plane] + std::ptrdiff_t(y) * frame.linesize[plane];
+    }
+    static std::uint8_t lumaAt(const AVFrame& frame, int x, int y)
+    {
+        const std::uint8_t* row = rowOf(frame, 0, y);
+        const int depth = depthOf(frame);
+        return depth == 8 ? row[x] : std::uint8_t((row[2 * x] | row[2 * x + 1] << 8) >> (depth - 8));
+    }
+    static int numberOf(const AVFrame& frame)
+    {
+        const int perRow = frame.width >= 640 ? 16 : 8;
         int number = 0;
-        for (int i = 0; i < 16; ++i) {
-            const int x = 8 + 38 * (i % perRow) + 16;
-            const int y = 8 + 38 * (i / perRow) + 16;
-            number |= (luma[std::size_t(y) * std::size_t(width) + std::size_t(x)] > 125) << i;
-        }
+        for (int i = 0; i < 16; ++i)
+            number |= (lumaAt(frame, 8 + 38 * (i % perRow) + 16, 8 + 38 * (i / perRow) + 16) > 125) << i;
         return number;
+    }
+    /// Eight bytes at a time: many pictures are looked at.
+    static void addTo(std::uint64_t& hash, const std::uint8_t* bytes, std::size_t count)
+    {
+        for (std::size_t at = 0; at < count; at += sizeof hash) {
+            std::uint64_t part = 0;
+            std::memcpy(&part, bytes + at, std::min(sizeof part, count - at));
+            hash = (hash ^ part) * 1099511628211U;
+            hash ^= hash >> 29;
+        }
     }
 
     ffmpeg::Owned<AVFormatContext> m_context;
