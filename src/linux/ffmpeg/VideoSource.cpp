@@ -1,5 +1,7 @@
 #include "linux/ffmpeg/VideoSource.h"
 
+#include "linux/ffmpeg/TableLag.h"
+
 #include <algorithm>
 #include <cstdlib>
 #include <utility>
@@ -130,8 +132,9 @@ std::optional<std::int64_t> VideoSource::keyframeBefore(std::int64_t tick) const
         return found ? std::optional(found->pts) : std::nullopt;
     }
     AVStream& stream = m_demuxer->stream(m_track.stream);
-    const AVIndexEntry* found = avformat_index_get_entry_from_timestamp(&stream, tick, AVSEEK_FLAG_BACKWARD);
-    return found ? std::optional(found->timestamp) : std::nullopt;
+    const std::int64_t lag = m_tableLag.value_or(0);
+    const AVIndexEntry* found = avformat_index_get_entry_from_timestamp(&stream, tick - lag, AVSEEK_FLAG_BACKWARD);
+    return found ? std::optional(found->timestamp + lag) : std::nullopt;
 }
 
 void VideoSource::seek(std::int64_t tick)
@@ -152,6 +155,8 @@ void VideoSource::seek(std::int64_t tick)
             m_demuxer->seekToStart(m_track.stream);
         return;
     }
+    if (!m_tableLag)
+        m_tableLag = tableLag(*m_demuxer, m_track.stream, m_track.origin);
     const auto keyframe = keyframeBefore(tick);
     m_fromStart = keyframe && !keyframeBefore(*keyframe - 1);
     if (!m_demuxer->seek(m_track.stream, tick)) {
@@ -160,7 +165,7 @@ void VideoSource::seek(std::int64_t tick)
     }
 }
 
-/// The table's times are those of decoding: what it led to can lie behind the tick.
+/// What the table led to lies behind the tick after all.
 void VideoSource::seekFarther()
 {
     const std::int64_t second = std::max<std::int64_t>(1, av_rescale_q(1, {1, 1}, m_track.timeBase));

@@ -63,6 +63,7 @@ private:
     Cancelled m_cancelled;
     Owned<AVPacket> m_packet;
     std::shared_ptr<const PacketIndex> m_index; ///< where the file has no table of its own
+    std::optional<std::int64_t> m_tableLag;     ///< known once it is needed
     FrameCache m_cache;
 
     FrameRef m_current; ///< the last picture that came out, but one

@@ -1,5 +1,7 @@
 #include "linux/ffmpeg/images/PictureWalk.h"
 
+#include "linux/ffmpeg/TableLag.h"
+
 #include <algorithm>
 #include <utility>
 
@@ -23,10 +25,7 @@ PictureWalk::PictureWalk(std::shared_ptr<const Movie> movie, std::unique_ptr<Dem
         m_index = m_movie->packetIndex(m_cancelled);
         return;
     }
-    m_demuxer->seek(m_track.stream, m_track.origin); // some read their table only when they need it
-    const auto first = newPacket();
-    if (m_demuxer->read(*first) == 0 && first->pts != AV_NOPTS_VALUE && first->dts != AV_NOPTS_VALUE)
-        m_tableLag = std::max<std::int64_t>(0, first->pts - first->dts);
+    m_tableLag = tableLag(*m_demuxer, m_track.stream, m_track.origin);
 }
 
 base::Result<std::unique_ptr<PictureWalk>> PictureWalk::open(std::shared_ptr<const Movie> movie, Cancelled cancelled)
@@ -117,7 +116,8 @@ void PictureWalk::seek(std::int64_t tick)
         m_fromStart = !keyframe || keyframe->position < 0 || !m_demuxer->seekToByte(keyframe->position);
     } else {
         const auto keyframe = keyframeBefore(tick);
-        m_fromStart = (keyframe && !keyframeBefore(*keyframe - 1)) || !m_demuxer->seek(m_track.stream, tick);
+        m_fromStart =
+            (keyframe && !keyframeBefore(*keyframe - 1)) || !m_demuxer->seek(m_track.stream, tick);
     }
     if (m_fromStart)
         m_demuxer->seekToStart(m_track.stream);

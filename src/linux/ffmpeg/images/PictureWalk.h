@@ -69,7 +69,7 @@ private:
     bool m_hasUntimed = false;          ///< there is one of which nobody knows
     int m_sentCount = 0;                ///< packets since the seek
 
-    std::int64_t m_tableLag = 0; ///< the table's times are those of decoding, which is so much ahead of showing
+    std::int64_t m_tableLag = 0;
 
     FrameRef m_current; ///< the last picture that came out, but one
     FrameRef m_next;    ///< the one behind it: known, so that the end of `m_current` is
