@@ -221,8 +221,9 @@ void VKVideoEditorViewController::trimEndHere()
 
 void VKVideoEditorViewController::confirmTrim()
 {
-    const bool isUnderWay =
-        isExporting() && exportSession() && exportSession()->status() == platform::ExportSession::Status::Exporting;
+    using Status = platform::ExportSession::Status;
+    const auto status = exportSession() ? exportSession()->status() : Status::Unknown;
+    const bool isUnderWay = isExporting() && (status == Status::Waiting || status == Status::Exporting);
     // A key is soon pressed twice.
     if (isTrimming() && !isUnderWay)
         saveAction();

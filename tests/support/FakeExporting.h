@@ -22,7 +22,7 @@ public:
     void setAudioMix(std::optional<platform::AudioMix> mix) override { audioMix = std::move(mix); }
     void exportAsynchronously(std::function<void()> done) override
     {
-        m_status = Status::Exporting;
+        m_status = Status::Waiting; // as a real one does until its asset is loaded
         m_done = std::move(done);
     }
     void cancelExport() override { wasCancelled = true; }
@@ -31,7 +31,7 @@ public:
     std::optional<base::Url> outputURL() const override { return m_outputURL; }
     double progress() const override { return m_status == Status::Completed ? 1 : 0; }
 
-    bool isRunning() const { return m_status == Status::Exporting; }
+    bool isRunning() const { return m_done != nullptr; }
     /// Ends the export, and tells so at once on the caller's thread.
     void finish(Status status, base::ErrorRef why = nullptr)
     {
