@@ -100,19 +100,27 @@ DecodedSound decodeSound(const std::string& path, int track, bool everything)
 std::int64_t latenessOf(const DecodedSound& cut, std::int64_t at, const DecodedSound& source, std::int64_t sourceAt,
                         std::int64_t samples, std::int64_t farthest, double* likeness)
 {
-    constexpr std::int64_t kStep = 3; // sounds to compare have nothing in the highest octave
+    constexpr std::size_t kStep = 3; // sounds to compare have nothing in the highest octave
+    const auto taken = [](const DecodedSound& sound, std::int64_t from, std::int64_t count) {
+        std::vector<double> part;
+        for (std::int64_t i = from; i < from + count; ++i)
+            part.push_back(static_cast<double>(sound.at(i, 0)));
+        return part;
+    };
+    const std::vector<double> there = taken(source, sourceAt, samples);
+    const std::vector<double> here = taken(cut, at - farthest, samples + 2 * farthest);
+    double loudness = 0;
+    for (std::size_t i = 0; i < there.size(); i += kStep)
+        loudness += there[i] * there[i];
     double best = -2;
     std::int64_t found = 0;
-    double loudness = 0;
-    for (std::int64_t i = 0; i < samples; i += kStep)
-        loudness += std::pow(static_cast<double>(source.at(sourceAt + i, 0)), 2);
     for (std::int64_t lag = -farthest; lag <= farthest; ++lag) {
+        const double* moved = here.data() + (lag + farthest);
         double sum = 0;
         double own = 0;
-        for (std::int64_t i = 0; i < samples; i += kStep) {
-            const double sample = static_cast<double>(cut.at(at + i + lag, 0));
-            sum += sample * static_cast<double>(source.at(sourceAt + i, 0));
-            own += sample * sample;
+        for (std::size_t i = 0; i < there.size(); i += kStep) {
+            sum += moved[i] * there[i];
+            own += moved[i] * moved[i];
         }
         const double alike = own > 0 && loudness > 0 ? sum / std::sqrt(own * loudness) : -1;
         if (alike > best) {
