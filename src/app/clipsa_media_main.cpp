@@ -1,9 +1,9 @@
 // What `clipsa` becomes for the commands that need the media engine and no window; takes the same words.
 
 #include "app/host/CommandLine.h"
+#include "app/host/ExitStatus.h"
 #include "app/host/MakeThumbnails.h"
 #include "app/host/MixMovie.h"
-#include "app/host/OpenMovie.h"
 #include "app/host/ProbeMovie.h"
 #include "app/host/SaveMovie.h"
 #include "app/host/TrimMovie.h"

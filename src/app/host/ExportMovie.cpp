@@ -1,6 +1,6 @@
 #include "app/host/ExportMovie.h"
 
-#include "app/host/OpenMovie.h"
+#include "app/host/ExitStatus.h"
 #include "app/host/ProgressBar.h"
 #include "linux/dbus/EditRequest.h"
 

@@ -1,7 +1,7 @@
 #include "app/host/MakeThumbnails.h"
 
+#include "app/host/ExitStatus.h"
 #include "app/host/MediaTool.h"
-#include "app/host/OpenMovie.h"
 #include "app/host/ProgressBar.h"
 #include "app/host/WholeFile.h"
 #include "linux/dbus/EditRequest.h"

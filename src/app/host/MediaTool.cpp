@@ -1,7 +1,7 @@
 #include "app/host/MediaTool.h"
 
+#include "app/host/ExitStatus.h"
 #include "app/host/InputFile.h"
-#include "app/host/OpenMovie.h"
 #include "linux/dbus/EditRequest.h"
 #include "linux/ffmpeg/FFmpegMediaFramework.h"
 

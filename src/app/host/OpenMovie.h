@@ -2,6 +2,7 @@
 #pragma once
 
 #include "app/host/CommandLine.h"
+#include "app/host/ExitStatus.h"
 
 #include <functional>
 #include <string>
@@ -9,8 +10,6 @@
 #include <vector>
 
 namespace host {
-
-enum ExitStatus { kExitDone = 0, kExitFailed = 1, kExitUsage = 2, kExitEditorEnded = 3 };
 
 /// Results go to standard output, all else to standard error. Needs a QCoreApplication, and a thread on which SIGINT,
 /// SIGTERM and SIGHUP have been blocked before any other was started; they close the editor.

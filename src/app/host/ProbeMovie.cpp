@@ -1,8 +1,8 @@
 #include "app/host/ProbeMovie.h"
 
+#include "app/host/ExitStatus.h"
 #include "app/host/JsonObject.h"
 #include "app/host/MediaTool.h"
-#include "app/host/OpenMovie.h"
 #include "linux/ffmpeg/FFmpegAsset.h"
 
 #include <atomic>

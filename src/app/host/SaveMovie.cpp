@@ -1,8 +1,8 @@
 #include "app/host/SaveMovie.h"
 
 #include "app/host/EditorDirectory.h"
+#include "app/host/ExitStatus.h"
 #include "app/host/MediaTool.h"
-#include "app/host/OpenMovie.h"
 #include "app/host/ProgressBar.h"
 #include "linux/photos/VideoLibrary.h"
 #include "linux/xdg/FileManager.h"

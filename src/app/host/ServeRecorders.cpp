@@ -2,7 +2,7 @@
 
 #include "app/host/EditorDirectory.h"
 #include "app/host/EditorSession.h"
-#include "app/host/OpenMovie.h"
+#include "app/host/ExitStatus.h"
 #include "app/host/PrepareRequest.h"
 #include "app/host/TerminationSignals.h"
 #include "linux/dbus/RecorderService.h"

@@ -1,6 +1,6 @@
 #include "app/host/StartMediaProgram.h"
 
-#include "app/host/OpenMovie.h"
+#include "app/host/ExitStatus.h"
 
 #include <cerrno>
 #include <cstdio>
