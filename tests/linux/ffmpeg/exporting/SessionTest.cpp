@@ -205,6 +205,16 @@ TEST_F(AnExport, SaysWhatIsMissingOfATruncatedMovie)
     EXPECT_GT(DecodedMovie(output()).all().size(), 30U);
 }
 
+TEST_F(AnExport, SaysThatFieldsInPacketsOfTheirOwnAreNotCopied)
+{
+    ASSERT_EQ(cut(exportMovie("h264-fields.mp4"), output("pairs.mp4"), fromTo(0.5, 2.5)), ExportStatus::Completed);
+    EXPECT_TRUE(log.texts(base::MemoryLog::Line::Kind::Message).empty());
+    ASSERT_EQ(cut(exportMovie("h264-fields-apart.mp4"), output(), fromTo(0.5, 2.5)), ExportStatus::Completed);
+    const auto lines = log.texts(base::MemoryLog::Line::Kind::Message);
+    ASSERT_EQ(lines.size(), 1U);
+    EXPECT_THAT(lines.front(), HasSubstr("the fields of its pictures stand in packets of their own"));
+}
+
 TEST_F(AnExport, OfOneThatChangesItsSizeShowsAllOfEachPicture)
 {
     ASSERT_EQ(cut(movie("size-change.ts"), output(), std::nullopt), ExportStatus::Completed) << errorText();

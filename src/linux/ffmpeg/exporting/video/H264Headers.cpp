@@ -213,6 +213,20 @@ std::uint32_t ppsOfSlice(ByteView nal)
     return in.ue();
 }
 
+bool isOfField(ByteView nal, const Sps& sps)
+{
+    if (sps.isProgressive)
+        return false;
+    const Bytes payload = withoutEmulation(nal.first(std::min<std::size_t>(nal.size(), 24)));
+    BitReader in(payload);
+    in.skip(8);
+    in.ue();
+    in.ue();
+    in.ue();
+    in.skip((sps.hasSeparatePlanes ? 2 : 0) + sps.frameNumBits);
+    return in.bit() != 0;
+}
+
 bool Configuration::hasStartCodes(ByteView extradata)
 {
     return extradata.size() >= 4 && extradata[0] == 0;

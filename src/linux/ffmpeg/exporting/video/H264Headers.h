@@ -66,6 +66,13 @@ struct PpsIds {
 PpsIds idsOfPps(ByteView nal);
 /// The picture parameter set that a slice refers to.
 std::uint32_t ppsOfSlice(ByteView nal);
+/// Whether a slice is the first of its picture, or of its field.
+inline bool isFirstSlice(ByteView nal)
+{
+    return nal.size() > 1 && (nal[1] & 0x80);
+}
+/// Whether a slice is of one field. `sps` is the sequence set that it refers to.
+bool isOfField(ByteView nal, const Sps& sps);
 
 /// The header of a stream in MP4, "avcC".
 struct Configuration {

@@ -14,6 +14,7 @@ public:
     static base::Result<std::unique_ptr<Splicer>> make(const AVStream& stream);
 
     bool isJoint(const AVPacket& keyframe) const override;
+    bool holdsHalf(const AVPacket& packet) const override;
     int reorderDepth() const override;
     bool wantsToSee() const override { return m_header.pps.size() > 1 || m_header.sps.size() > 1; }
     void see(const AVPacket& copied) override;
@@ -28,6 +29,7 @@ private:
 
     std::vector<ByteView> unitsIn(const AVPacket& packet) const;
     bool isKnown(ByteView set) const;
+    const h264::Sps& spsOf(ByteView slice) const;
     void dropUnused(h264::Configuration& header) const;
 
     h264::Configuration m_header;

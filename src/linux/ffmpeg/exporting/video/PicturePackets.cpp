@@ -60,6 +60,8 @@ base::Result<PicturePacket> PicturePackets::look(const AVPacket& packet, const S
 {
     if (packet.pts == AV_NOPTS_VALUE)
         return cannotCopy("its packets do not say when they are shown");
+    if (splicer.holdsHalf(packet))
+        return cannotCopy("the fields of its pictures stand in packets of their own");
     const bool isKey = packet.flags & AV_PKT_FLAG_KEY;
     return PicturePacket{outTick(packet.pts),
                          isKey,

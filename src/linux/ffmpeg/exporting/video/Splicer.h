@@ -23,6 +23,8 @@ public:
     virtual bool isOpenJoint(const AVPacket& /*keyframe*/) const { return false; }
     /// How many more pictures this packet decodes for showing them later than it shows that were decoded before.
     virtual int picturesHeldBack(const AVPacket& /*packet*/) const { return 0; }
+    /// Whether it holds one field of a picture, and the next packet the other.
+    virtual bool holdsHalf(const AVPacket& /*packet*/) const { return false; }
     /// How far the stream says that its pictures are reordered; 0 when it does not.
     virtual int reorderDepth() const { return 0; }
 
