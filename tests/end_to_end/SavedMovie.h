@@ -4,7 +4,6 @@
 #include "support/Child.h"
 
 #include <cmath>
-#include <cstdint>
 #include <cstring>
 #include <filesystem>
 #include <numbers>

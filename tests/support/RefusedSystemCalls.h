@@ -2,7 +2,6 @@
 /// would. For ever, and also to programs that it starts: use it on a thread that ends.
 #pragma once
 
-#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <fcntl.h>

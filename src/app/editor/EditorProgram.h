@@ -23,7 +23,6 @@
 #include "platform/hosting/ExtensionContext.h"
 
 #include <memory>
-#include <optional>
 
 class VKVideoEditorViewController;
 

@@ -28,7 +28,6 @@
 #include "base/Clock.h"
 #include "base/Geometry.h"
 
-#include <functional>
 #include <memory>
 #include <optional>
 #include <string>

@@ -1,5 +1,7 @@
 #include "app/host/MediaCommandLine.h"
 
+#include "app/host/Words.h"
+
 #include <algorithm>
 #include <cstdint>
 #include <utility>

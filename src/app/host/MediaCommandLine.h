@@ -1,9 +1,9 @@
 /// What the words of the commands say that need no window, only the media engine. Any thread.
 #pragma once
 
-#include "app/host/Words.h"
 #include "base/Geometry.h"
 #include "base/MediaTime.h"
+#include "base/Result.h"
 
 #include <optional>
 #include <string>

@@ -7,7 +7,6 @@
 #include "linux/ffmpeg/FFmpegPlayerItem.h"
 #include "linux/ffmpeg/exporting/FFmpegExportSession.h"
 
-#include <cassert>
 #include <utility>
 
 namespace ffmpeg {

@@ -3,8 +3,6 @@
 #include <algorithm>
 #include <cmath>
 #include <cstring>
-#include <string_view>
-#include <utility>
 
 namespace ffmpeg {
 

@@ -5,7 +5,6 @@
 #include "linux/ffmpeg/Movie.h"
 
 #include <cstdint>
-#include <memory>
 #include <optional>
 #include <string>
 #include <vector>

@@ -3,7 +3,6 @@
 #include "platform/views/MovieScrubber.h"
 
 #include <algorithm>
-#include <cmath>
 #include <cstdio>
 
 namespace platform {

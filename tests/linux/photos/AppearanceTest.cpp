@@ -2,7 +2,6 @@
 
 #include "linux/photos/LibraryFixture.h"
 #include "linux/photos/RecentFiles.h"
-#include "linux/photos/Thumbnail.h"
 #include "support/Child.h"
 #include "support/Paths.h"
 
