@@ -66,9 +66,8 @@ int Demuxer::readBytes(void* self, std::uint8_t* into, int count)
 std::int64_t Demuxer::moveTo(void* self, std::int64_t offset, int whence)
 {
     auto& demuxer = *static_cast<Demuxer*>(self);
-    const std::int64_t size = demuxer.m_file->size();
     if (whence & AVSEEK_SIZE)
-        return size;
+        return demuxer.m_file->size();
     switch (whence & ~AVSEEK_FORCE) {
     case SEEK_SET:
         break;
@@ -76,7 +75,7 @@ std::int64_t Demuxer::moveTo(void* self, std::int64_t offset, int whence)
         offset += demuxer.m_position;
         break;
     case SEEK_END:
-        offset += size;
+        offset += demuxer.m_file->size();
         break;
     default:
         return AVERROR(EINVAL);

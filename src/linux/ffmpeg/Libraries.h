@@ -22,6 +22,7 @@ struct Freeing {
     void operator()(AVCodecContext* context) const { avcodec_free_context(&context); }
     void operator()(AVFrame* frame) const { av_frame_free(&frame); }
     void operator()(AVPacket* packet) const { av_packet_free(&packet); }
+    void operator()(AVDictionary* dictionary) const { av_dict_free(&dictionary); }
     void operator()(SwsContext* context) const { sws_freeContext(context); }
     void operator()(SwrContext* context) const { swr_free(&context); }
     void operator()(AVIOContext* context) const

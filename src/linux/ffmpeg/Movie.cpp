@@ -3,6 +3,7 @@
 #include "linux/ffmpeg/VideoDecoder.h"
 
 #include <algorithm>
+#include <cmath>
 #include <utility>
 
 namespace ffmpeg {
@@ -29,6 +30,9 @@ constexpr std::int64_t kFar = AV_TIME_BASE; ///< a movie that starts later than 
 constexpr int kPacketsToOrigin = 64;
 constexpr std::int64_t kRunUp = AV_TIME_BASE / 10;
 
+constexpr double kPicturesASecond = 61;
+constexpr double kSoundPacketsASecond = 102;
+
 } // namespace
 
 base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file, const Cancelled& cancelled)
@@ -54,6 +58,7 @@ base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file,
     }
     if (const auto found = movie->findDuration(cancelled); !found)
         return failed(found.error());
+    movie->findLikelyPackets();
     return movie;
 }
 
@@ -63,6 +68,9 @@ void Movie::describe()
     // Broadcast streams start at any time; movies with a header mean what they say.
     if (!m_spare->seeksByTable() && context.start_time != AV_NOPTS_VALUE)
         m_origin = context.start_time;
+    AVDictionary* metadata = nullptr;
+    av_dict_copy(&metadata, context.metadata, 0);
+    m_metadata.reset(metadata);
     for (int i = 0; i < m_spare->streamCount(); ++i) {
         const AVStream& stream = m_spare->stream(i);
         if (!isPicture(stream) && !isSound(stream))
@@ -204,6 +212,16 @@ base::Result<void> Movie::findDuration(const Cancelled& cancelled)
     const double rounding = std::abs(longest.seconds() - m_duration.seconds());
     m_duration = rounding < 0.002 ? longest : m_duration.convertedTo(timescale());
     return {};
+}
+
+void Movie::findLikelyPackets()
+{
+    for (int i = 0; i < m_spare->streamCount(); ++i) {
+        const AVStream& stream = m_spare->stream(i);
+        const int counted = m_spare->isMov() ? avformat_index_get_entries_count(&stream) : 0;
+        const double usual = isPicture(stream) ? kPicturesASecond : kSoundPacketsASecond;
+        m_likelyPackets += counted > 0 ? counted : std::llround(m_duration.seconds() * usual);
+    }
 }
 
 base::Result<std::unique_ptr<Demuxer>> Movie::demuxer(Cancelled cancelled) const

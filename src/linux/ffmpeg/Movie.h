@@ -36,6 +36,10 @@ public:
     const std::vector<int>& audioStreams() const { return m_audioStreams; }
     /// Where the movie begins, in microseconds of the file's own time.
     std::int64_t origin() const { return m_origin; }
+    /// What the file says of itself as a whole; null when it says nothing.
+    const AVDictionary* metadata() const { return m_metadata.get(); }
+    /// Of all tracks together; where the file does not count them, more than recordings have.
+    std::int64_t likelyPackets() const { return m_likelyPackets; }
     /// Null when there is only sound.
     const FrameRef& firstFrame() const { return m_firstFrame; }
 
@@ -52,6 +56,7 @@ private:
     void describeVideo(const AVStream& stream);
     void findOrigin(std::int64_t firstPts, const Cancelled& cancelled);
     base::Result<void> findDuration(const Cancelled& cancelled);
+    void findLikelyPackets();
 
     std::shared_ptr<OpenFile> m_file;
     std::vector<platform::AssetTrack> m_tracks;
@@ -59,6 +64,8 @@ private:
     std::optional<VideoTrack> m_video;
     std::vector<int> m_audioStreams;
     std::int64_t m_origin = 0;
+    Owned<AVDictionary> m_metadata;
+    std::int64_t m_likelyPackets = 0;
     FrameRef m_firstFrame;
 
     mutable std::mutex m_mutex;

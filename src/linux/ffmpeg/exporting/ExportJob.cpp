@@ -9,6 +9,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <future>
 #include <utility>
 
 namespace ffmpeg {
@@ -19,10 +20,9 @@ using base::Result;
 
 namespace {
 
-/// Of both kinds of streams, where a file does not count them beforehand: more than recordings have.
-constexpr double kPicturesASecond = 61;
-constexpr double kSoundPacketsASecond = 102;
-constexpr std::int64_t kSpare = 600; ///< packets beside what is counted: at the edges of the range
+/// Packets more than the range's share of the movie's: where it has more of them than elsewhere, and at its edges.
+constexpr double kMoreThanShare = 1.2;
+constexpr std::int64_t kSparePackets = 2000;
 
 MediaTime earlier(MediaTime a, MediaTime b)
 {
@@ -54,33 +54,6 @@ Result<ExportRange> rangeIn(const Movie& movie, const std::optional<base::MediaT
     return ExportRange{start, end};
 }
 
-/// What the whole file says, and how much of it there is.
-struct Facts {
-    AVDictionary* metadata = nullptr;
-    std::int64_t packets = 0;
-
-    Facts() = default;
-    Facts(const Facts&) = delete;
-    Facts& operator=(const Facts&) = delete;
-    ~Facts() { av_dict_free(&metadata); }
-
-    Result<void> find(const Movie& movie, const Cancelled& cancelled, double share)
-    {
-        const auto demuxer = movie.demuxer(cancelled);
-        if (!demuxer)
-            return demuxer.error();
-        av_dict_copy(&metadata, demuxer.value()->context().metadata, 0);
-        for (int i = 0; i < demuxer.value()->streamCount(); ++i) {
-            const AVStream& stream = demuxer.value()->stream(i);
-            const bool isPicture = stream.codecpar->codec_type == AVMEDIA_TYPE_VIDEO;
-            const double usual = movie.duration().seconds() * (isPicture ? kPicturesASecond : kSoundPacketsASecond);
-            const double counted = demuxer.value()->isMov() ? avformat_index_get_entries_count(&stream) : 0;
-            packets += std::llround((counted > 0 ? counted : usual) * share) + kSpare;
-        }
-        return {};
-    }
-};
-
 class Attempt {
 public:
     Attempt(const ExportJob& job, const ExportRange& range, OutputFile& file) : m_job(job), m_range(range), m_file(file)
@@ -91,6 +64,10 @@ public:
     {
         const Movie& movie = *m_job.movie;
         const TellLog log = [this](const std::string& line) { m_job.log->message(line); };
+        // The sound is looked at meanwhile. When the pictures cannot be copied it is as good for the next attempt.
+        if (!m_sounds.valid())
+            m_sounds =
+                std::async(std::launch::async, openSoundSources, m_job.movie, m_range, m_job.mix, m_job.cancelled, log);
         std::vector<std::unique_ptr<TrackSource>> tracks;
         if (movie.video()) {
             auto video = openVideoSource(m_job.movie, m_range, mode, m_job.cancelled, log);
@@ -98,7 +75,7 @@ public:
                 return video.error();
             tracks.push_back(std::move(video).value());
         }
-        auto sounds = openSoundSources(m_job.movie, m_range, m_job.mix, m_job.cancelled, log);
+        auto sounds = m_sounds.get();
         if (!sounds)
             return sounds.error();
         for (auto& each : sounds.value())
@@ -107,14 +84,13 @@ public:
             return Error::make("ffmpeg", AVERROR_STREAM_NOT_FOUND, "nothing of it can be exported");
 
         const double seconds = (m_range.end - m_range.start).seconds();
-        Facts facts;
-        if (auto found = facts.find(movie, m_job.cancelled, std::min(1.0, seconds / movie.duration().seconds() * 1.2));
-            !found)
-            return found;
-        const auto written = writeMovie({m_file, tracks, facts.metadata, movie.video() ? movie.timescale() : 0,
-                                         facts.packets, seconds, m_job.cancelled, m_job.progress});
+        const double share = std::min(1.0, seconds / movie.duration().seconds() * kMoreThanShare);
+        const auto packets = std::llround(static_cast<double>(movie.likelyPackets()) * share) + kSparePackets;
+        const auto written = writeMovie({m_file, tracks, movie.metadata(), movie.video() ? movie.timescale() : 0,
+                                         packets, seconds, m_job.cancelled, m_job.progress});
         if (!written)
             return written.error();
+        m_file.sendToDisk(); // while it is checked
         const auto checked = checkOutput(m_file, written.value(), m_job.cancelled);
         if (!checked && mode == VideoMode::Copy && movie.video())
             return cannotCopy(checked.error()->description());
@@ -125,6 +101,7 @@ private:
     const ExportJob& m_job;
     const ExportRange& m_range;
     OutputFile& m_file;
+    std::future<Result<std::vector<std::unique_ptr<TrackSource>>>> m_sounds;
 };
 
 /// Errors of reading and encoding do not name the movie; those of writing name the output.

@@ -1,9 +1,12 @@
 #include "linux/ffmpeg/exporting/output/MovieWriter.h"
 
+#include "linux/ffmpeg/exporting/output/TrackTurns.h"
+
 #include <algorithm>
 #include <array>
 #include <cerrno>
 #include <limits>
+#include <optional>
 #include <string>
 #include <unistd.h>
 
@@ -19,9 +22,6 @@ constexpr int kBufferSize = 1 << 20;
 /// What a packet takes in the index at most: its size, time, composition, keyframe, and a chunk of its own.
 constexpr std::int64_t kIndexBytesAPacket = 4 + 8 + 8 + 4 + 12 + 8;
 constexpr std::int64_t kIndexBytesBeside = 64 << 10; ///< headers of tracks and metadata
-
-/// So long does one track go on before another has its turn: fewer chunks make a smaller index and larger reads.
-constexpr double kTurn = 0.5;
 
 /// How much more of the whole must be done before it is told again: whoever hears of each packet has no time to write.
 constexpr double kProgressStep = 0.001;
@@ -106,8 +106,7 @@ public:
 private:
     struct Track {
         TrackSource* source;
-        Owned<AVPacket> next; ///< null when none is left
-        AVRational sourceTimeBase;
+        AVRational sourceTicks;
         TrackSummary summary;
         double done = 0;
     };
@@ -143,7 +142,7 @@ private:
                 return failure(AVERROR(ENOMEM));
             if (auto described = source->describe(*stream); !described)
                 return described;
-            m_tracks.push_back({source.get(), newPacket(), stream->time_base, {}, 0});
+            m_tracks.push_back({source.get(), stream->time_base, {}, 0});
         }
         AVDictionary* options = nullptr;
         if (m_job.videoTimescale > 0)
@@ -159,8 +158,6 @@ private:
         for (std::size_t i = 0; i < m_tracks.size(); ++i) {
             m_tracks[i].summary.type = context->streams[i]->codecpar->codec_type;
             m_tracks[i].summary.timeBase = context->streams[i]->time_base;
-            if (auto done = fetch(m_tracks[i]); !done)
-                return done;
         }
         return {};
     }
@@ -173,54 +170,37 @@ private:
             av_dict_set(&context.metadata, key, nullptr, 0);
     }
 
-    Result<void> fetch(Track& track)
-    {
-        const auto more = track.source->next(*track.next);
-        if (!more)
-            return more.error();
-        if (!more.value())
-            track.next = nullptr;
-        else
-            av_packet_rescale_ts(track.next.get(), track.sourceTimeBase, track.summary.timeBase);
-        return {};
-    }
-
-    double secondsOf(const Track& track) const
-    {
-        return static_cast<double>(track.next->dts) * av_q2d(track.summary.timeBase);
-    }
-
-    Track* furthestBehind()
-    {
-        Track* found = nullptr;
-        for (Track& each : m_tracks)
-            if (each.next && (!found || secondsOf(each) < secondsOf(*found)))
-                found = &each;
-        return found;
-    }
-
     Result<void> writePackets()
     {
-        while (Track* track = furthestBehind()) {
-            const double turn = secondsOf(*track) + kTurn;
-            while (track->next && secondsOf(*track) < turn) {
+        std::vector<TrackTurns::Track> tracks;
+        for (const Track& each : m_tracks)
+            tracks.push_back({each.source, each.sourceTicks, each.summary.timeBase});
+        TrackTurns turns(tracks);
+        for (;;) {
+            auto next = turns.next();
+            if (!next)
+                return next.error();
+            if (!next.value())
+                return {};
+            const TrackTurns::Turn& turn = *next.value();
+            Track& track = m_tracks[turn.track];
+            for (const auto& packet : turn.packets) {
                 if (m_job.cancelled && *m_job.cancelled)
                     return failure(AVERROR_EXIT);
-                if (auto done = write(*track); !done)
+                if (auto done = write(track, *packet); !done)
                     return done;
-                if (auto done = fetch(*track); !done)
-                    return done;
-                tellProgress(*track);
+                tellProgress(track, static_cast<double>(packet->dts) * av_q2d(track.summary.timeBase));
             }
+            if (turn.isLast)
+                tellProgress(track, m_job.seconds);
         }
-        return {};
     }
 
-    void tellProgress(Track& track)
+    void tellProgress(Track& track, double seconds)
     {
         if (!m_job.progress || m_job.seconds <= 0)
             return;
-        track.done = track.next ? std::clamp(secondsOf(track) / m_job.seconds, track.done, 1.0) : 1.0;
+        track.done = std::clamp(seconds / m_job.seconds, track.done, 1.0);
         double sum = 0;
         for (const Track& each : m_tracks)
             sum += each.done;
@@ -231,9 +211,8 @@ private:
         m_job.progress(part);
     }
 
-    Result<void> write(Track& track)
+    Result<void> write(Track& track, AVPacket& packet)
     {
-        AVPacket& packet = *track.next;
         packet.stream_index = static_cast<int>(&track - m_tracks.data());
         TrackSummary& summary = track.summary;
         summary.firstPts = summary.packets == 0 ? packet.pts : std::min(summary.firstPts, packet.pts);

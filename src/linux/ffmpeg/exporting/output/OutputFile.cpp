@@ -22,6 +22,9 @@ using namespace std::chrono_literals;
 constexpr auto kPatience = 2s;
 constexpr auto kPause = 5ms;
 
+/// Written bytes go to the disk while others are written, not all at the end, and so many at once that it makes no haste.
+constexpr std::int64_t kToDiskAtOnce = 8 << 20;
+
 } // namespace
 
 OutputFile::OutputFile(std::string path, std::shared_ptr<const OpenFile> source)
@@ -93,13 +96,28 @@ int OutputFile::write(std::int64_t position, const std::uint8_t* bytes, std::siz
         bytes += done;
         count -= static_cast<std::size_t>(done);
     }
+    if (position >= m_onItsWay + kToDiskAtOnce)
+        sendToDisk(position);
     return 0;
+}
+
+void OutputFile::sendToDisk(std::int64_t until)
+{
+    // Nothing is promised by it; what goes wrong, fsync() tells.
+    sync_file_range(m_descriptor, m_onItsWay, until - m_onItsWay, SYNC_FILE_RANGE_WRITE);
+    m_onItsWay = until;
+}
+
+void OutputFile::sendToDisk()
+{
+    sync_file_range(m_descriptor, 0, 0, SYNC_FILE_RANGE_WRITE);
 }
 
 base::Result<void> OutputFile::clear()
 {
     if (ftruncate(m_descriptor, 0) != 0)
         return failure(errno);
+    m_onItsWay = 0;
     return {};
 }
 

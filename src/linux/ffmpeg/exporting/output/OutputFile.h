@@ -28,8 +28,10 @@ public:
     const std::string& name() const { return m_name; }
     int descriptor() const { return m_descriptor; }
 
-    /// All of it, or a negative errno. Past the end is fine.
+    /// All of it, or a negative errno. Past the end is fine. From time to time the disk is given what was written.
     int write(std::int64_t position, const std::uint8_t* bytes, std::size_t count);
+    /// Gives the disk all that was written, for publish() to have less to wait for; does not wait itself.
+    void sendToDisk();
     /// Starts over.
     base::Result<void> clear();
     /// Brings it to the disk, then under its name. Never in place of another file.
@@ -39,6 +41,7 @@ private:
     OutputFile(std::string path, std::shared_ptr<const OpenFile> source);
     bool isTaken() const;
     base::ErrorRef failure(int error) const;
+    void sendToDisk(std::int64_t until);
     int link() const;
 
     std::string m_path;
@@ -47,6 +50,7 @@ private:
     std::string m_name;
     std::string m_hiddenName; ///< empty when it has none
     int m_descriptor = -1;
+    std::int64_t m_onItsWay = 0; ///< up to here the disk was given it
     bool m_published = false;
 };
 
