@@ -97,10 +97,11 @@ void Presenter::hide()
 void Presenter::showWork(std::optional<double> progress)
 {
     const bool begins = !m_workLine->isUnderWay();
+    const auto told = m_workLine->percent();
     m_workLine->begin(progress);
     if (begins)
         announceWorkBegun(*m_workLine);
-    else
+    else if (m_workLine->percent() != told)
         announceWorkProgress(*m_workLine);
     m_needsCommit = true;
     scheduleFrame();

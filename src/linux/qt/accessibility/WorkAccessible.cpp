@@ -6,16 +6,9 @@
 #include <QAccessible>
 #include <QAccessibleValueInterface>
 
-#include <cmath>
-
 namespace qtui {
 
 namespace {
-
-int percentOf(const WorkLine& line)
-{
-    return static_cast<int>(std::lround(line.progress().value_or(0) * 100));
-}
 
 class WorkAccessible final : public QAccessibleInterface, public QAccessibleValueInterface {
 public:
@@ -38,8 +31,8 @@ public:
     {
         if (kind == QAccessible::Name)
             return QStringLiteral("Working on the movie");
-        if (kind == QAccessible::Value && m_line.progress())
-            return QStringLiteral("%1 %").arg(percentOf(m_line));
+        if (kind == QAccessible::Value && m_line.percent())
+            return QStringLiteral("%1 %").arg(*m_line.percent());
         return {};
     }
     void setText(QAccessible::Text /*kind*/, const QString& /*text*/) override {}
@@ -57,7 +50,7 @@ public:
         return type == QAccessible::ValueInterface ? static_cast<QAccessibleValueInterface*>(this) : nullptr;
     }
 
-    QVariant currentValue() const override { return percentOf(m_line); }
+    QVariant currentValue() const override { return m_line.percent().value_or(0); }
     void setCurrentValue(const QVariant& /*value*/) override {}
     QVariant maximumValue() const override { return 100; }
     QVariant minimumValue() const override { return 0; }
@@ -92,7 +85,7 @@ void announceWorkProgress(WorkLine& line)
 {
     if (!QAccessible::isActive())
         return;
-    QAccessibleValueChangeEvent event(&line, percentOf(line));
+    QAccessibleValueChangeEvent event(&line, line.percent().value_or(0));
     QAccessible::updateAccessibility(&event);
 }
 

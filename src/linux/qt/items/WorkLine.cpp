@@ -1,5 +1,6 @@
 #include "linux/qt/items/WorkLine.h"
 
+#include <cmath>
 #include <limits>
 #include <utility>
 
@@ -34,6 +35,11 @@ void WorkLine::end()
     m_underWay = false;
     m_changed = true;
     m_progress.reset();
+}
+
+std::optional<int> WorkLine::percent() const
+{
+    return m_progress ? std::optional(static_cast<int>(std::lround(*m_progress * 100))) : std::nullopt;
 }
 
 void WorkLine::showIn(const QRectF& window)

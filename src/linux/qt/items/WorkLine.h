@@ -19,6 +19,8 @@ public:
 
     bool isUnderWay() const { return m_underWay; }
     std::optional<double> progress() const { return m_progress; }
+    /// The progress as people are told of it.
+    std::optional<int> percent() const;
 
     /// Draws itself along the upper edge of `window`, if something is under way.
     void showIn(const QRectF& window);
