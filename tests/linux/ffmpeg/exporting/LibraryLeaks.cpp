@@ -1,6 +1,7 @@
 // What the libraries leak that encode, and we cannot mend: LeakSanitizer shall look at ours.
 
-extern "C" const char* __lsan_default_suppressions();
+/// The sanitizer looks for it from a library of its own.
+extern "C" [[gnu::visibility("default")]] const char* __lsan_default_suppressions();
 
 extern "C" const char* __lsan_default_suppressions()
 {
