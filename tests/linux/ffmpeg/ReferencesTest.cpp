@@ -1,3 +1,4 @@
+#include "linux/ffmpeg/exporting/video/NalUnits.h"
 #include "linux/ffmpeg/images/PacketsAhead.h"
 #include "support/EngineTest.h"
 
@@ -181,6 +182,83 @@ TEST_F(References, LetNothingBeReplacedThatIsNeededHoweverShortTheLookAhead)
             EXPECT_EQ(at, 75U);
             EXPECT_TRUE(enough < 8 || replaced >= 20 || name != std::string("refs-recorder.mp4")) << enough;
         }
+    }
+}
+
+/// A stream that was never coded: only what its slices say about references.
+class WrittenReferences : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        ffmpeg::BitWriter sps;
+        for (const std::uint32_t byte : {0x67, 77, 0, 30})
+            sps.bits(byte, 8);
+        for (const std::uint32_t value : {0, 0, 0, 4, 4}) // 4 bits of numbers, 8 of the order, 4 references
+            sps.ue(value);
+        sps.bit(0);
+        sps.ue(19);
+        sps.ue(10);
+        sps.bits(0b1100, 4);
+        sps.finish();
+        ffmpeg::h264::Configuration header;
+        header.sps = {sps.bytes()};
+        header.pps = {ffmpeg::h264::standInParameters(0, 0)};
+        extradata = header.bytes();
+        stream.codecpar = &parameters;
+        parameters.codec_id = AV_CODEC_ID_H264;
+        parameters.extradata = extradata.data();
+        parameters.extradata_size = static_cast<int>(extradata.size());
+    }
+    /// A reference that is shown at `order`. A P picture refers to the one that is `back` references before it.
+    static ffmpeg::Owned<AVPacket> picture(Kind kind, std::uint32_t number, std::uint32_t order, std::uint32_t back = 1)
+    {
+        ffmpeg::BitWriter out;
+        out.bits(kind == Kind::I ? 0x65 : 0x61, 8);
+        out.ue(0);
+        out.ue(static_cast<std::uint32_t>(kind));
+        out.ue(0);
+        out.bits(number, 4);
+        if (kind == Kind::I)
+            out.ue(0);
+        out.bits(order, 8);
+        if (kind == Kind::B)
+            out.bits(0b1000, 4);
+        if (kind == Kind::P) {
+            out.bits(0b01, 2);
+            out.ue(0);
+            out.ue(back - 1);
+            out.ue(3);
+        }
+        out.bits(0, kind == Kind::I ? 2 : 1);
+        out.finish();
+        auto packet = ffmpeg::newPacket();
+        EXPECT_TRUE(ffmpeg::replacePayload(*packet, {out.bytes()}, 4));
+        packet->pts = order;
+        return packet;
+    }
+
+    ffmpeg::Bytes extradata;
+    AVCodecParameters parameters{};
+    AVStream stream{};
+};
+
+TEST_F(WrittenReferences, OfWhatLiesBeyondTheLookAheadAreReckonedWith)
+{
+    for (const std::uint32_t back : {2U, 3U}) {
+        ffmpeg::PacketsAhead ahead(stream);
+        ahead.add(picture(Kind::I, 0, 0));
+        ahead.add(picture(Kind::P, 1, 8));
+        ahead.add(picture(Kind::B, 2, 4));
+        ahead.add(picture(Kind::P, 3, 16, 2));
+        ahead.take();
+        ahead.take();
+        EXPECT_FALSE(ahead.standInForFirst(100, true)) << "the next one can refer to it";
+        ahead.add(picture(Kind::P, 4, 24, back));
+        ahead.add(picture(Kind::P, 5, 32, 1));
+        EXPECT_FALSE(ahead.standInForFirst(100, true)) << "the next one can refer to it";
+        ahead.add(picture(Kind::P, 6, 40, 1)); // the fourth since
+        EXPECT_EQ(ahead.standInForFirst(100, true) == nullptr, back == 2) << "whether any does";
+        EXPECT_FALSE(ahead.standInForFirst(4, true)) << "it is what is looked for";
     }
 }
 

@@ -42,11 +42,16 @@ void PacketsAhead::fill(Demuxer& demuxer)
         if (m_readAll)
             return;
         bytes += sizeOf(*packet);
-        H264References::Picture picture;
-        if (m_references)
-            picture = m_references->follow(*packet);
-        m_entries.push_back({std::move(packet), std::move(picture)});
+        add(std::move(packet));
     }
+}
+
+void PacketsAhead::add(Owned<AVPacket> packet)
+{
+    H264References::Picture picture;
+    if (m_references)
+        picture = m_references->follow(*packet);
+    m_entries.push_back({std::move(packet), std::move(picture)});
 }
 
 Owned<AVPacket> PacketsAhead::take()

@@ -26,6 +26,8 @@ public:
     void restart();
     /// Reads until enough is there, or the movie ends.
     void fill(Demuxer& demuxer);
+    /// The next one in the order of decoding.
+    void add(Owned<AVPacket> packet);
     bool isEmpty() const { return m_entries.empty(); }
     const AVPacket& first() const { return *m_entries.front().packet; }
     Owned<AVPacket> take();
