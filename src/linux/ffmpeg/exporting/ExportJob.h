@@ -1,4 +1,5 @@
-/// Exports a movie, or a range of it, from the first to the last: what it takes and what happens. One thread.
+/// Exports a movie, or a range of it, from the first to the last: what it takes and what happens. `progress` is called on
+/// the thread of run(), `log` on others too.
 #pragma once
 
 #include "base/Log.h"

@@ -1,4 +1,4 @@
-/// One track of an exported movie, given packet by packet in decode order. One thread.
+/// One track of an exported movie, given packet by packet in decode order. One thread at a time.
 #pragma once
 
 #include "base/MediaTime.h"

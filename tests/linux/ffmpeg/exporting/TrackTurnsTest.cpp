@@ -1,0 +1,124 @@
+// Who of several tracks comes when, with tracks that are made up.
+#include "linux/ffmpeg/exporting/output/TrackTurns.h"
+
+#include <gmock/gmock.h>
+
+#include <atomic>
+#include <functional>
+#include <latch>
+#include <memory>
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace {
+
+using ffmpeg::TrackTurns;
+using testing::ElementsAre;
+
+/// Ten packets a second, of `size` bytes.
+class TenASecond final : public ffmpeg::TrackSource {
+public:
+    explicit TenASecond(int count, int size = 1) : m_count(count), m_size(size) {}
+
+    base::Result<void> describe(AVStream&) override { return {}; }
+    base::Result<bool> next(AVPacket& packet) override
+    {
+        if (given == m_count)
+            return failure ? base::Result<bool>(failure) : base::Result<bool>(false);
+        if (before)
+            before(given);
+        av_new_packet(&packet, m_size);
+        packet.pts = packet.dts = given++;
+        return true;
+    }
+
+    base::ErrorRef failure; ///< instead of the end
+    std::function<void(int)> before;
+    std::atomic<int> given = 0;
+
+private:
+    int m_count;
+    int m_size;
+};
+
+std::vector<TrackTurns::Track> tracksOf(const std::vector<TenASecond*>& sources)
+{
+    std::vector<TrackTurns::Track> tracks;
+    for (TenASecond* each : sources)
+        tracks.push_back({each, {1, 10}, {1, 1000}});
+    return tracks;
+}
+
+/// A word for each turn: the track, from when to when in milliseconds, and a point where it has no more.
+std::vector<std::string> wordsOf(TrackTurns& turns)
+{
+    std::vector<std::string> words;
+    for (;;) {
+        const auto next = turns.next();
+        if (!next)
+            words.push_back(next.error()->description());
+        if (!next || !next.value())
+            return words;
+        const TrackTurns::Turn& turn = *next.value();
+        std::string word(1, static_cast<char>('A' + turn.track));
+        if (!turn.packets.empty())
+            word += std::to_string(turn.packets.front()->dts) + "-" + std::to_string(turn.packets.back()->dts);
+        words.push_back(word + (turn.isLast ? "." : ""));
+    }
+}
+
+TEST(TrackTurns, GoToTheTrackThatIsFurthestBehind)
+{
+    TenASecond a(12);
+    TenASecond b(7);
+    TrackTurns turns(tracksOf({&a, &b}));
+    EXPECT_THAT(wordsOf(turns), ElementsAre("A0-400", "B0-400", "A500-900", "B500-600.", "A1000-1100."));
+}
+
+TEST(TrackTurns, TellOfATrackWithoutPackets)
+{
+    TenASecond a(3);
+    TenASecond b(0);
+    TrackTurns turns(tracksOf({&a, &b}));
+    EXPECT_THAT(wordsOf(turns), ElementsAre("B.", "A0-200."));
+}
+
+TEST(TrackTurns, EndWithTheErrorOfATrackBehindWhatCameBefore)
+{
+    TenASecond a(12);
+    TenASecond b(7);
+    b.failure = base::Error::make("ffmpeg", AVERROR_INVALIDDATA, "broken");
+    TrackTurns turns(tracksOf({&a, &b}));
+    EXPECT_THAT(wordsOf(turns), ElementsAre("A0-400", "B0-400", "A500-900", "broken"));
+}
+
+TEST(TrackTurns, AreGivenOutWhileATrackIsSlow)
+{
+    TenASecond a(10);
+    std::latch gotFirst(1);
+    a.before = [&](int number) {
+        if (number == 7)
+            gotFirst.wait();
+    };
+    TrackTurns turns(tracksOf({&a}));
+    const auto first = turns.next();
+    ASSERT_TRUE(first && first.value());
+    EXPECT_EQ(first.value()->packets.size(), 5U);
+    gotFirst.count_down();
+    EXPECT_THAT(wordsOf(turns), ElementsAre("A500-900."));
+}
+
+TEST(TrackTurns, AreNotReadFarAheadOfWhoeverWantsThem)
+{
+    constexpr int kMegabyte = 1 << 20;
+    TenASecond endless(-1, kMegabyte);
+    {
+        TrackTurns turns(tracksOf({&endless}));
+        ASSERT_TRUE(turns.next());
+    }
+    // Twice eight of them, each time a turn of five more, and the one that is read next.
+    EXPECT_LE(endless.given, 2 * (8 + 5) + 5 + 1);
+}
+
+} // namespace
