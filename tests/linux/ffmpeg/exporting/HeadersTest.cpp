@@ -143,8 +143,9 @@ TEST_F(Headers, OfAnExportAgreeOnHowFarPicturesAreReordered)
 
 TEST_F(Headers, OfExportsOfExportsDoNotPileUp)
 {
-    for (const char* name : {"h264-b.mp4", "hevc.mp4"}) {
+    for (const char* name : {"h264-b.mp4", "hevc.mp4", "hevc-open.mp4"}) {
         std::string from = exportMovie(name);
+        const std::size_t count = DecodedMovie(from).all(DecodedMovie::Look::AtNumbers).size();
         for (int i = 0; i < 5; ++i) {
             const std::string to = output(std::to_string(i) + name);
             ASSERT_EQ(cut(from, to, fromTo(0.2, 10)), ExportStatus::Completed) << errorText();
@@ -153,7 +154,7 @@ TEST_F(Headers, OfExportsOfExportsDoNotPileUp)
             DecodedMovie decoded(from);
             const auto pictures = decoded.all();
             EXPECT_EQ(Complaints::texts(), "");
-            EXPECT_EQ(pictures.size(), (std::string(name) == "hevc.mp4" ? 120U : 150U) - unsigned(i + 1) * 6);
+            EXPECT_EQ(pictures.size(), count - unsigned(i + 1) * 6);
             EXPECT_EQ(pictures.front().number, (i + 1) * 6);
             const auto header = ffmpeg::extradataOf(*decoded.stream().codecpar);
             if (const auto found = h264::Configuration::parse(header))
@@ -163,6 +164,28 @@ TEST_F(Headers, OfExportsOfExportsDoNotPileUp)
         }
     }
     EXPECT_FALSE(saysEncodedAsAWhole());
+}
+
+TEST_F(Headers, OfHevcSayThatACutBeginsAnew)
+{
+    ASSERT_EQ(cut(exportMovie("hevc-open.mp4"), output(), fromTo(0.5, 10)), ExportStatus::Completed) << errorText();
+    DecodedMovie file(output());
+    std::vector<hevc::Unit> keyframes;
+    const auto packet = ffmpeg::newPacket();
+    while (av_read_frame(&file.context(), packet.get()) >= 0) {
+        const auto units = ffmpeg::unitsBehindLengths(ffmpeg::payloadOf(*packet), 4);
+        ASSERT_TRUE(units);
+        for (const ffmpeg::ByteView nal : *units)
+            if (hevc::unitOf(nal) >= hevc::Unit::FirstIrap && hevc::unitOf(nal) <= hevc::Unit::LastIrap)
+                keyframes.push_back(hevc::unitOf(nal));
+        av_packet_unref(packet.get());
+    }
+    // What was encoded, the first group that was copied, and the next, which is as it was.
+    ASSERT_EQ(keyframes.size(), 3U);
+    EXPECT_GE(keyframes[0], hevc::Unit::IdrWithLeading);
+    EXPECT_LE(keyframes[0], hevc::Unit::Idr);
+    EXPECT_EQ(keyframes[1], hevc::Unit::Bla);
+    EXPECT_EQ(keyframes[2], hevc::Unit::Cra);
 }
 
 TEST(NalUnits, EndBeforeZerosThatBelongToNobody)

@@ -123,18 +123,13 @@ VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int
     plan.joinsOpenGroup = joint->isOpen;
 
     // Where both windows overlap, the stretch begins inside the tail's.
-    std::vector<PicturePacket> packets = tail.packets;
+    const auto& packets = tail.packets;
     const auto found = std::find_if(packets.begin(), packets.end(),
                                     [&](const PicturePacket& each) { return each.pts == plan.copyFrom; });
-    const bool overlap = found != packets.end();
-    const auto begin = overlap ? static_cast<std::size_t>(found - packets.begin()) : std::size_t{0};
-    if (overlap && joint->isOpen)
-        packets.erase(
-            std::remove_if(found, packets.end(), [&](const PicturePacket& each) { return each.pts < plan.copyFrom; }),
-            packets.end());
+    const auto begin = found == packets.end() ? std::size_t{0} : static_cast<std::size_t>(found - packets.begin());
     const std::size_t count = copyablePrefix(packets, begin, end, tail.endsMovie);
     if (count == 0) {
-        if (overlap || tail.startsMovie)
+        if (found != packets.end() || tail.startsMovie)
             return encodeAll(plan, "no picture can be copied before the end of the range");
         plan.wantsEarlierTail = true;
         return plan;
