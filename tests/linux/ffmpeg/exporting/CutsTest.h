@@ -108,13 +108,21 @@ private:
         const double length = double(decoded.context().duration) / AV_TIME_BASE;
         EXPECT_GT(length, last);
         EXPECT_LE(length, end - start + 0.002);
-        for (const DecodedPicture& each :
-             DecodedMovie(output(), DecodedMovie::Edits::Ignore).all(DecodedMovie::Look::AtNumbers))
-            EXPECT_TRUE(shown.contains(each.number)) << each.number << " was removed";
+        checkHidden(decoded.shown(), shown);
         for (const double part : {0.9, 0.1, 0.5}) {
             const std::size_t which = std::size_t(part * double(got.size()));
             EXPECT_EQ(decoded.numberAfterSeeking(got[which].seconds), got[which].number);
         }
+    }
+
+    /// What an edit list hides is there too when it is ignored; where it hides no packet there is nothing to see.
+    void checkHidden(int packetsShown, const std::set<int>& shown)
+    {
+        if (DecodedMovie(output(), DecodedMovie::Edits::Ignore).rest() == packetsShown)
+            return;
+        for (const DecodedPicture& each :
+             DecodedMovie(output(), DecodedMovie::Edits::Ignore).all(DecodedMovie::Look::AtNumbers))
+            EXPECT_TRUE(shown.contains(each.number)) << each.number << " was removed";
     }
 
     void checkSounds(double start, double end)

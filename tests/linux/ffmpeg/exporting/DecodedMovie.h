@@ -86,6 +86,17 @@ public:
     AVStream& stream() { return *m_context->streams[m_stream]; }
     /// Packets that the decoder refused.
     int refused() const { return m_refused; }
+    /// Packets that were decoded and shown, whole.
+    int shown() const { return m_shown; }
+    /// Those that are left in the file; nothing is decoded.
+    int rest()
+    {
+        int count = 0;
+        const auto packet = ffmpeg::newPacket();
+        for (; av_read_frame(m_context.get(), packet.get()) >= 0; av_packet_unref(packet.get()))
+            count += packet->stream_index == m_stream;
+        return count;
+    }
 
     std::vector<DecodedPicture> all(Look look = Look::AtEverything)
     {
@@ -128,6 +139,7 @@ private:
             }
             error = avcodec_send_packet(m_decoder.get(), more ? packet.get() : nullptr);
             m_refused += error < 0 && more;
+            m_shown += more && !(packet->flags & AV_PKT_FLAG_DISCARD);
             av_packet_unref(packet.get());
             while ((error = avcodec_receive_frame(m_decoder.get(), frame.get())) >= 0) {
                 if (!take(pictureOf(*frame, look)))
@@ -200,6 +212,7 @@ private:
     ffmpeg::Owned<AVCodecContext> m_decoder;
     int m_stream = -1;
     int m_refused = 0;
+    int m_shown = 0;
     bool m_isGood = false;
 };
 
