@@ -8,6 +8,7 @@
 #include <latch>
 #include <memory>
 #include <string>
+#include <thread>
 #include <utility>
 #include <vector>
 
@@ -112,13 +113,25 @@ TEST(TrackTurns, AreGivenOutWhileATrackIsSlow)
 TEST(TrackTurns, AreNotReadFarAheadOfWhoeverWantsThem)
 {
     constexpr int kMegabyte = 1 << 20;
-    TenASecond endless(-1, kMegabyte);
-    {
-        TrackTurns turns(tracksOf({&endless}));
-        ASSERT_TRUE(turns.next());
+    // Twice eight of them, each time a turn of five more, then the turn that waits for room and the packet behind it.
+    constexpr int kAhead = 2 * (8 + 5) + 5 + 1;
+    TenASecond large(200, kMegabyte);
+    TrackTurns turns(tracksOf({&large}));
+    int taken = 0;
+    for (auto next = turns.next(); next && next.value(); next = turns.next()) {
+        for (int i = 0; i < 1000; ++i)
+            std::this_thread::yield(); // whoever reads too far has the time for it
+        ASSERT_LE(large.given, taken + kAhead);
+        taken += static_cast<int>(next.value()->packets.size());
     }
-    // Twice eight of them, each time a turn of five more, and the one that is read next.
-    EXPECT_LE(endless.given, 2 * (8 + 5) + 5 + 1);
+    EXPECT_EQ(taken, 200);
+}
+
+TEST(TrackTurns, EndWhereNobodyWantsTheRest)
+{
+    TenASecond endless(-1, 1 << 20);
+    TrackTurns turns(tracksOf({&endless}));
+    EXPECT_TRUE(turns.next());
 }
 
 } // namespace
