@@ -111,10 +111,10 @@ base::Result<std::vector<std::string>> VideoLibrary::Transaction::commit()
     if (!directory)
         return explained(directory.error(), m_sources.front());
     const LibraryDirectory& library = directory.value();
-    library.sweep();
+    posix::sweepNewFiles(library.descriptor());
 
     // All are copied before the first one appears: what can fail is done then.
-    std::vector<NewFile> files;
+    std::vector<posix::NewFile> files;
     for (const Source& source : m_sources) {
         auto file = copy(source, library, static_cast<double>(files.size()));
         if (!file)
@@ -125,7 +125,7 @@ base::Result<std::vector<std::string>> VideoLibrary::Transaction::commit()
     std::vector<std::string> names;
     base::ErrorRef error;
     for (std::size_t i = 0; i < files.size() && !error; ++i) {
-        const auto name = files[i].publish(m_sources[i].name);
+        const auto name = library.publish(files[i], m_sources[i].name);
         if (name)
             names.push_back(name.value());
         else
@@ -143,10 +143,10 @@ base::Result<std::vector<std::string>> VideoLibrary::Transaction::commit()
     return names;
 }
 
-base::Result<NewFile> VideoLibrary::Transaction::copy(const Source& source, const LibraryDirectory& directory,
-                                                      double done) const
+base::Result<posix::NewFile> VideoLibrary::Transaction::copy(const Source& source, const LibraryDirectory& directory,
+                                                             double done) const
 {
-    auto file = NewFile::make(directory);
+    auto file = posix::NewFile::make(directory.descriptor());
     if (!file)
         return file;
     const auto goOn = [&](std::uint64_t copied) {

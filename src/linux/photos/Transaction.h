@@ -32,7 +32,7 @@ private:
     };
 
     base::Result<Source> open(const std::optional<base::Url>& url) const;
-    base::Result<NewFile> copy(const Source& source, const LibraryDirectory& directory, double done) const;
+    base::Result<posix::NewFile> copy(const Source& source, const LibraryDirectory& directory, double done) const;
     base::ErrorRef explained(const base::ErrorRef& error, const Source& source) const;
 
     const LibraryOptions& m_options;

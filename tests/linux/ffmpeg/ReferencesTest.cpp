@@ -1,4 +1,4 @@
-#include "linux/ffmpeg/exporting/video/NalUnits.h"
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/images/PacketsAhead.h"
 #include "support/EngineTest.h"
 

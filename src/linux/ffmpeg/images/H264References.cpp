@@ -1,6 +1,6 @@
 #include "linux/ffmpeg/images/H264References.h"
 
-#include "linux/ffmpeg/exporting/video/NalUnits.h"
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 
 #include <algorithm>
 #include <utility>

@@ -5,12 +5,11 @@
 #pragma once
 
 #include "linux/ffmpeg/Libraries.h"
-#include "linux/ffmpeg/images/H264Slices.h"
+#include "linux/ffmpeg/bitstream/H264Slices.h"
 
 #include <cstdint>
 #include <map>
 #include <memory>
-#include <optional>
 #include <vector>
 
 namespace ffmpeg {

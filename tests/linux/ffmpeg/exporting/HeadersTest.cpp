@@ -1,9 +1,9 @@
 // Parameter sets as x264 and x265 write them, read and written anew.
+#include "linux/ffmpeg/bitstream/H264Headers.h"
+#include "linux/ffmpeg/bitstream/HevcHeaders.h"
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/ExportTest.h"
-#include "linux/ffmpeg/exporting/video/H264Headers.h"
-#include "linux/ffmpeg/exporting/video/HevcHeaders.h"
 #include "linux/ffmpeg/exporting/video/HiddenPictures.h"
-#include "linux/ffmpeg/exporting/video/NalUnits.h"
 
 #include <random>
 

@@ -57,6 +57,28 @@ TEST_F(AnOutput, DoesNotReplaceAFileThatComesMeanwhile)
     }
 }
 
+TEST_F(AnOutput, IsWholeWhereAFileWithoutANameGetsNone)
+{
+    for (const auto& calls :
+         {std::vector<RefusedSystemCall>{{SYS_linkat, EPERM}}, std::vector<RefusedSystemCall>{noUnnamedFiles()},
+          std::vector<RefusedSystemCall>{noUnnamedFiles(), {SYS_renameat2, EINVAL}}}) {
+        const auto result = runJobRefusing(calls, exportMovie("h264.mp4"), fromTo(1, 2));
+        ASSERT_TRUE(result) << result.error()->description();
+        EXPECT_EQ(files(), std::vector<std::string>{"out.mp4"});
+        EXPECT_EQ(DecodedMovie(output()).all().size(), 30U);
+        std::filesystem::remove(output());
+    }
+}
+
+TEST_F(AnOutput, SweepsWhatKilledExportsHaveLeftBesideIt)
+{
+    std::ofstream(output(".clipsa-12-3.part")) << "half";
+    std::ofstream(output("film.part")) << "not ours";
+    const auto result = runJobRefusing({noUnnamedFiles()}, exportMovie("h264.mp4"), fromTo(1, 2));
+    ASSERT_TRUE(result) << result.error()->description();
+    EXPECT_EQ(files(), (std::vector<std::string>{"film.part", "out.mp4"}));
+}
+
 TEST_F(AnOutput, NeedsSomewhereToWriteTo)
 {
     EXPECT_EQ(cut(exportMovie("h264.mp4"), directory() + "/none/out.mp4", fromTo(1, 2)), ExportStatus::Failed);

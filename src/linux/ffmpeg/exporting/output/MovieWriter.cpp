@@ -6,7 +6,6 @@
 #include <array>
 #include <cerrno>
 #include <limits>
-#include <optional>
 #include <string>
 #include <unistd.h>
 
@@ -216,10 +215,7 @@ private:
         packet.stream_index = static_cast<int>(&track - m_tracks.data());
         TrackSummary& summary = track.summary;
         summary.firstPts = summary.packets == 0 ? packet.pts : std::min(summary.firstPts, packet.pts);
-        if (summary.packets == 0 || packet.pts >= summary.lastPts) {
-            summary.lastPts = packet.pts;
-            summary.end = packet.pts + packet.duration;
-        }
+        summary.lastPts = summary.packets == 0 ? packet.pts : std::max(summary.lastPts, packet.pts);
         ++summary.packets;
         int error = av_write_frame(m_context.get(), &packet);
         if (error >= 0)

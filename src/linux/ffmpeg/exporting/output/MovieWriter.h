@@ -18,7 +18,6 @@ struct TrackSummary {
     std::int64_t packets = 0;
     std::int64_t firstPts = 0;
     std::int64_t lastPts = 0; ///< the latest
-    std::int64_t end = 0;     ///< of the latest
 };
 
 struct WriteJob {

@@ -4,7 +4,6 @@
 #include "linux/ffmpeg/VideoDecoder.h"
 
 #include <cmath>
-#include <optional>
 #include <set>
 #include <string>
 

@@ -1,14 +1,15 @@
-/// A file that gets its name when it is whole, and leaves nothing behind when it does not. One thread.
-///
-/// It has no name at all while it is written, where the file system knows such files; else a hidden one beside its own.
+/// The file that an export writes: it gets its name when it is whole, and leaves nothing behind when it does not. One
+/// thread.
 #pragma once
 
 #include "base/Result.h"
 #include "linux/ffmpeg/OpenFile.h"
+#include "linux/posix/NewFile.h"
 
 #include <cstddef>
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 
 namespace ffmpeg {
@@ -19,14 +20,12 @@ public:
     /// from there: publish() gives that some time.
     static base::Result<std::unique_ptr<OutputFile>> create(const std::string& path,
                                                             std::shared_ptr<const OpenFile> source = nullptr);
-    /// Removes what was not published.
-    ~OutputFile();
     OutputFile(const OutputFile&) = delete;
     OutputFile& operator=(const OutputFile&) = delete;
 
     /// The last component of the path, for messages.
     const std::string& name() const { return m_name; }
-    int descriptor() const { return m_descriptor; }
+    int descriptor() const { return m_file->descriptor(); }
 
     /// All of it, or a negative errno. Past the end is fine. From time to time the disk is given what was written.
     int write(std::int64_t position, const std::uint8_t* bytes, std::size_t count);
@@ -42,16 +41,13 @@ private:
     bool isTaken() const;
     base::ErrorRef failure(int error) const;
     void sendToDisk(std::int64_t until);
-    int link() const;
 
     std::string m_path;
     std::shared_ptr<const OpenFile> m_source;
-    int m_directory = -1;
     std::string m_name;
-    std::string m_hiddenName; ///< empty when it has none
-    int m_descriptor = -1;
-    std::int64_t m_onItsWay = 0; ///< up to here the disk was given it
-    bool m_published = false;
+    posix::FileDescriptor m_directory;
+    std::optional<posix::NewFile> m_file; ///< there as soon as create() has done its work
+    std::int64_t m_onItsWay = 0;          ///< up to here the disk was given it
 };
 
 } // namespace ffmpeg

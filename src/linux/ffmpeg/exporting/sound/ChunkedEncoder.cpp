@@ -68,7 +68,7 @@ base::Result<void> ChunkedEncoder::startOne()
         const auto missing = static_cast<int>(std::min<std::size_t>(wanted - m_samples.front().size(), kReadAtOnce));
         const int got = m_source->read(m_samples, missing);
         if (got < 0)
-            return base::Error::make("ffmpeg", got, "Reading the sound failed: " + textOf(got) + ".");
+            return base::Error::make("ffmpeg", got, "reading the sound failed: " + textOf(got));
         m_hasEnded = got < missing;
     }
     Chunk chunk{start, from, until, m_hasEnded, {}};
@@ -109,11 +109,11 @@ base::Result<ChunkedEncoder::Packets> ChunkedEncoder::encode(const SoundEncoder:
     const std::size_t count = chunk.samples.front().size();
     for (std::size_t from = 0; from < count; from += kAacFrame) {
         if (isUnwanted())
-            return base::Error::make("ffmpeg", AVERROR_EXIT, "Encoding was cancelled.");
+            return base::Error::make("ffmpeg", AVERROR_EXIT, "encoding was cancelled");
         const int length = static_cast<int>(std::min<std::size_t>(kAacFrame, count - from));
         const std::int64_t pts = chunk.start * kAacFrame + static_cast<std::int64_t>(from);
         if (const int error = encoder.value()->send(chunk.samples, from, length, pts); error < 0)
-            return base::Error::make("ffmpeg", error, "Sound cannot be encoded: " + textOf(error) + ".");
+            return base::Error::make("ffmpeg", error, "sound cannot be encoded: " + textOf(error));
         keep();
     }
     if (chunk.isLast) {
@@ -127,7 +127,7 @@ base::Result<bool> ChunkedEncoder::next(AVPacket& packet)
 {
     while (m_ready.empty()) {
         if (m_cancelled && *m_cancelled)
-            return base::Error::make("ffmpeg", AVERROR_EXIT, "Encoding was cancelled.");
+            return base::Error::make("ffmpeg", AVERROR_EXIT, "encoding was cancelled");
         // One more than there are cores, so that none waits while this thread does something else.
         while (!m_hasEnded && m_running.size() <= m_plan.workers)
             if (const auto started = startOne(); !started)

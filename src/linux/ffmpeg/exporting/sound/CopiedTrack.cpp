@@ -235,7 +235,7 @@ base::Result<void> CopiedTrack::describe(AVStream& output)
 {
     const AVStream& stream = m_packets->stream();
     if (const int error = avcodec_parameters_copy(output.codecpar, &m_packets->parameters()); error < 0)
-        return base::Error::make("ffmpeg", error, "Sound cannot be described: " + textOf(error) + ".");
+        return base::Error::make("ffmpeg", error, "sound cannot be described: " + textOf(error));
     output.codecpar->codec_tag = 0;
     output.time_base = {1, m_packets->rate()};
     output.disposition = stream.disposition;
@@ -276,7 +276,7 @@ base::Result<bool> CopiedTrack::next(AVPacket& packet)
         } else {
             const int error = m_packets->read(packet);
             if (error == AVERROR_EXIT)
-                return base::Error::make("ffmpeg", error, "Reading the sound was cancelled.");
+                return base::Error::make("ffmpeg", error, "reading the sound was cancelled");
             if (error < 0)
                 break;
             at = m_placement->place({packet.pts, samplesIn(packet)});

@@ -72,7 +72,7 @@ base::Result<bool> LosslessTrack::next(AVPacket& packet)
         Planes samples;
         const int got = m_samples->read(samples, m_encoder->frameSize());
         if (got < 0)
-            return base::Error::make("ffmpeg", got, "Reading the sound failed: " + textOf(got) + ".");
+            return base::Error::make("ffmpeg", got, "reading the sound failed: " + textOf(got));
         m_hasEnded = got < m_encoder->frameSize();
         int error = 0;
         if (got > 0)
@@ -80,7 +80,7 @@ base::Result<bool> LosslessTrack::next(AVPacket& packet)
         if (error >= 0 && m_hasEnded)
             error = m_encoder->finish();
         if (error < 0)
-            return base::Error::make("ffmpeg", error, "Sound cannot be encoded: " + textOf(error) + ".");
+            return base::Error::make("ffmpeg", error, "sound cannot be encoded: " + textOf(error));
         m_sent += got;
     }
     return true;

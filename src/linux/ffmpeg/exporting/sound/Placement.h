@@ -29,8 +29,6 @@ public:
     bool hasBegun() const { return m_hasBegun; }
     /// Where this piece begins; pieces come in order. A jump in time is followed.
     std::int64_t place(const Piece& piece);
-    /// Right behind the piece that was placed last.
-    std::int64_t next() const { return m_next; }
 
     /// What the file says, in samples from the movie's start.
     double said(std::int64_t pts) const;

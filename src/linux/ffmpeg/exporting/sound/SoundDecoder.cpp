@@ -33,11 +33,6 @@ const AVFrame* SoundDecoder::receive()
     return avcodec_receive_frame(m_context.get(), m_frame.get()) >= 0 ? m_frame.get() : nullptr;
 }
 
-void SoundDecoder::flush()
-{
-    avcodec_flush_buffers(m_context.get());
-}
-
 int SoundDecoder::surplusOf(const AVFrame& frame)
 {
     const AVFrameSideData* skipped = av_frame_get_side_data(&frame, AV_FRAME_DATA_SKIP_SAMPLES);

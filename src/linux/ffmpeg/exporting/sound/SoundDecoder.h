@@ -17,7 +17,6 @@ public:
     bool send(const AVPacket* packet);
     /// The next frame, or null: send more.
     const AVFrame* receive();
-    void flush();
 
     /// How many samples the file says do not belong to the sound at this frame's end.
     static int surplusOf(const AVFrame& frame);

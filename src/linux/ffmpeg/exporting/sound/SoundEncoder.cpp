@@ -40,8 +40,8 @@ base::Result<std::unique_ptr<SoundEncoder>> SoundEncoder::open(const Settings& s
 {
     const auto failed = [&](int error) {
         return base::Error::make("ffmpeg", error,
-                                 "Sound cannot be encoded as " + std::string(avcodec_get_name(settings.codec)) + ": "
-                                     + textOf(error) + ".");
+                                 "sound cannot be encoded as " + std::string(avcodec_get_name(settings.codec)) + ": "
+                                     + textOf(error));
     };
     // By name: other encoders of AAC have windows and priming of their own.
     const AVCodec* codec =
@@ -79,7 +79,7 @@ base::Result<std::unique_ptr<SoundEncoder>> SoundEncoder::open(const Settings& s
 base::Result<void> SoundEncoder::describe(AVCodecParameters& parameters) const
 {
     if (const int error = avcodec_parameters_from_context(&parameters, m_context.get()); error < 0)
-        return base::Error::make("ffmpeg", error, "Sound cannot be described: " + textOf(error) + ".");
+        return base::Error::make("ffmpeg", error, "sound cannot be described: " + textOf(error));
     return {};
 }
 

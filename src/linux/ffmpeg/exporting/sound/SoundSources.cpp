@@ -23,7 +23,7 @@ constexpr std::array kAacRates = {96000, 88200, 64000, 48000, 44100, 32000, 2400
 
 base::Result<Sources> cancelledResult()
 {
-    return base::Error::make("ffmpeg", AVERROR_EXIT, "The export was cancelled.");
+    return base::Error::make("ffmpeg", AVERROR_EXIT, "the export was cancelled");
 }
 
 bool isSet(const Cancelled& cancelled)
@@ -99,7 +99,7 @@ std::unique_ptr<TrackPackets> Opening::packetsOf(const Track& track) const
     if (packets)
         return std::move(packets).value();
     if (!isSet(m_cancelled))
-        tell(track, "is left out. " + packets.error()->description());
+        tell(track, "is left out: " + packets.error()->description());
     return nullptr;
 }
 
@@ -157,7 +157,7 @@ std::unique_ptr<TrackSource> Opening::encoded(const Track& track, std::size_t tr
             return std::make_unique<EncodedTrack>(std::move(encoder).value(), std::move(labels));
         error = encoder.error();
     }
-    tell(track, "is left out. " + error->description());
+    tell(track, "is left out: " + error->description());
     return nullptr;
 }
 

@@ -1,5 +1,7 @@
 #include "linux/ffmpeg/exporting/sound/TrackPackets.h"
 
+#include "linux/ffmpeg/bitstream/NalUnits.h"
+
 #include <algorithm>
 #include <utility>
 
@@ -18,21 +20,16 @@ base::Result<std::unique_ptr<TrackPackets>> TrackPackets::open(std::shared_ptr<c
     if (!demuxer)
         return demuxer.error();
     if (stream >= demuxer.value()->streamCount())
-        return base::Error::make("ffmpeg", AVERROR_STREAM_NOT_FOUND,
-                                 "“" + movie->file()->name() + "” has lost a sound track.");
+        return base::Error::make("ffmpeg", AVERROR_STREAM_NOT_FOUND, "it is no longer in the file");
     std::unique_ptr<TrackPackets> packets(new TrackPackets(std::move(movie), std::move(demuxer).value(), stream));
     if (const int error = packets->prepare(); error < 0)
-        return base::Error::make("ffmpeg", error,
-                                 "The sound of “" + packets->m_movie->file()->name()
-                                     + "” cannot be read: " + textOf(error) + ".");
+        return base::Error::make("ffmpeg", error, "it cannot be read: " + textOf(error));
     return packets;
 }
 
 int TrackPackets::prepare()
 {
-    // The video stream's table finds places in files that have none for their sound.
-    std::vector<int> wanted{m_stream};
-    m_demuxer->select(wanted);
+    m_demuxer->select({m_stream});
     const AVCodecParameters& given = *stream().codecpar;
     if (const int error = avcodec_parameters_copy(m_parameters.get(), &given); error < 0)
         return error;
@@ -53,9 +50,8 @@ int TrackPackets::prepare()
         return error == AVERROR_EOF ? 0 : error;
     std::size_t size = 0;
     if (const auto* header = av_packet_get_side_data(packet.get(), AV_PKT_DATA_NEW_EXTRADATA, &size)) {
-        m_parameters->extradata = static_cast<std::uint8_t*>(av_mallocz(size + AV_INPUT_BUFFER_PADDING_SIZE));
-        std::copy_n(header, size, m_parameters->extradata);
-        m_parameters->extradata_size = static_cast<int>(size);
+        if (!setExtradata(*m_parameters, {header, size}))
+            return AVERROR(ENOMEM);
     }
     return 0;
 }

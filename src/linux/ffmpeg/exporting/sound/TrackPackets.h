@@ -9,8 +9,6 @@ extern "C" {
 }
 
 #include <memory>
-#include <optional>
-#include <string>
 
 namespace ffmpeg {
 

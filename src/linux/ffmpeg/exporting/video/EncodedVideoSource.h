@@ -8,8 +8,6 @@
 #include "linux/ffmpeg/exporting/video/PicturePackets.h"
 #include "linux/ffmpeg/exporting/video/PictureScaler.h"
 
-#include <optional>
-
 namespace ffmpeg {
 
 class EncodedVideoSource final : public TrackSource {

@@ -1,7 +1,7 @@
 #include "linux/ffmpeg/exporting/video/H264Splicer.h"
 
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/CannotCopy.h"
-#include "linux/ffmpeg/exporting/video/NalUnits.h"
 
 #include <algorithm>
 
@@ -173,14 +173,8 @@ base::Result<void> H264Splicer::describe(AVCodecParameters& parameters)
         all.lengthSize = 4;
     all.sps.insert(all.sps.end(), m_encoderSps.begin(), m_encoderSps.end());
     all.pps.insert(all.pps.end(), m_encoderPps.begin(), m_encoderPps.end());
-    const Bytes bytes = all.bytes();
-    av_freep(&parameters.extradata);
-    parameters.extradata_size = 0;
-    parameters.extradata = static_cast<std::uint8_t*>(av_mallocz(bytes.size() + AV_INPUT_BUFFER_PADDING_SIZE));
-    if (!parameters.extradata)
+    if (!setExtradata(parameters, all.bytes()))
         return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
-    std::copy(bytes.begin(), bytes.end(), parameters.extradata);
-    parameters.extradata_size = static_cast<int>(bytes.size());
     parameters.codec_tag = MKTAG('a', 'v', 'c', '1');
     return {};
 }

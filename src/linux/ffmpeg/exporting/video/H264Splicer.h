@@ -1,10 +1,9 @@
 /// Joins H.264 with what x264 encodes: its parameter sets get an id of their own, and stand beside the stream's.
 #pragma once
 
-#include "linux/ffmpeg/exporting/video/H264Headers.h"
+#include "linux/ffmpeg/bitstream/H264Headers.h"
 #include "linux/ffmpeg/exporting/video/Splicer.h"
 
-#include <optional>
 #include <set>
 
 namespace ffmpeg {

@@ -1,7 +1,7 @@
 #include "linux/ffmpeg/exporting/video/HevcSplicer.h"
 
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/CannotCopy.h"
-#include "linux/ffmpeg/exporting/video/NalUnits.h"
 
 #include <algorithm>
 #include <array>
@@ -160,13 +160,8 @@ base::Result<void> HevcSplicer::describe(AVCodecParameters& parameters)
         bytes.insert(bytes.end(), {0, 0, 0, 1});
         bytes.insert(bytes.end(), set.begin(), set.end());
     }
-    av_freep(&parameters.extradata);
-    parameters.extradata_size = 0;
-    parameters.extradata = static_cast<std::uint8_t*>(av_mallocz(bytes.size() + AV_INPUT_BUFFER_PADDING_SIZE));
-    if (!parameters.extradata)
+    if (!setExtradata(parameters, bytes))
         return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
-    std::copy(bytes.begin(), bytes.end(), parameters.extradata);
-    parameters.extradata_size = static_cast<int>(bytes.size());
     parameters.codec_tag = MKTAG('h', 'v', 'c', '1');
     return {};
 }

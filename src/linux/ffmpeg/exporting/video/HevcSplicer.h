@@ -1,7 +1,7 @@
 /// Joins HEVC with what x265 encodes: its parameter sets are given numbers of their own, and stand beside the stream's.
 #pragma once
 
-#include "linux/ffmpeg/exporting/video/HevcHeaders.h"
+#include "linux/ffmpeg/bitstream/HevcHeaders.h"
 #include "linux/ffmpeg/exporting/video/Splicer.h"
 
 #include <set>

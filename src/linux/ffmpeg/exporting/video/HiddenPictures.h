@@ -1,7 +1,7 @@
 /// Pictures of VP9 and AV1 that are decoded now and shown later. Pure functions; any thread.
 #pragma once
 
-#include "linux/ffmpeg/exporting/video/Bits.h"
+#include "linux/ffmpeg/bitstream/Bits.h"
 
 namespace ffmpeg {
 

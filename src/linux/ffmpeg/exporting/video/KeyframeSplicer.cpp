@@ -1,8 +1,8 @@
 #include "linux/ffmpeg/exporting/video/KeyframeSplicer.h"
 
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/CannotCopy.h"
 #include "linux/ffmpeg/exporting/video/HiddenPictures.h"
-#include "linux/ffmpeg/exporting/video/NalUnits.h"
 
 #include <algorithm>
 

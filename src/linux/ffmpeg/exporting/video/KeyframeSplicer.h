@@ -1,7 +1,7 @@
 /// Joins VP9 and AV1 with what is encoded beside it: their keyframes bring all headers along.
 #pragma once
 
-#include "linux/ffmpeg/exporting/video/Bits.h"
+#include "linux/ffmpeg/bitstream/Bits.h"
 #include "linux/ffmpeg/exporting/video/Splicer.h"
 
 namespace ffmpeg {

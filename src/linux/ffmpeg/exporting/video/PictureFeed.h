@@ -4,10 +4,8 @@
 #include "linux/ffmpeg/VideoDecoder.h"
 #include "linux/ffmpeg/exporting/video/PicturePackets.h"
 
-#include <deque>
 #include <functional>
 #include <memory>
-#include <optional>
 
 namespace ffmpeg {
 

@@ -34,8 +34,6 @@ public:
     /// False when more must be pushed first, or all have come out.
     bool pop(AVPacket& packet);
 
-    std::int64_t count() const { return m_count; }
-
 private:
     struct Waiting {
         Owned<AVPacket> packet;

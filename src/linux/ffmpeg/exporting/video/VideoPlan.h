@@ -1,8 +1,8 @@
 /// Which pictures of a range are copied and which are encoded again. A pure function; any thread.
 ///
 /// A copied stretch begins at a joint, a picture that nothing before it is needed for and nothing behind it looks past,
-/// and ends where no picture that is left out would be shown before one that is kept, and none is held back. What lies in the range before and
-/// behind that stretch is encoded again: so no picture outside of the range gets into the output.
+/// and ends where no picture that is left out would be shown before one that is kept, and none is held back. What lies in
+/// the range before and behind that stretch is encoded again: so no picture outside of the range gets into the output.
 #pragma once
 
 #include <cstdint>

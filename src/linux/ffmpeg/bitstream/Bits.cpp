@@ -1,4 +1,4 @@
-#include "linux/ffmpeg/exporting/video/Bits.h"
+#include "linux/ffmpeg/bitstream/Bits.h"
 
 #include <bit>
 

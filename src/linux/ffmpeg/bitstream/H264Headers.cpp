@@ -1,6 +1,6 @@
-#include "linux/ffmpeg/exporting/video/H264Headers.h"
+#include "linux/ffmpeg/bitstream/H264Headers.h"
 
-#include "linux/ffmpeg/exporting/video/NalUnits.h"
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 
 #include <algorithm>
 #include <array>

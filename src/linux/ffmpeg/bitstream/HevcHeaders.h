@@ -4,7 +4,7 @@
 /// number: from 15 to 30 it is eight bits longer than that of 0, so that all behind it moves by a whole byte.
 #pragma once
 
-#include "linux/ffmpeg/exporting/video/Bits.h"
+#include "linux/ffmpeg/bitstream/Bits.h"
 
 #include <cstdint>
 #include <optional>

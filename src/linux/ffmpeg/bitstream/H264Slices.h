@@ -1,7 +1,7 @@
 /// What H.264 says at the beginning of a slice about other pictures. Values; any thread.
 #pragma once
 
-#include "linux/ffmpeg/exporting/video/H264Headers.h"
+#include "linux/ffmpeg/bitstream/H264Headers.h"
 
 #include <array>
 #include <cstdint>

@@ -1,7 +1,7 @@
 /// What H.264 says in its parameter sets, as far as joining two streams needs it. Values; any thread.
 #pragma once
 
-#include "linux/ffmpeg/exporting/video/Bits.h"
+#include "linux/ffmpeg/bitstream/Bits.h"
 
 #include <cstdint>
 #include <optional>

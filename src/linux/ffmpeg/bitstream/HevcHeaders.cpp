@@ -1,6 +1,6 @@
-#include "linux/ffmpeg/exporting/video/HevcHeaders.h"
+#include "linux/ffmpeg/bitstream/HevcHeaders.h"
 
-#include "linux/ffmpeg/exporting/video/NalUnits.h"
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 
 #include <algorithm>
 

@@ -1,4 +1,4 @@
-#include "linux/ffmpeg/images/H264Slices.h"
+#include "linux/ffmpeg/bitstream/H264Slices.h"
 
 #include <algorithm>
 

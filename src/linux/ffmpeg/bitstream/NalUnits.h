@@ -3,7 +3,7 @@
 #pragma once
 
 #include "linux/ffmpeg/Libraries.h"
-#include "linux/ffmpeg/exporting/video/Bits.h"
+#include "linux/ffmpeg/bitstream/Bits.h"
 
 #include <optional>
 #include <vector>
@@ -37,5 +37,8 @@ inline ByteView extradataOf(const AVCodecParameters& parameters)
 {
     return {parameters.extradata, static_cast<std::size_t>(parameters.extradata_size)};
 }
+
+/// Replaces it. False without memory.
+bool setExtradata(AVCodecParameters& parameters, ByteView bytes);
 
 } // namespace ffmpeg

@@ -1,4 +1,4 @@
-#include "linux/ffmpeg/exporting/video/NalUnits.h"
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 
 #include <algorithm>
 #include <array>
@@ -73,6 +73,18 @@ bool replacePayload(AVPacket& packet, const std::vector<ByteView>& units, int le
     packet.buf = buffer;
     packet.data = buffer->data;
     packet.size = static_cast<int>(size);
+    return true;
+}
+
+bool setExtradata(AVCodecParameters& parameters, ByteView bytes)
+{
+    av_freep(&parameters.extradata);
+    parameters.extradata_size = 0;
+    parameters.extradata = static_cast<std::uint8_t*>(av_mallocz(bytes.size() + AV_INPUT_BUFFER_PADDING_SIZE));
+    if (!parameters.extradata)
+        return false;
+    std::copy(bytes.begin(), bytes.end(), parameters.extradata);
+    parameters.extradata_size = static_cast<int>(bytes.size());
     return true;
 }
 
