@@ -116,8 +116,7 @@ void PictureWalk::seek(std::int64_t tick)
         m_fromStart = !keyframe || keyframe->position < 0 || !m_demuxer->seekToByte(keyframe->position);
     } else {
         const auto keyframe = keyframeBefore(tick);
-        m_fromStart =
-            (keyframe && !keyframeBefore(*keyframe - 1)) || !m_demuxer->seek(m_track.stream, tick);
+        m_fromStart = (keyframe && !keyframeBefore(*keyframe - 1)) || !m_demuxer->seek(m_track.stream, tick);
     }
     if (m_fromStart)
         m_demuxer->seekToStart(m_track.stream);
