@@ -193,7 +193,6 @@ private:
             sum += std::pow(double(sound.at(i, 0)), 2);
         return std::sqrt(sum / double(count));
     }
-    static double decibels(double ratio) { return 20 * std::log10(ratio); }
 };
 
 } // namespace tests

@@ -5,6 +5,7 @@
 #include "linux/ffmpeg/exporting/ExportJob.h"
 #include "platform/media/ExportSession.h"
 #include "support/EngineTest.h"
+#include "support/Names.h"
 #include "support/PrivateDirectory.h"
 #include "support/RefusedSystemCalls.h"
 
@@ -78,14 +79,7 @@ protected:
     }
     std::string errorText() const { return lastError ? lastError->description() : ""; }
     /// Names of what lies in the directory.
-    std::vector<std::string> files() const
-    {
-        std::vector<std::string> names;
-        for (const auto& each : std::filesystem::directory_iterator(directory()))
-            names.push_back(each.path().filename());
-        std::sort(names.begin(), names.end());
-        return names;
-    }
+    std::vector<std::string> files() const { return namesIn(directory()); }
     bool saysEncodedAsAWhole() const
     {
         for (const std::string& line : log.texts(base::MemoryLog::Line::Kind::Message))

@@ -11,11 +11,6 @@ namespace {
 
 using namespace tests;
 
-double decibels(double level)
-{
-    return 20 * std::log10(std::max(level, 1e-9));
-}
-
 class CuttingSound : public testing::Test {
 protected:
     std::string path(const std::string& name) const { return (directory.path() / name).string(); }

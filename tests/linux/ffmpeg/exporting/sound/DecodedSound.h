@@ -1,6 +1,8 @@
 /// What a player would hear of a movie: a sound track, decoded by FFmpeg's libraries without our engine.
 #pragma once
 
+#include <algorithm>
+#include <cmath>
 #include <cstddef>
 #include <cstdint>
 #include <string>
@@ -31,6 +33,12 @@ struct DecodedSound {
                    : 0.0f;
     }
 };
+
+/// Of a level of 1, or of a ratio of two levels; silence is -180.
+inline double decibels(double level)
+{
+    return 20 * std::log10(std::max(level, 1e-9));
+}
 
 /// What a player hears, or (`everything`) what is in the packets although an edit list hides it.
 DecodedSound decodeSound(const std::string& path, int track = 0, bool everything = false);
