@@ -112,7 +112,16 @@ EditorProgram::EditorProgram(const EditorOptions& options)
     VKVideoEditorExtensionViewController::classObject();
 }
 
-EditorProgram::~EditorProgram() = default;
+EditorProgram::~EditorProgram()
+{
+    // The queues outlive what their tasks use: what is still to be done, like emptying the store of temporary movies, is
+    // done while all of that is there.
+    m_extension = {};
+    m_mainQueue.drain();
+    m_backgroundQueue.finish();
+    m_defaultQueue.finish();
+    m_mainQueue.drain();
+}
 
 int EditorProgram::run()
 {
