@@ -26,6 +26,10 @@ inline base::Rect between(const base::Rect& from, const base::Rect& to, double p
                             between(from.width(), to.width(), part), between(from.height(), to.height(), part));
 }
 
+/// So near to its end nobody sees a difference, but the renderer does: it draws an item of almost full opacity a grey level
+/// too dark, and takes the full opacity that follows for the same one and draws nothing anew.
+inline constexpr double kArrived = 0.999;
+
 template <typename V> class Tween {
 public:
     /// Goes from `from` to `to`. Where it is on its way to `from` already, it turns round where it is.
@@ -46,7 +50,8 @@ public:
         if (!m_running)
             return model;
         using Part = std::chrono::duration<double>;
-        return between(m_from, m_to, easeInOut(Part(now - m_start) / Part(m_duration)));
+        const double part = easeInOut(Part(now - m_start) / Part(m_duration));
+        return part < kArrived ? between(m_from, m_to, part) : m_to;
     }
 
     bool isRunning() const { return m_running; }
