@@ -46,7 +46,8 @@ inline std::vector<float> samplesIn(const std::filesystem::path& movie, int trac
     const std::string bytes = decoded(
         movie, {"-map", "0:a:" + std::to_string(track), "-af", "pan=mono|c0=c0", "-ar", "48000", "-f", "f32le"});
     std::vector<float> samples(bytes.size() / sizeof(float));
-    std::memcpy(samples.data(), bytes.data(), samples.size() * sizeof(float));
+    if (!samples.empty())
+        std::memcpy(samples.data(), bytes.data(), samples.size() * sizeof(float));
     return samples;
 }
 
