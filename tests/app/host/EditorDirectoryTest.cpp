@@ -109,15 +109,15 @@ TEST_F(EditorDirectories, OfDeadEditorsAreSwept)
 TEST_F(EditorDirectories, ThatCannotBeRemovedAsAWholeAreSweptAnotherTime)
 {
     const auto path = dead("editor-aaaaaa");
-    const auto stubborn = path / "private/Velkor";
+    const auto closed = path / "private/Velkor";
     {
         const tests::WithoutPrivileges here;
-        std::filesystem::permissions(stubborn, std::filesystem::perms::owner_read | std::filesystem::perms::owner_exec);
+        std::filesystem::permissions(closed, std::filesystem::perms::owner_read | std::filesystem::perms::owner_exec);
         sweep();
     }
-    EXPECT_TRUE(std::filesystem::exists(stubborn / "movie.mp4"));
+    EXPECT_TRUE(std::filesystem::exists(closed / "movie.mp4"));
     EXPECT_TRUE(std::filesystem::exists(path / "lock")) << "it says that nobody lives there";
-    std::filesystem::permissions(stubborn, std::filesystem::perms::owner_all);
+    std::filesystem::permissions(closed, std::filesystem::perms::owner_all);
     EXPECT_EQ(sweep(), 1);
     EXPECT_FALSE(std::filesystem::exists(path));
 }

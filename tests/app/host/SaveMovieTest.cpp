@@ -232,7 +232,7 @@ TEST_F(SavingFromAShell, LeavesTheWholeMovieOrNothingWheneverItIsKilled)
 
     std::mt19937 random(5);
     int found = 0;
-    int unfinished = 0;
+    int leftBehind = 0;
     for (int i = 0; i < kMoments; ++i) {
         SCOPED_TRACE("kill " + std::to_string(i));
         fs::remove_all(videos);
@@ -249,11 +249,11 @@ TEST_F(SavingFromAShell, LeavesTheWholeMovieOrNothingWheneverItIsKilled)
             ++found;
         }
         ASSERT_TRUE(tests::PrivateDirectory::read(movie) == bytes) << "the recording";
-        unfinished += !namesIn(root).empty();
+        leftBehind += !namesIn(root).empty();
     }
     EXPECT_GT(found, 0);
     EXPECT_LT(found, kMoments);
-    EXPECT_GT(unfinished, 0) << "none was killed in the middle";
+    EXPECT_GT(leftBehind, 0) << "none was killed in the middle";
     fs::remove_all(videos);
     ASSERT_EQ(save({"--app-name", "Tux", movie}), 0) << errors;
     // The next one sweeps up what the dead ones left; a directory of one that died while making it is empty.

@@ -35,7 +35,6 @@ public:
 
     /// What is read next is a keyframe shown at or before this tick of the output, or the first packet of all.
     void seek(std::int64_t outTick);
-    /// Whether nothing precedes what is read next (or was read first since).
     /// As Demuxer::read.
     int read(AVPacket& packet);
 
