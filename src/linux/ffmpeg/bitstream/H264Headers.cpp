@@ -256,17 +256,11 @@ std::optional<Configuration> Configuration::parse(ByteView extradata)
         for (const int mask : {0x1F, 0xFF}) {
             if (at >= extradata.size())
                 return std::nullopt;
-            int count = extradata[at++] & mask;
-            for (; count > 0; --count) {
-                if (at + 2 > extradata.size())
-                    return std::nullopt;
-                const std::size_t size = static_cast<std::size_t>(extradata[at]) << 8 | extradata[at + 1];
-                at += 2;
-                if (size > extradata.size() - at)
-                    return std::nullopt;
-                add(extradata.subspan(at, size));
-                at += size;
-            }
+            const int count = extradata[at++] & mask;
+            const auto units = unitsOfHeader(extradata, at, count);
+            if (!units)
+                return std::nullopt;
+            std::for_each(units->begin(), units->end(), add);
         }
         configuration.hasExtensions = at + 3 < extradata.size() && extradata[at + 3] != 0;
     }

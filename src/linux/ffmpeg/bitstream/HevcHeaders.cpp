@@ -175,18 +175,12 @@ std::optional<Configuration> Configuration::parse(ByteView extradata)
         for (int arrays = extradata[kArrays]; arrays > 0; --arrays) {
             if (at + 3 > extradata.size())
                 return std::nullopt;
-            int count = extradata[at + 1] << 8 | extradata[at + 2];
+            const int count = extradata[at + 1] << 8 | extradata[at + 2];
             at += 3;
-            for (; count > 0; --count) {
-                if (at + 2 > extradata.size())
-                    return std::nullopt;
-                const std::size_t size = static_cast<std::size_t>(extradata[at]) << 8 | extradata[at + 1];
-                at += 2;
-                if (size > extradata.size() - at)
-                    return std::nullopt;
-                add(extradata.subspan(at, size));
-                at += size;
-            }
+            const auto units = unitsOfHeader(extradata, at, count);
+            if (!units)
+                return std::nullopt;
+            std::for_each(units->begin(), units->end(), add);
         }
     } else {
         for (const ByteView nal : unitsBetweenStartCodes(extradata))

@@ -76,6 +76,23 @@ bool replacePayload(AVPacket& packet, const std::vector<ByteView>& units, int le
     return true;
 }
 
+std::optional<std::vector<ByteView>> unitsOfHeader(ByteView header, std::size_t& at, int count)
+{
+    constexpr std::size_t kLength = 2;
+    std::vector<ByteView> units;
+    for (; count > 0; --count) {
+        if (at + kLength > header.size())
+            return std::nullopt;
+        const std::size_t size = static_cast<std::size_t>(header[at]) << 8 | header[at + 1];
+        at += kLength;
+        if (size > header.size() - at)
+            return std::nullopt;
+        units.push_back(header.subspan(at, size));
+        at += size;
+    }
+    return units;
+}
+
 bool setExtradata(AVCodecParameters& parameters, ByteView bytes)
 {
     av_freep(&parameters.extradata);

@@ -15,6 +15,10 @@ std::vector<ByteView> unitsBetweenStartCodes(ByteView data);
 /// Units behind big-endian lengths of so many bytes, without trailing zeros. Nothing where a length leads beyond the end.
 std::optional<std::vector<ByteView>> unitsBehindLengths(ByteView data, int lengthSize);
 
+/// So many units of a stream's header behind lengths of two bytes, from `at` on, which is moved behind them. Nothing where
+/// one leads beyond the end.
+std::optional<std::vector<ByteView>> unitsOfHeader(ByteView header, std::size_t& at, int count);
+
 /// No unit ends with a zero. But some files count in what stood before the next start code when they were made.
 inline ByteView withoutTrailingZeros(ByteView unit)
 {
