@@ -13,6 +13,9 @@ namespace {
 constexpr std::size_t kAv1ConfigurationBytes = 4; ///< of "av1C", before the sequence header
 constexpr std::uint8_t kAv1Marker = 0x81;
 
+/// VP9 has at least two columns of tiles where pictures are wider.
+constexpr int kWidestVp9Tile = 4096;
+
 int vp9Profile(AVPixelFormat format)
 {
     const AVPixFmtDescriptor& about = *av_pix_fmt_desc_get(format);
@@ -60,8 +63,13 @@ base::Result<void> KeyframeSplicer::prepare(EncoderRequest& request, int /*reord
     } else {
         request.encoder = "libvpx-vp9";
         request.profile = vp9Profile(m_format);
-        request.options = {{"deadline", "realtime"}, {"cpu-used", "7"},     {"crf", "4"},   {"b", "0"},
-                           {"lag-in-frames", "0"},   {"auto-alt-ref", "0"}, {"row-mt", "1"}};
+        // Threads write each column of tiles into a buffer that is too small for what is nearly without loss, unless its
+        // colours are halved both ways; one column, or one thread, is written straight into the packet.
+        if (request.width > kWidestVp9Tile)
+            request.threads = 1;
+        request.options = {
+            {"tile-columns", "0"},  {"deadline", "realtime"}, {"cpu-used", "7"}, {"crf", "4"}, {"b", "0"},
+            {"lag-in-frames", "0"}, {"auto-alt-ref", "0"},    {"row-mt", "1"}};
     }
     return {};
 }
