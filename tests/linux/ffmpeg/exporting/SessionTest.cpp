@@ -120,6 +120,24 @@ TEST_F(AnExport, KeepsWhatIsSaidOfTheMovie)
     EXPECT_EQ(parameters.color_range, AVCOL_RANGE_MPEG);
 }
 
+TEST_F(AnExport, OfAMovieWithATimeCodeIsCopiedWithoutIt)
+{
+    for (const char* name : {"timecode.mp4", "timecode.mov"}) {
+        for (const std::optional<Range>& range : {std::optional<Range>(), std::optional(fromTo(0.5, 2.5))}) {
+            ASSERT_EQ(cut(exportMovie(name), output(), range), ExportStatus::Completed) << name << errorText();
+            DecodedMovie decoded(output());
+            EXPECT_EQ(decoded.context().nb_streams, 1U);
+            EXPECT_EQ(av_dict_get(decoded.context().metadata, "timecode", nullptr, 0), nullptr);
+            EXPECT_EQ(av_dict_get(decoded.stream().metadata, "timecode", nullptr, 0), nullptr);
+            const auto pictures = decoded.all();
+            EXPECT_EQ(pictures.size(), range ? 60U : 90U);
+            EXPECT_EQ(pictures.front().number, range ? 15 : 0);
+            std::filesystem::remove(output());
+        }
+    }
+    EXPECT_FALSE(saysEncodedAsAWhole());
+}
+
 TEST_F(AnExport, KeepsHowThePictureIsTurned)
 {
     ASSERT_EQ(cut(exportMovie("h264-rotated.mp4"), output(), fromTo(1.1, 3)), ExportStatus::Completed);

@@ -147,6 +147,8 @@ private:
         if (m_job.videoTimescale > 0)
             av_dict_set_int(&options, "video_track_timescale", m_job.videoTimescale, 0);
         av_dict_set_int(&options, "movie_timescale", 90000, 0);
+        // A time code says when the source's first picture was taken, and would be a track that nobody asked for.
+        av_dict_set_int(&options, "write_tmcd", 0, 0);
         m_reserved = std::min<std::int64_t>(m_job.likelyPackets * kIndexBytesAPacket + kIndexBytesBeside,
                                             std::numeric_limits<int>::max() / 2);
         av_dict_set_int(&options, "moov_size", m_reserved, 0);
@@ -165,7 +167,7 @@ private:
     {
         av_dict_copy(&context.metadata, m_job.metadata, 0);
         // The muxer has words of its own for these.
-        for (const char* key : {"major_brand", "minor_version", "compatible_brands", "encoder", "DURATION"})
+        for (const char* key : {"major_brand", "minor_version", "compatible_brands", "encoder", "DURATION", "timecode"})
             av_dict_set(&context.metadata, key, nullptr, 0);
     }
 

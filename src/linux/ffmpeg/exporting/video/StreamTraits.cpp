@@ -20,7 +20,7 @@ base::Result<void> describeLike(const AVStream& source, AVRational timeBase, AVS
     if (error < 0)
         return base::Error::make("ffmpeg", error, textOf(error));
     // The muxer has words of its own for these.
-    for (const char* key : {"encoder", "vendor_id", "DURATION", "DURATION-eng", "BPS", "BPS-eng"})
+    for (const char* key : {"encoder", "vendor_id", "DURATION", "DURATION-eng", "BPS", "BPS-eng", "timecode"})
         av_dict_set(&output.metadata, key, nullptr, 0);
     output.codecpar->codec_tag = 0;
     output.time_base = timeBase;
