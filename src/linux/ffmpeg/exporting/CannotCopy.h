@@ -1,4 +1,4 @@
-/// The reason why a track's packets cannot be copied, as an error: whoever gets it encodes instead.
+/// The reason why a movie's pictures, or its sound, cannot be copied, as an error: whoever gets it encodes these instead.
 #pragma once
 
 #include "base/Error.h"
@@ -13,6 +13,18 @@ inline constexpr const char* kCannotCopyDomain = "ffmpeg.copying";
 inline base::ErrorRef cannotCopy(std::string reason)
 {
     return base::Error::make(kCannotCopyDomain, AVERROR_PATCHWELCOME, std::move(reason));
+}
+
+inline constexpr const char* kCannotCopySoundDomain = "ffmpeg.copying.sound";
+
+inline base::ErrorRef cannotCopySound(std::string reason)
+{
+    return base::Error::make(kCannotCopySoundDomain, AVERROR_PATCHWELCOME, std::move(reason));
+}
+
+inline bool saysCannotCopySound(const base::ErrorRef& error)
+{
+    return error && error->domain() == kCannotCopySoundDomain;
 }
 
 inline bool saysCannotCopy(const base::ErrorRef& error)

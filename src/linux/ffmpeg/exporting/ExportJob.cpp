@@ -60,14 +60,14 @@ public:
     {
     }
 
-    Result<void> run(VideoMode mode)
+    Result<void> run(VideoMode mode, SoundMode soundMode)
     {
         const Movie& movie = *m_job.movie;
         const TellLog log = [this](const std::string& line) { m_job.log->message(line); };
         // The sound is looked at meanwhile. When the pictures cannot be copied it is as good for the next attempt.
         if (!m_sounds.valid())
-            m_sounds =
-                std::async(std::launch::async, openSoundSources, m_job.movie, m_range, m_job.mix, m_job.cancelled, log);
+            m_sounds = std::async(std::launch::async, openSoundSources, m_job.movie, m_range, m_job.mix, soundMode,
+                                  m_job.cancelled, log);
         std::vector<std::unique_ptr<TrackSource>> tracks;
         if (movie.video()) {
             auto video = openVideoSource(m_job.movie, m_range, mode, m_job.cancelled, log);
@@ -91,10 +91,7 @@ public:
         if (!written)
             return written.error();
         m_file.sendToDisk(); // while it is checked
-        const auto checked = checkOutput(m_file, written.value(), m_job.cancelled);
-        if (!checked && mode == VideoMode::Copy && movie.video())
-            return cannotCopy(checked.error()->description());
-        return checked;
+        return checkOutput(m_file, written.value(), m_job.cancelled);
     }
 
 private:
@@ -124,12 +121,22 @@ Result<void> ExportJob::run() const
     if (!file)
         return file.error();
     Attempt attempt(*this, found.value(), *file.value());
-    Result<void> done = attempt.run(VideoMode::Copy);
-    if (saysCannotCopy(done.error()) && !*cancelled) {
-        log->message("“" + movie->file()->name() + "” is encoded as a whole: " + done.error()->description() + ".");
+    VideoMode video = movie->video() ? VideoMode::Copy : VideoMode::Encode;
+    SoundMode sound = SoundMode::Copy;
+    Result<void> done = attempt.run(video, sound);
+    while (!done && !*cancelled) {
+        const std::string name = "“" + movie->file()->name() + "” is encoded as a whole: ";
+        if (saysCannotCopy(done.error()) && video == VideoMode::Copy)
+            video = VideoMode::Encode;
+        else if (saysCannotCopySound(done.error()) && sound == SoundMode::Copy)
+            sound = SoundMode::Encode;
+        else
+            break;
+        log->message((saysCannotCopySound(done.error()) ? "The sound of " : "") + name + done.error()->description()
+                     + ".");
         if (auto cleared = file.value()->clear(); !cleared)
             return cleared;
-        done = attempt.run(VideoMode::Encode);
+        done = attempt.run(video, sound);
     }
     if (*cancelled)
         return Error::make("ffmpeg", AVERROR_EXIT, "it is no longer wanted");

@@ -1,7 +1,9 @@
 // The file of an export: whole or absent, never in place of another; its source may go.
+#include "linux/ffmpeg/exporting/CannotCopy.h"
 #include "linux/ffmpeg/exporting/ExportTest.h"
 #include "linux/ffmpeg/exporting/output/MovieWriter.h"
 #include "linux/ffmpeg/exporting/output/OutputCheck.h"
+#include "linux/ffmpeg/exporting/sound/SoundSources.h"
 #include "linux/ffmpeg/exporting/video/VideoSources.h"
 #include "support/WithoutPrivileges.h"
 
@@ -220,6 +222,31 @@ TEST_F(AnOutput, HasRoomForItsIndexAlsoWhereMorePacketsComeThanThought)
     const std::string bytes = bytesOf(output());
     EXPECT_LT(bytes.find("moov"), bytes.find("mdat"));
     EXPECT_EQ(DecodedMovie(output()).all().size(), 150U);
+}
+
+TEST_F(AnOutput, WhoseSoundIsWrongIsNoReasonToEncodeItsPictures)
+{
+    ASSERT_EQ(open(exportMovie("sound-late.mp4")), Status::ReadyToPlay);
+    const auto source = std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie();
+    const auto cancelled = std::make_shared<std::atomic<bool>>(false);
+    const ffmpeg::ExportRange range{at(0), at(3)};
+    std::vector<std::unique_ptr<ffmpeg::TrackSource>> tracks;
+    tracks.push_back(ffmpeg::openVideoSource(source, range, ffmpeg::VideoMode::Copy, cancelled, {}).value());
+    auto sounds = ffmpeg::openSoundSources(source, range, std::nullopt, ffmpeg::SoundMode::Copy, cancelled,
+                                           [](const std::string&) {});
+    tracks.push_back(std::move(sounds.value().front()));
+    auto file = ffmpeg::OutputFile::create(output()).value();
+    const auto written =
+        ffmpeg::writeMovie({*file, tracks, nullptr, source->timescale(), 1000, 3, cancelled, {}}).value();
+    ASSERT_TRUE(ffmpeg::checkOutput(*file, written, cancelled));
+    for (const std::size_t track : {0U, 1U}) {
+        auto wanted = written;
+        ++wanted[track].packets;
+        const auto checked = ffmpeg::checkOutput(*file, wanted, cancelled);
+        ASSERT_FALSE(checked);
+        EXPECT_EQ(ffmpeg::saysCannotCopy(checked.error()), track == 0);
+        EXPECT_EQ(ffmpeg::saysCannotCopySound(checked.error()), track == 1);
+    }
 }
 
 } // namespace

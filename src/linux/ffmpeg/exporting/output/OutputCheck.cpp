@@ -2,6 +2,7 @@
 
 #include "linux/ffmpeg/Movie.h"
 #include "linux/ffmpeg/VideoDecoder.h"
+#include "linux/ffmpeg/exporting/CannotCopy.h"
 
 #include <cmath>
 #include <set>
@@ -15,9 +16,18 @@ namespace {
 
 constexpr double kTolerance = 0.001; ///< seconds; clocks of movie and tracks round
 
+constexpr const char* kWrong = "the exported movie is not as it should be: ";
+
 base::ErrorRef wrong(const std::string& what)
 {
-    return base::Error::make("ffmpeg", AVERROR_EXTERNAL, "the exported movie is not as it should be: " + what);
+    return cannotCopy(kWrong + what);
+}
+
+/// `which` counts from 0.
+base::ErrorRef wrong(const TrackSummary& track, int which, const std::string& what)
+{
+    const std::string reason = kWrong + ("track " + std::to_string(which + 1)) + what;
+    return track.type == AVMEDIA_TYPE_AUDIO ? cannotCopySound(reason) : cannotCopy(reason);
 }
 
 bool areFar(std::int64_t a, AVRational aTicks, double seconds)
@@ -39,12 +49,12 @@ Result<void> checkBeginnings(Demuxer& demuxer, const std::vector<TrackSummary>& 
     const auto packet = newPacket();
     while (!awaited.empty()) {
         if (demuxer.read(*packet) != 0)
-            return wrong("a track is empty");
+            return wrong(written[static_cast<std::size_t>(*awaited.begin())], *awaited.begin(), " is empty");
         if (awaited.erase(packet->stream_index) == 0)
             continue;
         const TrackSummary& track = written[static_cast<std::size_t>(packet->stream_index)];
         if (areFar(packet->pts, demuxer.stream(packet->stream_index).time_base, secondsOf(track.firstPts, track)))
-            return wrong("track " + std::to_string(packet->stream_index + 1) + " begins at the wrong time");
+            return wrong(track, packet->stream_index, " begins at the wrong time");
     }
     return {};
 }
@@ -102,7 +112,7 @@ Result<void> checkOutput(const OutputFile& file, const std::vector<TrackSummary>
         if (track.packets == 0)
             continue;
         if (avformat_index_get_entries_count(&stream) != track.packets)
-            return wrong("track " + std::to_string(i + 1) + " has not all of its packets");
+            return wrong(track, i, " has not all of its packets");
         if (track.type != AVMEDIA_TYPE_VIDEO)
             continue;
         const AVIndexEntry* last = avformat_index_get_entry(&stream, static_cast<int>(track.packets) - 1);

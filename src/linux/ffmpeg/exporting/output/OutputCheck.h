@@ -7,7 +7,8 @@
 
 namespace ffmpeg {
 
-/// The error says what is wrong: a track, its first picture or sound, its length, or a group that cannot be decoded.
+/// The error says what is wrong: a track, its first picture or sound, its length, or a group that cannot be decoded. It
+/// saysCannotCopySound() where that is a matter of the sound alone, and saysCannotCopy() otherwise.
 base::Result<void> checkOutput(const OutputFile& file, const std::vector<TrackSummary>& written,
                                const Cancelled& cancelled);
 

@@ -16,6 +16,8 @@ constexpr double kSilent = 1.0 / 32768; ///< the last bit of 16
 constexpr double kPriming = 0.1;
 /// Samples by which the first packet of AAC lies before the sound at most; they are what the encoder made of nothing.
 constexpr std::int64_t kAacPriming = 2112;
+/// Where the rate is doubled, and the filters that do it need their start, too.
+constexpr std::int64_t kDoubledAacPriming = 2 * kAacPriming + 962;
 /// Where a movie's header is rounded to milliseconds, its end is no cut.
 constexpr double kRounding = 0.0015;
 
@@ -65,7 +67,7 @@ CopiedTrack::CopiedTrack(std::unique_ptr<TrackPackets> packets, const ExportRang
     : m_packets(std::move(packets)), m_from(range.start.convertedTo(m_packets->rate()).value),
       m_until(range.end.convertedTo(m_packets->rate()).value),
       m_endsWithMovie(range.end.seconds() > m_packets->movie().duration().seconds() - kRounding),
-      m_isCuttable(isPlainAac(m_packets->parameters()))
+      m_isCuttable(isPlainAac(m_packets->parameters()) && m_packets->samplesOfAac() == kAacFrame)
 {
 }
 
@@ -85,8 +87,8 @@ CopiedTrack::open(std::unique_ptr<TrackPackets> packets, const ExportRange& rang
 
 std::int64_t CopiedTrack::samplesIn(const AVPacket& packet) const
 {
-    if (m_isCuttable)
-        return kAacFrame;
+    if (const int known = m_packets->samplesOfAac(); known > 0)
+        return known;
     auto* parameters = const_cast<AVCodecParameters*>(&m_packets->parameters()); // FFmpeg's signature lacks the const
     if (const int known = av_get_audio_frame_duration2(parameters, packet.size); known > 0 && !isAac())
         return known;
@@ -192,11 +194,11 @@ std::optional<CopiedTrack::Refusal> CopiedTrack::prepareStart()
     const auto reached = std::find_if(pieces.begin(), pieces.end(),
                                       [&](const AacPiece& each) { return each.at + samplesIn(*each.packet) > m_from; });
     if (reached == pieces.end() || reached->at >= m_until)
-        return Refusal{"", 0};
+        return Refusal{m_packets->isDamaged() ? "its packets are damaged" : "", 0};
     const auto first = static_cast<std::size_t>(reached - pieces.begin());
     std::size_t copied = 0;
     if (!m_isCuttable) {
-        const auto priming = static_cast<std::int64_t>(kPriming * m_packets->rate());
+        const auto priming = isAac() ? kDoubledAacPriming : static_cast<std::int64_t>(kPriming * m_packets->rate());
         if (!isFromStart || pieces.front().at < m_from - priming)
             return Refusal{isAac() ? "this kind of AAC cannot be cut to the sample without decoding it"
                                    : std::string(avcodec_get_name(m_packets->parameters().codec_id))

@@ -45,8 +45,10 @@ int aacChannelsFor(int channels)
 /// Opens what is to be read for one export.
 class Opening {
 public:
-    Opening(std::shared_ptr<const Movie> movie, const ExportRange& range, Cancelled cancelled, TellLog log)
-        : m_movie(std::move(movie)), m_range(range), m_cancelled(std::move(cancelled)), m_log(std::move(log))
+    Opening(std::shared_ptr<const Movie> movie, const ExportRange& range, SoundMode mode, Cancelled cancelled,
+            TellLog log)
+        : m_movie(std::move(movie)), m_range(range), m_mode(mode), m_cancelled(std::move(cancelled)),
+          m_log(std::move(log))
     {
     }
 
@@ -65,6 +67,7 @@ private:
     };
 
     std::vector<Track> soundTracks() const;
+    void tellOfUnknown() const;
     std::unique_ptr<TrackPackets> packetsOf(const Track& track) const;
     std::unique_ptr<TrackSource> sourceOf(const Track& track, std::size_t tracks) const;
     std::unique_ptr<TrackSource> encoded(const Track& track, std::size_t tracks, bool keepsLossless) const;
@@ -81,6 +84,7 @@ private:
 
     std::shared_ptr<const Movie> m_movie;
     ExportRange m_range;
+    SoundMode m_mode;
     Cancelled m_cancelled;
     TellLog m_log;
 };
@@ -91,6 +95,19 @@ std::vector<Opening::Track> Opening::soundTracks() const
     for (const int stream : m_movie->audioStreams())
         tracks.push_back({stream, tracks.size() + 1});
     return tracks;
+}
+
+/// Of tracks that are not even tried.
+void Opening::tellOfUnknown() const
+{
+    const auto& tracks = m_movie->tracks();
+    const auto sounds = std::count_if(tracks.begin(), tracks.end(), [](const platform::AssetTrack& track) {
+        return track.type == platform::MediaType::Audio;
+    });
+    if (const auto unknown = sounds - std::ssize(m_movie->audioStreams()); unknown > 0)
+        m_log((unknown == 1 ? "A sound track" : std::to_string(unknown) + " sound tracks") + std::string(" of “")
+              + m_movie->file()->name() + (unknown == 1 ? "” is left out: it" : "” are left out: they")
+              + " cannot be decoded.");
 }
 
 std::unique_ptr<TrackPackets> Opening::packetsOf(const Track& track) const
@@ -163,6 +180,8 @@ std::unique_ptr<TrackSource> Opening::encoded(const Track& track, std::size_t tr
 
 std::unique_ptr<TrackSource> Opening::sourceOf(const Track& track, std::size_t tracks) const
 {
+    if (m_mode == SoundMode::Encode)
+        return encoded(track, tracks, true);
     auto packets = packetsOf(track);
     if (!packets)
         return nullptr;
@@ -183,6 +202,7 @@ std::unique_ptr<TrackSource> Opening::sourceOf(const Track& track, std::size_t t
 base::Result<Sources> Opening::allTracks()
 {
     Sources sources;
+    tellOfUnknown();
     const auto tracks = soundTracks();
     for (const Track& track : tracks) {
         auto source = sourceOf(track, tracks.size());
@@ -262,10 +282,10 @@ base::Result<Sources> Opening::mixed(const platform::AudioMix& mix)
 } // namespace
 
 base::Result<Sources> openSoundSources(std::shared_ptr<const Movie> movie, const ExportRange& range,
-                                       const std::optional<platform::AudioMix>& mix, const Cancelled& cancelled,
-                                       const TellLog& log)
+                                       const std::optional<platform::AudioMix>& mix, SoundMode mode,
+                                       const Cancelled& cancelled, const TellLog& log)
 {
-    Opening opening(std::move(movie), range, cancelled, log);
+    Opening opening(std::move(movie), range, mode, cancelled, log);
     return mix ? opening.mixed(*mix) : opening.allTracks();
 }
 

@@ -9,6 +9,7 @@ extern "C" {
 }
 
 #include <memory>
+#include <vector>
 
 namespace ffmpeg {
 
@@ -26,33 +27,45 @@ public:
 
     const Movie& movie() const { return *m_movie; }
     AVStream& stream() const { return m_demuxer->stream(m_stream); }
-    /// With the header that decoders and MP4 need.
+    /// With the header that decoders and MP4 need, and the rate and channels that are heard.
     const AVCodecParameters& parameters() const { return *m_parameters; }
     int rate() const { return m_parameters->sample_rate; }
+    /// What each packet of AAC holds, at that rate; 0 when it is not known, or of other codecs.
+    int samplesOfAac() const { return m_samplesOfAac; }
+    /// Whether a packet that was read was so damaged that it was left out.
+    bool isDamaged() const { return m_isDamaged; }
 
     /// The next packet is one that begins at or before this moment of the movie, or the track's first.
     void seek(double seconds);
     /// Whether what is read next, or was read since, begins with the track's first packet.
     bool isFromStart() const { return m_isFromStart; }
     /// 0, AVERROR_EOF where the track ends or the file is cut, AVERROR_EXIT, or another error after which nothing can
-    /// be read. Every packet has a presentation time.
+    /// be read. Every packet has a presentation time, and one whose length cannot be told otherwise a duration.
     int read(AVPacket& packet);
 
 private:
     TrackPackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer, int stream);
 
     int prepare();
+    int readFirst(std::vector<Owned<AVPacket>>& packets, int count);
+    int findAacHeader();
+    int openFilter();
+    int hearAac();
     bool trySeek(double seconds);
     void toStart();
     int readFiltered(AVPacket& packet);
+    int readTimed(AVPacket& packet);
 
     std::shared_ptr<const Movie> m_movie;
     std::unique_ptr<Demuxer> m_demuxer;
     int m_stream;
     std::unique_ptr<AVCodecParameters, FreeingParameters> m_parameters;
     std::unique_ptr<AVBSFContext, FreeingFilter> m_filter;
-    Owned<AVPacket> m_first; ///< read already
+    Owned<AVPacket> m_ahead; ///< read already
+    int m_samplesOfAac = 0;
     std::int64_t m_expected = AV_NOPTS_VALUE;
+    std::int64_t m_duration = 0; ///< of the packet before
+    bool m_isDamaged = false;
     bool m_isFromStart = false;
 };
 

@@ -48,8 +48,7 @@ int TrackSamples::decodeUntil(std::int64_t wanted)
         if (error == AVERROR_EXIT)
             return error;
         if (error < 0) {
-            if (error != AVERROR_EOF)
-                m_isDamaged = true;
+            m_isDamaged = m_isDamaged || error != AVERROR_EOF || m_packets->isDamaged();
             m_hasEnded = true;
             m_decoder->send(nullptr);
         } else {

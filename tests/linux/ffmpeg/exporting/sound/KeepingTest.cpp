@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <filesystem>
 
 namespace {
 
@@ -193,6 +194,146 @@ TEST_F(KeepingSound, AGapInTheSoundStaysAGap)
     }
 }
 
+TEST_F(KeepingSound, AacWithoutAHeaderGetsOne)
+{
+    for (const int channels : {1, 2}) {
+        SCOPED_TRACE(channels);
+        makeSoundFile(path("source.mp4"), {track("aac", 4, channels)});
+        std::filesystem::copy(path("source.mp4"), path("bare.mp4"), std::filesystem::copy_options::overwrite_existing);
+        removeAacHeaders(path("bare.mp4"));
+        const auto source = decodeSound(path("source.mp4"));
+        for (const auto& [from, to] : {std::pair{0.0, -1.0}, {1.1, 3.3}}) {
+            const auto exported = exportSound(path("bare.mp4"), path("out.mp4"), from, to);
+            EXPECT_EQ(exported.error, "");
+            EXPECT_EQ(exported.log, std::vector<std::string>{});
+            const auto out = decodeSound(path("out.mp4"));
+            EXPECT_EQ(out.errors, 0);
+            ASSERT_EQ(out.channels.size(), source.channels.size());
+            for (std::int64_t i = 0; i < 100000; i += 7)
+                ASSERT_NEAR(out.at(i, 0), source.at(i + std::llround(from * 48000), 0), 0.005) << i;
+        }
+        ASSERT_EQ(exportSound(path("bare.mp4"), path("out.mp4"), 0, -1, mixOfAll(path("bare.mp4"))).tracks, 1u);
+        EXPECT_EQ(decodeSound(path("out.mp4")).bytes, source.bytes);
+    }
+}
+
+TEST_F(KeepingSound, ATrackThatIsDamagedAsAWholeIsLeftOutForThatReason)
+{
+    makeSoundFile(path("source.mp4"), {track("aac")});
+    removeAacHeaders(path("source.mp4"));
+    damagePackets(path("source.mp4"));
+    for (const bool isMixed : {false, true}) {
+        const auto mix = isMixed ? std::optional(mixOfAll(path("source.mp4"))) : std::nullopt;
+        const auto exported = exportSound(path("source.mp4"), path("out.mp4"), 0, -1, mix);
+        EXPECT_EQ(exported.tracks, 0u);
+        ASSERT_FALSE(exported.log.empty());
+        EXPECT_NE(exported.log[0].find("its packets are damaged"), std::string::npos) << exported.log[0];
+        for (const std::string& line : exported.log)
+            EXPECT_EQ(line.find("no sound of it in the range"), std::string::npos) << line;
+    }
+}
+
+TEST_F(KeepingSound, ATrackThatNobodyCanDecodeIsNotLostWithoutAWord)
+{
+    makeSoundFile(path("source.mov"), {track("aac"), track("pcm_s16le")});
+    replaceIn(path("source.mov"), "sowt", "zzzz");
+    const auto exported = exportSound(path("source.mov"), path("out.mp4"), 0, -1);
+    EXPECT_EQ(exported.tracks, 1u);
+    ASSERT_EQ(exported.log.size(), 1u);
+    EXPECT_NE(exported.log[0].find("is left out: it cannot be decoded"), std::string::npos) << exported.log[0];
+}
+
+TEST_F(KeepingSound, AacOfTwiceTheRateIsKeptWhereNothingIsCut)
+{
+    for (const auto doubled : {DoubledRate::InHeader, DoubledRate::InPackets})
+        for (const char* name : {"source.mp4", "fragments.mp4", "source.mkv", "source.mov"}) {
+            SCOPED_TRACE(std::string(name) + (doubled == DoubledRate::InHeader ? " (header)" : " (packets)"));
+            auto spec = track("aac");
+            spec.rate = 24000;
+            spec.doubled = doubled;
+            spec.start =
+                -1500.0 / 24000; // as much as phones begin before what is heard: 0.105 s with the encoder's own
+            makeSoundFile(path(name), {spec});
+            const auto source = decodeSound(path(name));
+            ASSERT_EQ(source.rate, 48000);
+            for (const bool isMixed : {false, true}) {
+                const auto mix = isMixed ? std::optional(mixOfAll(path(name))) : std::nullopt;
+                const auto exported = exportSound(path(name), path("out.mp4"), 0, -1, mix);
+                EXPECT_EQ(exported.error, "");
+                EXPECT_EQ(exported.log, std::vector<std::string>{});
+                const auto out = decodeSound(path("out.mp4"));
+                EXPECT_EQ(out.bytes, source.bytes);
+                EXPECT_EQ(out.rate, 48000);
+                EXPECT_NEAR(static_cast<double>(out.start), static_cast<double>(source.start), 48);
+                EXPECT_NEAR(static_cast<double>(out.length()), static_cast<double>(source.length()), 48);
+            }
+        }
+}
+
+TEST_F(KeepingSound, PacketsThatDoNotSayHowLongTheyLastAreKept)
+{
+    for (const char* encoder : {"libopus", "flac", "alac", "libmp3lame", "aac"})
+        for (const char* name : {"fragments.mp4", "source.mkv"}) {
+            SCOPED_TRACE(encoder + std::string(" in ") + name);
+            makeSoundFile(path(name), {track(encoder)});
+            const auto exported = exportSound(path(name), path("out.mp4"), 0, -1);
+            EXPECT_EQ(exported.error, "");
+            EXPECT_EQ(exported.log, std::vector<std::string>{});
+            const auto source = decodeSound(path(name));
+            const auto out = decodeSound(path("out.mp4"));
+            EXPECT_EQ(out.bytes, source.bytes);
+            EXPECT_EQ(out.errors, 0);
+            // Matroska rounds its times to milliseconds.
+            for (const std::int64_t place : {4800, 150000}) {
+                double alike = 0;
+                EXPECT_LE(std::abs(latenessOf(out, place, source, place, 24000, 60, &alike)), 48) << place;
+                EXPECT_GT(alike, 0.99) << place;
+            }
+        }
+}
+
+TEST_F(KeepingSound, AacOfTwiceTheRateIsCutToTheSampleByEncodingIt)
+{
+    for (const auto doubled : {DoubledRate::InHeader, DoubledRate::InPackets}) {
+        auto spec = track("aac");
+        spec.rate = 24000;
+        spec.doubled = doubled;
+        makeSoundFile(path("source.mp4"), {spec});
+        const auto source = decodeSound(path("source.mp4"));
+        const auto exported = exportSound(path("source.mp4"), path("out.mp4"), 1.1, 3.3);
+        EXPECT_EQ(exported.error, "");
+        EXPECT_EQ(exported.log.size(), 1u);
+        const auto out = decodeSound(path("out.mp4"));
+        EXPECT_EQ(out.rate, 48000);
+        EXPECT_NEAR(static_cast<double>(out.length()), 2.2 * 48000, 2048);
+        for (std::int64_t i = 0; i < 100000; i += 7)
+            ASSERT_NEAR(out.at(i, 0), source.at(i + std::llround(1.1 * 48000), 0), 0.02) << i;
+    }
+}
+
+TEST_F(KeepingSound, TracksOfTwiceTheRateAreMixedAtIt)
+{
+    auto app = track("aac");
+    app.rate = 24000;
+    app.doubled = DoubledRate::InPackets;
+    auto microphone = app;
+    microphone.channels = 1;
+    microphone.doubled = DoubledRate::InHeader;
+    makeSoundFile(path("source.mp4"), {app, microphone});
+    const auto exported = exportSound(path("source.mp4"), path("out.mp4"), 0, -1, mixOfAll(path("source.mp4")));
+    EXPECT_EQ(exported.log, std::vector<std::string>{});
+    const auto first = decodeSound(path("source.mp4"), 0);
+    const auto second = decodeSound(path("source.mp4"), 1);
+    const auto out = decodeSound(path("out.mp4"));
+    EXPECT_EQ(out.rate, 48000);
+    for (std::int64_t i = 4800; i < 180000; i += 7) {
+        const double sum = static_cast<double>(first.at(i, 0)) + static_cast<double>(second.at(i, 0));
+        if (std::abs(sum) < 0.5) { // elsewhere it is kept from clipping
+            ASSERT_NEAR(out.at(i, 0), sum, 0.05) << i;
+        }
+    }
+}
+
 TEST_F(KeepingSound, WhatIsNoLongerWantedEndsSoon)
 {
     makeSoundFile(path("source.webm"), {track("libvorbis", 6)});
@@ -200,14 +341,16 @@ TEST_F(KeepingSound, WhatIsNoLongerWantedEndsSoon)
     const auto movie = ffmpeg::Movie::open(std::move(file).value(), nullptr);
     const auto cancelled = std::make_shared<std::atomic<bool>>(false);
     const ffmpeg::ExportRange range{base::MediaTime::make(0, 1000), base::MediaTime::make(5000, 1000)};
-    auto sources = ffmpeg::openSoundSources(movie.value(), range, std::nullopt, cancelled, [](const std::string&) {});
+    auto sources = ffmpeg::openSoundSources(movie.value(), range, std::nullopt, ffmpeg::SoundMode::Copy, cancelled,
+                                            [](const std::string&) {});
     ASSERT_EQ(sources.value().size(), 1u);
     *cancelled = true;
     const auto packet = ffmpeg::newPacket();
     const auto next = sources.value()[0]->next(*packet);
     ASSERT_FALSE(next);
     EXPECT_EQ(next.error()->code(), AVERROR_EXIT);
-    EXPECT_FALSE(ffmpeg::openSoundSources(movie.value(), range, std::nullopt, cancelled, [](const std::string&) {}));
+    EXPECT_FALSE(ffmpeg::openSoundSources(movie.value(), range, std::nullopt, ffmpeg::SoundMode::Copy, cancelled,
+                                          [](const std::string&) {}));
 }
 
 } // namespace

@@ -9,6 +9,8 @@ extern "C" {
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <fstream>
+#include <iterator>
 #include <memory>
 #include <random>
 
@@ -116,6 +118,59 @@ EncodedSound encodeSound(const SoundTrackSpec& spec)
     return encoded;
 }
 
+/// What a packet of AAC says at its end: that the upper half of the band follows, of which there is nothing.
+void addUpperBand(AVPacket& packet)
+{
+    constexpr unsigned kFill = 6;
+    constexpr unsigned kUpperBand = 13;
+    constexpr unsigned kEnd = 7;
+    std::vector<bool> bits;
+    for (int i = 0; i < packet.size * 8; ++i)
+        bits.push_back(packet.data[i / 8] >> (7 - i % 8) & 1);
+    while (!bits.back())
+        bits.pop_back();
+    bits.resize(bits.size() - 3); // the end
+    const auto append = [&](unsigned value, int count) {
+        for (int i = count; i-- > 0;)
+            bits.push_back(value >> i & 1);
+    };
+    append(kFill, 3);
+    append(1, 4); // byte
+    append(kUpperBand, 4);
+    append(0, 4);
+    append(kEnd, 3);
+    auto longer = newPacket();
+    ASSERT_GE(av_new_packet(longer.get(), static_cast<int>((bits.size() + 7) / 8)), 0);
+    std::fill_n(longer->data, longer->size, std::uint8_t{0});
+    for (std::size_t i = 0; i < bits.size(); ++i)
+        longer->data[i / 8] = static_cast<std::uint8_t>(longer->data[i / 8] | (bits[i] ? 0x80 >> i % 8 : 0));
+    av_packet_copy_props(longer.get(), &packet);
+    av_packet_unref(&packet);
+    av_packet_move_ref(&packet, longer.get());
+}
+
+void doubleRate(const SoundTrackSpec& spec, AVCodecParameters& parameters)
+{
+    if (spec.doubled == DoubledRate::No)
+        return;
+    // Behind what plain AAC needs, the encoder says that nothing is doubled.
+    ASSERT_EQ(parameters.extradata_size, 5);
+    constexpr int kFasterBy = 3; // places in the table of rates
+    const int place = (parameters.extradata[0] & 7) << 1 | parameters.extradata[1] >> 7;
+    if (spec.doubled == DoubledRate::InPackets)
+        parameters.extradata_size = 2;
+    else
+        parameters.extradata[4] = static_cast<std::uint8_t>(0x80 | (place - kFasterBy) << 3);
+    parameters.sample_rate = 2 * spec.rate;
+    parameters.frame_size *= 2;
+}
+
+std::string bytesOf(const std::string& path)
+{
+    std::ifstream file(path, std::ios::binary);
+    return {std::istreambuf_iterator<char>(file), {}};
+}
+
 void writeTracks(const std::string& path, const std::vector<SoundTrackSpec>& specs, std::vector<EncodedSound> tracks)
 {
     const auto output = newOutput(path);
@@ -123,6 +178,7 @@ void writeTracks(const std::string& path, const std::vector<SoundTrackSpec>& spe
         AVStream* stream = avformat_new_stream(output.get(), nullptr);
         avcodec_parameters_from_context(stream->codecpar, tracks[i].encoder.get());
         stream->codecpar->codec_tag = 0;
+        doubleRate(specs[i], *stream->codecpar);
         stream->time_base = {1, specs[i].rate};
         stream->disposition = specs[i].isDefault ? AV_DISPOSITION_DEFAULT : 0;
         if (!specs[i].language.empty())
@@ -133,6 +189,8 @@ void writeTracks(const std::string& path, const std::vector<SoundTrackSpec>& spe
     output->strict_std_compliance = FF_COMPLIANCE_EXPERIMENTAL; // for FLAC
     AVDictionary* options = nullptr;
     av_dict_set(&options, "avoid_negative_ts", path.ends_with(".mp4") ? "disabled" : "auto", 0);
+    if (path.find("fragments") != std::string::npos)
+        av_dict_set(&options, "movflags", "frag_keyframe+empty_moov+default_base_moof", 0);
     ASSERT_GE(avformat_write_header(output.get(), &options), 0) << path;
     av_dict_free(&options);
     std::vector<std::size_t> next(tracks.size());
@@ -153,6 +211,8 @@ void writeTracks(const std::string& path, const std::vector<SoundTrackSpec>& spe
         AVPacket& packet = *tracks[chosen].packets[next[chosen]++];
         packet.pts += std::llround(specs[chosen].start * specs[chosen].rate);
         packet.dts = packet.pts;
+        if (specs[chosen].doubled == DoubledRate::InPackets)
+            addUpperBand(packet);
         packet.stream_index = static_cast<int>(chosen);
         av_packet_rescale_ts(&packet, {1, specs[chosen].rate}, output->streams[chosen]->time_base);
         ASSERT_GE(av_interleaved_write_frame(output.get(), &packet), 0);
@@ -168,6 +228,30 @@ void makeSoundFile(const std::string& path, const std::vector<SoundTrackSpec>& t
     for (const auto& track : tracks)
         encoded.push_back(encodeSound(track));
     writeTracks(path, tracks, std::move(encoded));
+}
+
+void replaceIn(const std::string& path, const std::string& what, const std::string& with)
+{
+    std::string bytes = bytesOf(path);
+    for (auto at = bytes.find(what); at != std::string::npos; at = bytes.find(what, at + with.size()))
+        bytes.replace(at, what.size(), with);
+    std::ofstream(path, std::ios::binary) << bytes;
+}
+
+void removeAacHeaders(const std::string& path)
+{
+    replaceIn(path, "\x05\x80\x80\x80", "\x7f\x80\x80\x80"); // a tag that nobody knows
+}
+
+void damagePackets(const std::string& path)
+{
+    std::string bytes = bytesOf(path);
+    const auto begin = bytes.find("mdat") + 4;
+    const auto end = bytes.find("moov") - 4;
+    std::minstd_rand random(1);
+    for (auto at = begin; at < end; ++at)
+        bytes[at] = static_cast<char>(random() % 127);
+    std::ofstream(path, std::ios::binary) << bytes;
 }
 
 void makeSineWindowedFile(const std::string& path, const SoundTrackSpec& spec)
@@ -246,7 +330,7 @@ ExportedSound exportSound(const std::string& from, const std::string& into, doub
     }
     const ExportRange range{base::MediaTime::fromSeconds(start, 90000),
                             to < 0 ? opened.value()->duration() : base::MediaTime::fromSeconds(to, 90000)};
-    auto sources = openSoundSources(opened.value(), range, mix, nullptr,
+    auto sources = openSoundSources(opened.value(), range, mix, SoundMode::Copy, nullptr,
                                     [&](const std::string& line) { result.log.push_back(line); });
     if (!sources) {
         result.error = sources.error()->description();
