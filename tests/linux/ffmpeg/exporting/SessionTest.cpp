@@ -1,5 +1,6 @@
 // What whoever exports sees: status, errors, ranges, what is kept.
 #include "linux/ffmpeg/exporting/ExportTest.h"
+#include "linux/ffmpeg/exporting/sound/DecodedSound.h"
 
 #include <gmock/gmock.h>
 
@@ -82,6 +83,40 @@ TEST_F(AnExport, RefusesRangesThatHoldNothing)
         EXPECT_THAT(errorText(), HasSubstr("“h264.mp4” cannot be exported: the range"));
     }
     EXPECT_TRUE(files().empty());
+}
+
+TEST_F(AnExport, OfARangeBeforeTheFirstPictureShowsThat)
+{
+    for (const char* name : {"h264-late.mp4", "sound-early.mp4"}) {
+        SCOPED_TRACE(name);
+        std::filesystem::remove(output());
+        ASSERT_EQ(cut(exportMovie(name), output(), fromTo(0.1, 0.5)), ExportStatus::Completed) << errorText();
+        DecodedMovie decoded(output());
+        const auto pictures = decoded.all();
+        ASSERT_EQ(pictures.size(), 1U);
+        EXPECT_EQ(pictures[0].number, 0);
+        EXPECT_EQ(pictures[0].seconds, 0);
+        EXPECT_NEAR(pictures[0].duration, 0.4, 0.001);
+        EXPECT_NEAR(static_cast<double>(decoded.context().duration) / AV_TIME_BASE, 0.4, 0.025);
+    }
+    for (const std::string& line : log.texts(base::MemoryLog::Line::Kind::Message))
+        EXPECT_THAT(line, HasSubstr("is encoded as a whole: the range ends before the first picture."));
+}
+
+TEST_F(AnExport, KeepsSoundWhoseHeaderOrLengthsTheFileDoesNotTell)
+{
+    for (const char* name : {"sound-no-header.mp4", "sound-doubled.mp4", "sound-doubled.mkv",
+                             "sound-doubled-fragmented.mp4", "opus-fragmented.mp4"}) {
+        SCOPED_TRACE(name);
+        std::filesystem::remove(output());
+        ASSERT_EQ(cut(exportMovie(name), output(), std::nullopt), ExportStatus::Completed) << errorText();
+        EXPECT_EQ(log.texts(base::MemoryLog::Line::Kind::Message), std::vector<std::string>{});
+        const auto out = decodeSound(output());
+        EXPECT_EQ(out.errors, 0);
+        EXPECT_EQ(out.rate, 48000);
+        EXPECT_NEAR(static_cast<double>(out.length()), static_cast<double>(decodeSound(exportMovie(name)).length()),
+                    2048);
+    }
 }
 
 TEST_F(AnExport, KeepsEveryPacketWhenNothingIsCut)

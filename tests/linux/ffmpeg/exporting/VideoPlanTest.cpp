@@ -142,7 +142,7 @@ TEST(VideoPlan, EndsACopyWhereNoPictureIsHeldBack)
 TEST(VideoPlan, SaysWhyAllIsEncoded)
 {
     EXPECT_THAT(plan("0J 1 1 2", 0, 2).reason, HasSubstr("the same time"));
-    EXPECT_THAT(plan("5J 6", 0, 4).reason, HasSubstr("no picture is shown"));
+    EXPECT_THAT(plan("5J 6", 0, 4).reason, HasSubstr("ends before the first picture"));
     EXPECT_THAT(plan("", 0, 4).reason, HasSubstr("no picture is shown"));
     EXPECT_THAT(plan("0J 1 2 3 4J", 1, 4).reason, HasSubstr("no group of pictures begins in the range"));
 }

@@ -101,6 +101,9 @@ Result<void> EncodedVideoSource::goOn()
         const FrameRef shown = std::exchange(m_waiting, picture);
         return shown && pts > m_start ? encode(*shown, pts) : Result<void>();
     }
+    // Before the first picture of all begins, it is what is seen.
+    if (picture && picture->pts() == m_packets->movie().firstFrame()->pts())
+        m_waiting = picture;
     std::int64_t end = pts;
     if (m_waiting && !picture) {
         // The movie ends before the range does, and its last picture when it would have ended anyway.
@@ -128,7 +131,8 @@ Result<void> EncodedVideoSource::encode(const DecodedFrame& picture, std::int64_
     auto fitting = m_scaler.fit(picture.picture());
     if (!fitting)
         return fitting.error();
-    const std::int64_t pts = std::max(m_packets->outTick(picture.pts()), m_start);
+    const std::int64_t own = m_packets->outTick(picture.pts());
+    const std::int64_t pts = own < m_end ? std::max(own, m_start) : m_start;
     if (auto done = m_encoder->encode(*fitting.value(), pts, until - pts); !done)
         return done;
     return moveOut();

@@ -109,8 +109,10 @@ VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int
 {
     VideoPlan plan;
     const auto first = visibleAt(head.packets, start);
-    if (!first || *first >= end)
+    if (!first)
         return encodeAll(plan, "no picture is shown in the range");
+    if (*first >= end)
+        return encodeAll(plan, "the range ends before the first picture");
     plan.firstPts = *first;
     plan.reorderDepth = std::max(reorderDepthOf(head.packets), reorderDepthOf(tail.packets));
     if (!haveTimesOfTheirOwn(head.packets) || !haveTimesOfTheirOwn(tail.packets))
