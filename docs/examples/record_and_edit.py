@@ -12,8 +12,9 @@ import dbus
 from dbus.mainloop.glib import DBusGMainLoop
 from gi.repository import GLib
 
+DAY = 24 * 60 * 60  # seconds
+
 DBusGMainLoop(set_as_default=True)
-bus = dbus.SessionBus()
 loop = GLib.MainLoop()
 status = 1
 
@@ -37,22 +38,29 @@ def service_left(owner):
         failed("Clipsa ended unexpectedly")
 
 
+if len(sys.argv) not in (2, 3):
+    sys.exit("record_and_edit.py MOVIE [APP-NAME]")
 movie = sys.argv[1]
 options = {"name": movie.rsplit("/", 1)[-1]}
 if len(sys.argv) > 2:
     options["app-name"] = sys.argv[2]
 
-# Listened to before the call, so that no answer can be missed; they come to us alone.
 SESSION = "org.clipsa.RecorderSession1"
-bus.add_signal_receiver(completed, "Completed", SESSION)
-bus.add_signal_receiver(failed, "Failed", SESSION)
-
-recorder = dbus.Interface(bus.get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"), "org.clipsa.Recorder1")
 try:
+    bus = dbus.SessionBus()
+    # Listened to before the call, so that no answer can be missed; they come to us alone.
+    bus.add_signal_receiver(completed, "Completed", SESSION)
+    bus.add_signal_receiver(failed, "Failed", SESSION)
+    recorder = dbus.Interface(bus.get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"), "org.clipsa.Recorder1")
     with open(movie, "rb") as file:
-        recorder.Edit(dbus.types.UnixFd(file), dbus.Dictionary(options, signature="sv"))
+        # A slow disk or network delays the answer, which is worth waiting for.
+        recorder.Edit(dbus.types.UnixFd(file), dbus.Dictionary(options, signature="sv"), timeout=DAY)
+    bus.watch_name_owner("org.clipsa.Clipsa", service_left)
+    loop.run()
+except OSError as error:
+    sys.exit(f"cannot read {movie}: {error.strerror}")
 except dbus.DBusException as error:
     sys.exit(error.get_dbus_message())
-bus.watch_name_owner("org.clipsa.Clipsa", service_left)
-loop.run()
+except KeyboardInterrupt:
+    sys.exit(130)  # the editor closes with our connection
 sys.exit(status)

@@ -7,10 +7,13 @@
 
 #include <sys/stat.h>
 
+using testing::AllOf;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::Not;
 using testing::StartsWith;
+using testing::UnorderedElementsAre;
 
 namespace {
 
@@ -128,26 +131,106 @@ TEST_F(Service, TellsTheExampleInPythonWhatIsWrong)
     EXPECT_THAT(wrong.errors(), HasSubstr("not a regular file"));
 }
 
-TEST_F(Service, TheExampleInShellRecordsAndEdits)
+TEST_F(Service, TheExampleInPythonSaysWhatItNeeds)
 {
-    const auto recorder = m_directory.write("recorder", "#!/bin/sh\necho moving pictures > \"$1\"\n");
-    ::chmod(recorder.c_str(), 0700);
-    const std::string path = tests::program("") + ":" + std::getenv("PATH");
-    const auto run = [&](const std::string& script) {
-        tests::Program example({"sh", "-c", "cd \"$0\" && exec \"$1\" Racer", m_directory.path(),
+    const std::string example = tests::sourceFile("docs/examples/record_and_edit.py");
+    tests::Program nothing({kPython, example}, {});
+    EXPECT_EQ(nothing.wait(), 1);
+    EXPECT_EQ(nothing.errors(), "record_and_edit.py MOVIE [APP-NAME]\n");
+    startBus("finish= wait");
+    tests::Program missing({kPython, example, m_directory.path() / "none.mp4"}, {});
+    EXPECT_EQ(missing.wait(), 1);
+    EXPECT_THAT(missing.errors(), AllOf(StartsWith("cannot read "), HasSubstr("none.mp4: No such file or directory")));
+    EXPECT_THAT(missing.errors(), Not(HasSubstr("Traceback")));
+}
+
+TEST_F(Service, OpensWhatTheExampleOfTheShellGivesIt)
+{
+    const auto there = pipe("PIPE_THERE");
+    startBus("tell=" + there.native() + " finish= wait");
+    const std::string manual = tests::PrivateDirectory::read(tests::sourceFile("docs/for-recorders.md"));
+    const std::size_t start = manual.find("gdbus call");
+    ASSERT_NE(start, std::string::npos);
+    std::string call = manual.substr(start, manual.find("```", start) - start);
+    const std::string file = "/home/me/Videos/race.webm";
+    ASSERT_THAT(call, HasSubstr(file));
+    call.replace(call.find(file), file.size(), m_directory.write("race.webm", "moving pictures"));
+    expectSuccess({"sh", "-c", call});
+    EXPECT_THAT(tests::readPipe(there), HasSubstr("AppNameKey=race\n"));
+}
+
+/// The example for scripts, with a recorder that writes `recording` and ends with `recorderStatus`.
+class ExampleInShell : public ::testing::Test {
+protected:
+    int run(const std::string& editorScript, const std::string& recording = "moving pictures", int recorderStatus = 0)
+    {
+        const auto recorder = m_directory.write("recorder", "#!/bin/sh\nprintf '" + recording + "' > \"$1\"\nexit "
+                                                                + std::to_string(recorderStatus) + "\n");
+        ::chmod(recorder.c_str(), 0700);
+        std::filesystem::create_directories(m_videos);
+        tests::Program example({"sh", "-c", "cd \"$0\" && exec \"$1\" Racer", m_videos,
                                 tests::sourceFile("docs/examples/record-and-edit.sh")},
                                {{"RECORDER", recorder},
-                                {"PATH", path},
-                                {"XDG_CACHE_HOME", m_cache},
+                                {"PATH", tests::program("") + ":" + std::getenv("PATH")},
+                                {"XDG_CACHE_HOME", m_directory.path() / "cache"},
                                 {"CLIPSA_EDITOR", tests::program("fake-editor")},
-                                {"FAKE_EDITOR", script}});
-        EXPECT_EQ(example.wait(), 0) << example.errors();
-        return example.output();
-    };
-    EXPECT_EQ(run("finish=save wait"), "Done with the recording: save\n");
-    EXPECT_FALSE(std::filesystem::exists(m_directory.path() / "recording.mp4"));
-    EXPECT_THAT(run("finish= wait"), HasSubstr("keeping it as recording.mp4"));
-    EXPECT_EQ(tests::PrivateDirectory::read(m_directory.path() / "recording.mp4"), "moving pictures\n");
+                                {"FAKE_EDITOR", editorScript}});
+        const int status = example.wait();
+        m_output = example.output();
+        m_errors = example.errors();
+        return status;
+    }
+
+    /// What all that is there contains, recording or not.
+    std::vector<std::string> recordings() const
+    {
+        std::vector<std::string> contents;
+        for (const auto& entry : std::filesystem::directory_iterator(m_videos))
+            contents.push_back(tests::PrivateDirectory::read(entry.path()));
+        return contents;
+    }
+
+    tests::PrivateDirectory m_directory;
+    std::filesystem::path m_videos = m_directory.path() / "my videos";
+    std::string m_output;
+    std::string m_errors;
+};
+
+TEST_F(ExampleInShell, KeepsTheRecordingWhateverWasDoneWithIt)
+{
+    EXPECT_EQ(run("finish=SaveToCameraRoll wait"), 0) << m_errors; // a trim says the same, and saves nothing
+    EXPECT_THAT(m_output, StartsWith("Done with the recording: SaveToCameraRoll\nIt stays in /"));
+    EXPECT_THAT(recordings(), ElementsAre("moving pictures"));
+}
+
+TEST_F(ExampleInShell, ReplacesNoOlderRecording)
+{
+    EXPECT_EQ(run("finish= wait", "older"), 0) << m_errors;
+    EXPECT_THAT(m_output, StartsWith("The recording was looked at and closed.\nIt stays in /"));
+    EXPECT_EQ(run("finish= wait", "newer"), 0) << m_errors;
+    EXPECT_THAT(recordings(), UnorderedElementsAre("older", "newer"));
+}
+
+TEST_F(ExampleInShell, KeepsTheRecordingWhenTheEditorCrashes)
+{
+    EXPECT_EQ(run("crash"), 3);
+    EXPECT_THAT(m_errors, HasSubstr("The editor has not finished."));
+    EXPECT_THAT(m_output, StartsWith("It stays in /"));
+    EXPECT_THAT(recordings(), ElementsAre("moving pictures"));
+}
+
+TEST_F(ExampleInShell, EditsWhatARecorderLeavesThatWasInterrupted)
+{
+    EXPECT_EQ(run("finish= wait", "moving pictures", 130), 0) << m_errors;
+    EXPECT_THAT(recordings(), ElementsAre("moving pictures"));
+}
+
+TEST_F(ExampleInShell, LeavesNothingWhereNothingWasRecorded)
+{
+    EXPECT_EQ(run("finish= wait", "", 7), 7);
+    EXPECT_EQ(m_errors, "Nothing was recorded.\n");
+    EXPECT_THAT(recordings(), IsEmpty());
+    EXPECT_EQ(run("finish= wait", "", 0), 1);
 }
 
 } // namespace
