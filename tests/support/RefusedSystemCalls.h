@@ -1,5 +1,6 @@
 /// Makes the kernel refuse system calls to one thread, and to those that it starts, as a full disk or a poor file system
-/// would. For ever, and also to programs that it starts: use it on a thread that ends.
+/// would, or hold them up, as a disk that does not answer. For ever, and also to programs that it starts: use it on a
+/// thread that ends.
 #pragma once
 
 #include <cstddef>
@@ -12,13 +13,17 @@
 #include <sys/prctl.h>
 #include <sys/syscall.h>
 #include <thread>
+#include <unistd.h>
 #include <vector>
 
 namespace tests {
 
+/// In place of an error: the call does not return.
+inline constexpr int kHeldUp = -1;
+
 struct RefusedSystemCall {
     long call;
-    int error; ///< errno
+    int error; ///< errno, or kHeldUp
     /// Only calls with any of these bits in this argument; all of them when there are no bits.
     unsigned argument = 0;
     std::uint32_t bits = 0;
@@ -38,7 +43,7 @@ inline RefusedSystemCall noReflinks()
     return {SYS_ioctl, EOPNOTSUPP, 1, FICLONE, true};
 }
 
-inline void refuseSystemCalls(const std::vector<RefusedSystemCall>& calls)
+inline std::vector<sock_filter> filterOf(const std::vector<RefusedSystemCall>& calls)
 {
     const auto load = [](std::size_t offset) {
         return sock_filter(BPF_STMT(BPF_LD | BPF_W | BPF_ABS, static_cast<std::uint32_t>(offset)));
@@ -54,14 +59,33 @@ inline void refuseSystemCalls(const std::vector<RefusedSystemCall>& calls)
             const int test = refused.exactly ? BPF_JEQ : BPF_JSET;
             filter.push_back(BPF_JUMP(static_cast<std::uint16_t>(BPF_JMP | test | BPF_K), refused.bits, 0, 1));
         }
-        filter.push_back(BPF_STMT(BPF_RET | BPF_K,
-                                  SECCOMP_RET_ERRNO | (static_cast<std::uint32_t>(refused.error) & SECCOMP_RET_DATA)));
+        const auto error = static_cast<std::uint32_t>(refused.error) & SECCOMP_RET_DATA;
+        filter.push_back(
+            BPF_STMT(BPF_RET | BPF_K, refused.error == kHeldUp ? SECCOMP_RET_USER_NOTIF : SECCOMP_RET_ERRNO | error));
     }
     filter.push_back(BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ALLOW));
+    return filter;
+}
+
+inline void refuseSystemCalls(const std::vector<RefusedSystemCall>& calls)
+{
+    std::vector<sock_filter> filter = filterOf(calls);
     const sock_fprog program = {static_cast<unsigned short>(filter.size()), filter.data()};
     if (::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) != 0
         || ::prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &program, 0, 0) != 0)
         throw std::runtime_error("the kernel takes no filter");
+}
+
+/// The same where some calls are held up: until the descriptor that it gives is closed, which nobody inherits.
+[[nodiscard]] inline int holdUpSystemCalls(const std::vector<RefusedSystemCall>& calls)
+{
+    std::vector<sock_filter> filter = filterOf(calls);
+    const sock_fprog program = {static_cast<unsigned short>(filter.size()), filter.data()};
+    ::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0);
+    const long listener = ::syscall(SYS_seccomp, SECCOMP_SET_MODE_FILTER, SECCOMP_FILTER_FLAG_NEW_LISTENER, &program);
+    if (listener < 0)
+        throw std::runtime_error("the kernel takes no filter");
+    return static_cast<int>(listener);
 }
 
 /// Runs `body` on a thread of its own to which `calls` are refused.

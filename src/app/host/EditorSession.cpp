@@ -1,5 +1,7 @@
 #include "app/host/EditorSession.h"
 
+#include "app/host/DeliverFiles.h"
+#include "app/host/DetachedWork.h"
 #include "app/host/EditorDirectory.h"
 #include "app/host/Payload.h"
 #include "linux/dbus/BusyMark.h"
@@ -8,10 +10,7 @@
 #include <QObject>
 #include <QTimer>
 
-#include <atomic>
 #include <csignal>
-#include <sys/stat.h>
-#include <thread>
 #include <utility>
 
 namespace host {
@@ -20,7 +19,6 @@ namespace {
 
 /// How long the last words of a process that has ended can be under way to us.
 constexpr std::chrono::milliseconds kLastWords{500};
-constexpr std::chrono::seconds kLongCopy{1};
 
 } // namespace
 
@@ -35,21 +33,13 @@ struct EditorSession::State final : QObject {
         connect(&timer, &QTimer::timeout, this, &State::whenTimeIsUp);
     }
 
-    ~State() override
-    {
-        stopping = true;
-        if (worker.joinable())
-            worker.join();
-    }
-
     base::Result<void> start();
     void handFilesOver();
-    base::Result<runtime::Value> attachmentPath();
-    CopyProgress progress();
     void close();
     void whenTimeIsUp();
     void processEnded(ProcessEnd end);
     void end();
+    void leave();
 
     // In the order in which they must outlive each other: the directory goes when the process has gone.
     dbus::EditRequest request;
@@ -65,9 +55,9 @@ struct EditorSession::State final : QObject {
     std::optional<ProcessEnd> processEnd;
     EditorOutcome outcome;
     bool closing = false;
-
-    std::atomic<bool> stopping = false;
-    std::thread worker;
+    bool filesAreDone = false; ///< delivered or not, and directories of dead editors swept
+    bool waitsForFiles = false;
+    std::optional<DetachedWork> files;
 };
 
 base::Result<void> EditorSession::State::start()
@@ -104,63 +94,42 @@ base::Result<void> EditorSession::State::start()
     if (!started)
         return started.error();
     process = std::move(started).value();
-    worker = std::thread([this] {
-        handFilesOver();
-        sweepEditorDirectories(place.directoriesRoot);
-    });
+    handFilesOver();
     return {};
 }
 
-/// On the worker. The attachment first: the movie is the last that the editor waits for.
 void EditorSession::State::handFilesOver()
 {
-    if (attachment)
-        attachment->keep(attachmentPath());
-    const auto way = handOver(request.movie.get(), directory.movieDirectory(), request.movieName, progress());
-    if (way) {
-        movie->keep(runtime::Value(kDeviceMovieDirectory + request.movieName));
-        return;
-    }
-    movie->keep(way.error());
-    QMetaObject::invokeMethod(this, [this, error = way.error()] {
-        if (!closing)
-            outcome.error = error;
-        close();
+    // Shared, because a function can be copied and a descriptor cannot.
+    const auto delivery = std::make_shared<FileDelivery>(
+        FileDelivery{std::move(request.movie), request.movieName, directory.movieDirectory(), movie, attachment,
+                     request.attachmentPath, std::move(request.attachment), request.attachmentName,
+                     directory.attachmentDirectory()});
+    const DeliveryEvents events{[this](std::uint64_t total) {
+                                    if (handlers.copying)
+                                        handlers.copying(total);
+                                },
+                                [this](const base::ErrorRef& error) {
+                                    if (!closing)
+                                        outcome.error = error;
+                                    close();
+                                }};
+    files.emplace([this, delivery, events, root = place.directoriesRoot](DetachedWork::Client& client) {
+        deliverFiles(*delivery, events, client);
+        sweepEditorDirectories(root);
+        client.post([this] {
+            filesAreDone = true;
+            if (waitsForFiles)
+                leave();
+        });
     });
-}
-
-base::Result<runtime::Value> EditorSession::State::attachmentPath()
-{
-    if (!request.attachment)
-        return runtime::Value(request.attachmentPath);
-    const std::string parent = directory.attachmentDirectory();
-    if (::mkdir(parent.c_str(), S_IRWXU) != 0)
-        return base::Error::fromErrno(errno, "cannot make " + parent);
-    const auto way = handOver(request.attachment.get(), parent, request.attachmentName, progress());
-    if (!way)
-        return way.error();
-    return runtime::Value(parent + "/" + request.attachmentName);
-}
-
-CopyProgress EditorSession::State::progress()
-{
-    return [this, start = std::chrono::steady_clock::now(), told = false](std::uint64_t, std::uint64_t total) mutable {
-        if (!told && std::chrono::steady_clock::now() - start > kLongCopy) {
-            told = true;
-            QMetaObject::invokeMethod(this, [this, total] {
-                if (const auto copying = std::exchange(handlers.copying, {}))
-                    copying(total);
-            });
-        }
-        return !stopping;
-    };
 }
 
 void EditorSession::State::close()
 {
     if (std::exchange(closing, true))
         return;
-    stopping = true; // nobody waits for the movie any more
+    files->cancel(); // nobody waits for the movie any more
     connection->disconnectEditor();
     if (processEnd)
         QMetaObject::invokeMethod(this, &State::end, Qt::QueuedConnection);
@@ -171,7 +140,8 @@ void EditorSession::State::close()
 void EditorSession::State::whenTimeIsUp()
 {
     if (processEnd) {
-        QMetaObject::invokeMethod(this, &State::end, Qt::QueuedConnection); // not inside the timer that it destroys
+        // Not inside the timer that it destroys.
+        QMetaObject::invokeMethod(this, waitsForFiles ? &State::leave : &State::end, Qt::QueuedConnection);
         return;
     }
     // One that has something to finish, a save for example, takes as long as that takes.
@@ -192,6 +162,18 @@ void EditorSession::State::processEnded(ProcessEnd ended)
 }
 
 void EditorSession::State::end()
+{
+    if (std::exchange(waitsForFiles, true))
+        return;
+    timer.stop();
+    files->cancel();
+    if (filesAreDone)
+        leave();
+    else
+        timer.start(place.patienceWithFiles);
+}
+
+void EditorSession::State::leave()
 {
     timer.stop();
     outcome.end = processEnd.value_or(ProcessEnd{});

@@ -37,6 +37,9 @@ public:
         /// How long an editor that has nothing to finish may take to go after being asked, and after SIGTERM, before
         /// stronger means are used.
         std::chrono::milliseconds patience = std::chrono::seconds(10);
+        /// How long a session that is over waits for its files, which a slow disk can hold up, before it leaves that
+        /// work to itself.
+        std::chrono::milliseconds patienceWithFiles = std::chrono::seconds(2);
     };
     struct Handlers {
         /// The user has finished; the editor is being closed.

@@ -74,8 +74,10 @@ base::Result<void> prepare(dbus::EditRequest& request)
         return opened;
     if (const auto opened = openAttachment(request); !opened)
         return opened;
-    const std::string fallback = nameFor(request.movie.get());
-    request.movieName = safeFileName(request.movieName, fallback);
+    // Read only for a movie that came without a name.
+    request.movieName = safeFileName(request.movieName, "");
+    if (request.movieName.empty())
+        request.movieName = nameFor(request.movie.get());
     request.appName = safeAppName(request.appName.empty() ? withoutExtension(request.movieName) : request.appName);
     if (request.bundleIdentifier.empty())
         request.bundleIdentifier = kUnknownBundleIdentifier;

@@ -1,30 +1,25 @@
 #include "app/host/ServeRecorders.h"
 
+#include "app/host/DetachedWork.h"
 #include "app/host/EditorDirectory.h"
 #include "app/host/EditorSession.h"
 #include "app/host/ExitStatus.h"
 #include "app/host/PrepareRequest.h"
+#include "app/host/Streams.h"
 #include "app/host/TerminationSignals.h"
 #include "linux/dbus/RecorderService.h"
 
 #include <QCoreApplication>
 
-#include <cstdio>
+#include <cerrno>
+#include <memory>
+#include <optional>
+#include <string>
 #include <utility>
 
 namespace host {
 
 namespace {
-
-class RecordersEditor final : public dbus::RecorderService::Editor {
-public:
-    explicit RecordersEditor(std::unique_ptr<EditorSession> session) : m_session(std::move(session)) {}
-
-    void close() override { m_session->close(); }
-
-private:
-    std::unique_ptr<EditorSession> m_session;
-};
 
 std::string failureOf(const EditorOutcome& outcome)
 {
@@ -35,37 +30,81 @@ std::string failureOf(const EditorOutcome& outcome)
     return outcome.closed ? "the editor was closed" : "the editor ended early, " + outcome.end.words();
 }
 
-base::Result<std::unique_ptr<dbus::RecorderService::Editor>> launch(dbus::EditRequest request,
-                                                                    dbus::RecorderService::EditorEvents events)
-{
-    if (const auto prepared = prepare(request); !prepared)
-        return prepared.error();
-    const auto program = findEditorProgram();
-    if (!program)
-        return program.error();
-    const auto root = editorDirectoriesRoot();
-    if (!root)
-        return root.error();
-    EditorSession::Handlers handlers;
-    handlers.finished = std::move(events.completed);
-    handlers.ended = [ended = std::move(events.ended)](const EditorOutcome& outcome) { ended(failureOf(outcome)); };
-    auto session = EditorSession::start(std::move(request), {program.value(), root.value()}, std::move(handlers));
-    if (!session)
-        return session.error();
-    return std::unique_ptr<dbus::RecorderService::Editor>(
-        std::make_unique<RecordersEditor>(std::move(session).value()));
-}
+/// First its request is made ready on a thread of its own, because a recorder's files may lie on a slow disk; then it is
+/// a session.
+class RecordersEditor final : public dbus::RecorderService::Editor {
+public:
+    RecordersEditor(dbus::EditRequest request, dbus::RecorderService::EditorEvents events) : m_events(std::move(events))
+    {
+        // Shared, because a function can be copied and a descriptor cannot.
+        const auto shared = std::make_shared<dbus::EditRequest>(std::move(request));
+        m_preparation.emplace([this, shared](DetachedWork::Client& client) {
+            const auto prepared = prepare(*shared);
+            client.post([this, shared, prepared] {
+                tellStarted(prepared ? start(std::move(*shared)) : base::Result<void>(prepared.error()));
+            });
+        });
+    }
+
+    void close() override
+    {
+        if (m_session) {
+            m_session->close();
+            return;
+        }
+        m_preparation.reset();
+        const auto tell = [this] {
+            tellStarted(base::Error::make(base::kPosixErrorDomain, ECANCELED, "the editor was closed"));
+        };
+        QMetaObject::invokeMethod(&m_context, tell, Qt::QueuedConnection);
+    }
+
+private:
+    void tellStarted(const base::Result<void>& started)
+    {
+        if (const auto tell = std::exchange(m_events.started, {}))
+            tell(started);
+    }
+
+    base::Result<void> start(dbus::EditRequest request)
+    {
+        const auto program = findEditorProgram();
+        if (!program)
+            return program.error();
+        const auto root = editorDirectoriesRoot();
+        if (!root)
+            return root.error();
+        EditorSession::Handlers handlers;
+        handlers.finished = m_events.completed;
+        handlers.ended = [ended = m_events.ended](const EditorOutcome& outcome) { ended(failureOf(outcome)); };
+        auto session = EditorSession::start(std::move(request), {program.value(), root.value()}, std::move(handlers));
+        if (!session)
+            return session.error();
+        m_session = std::move(session).value();
+        return {};
+    }
+
+    dbus::RecorderService::EditorEvents m_events;
+    std::unique_ptr<EditorSession> m_session;
+    std::optional<DetachedWork> m_preparation;
+    QObject m_context;
+};
 
 } // namespace
 
 int serveRecorders(const ServiceCommand& command)
 {
-    auto service = dbus::RecorderService::start(launch, command.idle, [] { QCoreApplication::exit(); });
-    if (!service) {
-        std::fprintf(stderr, "clipsa: %s\n", service.error()->description().c_str());
+    const auto launch = [](dbus::EditRequest request, dbus::RecorderService::EditorEvents events) {
+        return std::make_unique<RecordersEditor>(std::move(request), std::move(events));
+    };
+    std::unique_ptr<dbus::RecorderService> service;
+    const TerminationSignals signals([&](int) { service->close(); });
+    auto started = dbus::RecorderService::start(launch, command.idle, [] { QCoreApplication::exit(); });
+    if (!started) {
+        complain(started.error()->description());
         return kExitFailed;
     }
-    const TerminationSignals signals([&](int) { service.value()->close(); });
+    service = std::move(started).value();
     QCoreApplication::exec();
     return kExitDone;
 }

@@ -1,5 +1,6 @@
 #include "linux/dbus/RecorderService.h"
 
+#include "base/Text.h"
 #include "base/Url.h"
 #include "linux/dbus/DisconnectWatch.h"
 #include "linux/dbus/EditOptions.h"
@@ -15,6 +16,7 @@
 #include <QDBusVirtualObject>
 #include <QTimer>
 
+#include <algorithm>
 #include <cstdio>
 #include <map>
 #include <optional>
@@ -97,8 +99,13 @@ public:
     }
 
 private:
+    /// Told once: the number of the session, or why there is none.
+    using Answer = std::function<void(const base::Result<std::uint64_t>& session)>;
+
     struct Session {
-        std::string caller; ///< empty: nobody in particular, and nobody is told
+        std::string caller;
+        bool isCallers; ///< it ends with its caller, who is told; else it is the user's alone
+        Answer answer;
         std::unique_ptr<Editor> editor;
     };
 
@@ -123,7 +130,7 @@ private:
 
     void refuse(const QDBusMessage& message, const std::string& why, const char* error = kBadInput)
     {
-        std::fprintf(stderr, "clipsa: %s\n", why.c_str());
+        std::fprintf(stderr, "clipsa: %s\n", base::printable(why).c_str());
         if (message.isReplyRequired())
             m_connection.send(message.createErrorReply(QLatin1String(error), toQt(why)));
     }
@@ -142,62 +149,100 @@ private:
             refuse(message, taken.error()->description());
             return;
         }
-        const auto number = launch(std::move(request), fromQt(message.service()));
-        if (!number) {
-            refuse(message, number.error());
-            return;
-        }
-        answer(message, {QVariant::fromValue(QDBusObjectPath(pathOf(number.value())))});
+        launch(std::move(request), fromQt(message.service()), true,
+               [=, this](const base::Result<std::uint64_t>& session) {
+                   if (session)
+                       answer(message, {QVariant::fromValue(QDBusObjectPath(pathOf(session.value())))});
+                   else
+                       refuse(message, session.error());
+               });
     }
 
     void open(const QDBusMessage& message)
     {
         const auto data = qdbus_cast<QVariantMap>(message.arguments().at(1));
-        base::ErrorRef error;
-        for (const QString& uri : message.arguments().at(0).toStringList()) {
+        const QStringList uris = message.arguments().at(0).toStringList();
+        if (uris.isEmpty())
+            answer(message);
+        struct Answers {
+            qsizetype missing;
+            base::ErrorRef error;
+        };
+        const auto answers = std::make_shared<Answers>(Answers{uris.size(), nullptr});
+        for (const QString& uri : uris) {
             const auto url = base::Url::fromString(fromQt(uri));
             EditRequest request;
             request.moviePath = url && url->isFile() ? url->path() : fromQt(uri);
             takePlatformData(data, request);
-            const auto number = launch(std::move(request), {});
-            if (!number)
-                error = number.error();
+            launch(std::move(request), fromQt(message.service()), false,
+                   [=, this](const base::Result<std::uint64_t>& session) {
+                       if (!session)
+                           answers->error = session.error();
+                       if (--answers->missing > 0)
+                           return;
+                       if (answers->error)
+                           refuse(message, answers->error);
+                       else
+                           answer(message);
+                   });
         }
-        if (error)
-            refuse(message, error);
-        else
-            answer(message);
     }
 
-    base::Result<std::uint64_t> launch(EditRequest request, std::string caller)
+    base::Result<void> mayLaunchFor(const std::string& caller) const
     {
         if (m_closing)
             return base::Error::make(kErrorDomain, kNotConnected, "Clipsa is being closed");
+        const auto isTheirs = [&](const auto& entry) { return entry.second.caller == caller; };
+        if (std::count_if(m_sessions.begin(), m_sessions.end(), isTheirs) >= kMaximumSessions)
+            return base::Error::make(kErrorDomain, kRefused,
+                                     "you have " + std::to_string(kMaximumSessions)
+                                         + " recordings open in Clipsa; close one of them first");
+        return {};
+    }
+
+    void launch(EditRequest request, std::string caller, bool isCallers, Answer whenStarted)
+    {
+        if (const auto may = mayLaunchFor(caller); !may) {
+            whenStarted(may.error());
+            return;
+        }
         const std::uint64_t number = ++m_lastSession;
         EditorEvents events;
+        events.started = [this, number](const base::Result<void>& started) {
+            const Answer tellCaller = std::exchange(m_sessions.at(number).answer, {});
+            if (started) {
+                tellCaller(number);
+                return;
+            }
+            tellCaller(started.error());
+            forgetLater(number);
+        };
         events.completed = [this, number](const std::vector<std::string>& activityTypes) {
             tell(number, QStringLiteral("Completed"), toQt(activityTypes));
         };
         events.ended = [this, number](const std::string& failure) {
             if (!failure.empty())
                 tell(number, QStringLiteral("Failed"), toQt(failure));
-            // Later: the editor that calls us is destroyed with its session.
-            QMetaObject::invokeMethod(
-                this, [this, number] { forget(number); }, Qt::QueuedConnection);
+            forgetLater(number);
         };
-        auto editor = m_launcher(std::move(request), std::move(events));
-        if (!editor)
-            return editor.error();
         m_idle.stop();
-        watch(caller);
-        m_sessions.emplace(number, Session{std::move(caller), std::move(editor).value()});
-        return number;
+        if (isCallers)
+            watch(caller);
+        auto editor = m_launcher(std::move(request), std::move(events));
+        m_sessions.emplace(number, Session{std::move(caller), isCallers, std::move(whenStarted), std::move(editor)});
+    }
+
+    /// The editor that calls us is destroyed with its session.
+    void forgetLater(std::uint64_t number)
+    {
+        QMetaObject::invokeMethod(
+            this, [this, number] { forget(number); }, Qt::QueuedConnection);
     }
 
     void tell(std::uint64_t number, const QString& signal, const QVariant& value)
     {
         const auto session = m_sessions.find(number);
-        if (session == m_sessions.end() || session->second.caller.empty())
+        if (session == m_sessions.end() || !session->second.isCallers)
             return;
         auto message = QDBusMessage::createTargetedSignal(toQt(session->second.caller), pathOf(number),
                                                           QLatin1String(kSessionInterface), signal);
@@ -212,8 +257,8 @@ private:
         const std::string& caller = session.mapped().caller;
         bool watched = false;
         for (const auto& [other, living] : m_sessions)
-            watched |= living.caller == caller;
-        if (!watched && !caller.empty())
+            watched |= living.isCallers && living.caller == caller;
+        if (!watched)
             m_callers.removeWatchedService(toQt(caller));
         if (!m_sessions.empty())
             return;
@@ -225,7 +270,7 @@ private:
 
     void watch(const std::string& caller)
     {
-        if (caller.empty() || m_callers.watchedServices().contains(toQt(caller)))
+        if (m_callers.watchedServices().contains(toQt(caller)))
             return;
         m_callers.addWatchedService(toQt(caller));
         // It may have left before we watched; then nobody says so any more.
@@ -244,7 +289,7 @@ private:
     void callerLeft(const QString& name)
     {
         for (const auto& [number, session] : m_sessions)
-            if (session.caller == fromQt(name))
+            if (session.isCallers && session.caller == fromQt(name))
                 session.editor->close();
     }
 
@@ -254,7 +299,7 @@ private:
         if (!number)
             return false;
         const Session& session = m_sessions.at(*number);
-        if (session.caller != fromQt(message.service())) {
+        if (!session.isCallers || session.caller != fromQt(message.service())) {
             refuse(message, "only the recorder that asked for a session can close it");
             return true;
         }

@@ -21,18 +21,25 @@ public:
     class Editor {
     public:
         virtual ~Editor() = default;
-        /// Asks it to go; its `ended` follows.
+        /// Asks it to go: its `ended` follows, or an error as `started`.
         virtual void close() = 0;
     };
 
+    /// On the service's thread; none before the launcher has returned.
     struct EditorEvents {
+        /// The first, and the only one when there is an error: no editor could be started. One of kBadInputDomain is
+        /// told to the caller as its own.
+        std::function<void(const base::Result<void>& started)> started;
         std::function<void(const std::vector<std::string>& activityTypes)> completed;
         /// The last; `failure` says why the user did not get to finish, and is empty after `completed`.
         std::function<void(const std::string& failure)> ended;
     };
 
-    /// Starts an editor. An error of kBadInputDomain is told to the caller as its own.
-    using Launcher = std::function<base::Result<std::unique_ptr<Editor>>(EditRequest request, EditorEvents events)>;
+    /// Begins to start an editor. Must not wait for the caller's files, which can be as slow as they like.
+    using Launcher = std::function<std::unique_ptr<Editor>(EditRequest request, EditorEvents events)>;
+
+    /// The most sessions that a caller can have at a time; a call for another is refused.
+    static constexpr int kMaximumSessions = 8;
 
     /// `whenIdle` is called when there has been nothing to do for `idle`, and the name has been given back.
     static base::Result<std::unique_ptr<RecorderService>> start(Launcher launcher, std::chrono::milliseconds idle,

@@ -1,11 +1,14 @@
 // The service as it is installed: started by its bus for the first recorder that calls it.
+#include "linux/posix/FileDescriptor.h"
 #include "support/Paths.h"
 #include "support/PrivateBus.h"
 #include "support/Program.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <gmock/gmock.h>
 
 #include <sys/stat.h>
+#include <thread>
 
 using testing::AllOf;
 using testing::ElementsAre;
@@ -22,7 +25,7 @@ const std::string kPython = "/usr/bin/python3"; // whose modules are the system'
 class Service : public ::testing::Test {
 protected:
     /// A bus that knows our service file; what it starts has the variables of this process.
-    void startBus(const std::string& script)
+    void startBus(const std::string& script, const std::vector<tests::RefusedSystemCall>& slow = {})
     {
         std::string file = tests::PrivateDirectory::read(tests::sourceFile("packaging/org.clipsa.Clipsa.service.in"));
         const std::string variable = "@CMAKE_INSTALL_FULL_BINDIR@";
@@ -34,7 +37,12 @@ protected:
         ::setenv("XDG_CACHE_HOME", m_cache.c_str(), 1);
         ::setenv("CLIPSA_EDITOR", tests::program("fake-editor").c_str(), 1);
         ::setenv("FAKE_EDITOR", script.c_str(), 1);
-        m_bus.emplace();
+        // What the bus starts is held up as the thread is that started the bus.
+        std::thread([&] {
+            if (!slow.empty())
+                m_heldUp = posix::FileDescriptor(tests::holdUpSystemCalls(slow));
+            m_bus.emplace();
+        }).join();
     }
 
     void expectSuccess(const std::vector<std::string>& words)
@@ -62,8 +70,23 @@ protected:
     std::filesystem::path m_movie = m_directory.write("my game.mp4", "moving pictures");
     std::filesystem::path m_cache = m_directory.path() / "cache";
     std::string m_output;
+    posix::FileDescriptor m_heldUp;
     std::optional<tests::PrivateBus> m_bus;
 };
+
+TEST_F(Service, ReadsNobodysFileWhereItServesTheOthers)
+{
+    // Looking at a movie's first bytes, to find a name for it.
+    startBus("finish= wait", {{SYS_pread64, tests::kHeldUp, 2, 64, true}});
+    expectScenario("slow_file");
+}
+
+TEST_F(Service, WaitsForNoCopyThatNobodyWants)
+{
+    startBus("wait", {{SYS_linkat, EXDEV}, tests::noReflinks(), {SYS_copy_file_range, tests::kHeldUp}});
+    expectScenario("slow_copy");
+    EXPECT_TRUE(std::filesystem::is_empty(m_cache / "clipsa")) << "what was copied is left behind";
+}
 
 TEST_F(Service, TellsEachRecorderOfItsOwnSessionsAlone)
 {

@@ -6,6 +6,7 @@ Fails with a traceback when the service does not keep a promise.
 """
 
 import os
+import signal
 import sys
 
 import dbus
@@ -142,6 +143,48 @@ def open_uris():
     application = dbus.Interface(BusConnection(ADDRESS).get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"),
                                  "org.freedesktop.Application")
     application.Open(["file://" + MOVIE.replace(" ", "%20")], dbus.Dictionary({}, signature="sv"))
+
+
+def start_edit(recorder, **options):
+    """Edit without waiting; the replies and errors come into the list that it gives."""
+    answers = []
+    with open(MOVIE, "rb") as movie:
+        recorder.recorder.Edit(dbus.types.UnixFd(movie), dbus.Dictionary(options, signature="sv"),
+                               reply_handler=answers.append, error_handler=answers.append)
+    return answers
+
+
+def expect_leaving_after_sigterm(bus):
+    service = dbus.Interface(bus.get_object("org.freedesktop.DBus", "/org/freedesktop/DBus"), "org.freedesktop.DBus")
+    process = service.GetConnectionUnixProcessID("org.clipsa.Clipsa")
+    os.kill(process, signal.SIGTERM)
+    while service.NameHasOwner("org.clipsa.Clipsa"):
+        pass
+
+
+def slow_file():
+    """The file of one cannot be read; the others do not notice, and the service leaves all the same."""
+    slow, quick = Recorder(), Recorder()
+    answers = start_edit(slow)
+    quick.edit(name="a.mp4")
+    until(lambda: quick.signals)
+    assert quick.signals[0][1] == "Completed", quick.signals
+    slow.round_trip()
+    assert answers == [], answers
+    expect_leaving_after_sigterm(quick.bus)
+    until(lambda: answers)
+    assert "closed" in str(answers[0]), answers
+
+
+def slow_copy():
+    """Copying does not come to an end; the session does."""
+    recorder = Recorder()
+    session = recorder.edit(name="a.mp4")
+    dbus.Interface(recorder.bus.get_object("org.clipsa.Clipsa", session, introspect=False),
+                   "org.clipsa.RecorderSession1").Close()
+    until(lambda: recorder.signals)
+    assert recorder.signals == [(session, "Failed", "the editor was closed")], recorder.signals
+    expect_leaving_after_sigterm(recorder.bus)
 
 
 globals()[SCENARIO]()

@@ -16,6 +16,7 @@
 
 #include <gmock/gmock.h>
 
+#include <cerrno>
 #include <fcntl.h>
 #include <map>
 #include <optional>
@@ -24,6 +25,7 @@
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::Not;
 using testing::StartsWith;
 
 namespace {
@@ -74,6 +76,13 @@ public:
         return pending.reply();
     }
 
+    QDBusPendingCall startEdit(const QDBusUnixFileDescriptor& movie)
+    {
+        auto message = QDBusMessage::createMethodCall(kService, kPath, QStringLiteral("org.clipsa.Recorder1"),
+                                                      QStringLiteral("Edit"));
+        return bus.asyncCall(message << QVariant::fromValue(movie) << QVariantMap());
+    }
+
     QString introspect(const QString&) const override { return {}; }
     bool handleMessage(const QDBusMessage&, const QDBusConnection&) override { return false; }
 
@@ -90,13 +99,16 @@ protected:
     void serve(std::chrono::milliseconds idle = std::chrono::hours(1))
     {
         auto service = dbus::RecorderService::start(
-            [this](dbus::EditRequest request, dbus::RecorderService::EditorEvents events)
-                -> base::Result<std::unique_ptr<dbus::RecorderService::Editor>> {
-                if (m_refusal)
-                    return m_refusal;
-                m_editors.push_back(
-                    std::make_shared<PaperEditor>(PaperEditor{std::move(request), std::move(events), false, false}));
-                return std::unique_ptr<dbus::RecorderService::Editor>(std::make_unique<Editor>(m_editors.back()));
+            [this](dbus::EditRequest request, dbus::RecorderService::EditorEvents events) {
+                const auto editor =
+                    std::make_shared<PaperEditor>(PaperEditor{std::move(request), std::move(events), false, false});
+                m_editors.push_back(editor);
+                const auto tell = [editor, started = m_refusal ? base::Result<void>(m_refusal) : base::Result<void>()] {
+                    editor->events.started(started);
+                };
+                if (!m_isSlow)
+                    QMetaObject::invokeMethod(&m_context, tell, Qt::QueuedConnection);
+                return std::make_unique<Editor>(editor);
             },
             idle, [this] { ++m_idle; });
         ASSERT_TRUE(service) << service.error()->description();
@@ -124,7 +136,9 @@ protected:
     tests::PrivateDirectory m_directory;
     std::vector<std::shared_ptr<PaperEditor>> m_editors;
     base::ErrorRef m_refusal;
+    bool m_isSlow = false; ///< the test itself says when an editor has started
     int m_idle = 0;
+    QObject m_context;
     std::unique_ptr<dbus::RecorderService> m_service;
 };
 
@@ -198,6 +212,58 @@ TEST_F(Recorders, AreToldWhenThereIsNoEditorToBeHad)
     const auto reply = edit(caller);
     EXPECT_EQ(reply.errorName().toStdString(), "org.clipsa.Error.Failed");
     EXPECT_EQ(reply.errorMessage().toStdString(), "no space left");
+}
+
+TEST_F(Recorders, WaitForTheirOwnSlowFilesOnly)
+{
+    serve();
+    Caller slow;
+    m_isSlow = true;
+    QDBusPendingCallWatcher reply(slow.startEdit(movie()));
+    ASSERT_TRUE(tests::pumpUntil([&] { return m_editors.size() == 1; }));
+    m_isSlow = false;
+    Caller quick;
+    EXPECT_THAT(sessionOf(edit(quick)).toStdString(), StartsWith("/org/clipsa/Clipsa/session/"));
+    EXPECT_FALSE(reply.isFinished());
+
+    m_editors[0]->events.started({});
+    EXPECT_TRUE(tests::pumpUntil([&] { return reply.isFinished(); }));
+    EXPECT_THAT(sessionOf(reply.reply()).toStdString(), StartsWith("/org/clipsa/Clipsa/session/"));
+}
+
+TEST_F(Recorders, CanLeaveWhileTheirFileIsWaitedFor)
+{
+    serve();
+    Caller caller;
+    m_isSlow = true;
+    QDBusPendingCallWatcher reply(caller.startEdit(movie()));
+    ASSERT_TRUE(tests::pumpUntil([&] { return m_editors.size() == 1; }));
+    caller.leave();
+    caller.bus = QDBusConnection(QStringLiteral("none"));
+    EXPECT_TRUE(tests::pumpUntil([&] { return m_editors[0]->askedToGo; }));
+    m_editors[0]->events.started(base::Error::make("posix", ECANCELED, "the editor was closed"));
+    EXPECT_TRUE(tests::pumpUntil([&] { return m_editors[0]->gone; }));
+}
+
+TEST_F(Recorders, HaveEightSessionsAtMost)
+{
+    serve();
+    Caller caller;
+    for (int i = 0; i < 8; ++i)
+        EXPECT_THAT(sessionOf(edit(caller)).toStdString(), Not(IsEmpty()));
+    const auto refused = edit(caller);
+    EXPECT_EQ(refused.errorName().toStdString(), "org.clipsa.Error.Failed");
+    EXPECT_THAT(refused.errorMessage().toStdString(), HasSubstr("8 recordings open"));
+    const QStringList uris = {QStringLiteral("file:///c.webm")};
+    EXPECT_EQ(caller.call("org.freedesktop.Application", "Open", {uris, QVariantMap{}}).type(),
+              QDBusMessage::ErrorMessage);
+    EXPECT_EQ(m_editors.size(), 8U);
+
+    Caller other;
+    EXPECT_THAT(sessionOf(edit(other)).toStdString(), Not(IsEmpty()));
+    m_editors[3]->events.ended({});
+    EXPECT_TRUE(tests::pumpUntil([&] { return m_editors[3]->gone; }));
+    EXPECT_THAT(sessionOf(edit(caller)).toStdString(), Not(IsEmpty()));
 }
 
 TEST_F(Recorders, AWrongSignatureIsNoCall)

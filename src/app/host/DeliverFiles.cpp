@@ -1,0 +1,64 @@
+#include "app/host/DeliverFiles.h"
+
+#include "app/host/EditorDirectory.h"
+
+#include <cerrno>
+#include <chrono>
+#include <sys/stat.h>
+#include <utility>
+
+namespace host {
+
+namespace {
+
+constexpr std::chrono::seconds kLongCopy{1};
+
+CopyProgress progressFor(const DeliveryEvents& events, DetachedWork::Client& client)
+{
+    return [&, start = std::chrono::steady_clock::now(), told = false](std::uint64_t, std::uint64_t total) mutable {
+        if (!told && std::chrono::steady_clock::now() - start > kLongCopy) {
+            told = true;
+            client.post([copying = events.copying, total] { copying(total); });
+        }
+        return client.isWaiting();
+    };
+}
+
+base::Result<runtime::Value> deliverAttachment(const FileDelivery& delivery, const CopyProgress& progress)
+{
+    if (!delivery.attachment)
+        return runtime::Value(delivery.attachmentPath);
+    const std::string& parent = delivery.attachmentDirectory;
+    if (::mkdir(parent.c_str(), S_IRWXU) != 0)
+        return base::Error::fromErrno(errno, "cannot make " + parent);
+    const auto way = handOver(delivery.attachment.get(), parent, delivery.attachmentName, progress);
+    if (!way)
+        return way.error();
+    return runtime::Value(parent + "/" + delivery.attachmentName);
+}
+
+base::Result<runtime::Value> deliverMovie(const FileDelivery& delivery, const CopyProgress& progress)
+{
+    const auto way = handOver(delivery.movie.get(), delivery.movieDirectory, delivery.movieName, progress);
+    if (!way)
+        return way.error();
+    return runtime::Value(kDeviceMovieDirectory + delivery.movieName);
+}
+
+} // namespace
+
+void deliverFiles(const FileDelivery& delivery, const DeliveryEvents& events, DetachedWork::Client& client)
+{
+    // The attachment first: the movie is the last that the editor waits for.
+    if (delivery.attachmentArrived)
+        client.post([arrived = delivery.attachmentArrived,
+                     path = deliverAttachment(delivery, progressFor(events, client))] { arrived->keep(path); });
+    const auto movie = deliverMovie(delivery, progressFor(events, client));
+    client.post([movie, arrived = delivery.movieArrived, failed = events.failed] {
+        arrived->keep(movie);
+        if (!movie)
+            failed(movie.error());
+    });
+}
+
+} // namespace host
