@@ -4,8 +4,8 @@
 #include "app/host/OpenMovie.h"
 #include "app/host/ServeRecorders.h"
 #include "app/host/StartMediaProgram.h"
+#include "app/host/Streams.h"
 #include "app/host/TakeTour.h"
-#include "app/host/TerminationSignals.h"
 
 #include <QCoreApplication>
 
@@ -47,19 +47,19 @@ int run(const host::VersionCommand&)
 
 int main(int argc, char* argv[])
 {
+    host::keepStandardStreams();
     const auto command = host::parseCommandLine(std::vector<std::string>(argv + 1, argv + argc));
     if (!command) {
-        std::fprintf(stderr, "clipsa: %s\n", command.error()->description().c_str());
+        host::complain(command.error()->description());
         return host::kExitUsage;
     }
-    host::blockTerminationSignals();
     const QCoreApplication application(argc, argv);
-    return std::visit(
+    return host::finishOutput(std::visit(
         [argv](const auto& chosen) {
             if constexpr (std::is_same_v<decltype(chosen), const host::MediaCommand&>)
                 return host::startMediaProgram(argv);
             else
                 return run(chosen);
         },
-        command.value());
+        command.value()));
 }

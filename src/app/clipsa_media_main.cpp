@@ -6,6 +6,7 @@
 #include "app/host/MixMovie.h"
 #include "app/host/ProbeMovie.h"
 #include "app/host/SaveMovie.h"
+#include "app/host/Streams.h"
 #include "app/host/TrimMovie.h"
 
 #include <cstdio>
@@ -44,9 +45,10 @@ int run(const host::SaveCommand& command)
 
 int main(int argc, char* argv[])
 {
+    host::keepStandardStreams();
     const auto command = host::parseCommandLine(std::vector<std::string>(argv + 1, argv + argc));
     if (!command) {
-        std::fprintf(stderr, "clipsa: %s\n", command.error()->description().c_str());
+        host::complain(command.error()->description());
         return host::kExitUsage;
     }
     const auto* chosen = std::get_if<host::MediaCommand>(&command.value());
@@ -54,5 +56,5 @@ int main(int argc, char* argv[])
         std::fputs("clipsa-media: give this to clipsa\n", stderr);
         return host::kExitUsage;
     }
-    return std::visit([](const auto& each) { return run(each); }, *chosen);
+    return host::finishOutput(std::visit([](const auto& each) { return run(each); }, *chosen));
 }

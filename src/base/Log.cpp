@@ -1,5 +1,7 @@
 #include "base/Log.h"
 
+#include "base/Text.h"
+
 #include <algorithm>
 
 namespace base {
@@ -28,8 +30,7 @@ void StreamLog::console(std::string_view text)
 void StreamLog::write(std::string_view prefix, std::string_view text)
 {
     const std::lock_guard lock(m_mutex);
-    std::fprintf(m_stream, "%.*sclipsa: %.*s\n", static_cast<int>(prefix.size()), prefix.data(),
-                 static_cast<int>(text.size()), text.data());
+    std::fprintf(m_stream, "%.*sclipsa: %s\n", static_cast<int>(prefix.size()), prefix.data(), printable(text).c_str());
     std::fflush(m_stream);
 }
 

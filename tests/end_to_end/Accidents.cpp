@@ -80,6 +80,18 @@ TEST_F(Accidents, WhatALivingEditorUsesIsNotSwept)
     EXPECT_THAT(m_machine.remains(), IsEmpty());
 }
 
+TEST_F(Accidents, AHostThatHangsLeavesNoWindowThatDoesNotClose)
+{
+    // Long enough for the host to be stopped before the tap, so that it never learns of it.
+    m_machine.setScript("wait picture\nprint on the screen\npause 1500\ntap Cancel");
+    const auto host = startEditing();
+    host->signal(SIGSTOP);
+    EXPECT_TRUE(waitForEnd(editor(), Child::kDeadline));
+    host->signal(SIGCONT);
+    EXPECT_EQ(host->wait().exitStatus, 0) << "it reads the message when it can";
+    EXPECT_THAT(m_machine.remains(), IsEmpty());
+}
+
 TEST_F(Accidents, AnInterruptedHostTakesItsEditorAlong)
 {
     const auto host = startEditing();

@@ -149,6 +149,7 @@ base::Result<void> EditorProgram::start()
     m_connection->setHostInterface(m_extension.context->hostInterface());
     m_extension.context->setUp(m_platform, m_payload.watched(std::move(items).value()), m_connection);
     m_connection->setDisconnectedHandler([this] { disconnected(); });
+    m_connection->setSentHandler([this] { m_mainQueue.postAfter(kFarewellLimit, [this] { disconnected(); }); });
 
     m_presenter.setTitle("Clipsa");
     m_presenter.setCloseHandler([this] { closeRequested(); });

@@ -34,6 +34,9 @@ class EditorProgram {
 public:
     /// A host that does not hand over its payload in that time gets a window that shows what there is.
     static constexpr base::Instant kPayloadLimit = std::chrono::seconds(1);
+    /// A host that does not close the connection in that time, once it has been told that the user has finished, hangs:
+    /// the window closes without it.
+    static constexpr base::Instant kFarewellLimit = std::chrono::seconds(3);
 
     explicit EditorProgram(const EditorOptions& options);
     ~EditorProgram();

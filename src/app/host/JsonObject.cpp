@@ -1,5 +1,7 @@
 #include "app/host/JsonObject.h"
 
+#include "base/Text.h"
+
 #include <charconv>
 #include <cmath>
 #include <cstddef>
@@ -9,39 +11,27 @@ namespace host {
 
 namespace {
 
-/// The bytes of the character at `at`; 0 when they are not UTF-8.
-std::size_t lengthOf(std::string_view text, std::size_t at)
+std::string escaped(char character)
 {
-    const auto byte = [&](std::size_t i) { return static_cast<unsigned char>(i < text.size() ? text[i] : 0); };
-    const unsigned char first = byte(at);
-    const std::size_t length = first < 0x80                     ? 1
-                               : first >= 0xC2 && first <= 0xDF ? 2
-                               : (first & 0xF0) == 0xE0         ? 3
-                               : first >= 0xF0 && first <= 0xF4 ? 4
-                                                                : 0;
-    for (std::size_t i = 1; i < length; ++i)
-        if ((byte(at + i) & 0xC0) != 0x80)
-            return 0;
-    const unsigned char second = byte(at + 1);
-    const bool isWrong = (first == 0xE0 && second < 0xA0) || (first == 0xED && second > 0x9F)
-                         || (first == 0xF0 && second < 0x90) || (first == 0xF4 && second > 0x8F);
-    return isWrong ? 0 : length;
+    char escape[8];
+    std::snprintf(escape, sizeof escape, "\\u%04x", static_cast<unsigned>(static_cast<unsigned char>(character)));
+    return escape;
 }
 
 std::string quoted(std::string_view text)
 {
     std::string result = "\"";
     for (std::size_t at = 0; at < text.size();) {
-        const std::size_t length = lengthOf(text, at);
+        const std::size_t length = base::characterLength(text.substr(at));
         const char first = text[at];
         if (length == 0) {
             result += "\uFFFD";
         } else if (first == '"' || first == '\\') {
             result += {'\\', first};
-        } else if (static_cast<unsigned char>(first) < 0x20) {
-            char escape[8];
-            std::snprintf(escape, sizeof escape, "\\u%04x", static_cast<unsigned>(first));
-            result += escape;
+        } else if (static_cast<unsigned char>(first) < 0x20 || first == 0x7F) {
+            result += escaped(first);
+        } else if (length == 2 && first == '\xC2' && static_cast<unsigned char>(text[at + 1]) < 0xA0) {
+            result += escaped(text[at + 1]); // U+0080 to U+009F, which terminals obey
         } else {
             result += text.substr(at, length);
         }

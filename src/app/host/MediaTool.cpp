@@ -2,38 +2,25 @@
 
 #include "app/host/ExitStatus.h"
 #include "app/host/InputFile.h"
+#include "app/host/Streams.h"
+#include "app/host/TerminationSignals.h"
 #include "linux/dbus/EditRequest.h"
 #include "linux/ffmpeg/FFmpegMediaFramework.h"
 
 #include <algorithm>
 #include <cerrno>
 #include <chrono>
-#include <csignal>
 #include <cstdint>
-#include <cstdio>
 #include <filesystem>
 #include <optional>
 #include <poll.h>
 #include <sys/eventfd.h>
-#include <sys/signalfd.h>
-#include <unistd.h>
 
 namespace host {
 
 namespace {
 
 constexpr base::Instant kMeanwhile = std::chrono::milliseconds(100);
-
-/// The signals as something to poll for; from its beginning on they end nothing by themselves.
-posix::FileDescriptor openSignals()
-{
-    sigset_t signals;
-    ::sigemptyset(&signals);
-    for (const int number : {SIGINT, SIGTERM, SIGHUP})
-        ::sigaddset(&signals, number);
-    ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
-    return posix::FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
-}
 
 /// For poll(), rounded up: who is woken too early would spin.
 int milliseconds(base::Instant time)
@@ -45,9 +32,8 @@ int milliseconds(base::Instant time)
 } // namespace
 
 struct MediaTool::Machine {
-    posix::FileDescriptor signals = openSignals();
+    TerminationWatch signals;
     posix::FileDescriptor woken{::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)};
-    int interruption = 0;
 
     base::SystemClock clock;
     base::MemoryLog log;
@@ -67,14 +53,13 @@ struct MediaTool::Machine {
 
     void wait(std::optional<base::Instant> limit)
     {
-        pollfd inputs[] = {{woken.get(), POLLIN, 0}, {signals.get(), POLLIN, 0}};
+        // Who was interrupted only finishes what is under way, and is woken by that alone.
+        const bool isInterrupted = signals.arrived() != 0;
+        pollfd inputs[] = {{woken.get(), POLLIN, 0}, {isInterrupted ? -1 : signals.descriptor(), POLLIN, 0}};
         if (::poll(inputs, std::size(inputs), limit ? milliseconds(*limit) : -1) <= 0)
             return;
         eventfd_t ignored = 0;
         ::eventfd_read(woken.get(), &ignored);
-        signalfd_siginfo information = {};
-        if (::read(signals.get(), &information, sizeof information) == sizeof information)
-            interruption = static_cast<int>(information.ssi_signo);
     }
 };
 
@@ -97,7 +82,7 @@ void MediaTool::tellLog(base::MemoryLog::Line::Kind kind)
     const auto lines = m_machine->log.lines();
     for (std::size_t& i = m_machine->told; i < lines.size(); ++i)
         if (lines[i].kind == kind)
-            std::fprintf(stderr, "clipsa: %s\n", lines[i].text.c_str());
+            complain(lines[i].text);
 }
 
 base::Result<std::shared_ptr<platform::Asset>> MediaTool::open(const std::string& path)
@@ -121,7 +106,7 @@ bool MediaTool::runUntil(const std::function<bool()>& done, const std::function<
 {
     Machine& machine = *m_machine;
     base::Instant next = machine.clock.now();
-    while (machine.interruption == 0) {
+    while (machine.signals.arrived() == 0) {
         machine.mainQueue.runDue();
         if (done())
             return true;
@@ -169,14 +154,14 @@ void MediaTool::finishWork()
 
 int MediaTool::interruption() const
 {
-    return m_machine->interruption;
+    return m_machine->signals.arrived();
 }
 
 int MediaTool::fail(const base::ErrorRef& error) const
 {
-    if (m_machine->interruption != 0)
-        return 128 + m_machine->interruption;
-    std::fprintf(stderr, "clipsa: %s\n", error->description().c_str());
+    if (interruption() != 0)
+        return 128 + interruption();
+    complain(error->description());
     return error->domain() == dbus::kBadInputDomain ? kExitUsage : kExitFailed;
 }
 

@@ -3,6 +3,7 @@
 #include "app/host/EditorDirectory.h"
 #include "app/host/EditorSession.h"
 #include "app/host/PrepareRequest.h"
+#include "app/host/Streams.h"
 #include "app/host/TerminationSignals.h"
 
 #include <QCoreApplication>
@@ -16,11 +17,6 @@
 namespace host {
 
 namespace {
-
-void complain(const std::string& text)
-{
-    std::fprintf(stderr, "clipsa: %s\n", text.c_str());
-}
 
 void print(const std::vector<std::string>& activityTypes, const OpenCommand& command, const std::string& movie)
 {
@@ -89,6 +85,12 @@ int openMovie(const OpenCommand& command, OpenVariation variation)
         return kExitFailed;
     }
 
+    std::unique_ptr<EditorSession> session;
+    int interruptedBy = 0;
+    const TerminationSignals signals([&](int number) {
+        interruptedBy = number;
+        session->close();
+    });
     int status = kExitFailed;
     EditorSession::Handlers handlers;
     handlers.finished = std::move(variation.finished);
@@ -102,16 +104,12 @@ int openMovie(const OpenCommand& command, OpenVariation variation)
         status = exitStatus(outcome, movie);
         QCoreApplication::exit();
     };
-    auto session = EditorSession::start(std::move(request), {program.value(), root.value()}, std::move(handlers));
-    if (!session) {
-        complain(session.error()->description());
+    auto started = EditorSession::start(std::move(request), {program.value(), root.value()}, std::move(handlers));
+    if (!started) {
+        complain(started.error()->description());
         return kExitFailed;
     }
-    int interruptedBy = 0;
-    const TerminationSignals signals([&](int number) {
-        interruptedBy = number;
-        session.value()->close();
-    });
+    session = std::move(started).value();
     QCoreApplication::exec();
     return interruptedBy != 0 && status != kExitDone ? 128 + interruptedBy : status;
 }

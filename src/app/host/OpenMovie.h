@@ -11,8 +11,8 @@
 
 namespace host {
 
-/// Results go to standard output, all else to standard error. Needs a QCoreApplication, and a thread on which SIGINT,
-/// SIGTERM and SIGHUP have been blocked before any other was started; they close the editor.
+/// Results go to standard output, all else to standard error. Needs a QCoreApplication, and the only thread. SIGINT,
+/// SIGTERM and SIGHUP close the editor; before there is one they end the process at once.
 int openMovie(const OpenCommand& command);
 
 /// What a tour has differently.

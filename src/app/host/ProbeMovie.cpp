@@ -3,6 +3,7 @@
 #include "app/host/ExitStatus.h"
 #include "app/host/JsonObject.h"
 #include "app/host/MediaTool.h"
+#include "base/Text.h"
 #include "linux/ffmpeg/FFmpegAsset.h"
 
 #include <atomic>
@@ -29,7 +30,7 @@ namespace {
 
 std::string line(const std::string& what, const std::string& text)
 {
-    return formatted("%-11s", what.c_str()) + text + "\n";
+    return formatted("%-11s", what.c_str()) + base::printable(text) + "\n";
 }
 
 std::string bitRate(std::int64_t rate)

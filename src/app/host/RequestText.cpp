@@ -1,32 +1,12 @@
 #include "app/host/RequestText.h"
 
+#include "base/Text.h"
 #include "linux/dbus/EditRequest.h"
 #include "linux/dbus/Protocol.h"
 
 namespace host {
 
 namespace {
-
-/// The length of the UTF-8 character that `text` begins with; 0 when it begins with none.
-std::size_t characterLength(std::string_view text)
-{
-    const auto byte = [text](std::size_t i) { return static_cast<unsigned char>(text[i]); };
-    const std::size_t length = byte(0) < 0x80                      ? 1
-                               : byte(0) >= 0xC2 && byte(0) < 0xE0 ? 2
-                               : byte(0) >= 0xE0 && byte(0) < 0xF0 ? 3
-                               : byte(0) >= 0xF0 && byte(0) < 0xF5 ? 4
-                                                                   : 0;
-    if (length > text.size())
-        return 0;
-    for (std::size_t i = 1; i < length; ++i)
-        if ((byte(i) & 0xC0) != 0x80)
-            return 0;
-    // Neither longer than needed, nor half a surrogate pair, nor beyond the last character.
-    if ((byte(0) == 0xE0 && byte(1) < 0xA0) || (byte(0) == 0xED && byte(1) > 0x9F)
-        || (byte(0) == 0xF0 && byte(1) < 0x90) || (byte(0) == 0xF4 && byte(1) > 0x8F))
-        return 0;
-    return length;
-}
 
 bool isControl(char character)
 {
@@ -38,7 +18,7 @@ template <typename Replace> std::string rewritten(std::string_view text, std::si
 {
     std::string result;
     while (!text.empty()) {
-        const std::size_t length = characterLength(text);
+        const std::size_t length = base::characterLength(text);
         const std::string_view piece = length == 0 ? std::string_view("_") : replace(text.substr(0, length));
         if (result.size() + piece.size() > limit)
             break;
@@ -55,7 +35,7 @@ base::Result<void> checkText(std::string_view text, const std::string& what)
     if (text.size() > dbus::kMaximumTextSize)
         return base::Error::make(dbus::kBadInputDomain, dbus::kTooLarge, what + " is longer than 1 MiB; shorten it");
     for (std::string_view rest = text; !rest.empty();) {
-        const std::size_t length = characterLength(rest);
+        const std::size_t length = base::characterLength(rest);
         if (length == 0 || rest.front() == '\0')
             return base::Error::make(dbus::kBadInputDomain, dbus::kBadArgument, what + " is not UTF-8 text");
         rest.remove_prefix(length);

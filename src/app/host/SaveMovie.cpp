@@ -4,6 +4,7 @@
 #include "app/host/ExitStatus.h"
 #include "app/host/MediaTool.h"
 #include "app/host/ProgressBar.h"
+#include "app/host/Streams.h"
 #include "linux/photos/VideoLibrary.h"
 #include "linux/xdg/FileManager.h"
 
@@ -127,8 +128,8 @@ base::Result<std::string> save(MediaTool& tool, const SaveCommand& command, Prog
     progress.clear();
     tool.tellLog(base::MemoryLog::Line::Kind::Message); // what is left out of the mix
     if (error) {
-        std::fprintf(stderr, "clipsa: the sound of %s cannot be mixed (%s); it is saved as it is\n",
-                     command.movie.c_str(), error->description().c_str());
+        complain("the sound of " + command.movie + " cannot be mixed (" + error->description()
+                 + "); it is saved as it is");
         std::error_code ignored; // a relative path was opened a moment ago
         movie = fs::absolute(command.movie, ignored).native();
     }

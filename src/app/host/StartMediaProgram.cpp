@@ -1,11 +1,12 @@
 #include "app/host/StartMediaProgram.h"
 
 #include "app/host/ExitStatus.h"
+#include "app/host/Streams.h"
 
 #include <cerrno>
-#include <cstdio>
 #include <cstring>
 #include <filesystem>
+#include <string>
 #include <system_error>
 #include <unistd.h>
 
@@ -19,11 +20,11 @@ int startMediaProgram(char* const words[])
         ::execv(program.c_str(), words);
         if (errno != ENOENT && errno != ENOTDIR) {
             // NOLINTNEXTLINE(concurrency-mt-unsafe): there is one thread
-            std::fprintf(stderr, "clipsa: cannot start %s: %s\n", program.c_str(), std::strerror(errno));
+            complain("cannot start " + program.native() + ": " + std::strerror(errno));
             return kExitFailed;
         }
     }
-    std::fputs("clipsa: there is no clipsa-media beside this program; install Clipsa again\n", stderr);
+    complain("there is no clipsa-media beside this program; install Clipsa again");
     return kExitFailed;
 }
 

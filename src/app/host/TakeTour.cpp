@@ -1,6 +1,8 @@
 #include "app/host/TakeTour.h"
 
 #include "app/host/OpenMovie.h"
+#include "app/host/Streams.h"
+#include "base/Text.h"
 
 #include <cerrno>
 #include <cstdio>
@@ -68,7 +70,7 @@ std::vector<ReportLine> readReport(const fs::path& file)
 
 void say(const std::string& what, const std::string& text)
 {
-    std::printf("%-10s%s\n", what.c_str(), text.c_str());
+    std::printf("%-10s%s\n", what.c_str(), base::printable(text).c_str());
 }
 
 /// False when a picture that was reported is not there.
@@ -112,8 +114,7 @@ int takeTour(const TourCommand& command)
     if (!error && ::access(folder.c_str(), W_OK) != 0)
         error = {errno, std::generic_category()};
     if (error) {
-        std::fprintf(stderr, "clipsa: cannot write pictures into %s: %s\n", command.output.c_str(),
-                     error.message().c_str());
+        complain("cannot write pictures into " + command.output + ": " + error.message());
         return kExitUsage;
     }
 

@@ -3,6 +3,9 @@
 #include <QSocketNotifier>
 
 #include <csignal>
+#include <iterator>
+#include <poll.h>
+#include <sys/eventfd.h>
 #include <sys/signalfd.h>
 #include <unistd.h>
 #include <utility>
@@ -11,33 +14,55 @@ namespace host {
 
 namespace {
 
-sigset_t terminationSignals()
+posix::FileDescriptor blockAndOpenSignals()
 {
     sigset_t signals;
     ::sigemptyset(&signals);
     for (const int number : {SIGINT, SIGTERM, SIGHUP})
         ::sigaddset(&signals, number);
-    return signals;
+    ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
+    return posix::FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
 }
 
 } // namespace
 
-void blockTerminationSignals()
+TerminationWatch::TerminationWatch()
+    : m_signals(blockAndOpenSignals()), m_told(::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)),
+      m_ending(::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)), m_thread([this] { run(); })
 {
-    const sigset_t signals = terminationSignals();
-    ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
+}
+
+TerminationWatch::~TerminationWatch()
+{
+    ::eventfd_write(m_ending.get(), 1);
+    m_thread.join();
+}
+
+void TerminationWatch::run()
+{
+    for (;;) {
+        pollfd inputs[] = {{m_ending.get(), POLLIN, 0}, {m_signals.get(), POLLIN, 0}};
+        ::poll(inputs, std::size(inputs), -1);
+        if (inputs[0].revents != 0)
+            return;
+        signalfd_siginfo information = {};
+        if (::read(m_signals.get(), &information, sizeof information) != sizeof information)
+            continue;
+        const int number = static_cast<int>(information.ssi_signo);
+        if (m_arrived != 0)
+            ::_exit(128 + number); // whatever the others are waiting for
+        m_arrived = number;
+        ::eventfd_write(m_told.get(), 1);
+    }
 }
 
 TerminationSignals::TerminationSignals(std::function<void(int number)> arrived)
+    : m_notifier(std::make_unique<QSocketNotifier>(m_watch.descriptor(), QSocketNotifier::Read))
 {
-    const sigset_t signals = terminationSignals();
-    m_descriptor = posix::FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
-    m_notifier = std::make_unique<QSocketNotifier>(m_descriptor.get(), QSocketNotifier::Read);
     QObject::connect(m_notifier.get(), &QSocketNotifier::activated, m_notifier.get(),
-                     [descriptor = m_descriptor.get(), arrived = std::move(arrived)] {
-                         signalfd_siginfo information = {};
-                         if (::read(descriptor, &information, sizeof information) == sizeof information)
-                             arrived(static_cast<int>(information.ssi_signo));
+                     [this, arrived = std::move(arrived)] {
+                         m_notifier->setEnabled(false);
+                         arrived(m_watch.arrived());
                      });
 }
 

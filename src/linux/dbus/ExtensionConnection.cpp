@@ -37,7 +37,25 @@ struct ExtensionConnection::Shared {
     std::unique_ptr<ExtensionLink> link;
     platform::ConnectionInterface hostInterface;
     std::function<void()> disconnected;
+    std::function<void()> sent;
     bool hasEnded = false;
+
+    /// With the mutex held. Any thread; the handler runs as the other one does.
+    static void tellSent(const std::shared_ptr<Shared>& shared)
+    {
+        shared->mainQueue.post([weak = std::weak_ptr(shared)] {
+            const auto self = weak.lock();
+            if (!self)
+                return;
+            std::function<void()> handler;
+            {
+                const std::lock_guard lock(self->mutex);
+                handler = self->sent;
+            }
+            if (handler)
+                handler();
+        });
+    }
 
     /// With the mutex held. Any thread; the handler runs on the main queue, and not when the connection was destroyed.
     static void tellIfEnded(const std::shared_ptr<Shared>& shared)
@@ -126,6 +144,7 @@ private:
         };
         if (!shared->link || !shared->link->send(call, failed))
             return base::Error::make(kErrorDomain, kNotConnected, "there is no connection to the host");
+        Shared::tellSent(shared);
         return nullptr;
     }
 
@@ -157,6 +176,7 @@ ExtensionConnection::~ExtensionConnection()
         const std::lock_guard lock(m_shared->mutex);
         link = std::move(m_shared->link);
         m_shared->disconnected = {};
+        m_shared->sent = {};
     }
     // Ended without the mutex: completions run now, and may ask for more.
     link.reset();
@@ -191,6 +211,12 @@ void ExtensionConnection::setDisconnectedHandler(std::function<void()> handler)
     const std::lock_guard lock(m_shared->mutex);
     m_shared->disconnected = std::move(handler);
     Shared::tellIfEnded(m_shared);
+}
+
+void ExtensionConnection::setSentHandler(std::function<void()> handler)
+{
+    const std::lock_guard lock(m_shared->mutex);
+    m_shared->sent = std::move(handler);
 }
 
 base::Result<std::vector<platform::InputItem>> ExtensionConnection::inputItems()

@@ -35,6 +35,9 @@ public:
     /// Called once, when the host has gone or has closed the connection; at once when that is already so.
     void setDisconnectedHandler(std::function<void()> handler);
 
+    /// Called for each message that the host has been sent, whether it takes it or not.
+    void setSentHandler(std::function<void()> handler);
+
     /// What the host hands over; fetched once, then remembered. Contents are loaded by the attachments: they complete
     /// on a worker of the connection, each when its answer has come: usually, but not always, in the order in which they
     /// were asked for. Text is a `std::string`, a colour a `platform::Color`; anything else,
