@@ -139,6 +139,49 @@ TEST(VideoPlan, EndsACopyWhereNoPictureIsHeldBack)
     EXPECT_EQ(plan("0J 1 2+ 3 4 5", 0, 4).copyTo, 2);
 }
 
+TEST(VideoPlan, CopiesHeldBackPicturesWhereNothingIsCutBehindThem)
+{
+    const auto found = plan("0J+ 1 2 3+ 4 5", 0, 100);
+    ASSERT_TRUE(found.copies()) << found.reason;
+    EXPECT_FALSE(found.copyTo);
+    EXPECT_EQ(found.lastCopied, 5);
+    EXPECT_THAT(found.tail, IsEmpty());
+    EXPECT_FALSE(plan("0J 1 2 3J+ 4 5", 1, 6).copyTo);
+    // An edit list cuts, too.
+    EXPECT_EQ(plan("0J 1 2+ 3 4H", 0, 100).copyTo, 2);
+}
+
+TEST(VideoPlan, FindsWhereAnEditListLeavesOutPicturesOnTheWay)
+{
+    const auto gaps = [](const std::string& words) {
+        std::vector<std::pair<std::int64_t, std::int64_t>> found;
+        const auto all = ffmpeg::findGaps(window(words).packets);
+        EXPECT_TRUE(all);
+        for (const auto& each : all.value_or(std::vector<ffmpeg::VideoGap>{}))
+            found.emplace_back(each.firstPts, each.joint.value_or(-1));
+        return found;
+    };
+    EXPECT_THAT(gaps("0J 1 2 3J 4"), IsEmpty());
+    EXPECT_THAT(gaps("0J 1 2H 2 3 4J 5"), ElementsAre(std::pair(2, 4)));
+    EXPECT_THAT(gaps("0J 1 2H 3H 0H 1H 2 3 4J 5 6H 6 7J"), ElementsAre(std::pair(2, 4), std::pair(6, 7)));
+    EXPECT_THAT(gaps("0J 1 2JH 3H 2J 3"), ElementsAre(std::pair(2, 2))) << "nothing to encode";
+    EXPECT_THAT(gaps("0J 1 2H 2 3"), ElementsAre(std::pair(2, -1))) << "no joint follows";
+    EXPECT_THAT(gaps("0J 1 2H 3H"), IsEmpty()) << "nothing is shown behind it";
+    EXPECT_THAT(gaps("0J 2 1 5H 3 4 5 6J 8 7"), ElementsAre(std::pair(3, 6))) << "3 and 4 need what is hidden";
+    EXPECT_FALSE(ffmpeg::findGaps(window("0J 5 6H 4 7J").packets)) << "4 is shown before one that is copied";
+}
+
+TEST(VideoPlan, TakesNoHiddenPictureForTheOneOfTheSameTime)
+{
+    const auto found = plan("0J 1 2 3 4H 0JH 1H 4 5J 6", 2, 7);
+    EXPECT_EQ(found.firstPts, 2);
+    EXPECT_EQ(found.copyFrom, 5);
+    const auto cut = plan("0J 1 2 3 4H 0JH 1H 4 5", 0, 5);
+    EXPECT_EQ(cut.copyTo, 4);
+    EXPECT_TRUE(cut.copiesToHidden);
+    EXPECT_THAT(cut.tail, ElementsAre(4));
+}
+
 TEST(VideoPlan, SaysWhyAllIsEncoded)
 {
     EXPECT_THAT(plan("0J 1 1 2", 0, 2).reason, HasSubstr("the same time"));

@@ -65,7 +65,8 @@ Result<void> EncodedVideoSource::describe(AVStream& output)
         return base::Error::make("ffmpeg", error, textOf(error));
     output.codecpar->codec_tag = MKTAG('a', 'v', 'c', '1');
     const auto isEnd = [this, behind = 0](const AVPacket& packet) mutable {
-        behind += packet.pts != AV_NOPTS_VALUE && m_packets->outTick(packet.pts) >= m_end;
+        const bool isShown = packet.pts != AV_NOPTS_VALUE && !(packet.flags & AV_PKT_FLAG_DISCARD);
+        behind += isShown && m_packets->outTick(packet.pts) >= m_end;
         return behind > PicturePackets::kFarthestReorder;
     };
     auto feed = PictureFeed::start(*m_packets, m_start, PictureFeed::Before::Decode, isEnd);

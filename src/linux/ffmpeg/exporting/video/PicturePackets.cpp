@@ -38,7 +38,9 @@ void PicturePackets::seek(std::int64_t outTick)
         do {
             m_hasPeeked = m_demuxer->read(*m_peeked) == 0;
         } while (m_hasPeeked && !m_startsMovie && !(m_peeked->flags & AV_PKT_FLAG_KEY));
-        const bool isEarly = m_hasPeeked && m_peeked->pts != AV_NOPTS_VALUE && this->outTick(m_peeked->pts) <= outTick;
+        // Before what an edit list hides there may be pictures of the same times that it shows.
+        const bool isEarly = m_hasPeeked && m_peeked->pts != AV_NOPTS_VALUE && !(m_peeked->flags & AV_PKT_FLAG_DISCARD)
+                             && this->outTick(m_peeked->pts) <= outTick;
         if (m_startsMovie || isEarly || m_demuxer->isCancelled())
             return;
         // The table's times are those of decoding, and a file that is cut has a table that is not.
@@ -85,7 +87,7 @@ base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::i
         if (!looked)
             return looked.error();
         const PicturePacket& each = looked.value();
-        if (each.isKey && each.pts <= start && !window.packets.empty()) {
+        if (each.isKey && !each.isHidden && each.pts <= start && !window.packets.empty()) {
             window.packets.clear();
             window.startsMovie = false;
         }
@@ -96,8 +98,8 @@ base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::i
             openJoint = each.pts;
         if (each.pts <= start && !each.isHidden)
             visible = std::max(visible, each.pts);
-        behindStart += each.pts > start;
-        behindEnd += each.pts >= end;
+        behindStart += !each.isHidden && each.pts > start;
+        behindEnd += !each.isHidden && each.pts >= end;
         if (each.isJoint && !each.isOpenJoint && !each.isHidden && each.pts > start && window.packets.size() > 1)
             return window;
         // What is visible at the start is a joint itself: all that follows can be copied.
@@ -129,8 +131,8 @@ base::Result<PacketWindow> PicturePackets::tailWindow(std::int64_t from, std::in
                 window.startsMovie = false;
             }
             window.packets.push_back(each);
-            behindEnd += each.pts >= end;
-            if (behindEnd > kFarthestReorder || (each.isJoint && each.pts >= end))
+            behindEnd += !each.isHidden && each.pts >= end;
+            if (behindEnd > kFarthestReorder || (each.isJoint && !each.isHidden && each.pts >= end))
                 return window;
         }
         window.endsMovie = true;
@@ -138,6 +140,45 @@ base::Result<PacketWindow> PicturePackets::tailWindow(std::int64_t from, std::in
         if (!window.packets.empty() || m_startsMovie || isCancelled())
             return window;
     }
+}
+
+bool PicturePackets::isInterrupted()
+{
+    if (!isMov())
+        return false;
+    AVStream& stream = this->stream();
+    const int count = avformat_index_get_entries_count(&stream);
+    bool hasBegun = false;
+    bool isHidden = false;
+    for (int i = 0; i < count; ++i) {
+        const bool wasHidden = isHidden;
+        isHidden = avformat_index_get_entry(&stream, i)->flags & AVINDEX_DISCARD_FRAME;
+        if (hasBegun && wasHidden && !isHidden)
+            return true;
+        hasBegun = hasBegun || !isHidden;
+    }
+    return false;
+}
+
+base::Result<std::vector<PicturePacket>> PicturePackets::copiedWindow(const VideoPlan& plan, const Splicer& splicer)
+{
+    seek(plan.copyFrom);
+    std::vector<PicturePacket> packets;
+    int behind = 0;
+    while (behind <= kFarthestReorder && read(*m_packet) == 0) {
+        const auto looked = look(*m_packet, splicer);
+        if (!looked)
+            return looked.error();
+        const PicturePacket& each = looked.value();
+        const bool isShown = !each.isHidden;
+        if (isShown && !plan.copiesToHidden && plan.copyTo == each.pts)
+            break;
+        const bool isBehind = isShown && each.pts > plan.lastPts;
+        behind += isBehind;
+        if (!isBehind && (!packets.empty() || (isShown && each.pts == plan.copyFrom)))
+            packets.push_back(each);
+    }
+    return packets;
 }
 
 } // namespace ffmpeg

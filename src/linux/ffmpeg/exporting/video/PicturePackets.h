@@ -43,6 +43,11 @@ public:
     /// `from` is `end`, or earlier when that was not early enough.
     base::Result<PacketWindow> tailWindow(std::int64_t from, std::int64_t end, const Splicer& splicer);
 
+    /// Whether an edit list leaves out pictures between such that it shows.
+    bool isInterrupted();
+    /// All that is copied, and what is hidden in between.
+    base::Result<std::vector<PicturePacket>> copiedWindow(const VideoPlan& plan, const Splicer& splicer);
+
 private:
     PicturePackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer);
 

@@ -57,11 +57,32 @@ Result<std::unique_ptr<TrackSource>> SplicedVideoSource::open(std::unique_ptr<Pi
         return plan.error();
     std::unique_ptr<SplicedVideoSource> source(new SplicedVideoSource(
         std::move(packets), std::move(splicer).value(), std::move(plan).value(), start, end, std::move(log)));
-    for (const auto& step : {&SplicedVideoSource::prepareEncoder, &SplicedVideoSource::showToSplicer}) {
+    for (const auto& step : {&SplicedVideoSource::findInterruptions, &SplicedVideoSource::prepareEncoder,
+                             &SplicedVideoSource::showToSplicer}) {
         if (const auto done = (*source.*step)(); !done)
             return done.error();
     }
     return std::unique_ptr<TrackSource>(std::move(source));
+}
+
+Result<void> SplicedVideoSource::findInterruptions()
+{
+    if (!m_packets->isInterrupted())
+        return {};
+    const auto packets = m_packets->copiedWindow(m_plan, *m_splicer);
+    if (!packets)
+        return packets.error();
+    auto gaps = findGaps(packets.value());
+    if (!gaps)
+        return cannotCopy("an edit list leaves out pictures between others that need them");
+    m_plan.gaps = std::move(*gaps);
+    if (m_plan.gaps.empty() || m_plan.gaps.back().joint)
+        return {};
+    // What follows the last gap is all encoded, as what the end breaks is.
+    m_plan.tail.insert(m_plan.tail.begin(), m_plan.gaps.back().firstPts);
+    m_plan.copiesToHidden = true;
+    m_plan.gaps.pop_back();
+    return {};
 }
 
 Result<void> SplicedVideoSource::prepareEncoder()
@@ -74,7 +95,8 @@ Result<void> SplicedVideoSource::prepareEncoder()
     m_line = std::make_unique<PictureLine>(plan.reorderDepth, step,
                                            plan.isCutAtEnd ? std::optional(plan.lastPts - m_start) : std::nullopt,
                                            m_end - m_start);
-    if (!plan.encodesHead() && plan.tail.empty())
+    if (!plan.encodesHead() && plan.tail.empty()
+        && std::none_of(plan.gaps.begin(), plan.gaps.end(), [](const VideoGap& each) { return each.encodes(); }))
         return {};
     if (auto prepared = m_splicer->prepare(m_request, plan.reorderDepth); !prepared)
         return prepared;
@@ -105,9 +127,8 @@ Result<void> SplicedVideoSource::showToSplicer()
     bool isCopied = false;
     m_packets->seek(m_plan.copyFrom);
     while (m_packets->read(*packet) == 0) {
-        const std::int64_t pts = m_packets->outTick(packet->pts);
-        isCopied = isCopied || pts == m_plan.copyFrom;
-        if (m_plan.copyTo && pts == *m_plan.copyTo)
+        isCopied = isCopied || isFirstCopied(*packet);
+        if (isCopied && isBehindCopied(*packet))
             break;
         if (isCopied)
             m_splicer->see(*packet);
@@ -162,10 +183,10 @@ Result<void> SplicedVideoSource::beginStretch(State state)
     const auto isEnd = [this, behind = 0](const AVPacket& packet) mutable {
         const std::int64_t pts = m_packets->outTick(packet.pts);
         if (m_state == State::Head) {
-            m_hasReachedJoint = m_hasReachedJoint || pts == m_plan.copyFrom;
+            m_hasReachedJoint = m_hasReachedJoint || isFirstCopied(packet);
             return m_hasReachedJoint && (!m_plan.joinsOpenGroup || pts > m_plan.copyFrom);
         }
-        behind += pts > m_plan.lastPts;
+        behind += !(packet.flags & AV_PKT_FLAG_DISCARD) && pts > m_plan.lastPts;
         return behind > PicturePackets::kFarthestReorder;
     };
     auto feed = PictureFeed::start(*m_packets, from, PictureFeed::Before::Skip, isEnd);
@@ -226,8 +247,8 @@ Result<void> SplicedVideoSource::copyOne()
         if (packet->pts == AV_NOPTS_VALUE)
             return cannotCopy("its packets do not say when they are shown");
         const std::int64_t pts = m_packets->outTick(packet->pts);
-        const bool isOpenJoint = m_plan.joinsOpenGroup && pts == m_plan.copyFrom && !m_isPastJoint;
-        m_isPastJoint = m_isPastJoint || pts == m_plan.copyFrom;
+        const bool isOpenJoint = m_plan.joinsOpenGroup && isFirstCopied(*packet) && !m_isPastJoint;
+        m_isPastJoint = m_isPastJoint || isFirstCopied(*packet);
         if (isOpenJoint)
             if (auto done = m_splicer->close(*packet); !done)
                 return done;
@@ -237,9 +258,12 @@ Result<void> SplicedVideoSource::copyOne()
         av_packet_unref(packet.get());
     }
     const std::int64_t pts = m_packets->outTick(packet->pts);
-    if (m_plan.copyTo && pts == *m_plan.copyTo)
+    const bool isHidden = packet->flags & AV_PKT_FLAG_DISCARD;
+    if (isHidden && !m_plan.gaps.empty())
+        return leap();
+    if (isBehindCopied(*packet))
         return endCopying(true);
-    if ((packet->flags & AV_PKT_FLAG_DISCARD) || pts < m_plan.copyFrom || pts > m_plan.lastCopied)
+    if (isHidden || pts < m_plan.copyFrom || pts > m_plan.lastCopied)
         return cannotCopy("an edit list leaves out pictures on the way");
     std::size_t size = 0;
     const std::uint8_t* header = av_packet_get_side_data(packet.get(), AV_PKT_DATA_NEW_EXTRADATA, &size);
@@ -257,12 +281,37 @@ Result<void> SplicedVideoSource::copyOne()
     return m_line->push(std::move(packet), isJoint);
 }
 
+/// Over what an edit list leaves out, to where it shows pictures again.
+Result<void> SplicedVideoSource::leap()
+{
+    const VideoGap gap = m_plan.gaps.front();
+    m_plan.gaps.erase(m_plan.gaps.begin());
+    m_plan.firstPts = gap.firstPts;
+    m_plan.copyFrom = *gap.joint;
+    m_plan.joinsOpenGroup = false;
+    m_isPastJoint = false;
+    return gap.encodes() ? beginStretch(State::Head) : Result<void>();
+}
+
+/// What an edit list hides can have the time of a picture that it shows.
+bool SplicedVideoSource::isFirstCopied(const AVPacket& packet) const
+{
+    return !(packet.flags & AV_PKT_FLAG_DISCARD) && m_packets->outTick(packet.pts) == m_plan.copyFrom;
+}
+
+bool SplicedVideoSource::isBehindCopied(const AVPacket& packet) const
+{
+    if (packet.flags & AV_PKT_FLAG_DISCARD)
+        return m_plan.copiesToHidden && m_plan.gaps.empty();
+    return !m_plan.copiesToHidden && m_plan.copyTo == m_packets->outTick(packet.pts);
+}
+
 Result<void> SplicedVideoSource::endCopying(bool isExpected)
 {
     AVStream& stream = m_packets->stream();
     const AVIndexEntry* last =
         m_packets->isMov() ? avformat_index_get_entry(&stream, avformat_index_get_entries_count(&stream) - 1) : nullptr;
-    const bool isCut = !isExpected || (!m_plan.copyTo && last && last->timestamp > m_lastDts);
+    const bool isCut = !isExpected || (!m_plan.copyTo && !m_plan.copiesToHidden && last && last->timestamp > m_lastDts);
     if (isCut && m_log)
         m_log("“" + m_packets->movie().file()->name() + "” ends before its index does: pictures are missing.");
     return beginStretch(isExpected && !m_plan.tail.empty() ? State::Tail : State::Ended);

@@ -32,18 +32,22 @@ private:
     SplicedVideoSource(std::unique_ptr<PicturePackets> packets, std::unique_ptr<Splicer> splicer, VideoPlan plan,
                        std::int64_t start, std::int64_t end, TellLog log);
 
+    base::Result<void> findInterruptions();
     base::Result<void> prepareEncoder();
     base::Result<void> showToSplicer();
     base::Result<void> goOn();
     base::Result<void> beginStretch(State state);
     base::Result<void> encodeSome();
     base::Result<void> copyOne();
+    base::Result<void> leap();
+    bool isFirstCopied(const AVPacket& packet) const;
+    bool isBehindCopied(const AVPacket& packet) const;
     base::Result<void> endCopying(bool isExpected);
     base::Result<void> openEncoder();
 
     std::unique_ptr<PicturePackets> m_packets;
     std::unique_ptr<Splicer> m_splicer;
-    VideoPlan m_plan;
+    VideoPlan m_plan; ///< of a gap that was reached on the way, from there on
     std::int64_t m_start;
     std::int64_t m_end;
     TellLog m_log;

@@ -52,7 +52,7 @@ std::optional<Joint> findJoint(const PacketWindow& head, std::int64_t firstPts)
     for (std::size_t i = 0; i < head.packets.size(); ++i) {
         const PicturePacket& each = head.packets[i];
         if (!each.isHidden && each.pts >= firstPts && each.pts > shown) {
-            const auto isLater = [&](const PicturePacket& other) { return other.pts > each.pts; };
+            const auto isLater = [&](const PicturePacket& other) { return other.isHidden || other.pts > each.pts; };
             const auto behind = head.packets.begin() + static_cast<std::ptrdiff_t>(i) + 1;
             // The movie's first picture needs none before it, whatever its kind.
             if ((each.isJoint || (head.startsMovie && i == 0 && each.isKey))
@@ -62,18 +62,25 @@ std::optional<Joint> findJoint(const PacketWindow& head, std::int64_t firstPts)
                 && std::all_of(std::find_if(behind, head.packets.end(), isLater), head.packets.end(), isLater))
                 return Joint{i, true};
         }
-        shown = std::max(shown, each.pts);
+        shown = each.isHidden ? shown : std::max(shown, each.pts);
     }
     return std::nullopt;
+}
+
+/// For each packet the earliest time at which one of those from it on is shown.
+std::vector<std::int64_t> earliestShown(const std::vector<PicturePacket>& packets)
+{
+    std::vector<std::int64_t> earliest(packets.size() + 1, kBehind);
+    for (std::size_t i = packets.size(); i-- > 0;)
+        earliest[i] = packets[i].isHidden ? earliest[i + 1] : std::min(earliest[i + 1], packets[i].pts);
+    return earliest;
 }
 
 /// How many of the packets from `begin` on can be copied.
 std::size_t copyablePrefix(const std::vector<PicturePacket>& packets, std::size_t begin, std::int64_t end,
                            bool endsMovie)
 {
-    std::vector<std::int64_t> earliest(packets.size() + 1, kBehind);
-    for (std::size_t i = packets.size(); i-- > begin;)
-        earliest[i] = std::min(earliest[i + 1], packets[i].pts);
+    const auto earliest = earliestShown(packets);
     std::size_t best = 0;
     std::int64_t latest = kBefore;
     int heldBack = 0;
@@ -82,7 +89,8 @@ std::size_t copyablePrefix(const std::vector<PicturePacket>& packets, std::size_
             break;
         heldBack = packets[i].isJoint ? packets[i].heldBack : heldBack + packets[i].heldBack;
         latest = std::max(latest, packets[i].pts);
-        if (heldBack <= 0 && latest < earliest[i + 1] && (i + 1 < packets.size() || endsMovie))
+        const bool isLast = i + 1 == packets.size();
+        if (isLast ? endsMovie : heldBack <= 0 && latest < earliest[i + 1])
             best = i + 1 - begin;
     }
     return best;
@@ -95,6 +103,8 @@ int reorderDepthOf(const std::vector<PicturePacket>& packets)
     int depth = 0;
     std::vector<std::int64_t> before; // sorted
     for (const PicturePacket& each : packets) {
+        if (each.isHidden)
+            continue;
         const auto at = std::upper_bound(before.begin(), before.end(), each.pts);
         depth = std::max(depth, static_cast<int>(before.end() - at));
         before.insert(at, each.pts);
@@ -103,6 +113,32 @@ int reorderDepthOf(const std::vector<PicturePacket>& packets)
             before.erase(before.begin());
     }
     return depth;
+}
+
+std::optional<std::vector<VideoGap>> findGaps(const std::vector<PicturePacket>& packets)
+{
+    const auto earliest = earliestShown(packets);
+    std::vector<VideoGap> gaps;
+    std::int64_t copied = kBefore;
+    for (std::size_t i = 0; i < packets.size() && earliest[i] != kBehind; ++i) {
+        if (!packets[i].isHidden) {
+            copied = std::max(copied, packets[i].pts);
+            continue;
+        }
+        if (earliest[i] <= copied)
+            return std::nullopt;
+        VideoGap gap{earliest[i], std::nullopt};
+        std::int64_t shown = copied;
+        for (; i < packets.size() && !gap.joint; ++i) {
+            const PicturePacket& each = packets[i];
+            if (!each.isHidden && each.isJoint && each.pts > shown && earliest[i + 1] > each.pts)
+                gap.joint = copied = each.pts;
+            shown = each.isHidden ? shown : std::max(shown, each.pts);
+        }
+        --i;
+        gaps.push_back(gap);
+    }
+    return gaps;
 }
 
 VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int64_t start, std::int64_t end)
@@ -126,8 +162,9 @@ VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int
 
     // Where both windows overlap, the stretch begins inside the tail's.
     const auto& packets = tail.packets;
-    const auto found = std::find_if(packets.begin(), packets.end(),
-                                    [&](const PicturePacket& each) { return each.pts == plan.copyFrom; });
+    const auto found = std::find_if(packets.begin(), packets.end(), [&](const PicturePacket& each) {
+        return !each.isHidden && each.pts == plan.copyFrom;
+    });
     const auto begin = found == packets.end() ? std::size_t{0} : static_cast<std::size_t>(found - packets.begin());
     const std::size_t count = copyablePrefix(packets, begin, end, tail.endsMovie);
     if (count == 0) {
@@ -139,8 +176,10 @@ VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int
     plan.lastCopied = kBefore;
     for (std::size_t i = begin; i < begin + count; ++i)
         plan.lastCopied = std::max(plan.lastCopied, packets[i].pts);
-    if (begin + count < packets.size())
+    if (begin + count < packets.size()) {
         plan.copyTo = packets[begin + count].pts;
+        plan.copiesToHidden = packets[begin + count].isHidden;
+    }
     for (std::size_t i = begin + count; i < packets.size(); ++i) {
         if (!packets[i].isHidden && packets[i].pts < end)
             plan.tail.push_back(packets[i].pts);

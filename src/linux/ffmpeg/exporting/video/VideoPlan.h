@@ -1,8 +1,9 @@
 /// Which pictures of a range are copied and which are encoded again. A pure function; any thread.
 ///
 /// A copied stretch begins at a joint, a picture that nothing before it is needed for and nothing behind it looks past,
-/// and ends where no picture that is left out would be shown before one that is kept, and none is held back. What lies in
-/// the range before and behind that stretch is encoded again: so no picture outside of the range gets into the output.
+/// and ends with the movie, or where no picture that is left out would be shown before one that is kept, and none is held
+/// back. What lies in the range before and behind that stretch is encoded again: so no picture outside of the range gets
+/// into the output.
 #pragma once
 
 #include <cstdint>
@@ -30,6 +31,13 @@ struct PacketWindow {
     bool endsMovie = false;   ///< its last is the last of the stream
 };
 
+/// Where an edit list leaves out pictures on the way: what it shows behind them up to the next joint is encoded.
+struct VideoGap {
+    std::int64_t firstPts = 0;         ///< the first picture that is shown and cannot be copied, or the joint
+    std::optional<std::int64_t> joint; ///< copying goes on there; nothing when it does not
+    bool encodes() const { return firstPts != joint; }
+};
+
 struct VideoPlan {
     /// Why all pictures are encoded; empty when some are copied.
     std::string reason;
@@ -42,8 +50,12 @@ struct VideoPlan {
     std::int64_t copyFrom = 0;
     /// The joint must be made one: pictures that follow it and are shown before it are encoded, not copied.
     bool joinsOpenGroup = false;
+    /// In between, in their order.
+    std::vector<VideoGap> gaps;
     /// The first packet, in the order of decoding, that is not copied. Nothing: up to the end of the stream.
     std::optional<std::int64_t> copyTo;
+    /// That packet is the first behind all gaps that an edit list hides.
+    bool copiesToHidden = false;
     /// The last picture, in the order of presentation, that is copied.
     std::int64_t lastCopied = 0;
     /// Pictures behind the copied ones that are encoded.
@@ -64,7 +76,11 @@ struct VideoPlan {
 /// that follows is shown later.
 VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int64_t start, std::int64_t end);
 
-/// How many packets that are shown later precede one in the order of decoding, at most.
+/// The gaps in what lies between the joint, with which `packets` starts, and the last picture. Nothing when the pictures
+/// around one are too entangled.
+std::optional<std::vector<VideoGap>> findGaps(const std::vector<PicturePacket>& packets);
+
+/// How many packets that are shown later precede one in the order of decoding, at most. What is hidden is not counted.
 int reorderDepthOf(const std::vector<PicturePacket>& packets);
 
 } // namespace ffmpeg
