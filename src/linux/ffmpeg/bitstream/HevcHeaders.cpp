@@ -160,6 +160,29 @@ Bytes closed(ByteView slice)
     return withEmulation(payload);
 }
 
+bool saysHdr(ByteView nal)
+{
+    constexpr std::uint32_t kMasteringDisplay = 137;
+    constexpr std::uint32_t kContentLight = 144;
+    if (unitOf(nal) != Unit::PrefixInfo)
+        return false;
+    const Bytes payload = withoutEmulation(nal);
+    std::size_t at = kHeaderBits / 8;
+    const auto number = [&] { // of bytes that are added up as long as they are full
+        std::uint32_t sum = 0;
+        while (at < payload.size() && payload[at] == 0xFF)
+            sum += payload[at++];
+        return at < payload.size() ? sum + payload[at++] : sum;
+    };
+    while (at + 2 < payload.size()) {
+        const std::uint32_t type = number();
+        if (type == kMasteringDisplay || type == kContentLight)
+            return true;
+        at += number();
+    }
+    return false;
+}
+
 std::optional<Configuration> Configuration::parse(ByteView extradata)
 {
     constexpr std::size_t kArrays = 22;

@@ -24,6 +24,7 @@ enum class Unit : std::uint8_t {
     Sps = 33,
     Pps = 34,
     Delimiter = 35,
+    PrefixInfo = 39,
     LastInfo = 40,
 };
 
@@ -67,6 +68,9 @@ std::optional<Bytes> renumberedSlice(ByteView slice, std::uint32_t pps);
 
 /// A slice of an open group's first picture as one of a group that nothing is shown before.
 Bytes closed(ByteView slice);
+
+/// Whether it is information about the display that the movie was mastered on, or about how light it gets.
+bool saysHdr(ByteView nal);
 
 /// The sets of a stream's header, "hvcC" or between start codes.
 struct Configuration {

@@ -125,8 +125,23 @@ public:
         return number;
     }
 
+    /// Shows each picture as it was decoded.
+    template <typename See> void everyFrame(See see)
+    {
+        decode([&](const AVFrame& frame) {
+            see(frame);
+            return true;
+        });
+    }
+
 private:
     template <typename Take> void decode(Look look, Take take)
+    {
+        decode([&](const AVFrame& frame) { return take(pictureOf(frame, look)); });
+    }
+
+    /// Until `take` says that it is enough.
+    template <typename Take> void decode(Take take)
     {
         const auto packet = ffmpeg::newPacket();
         const auto frame = ffmpeg::newFrame();
@@ -142,7 +157,7 @@ private:
             m_shown += more && !(packet->flags & AV_PKT_FLAG_DISCARD);
             av_packet_unref(packet.get());
             while ((error = avcodec_receive_frame(m_decoder.get(), frame.get())) >= 0) {
-                if (!take(pictureOf(*frame, look)))
+                if (!take(*frame))
                     return;
             }
             m_refused += error != AVERROR(EAGAIN) && error != AVERROR_EOF;

@@ -1,5 +1,6 @@
 #include "linux/ffmpeg/exporting/video/EncodedVideoSource.h"
 
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/video/StreamTraits.h"
 
 #include <algorithm>
@@ -19,8 +20,9 @@ constexpr double kSecondsBetweenKeyframes = 2; ///< so that seeking is quick
 EncoderRequest requestFor(const AVStream& stream, const AVFrame& picture, AVRational timeBase)
 {
     EncoderRequest request = EncoderRequest::like(stream, picture, timeBase);
-    request.encoder = "libx264";
-    request.format = formatForH264(request.format);
+    const bool isHevc = isHdr(request.transfer); // few players know H.264 of more than 8 bits
+    request.encoder = isHevc ? "libx265" : "libx264";
+    request.format = isHevc ? formatForHdr(request.format) : formatForH264(request.format);
     const AVPixFmtDescriptor& about = *av_pix_fmt_desc_get(request.format);
     // Odd sizes have half a sample of colour at the edge, which x264 refuses.
     request.width = std::max(request.width >> about.log2_chroma_w << about.log2_chroma_w, 1 << about.log2_chroma_w);
@@ -30,6 +32,12 @@ EncoderRequest requestFor(const AVStream& stream, const AVFrame& picture, AVRati
     request.isInterlaced = false;
     request.keyframeInterval =
         std::max(1, static_cast<int>(std::lround(av_q2d(request.frameRate) * kSecondsBetweenKeyframes)));
+    if (isHevc) {
+        request.options = {
+            {"preset", "veryfast"},
+            {"x265-params", std::string("open-gop=0:cutree=0:info=0:repeat-headers=0:log-level=none:crf=") + kQuality}};
+        return request;
+    }
     // Saving on pictures that few others look at is what shows in short movies.
     request.options = {{"preset", "veryfast"}, {"crf", kQuality}, {"x264-params", "mbtree=0"}};
     return request;
@@ -39,6 +47,7 @@ EncoderRequest requestFor(const AVStream& stream, const AVFrame& picture, AVRati
 
 EncodedVideoSource::EncodedVideoSource(std::unique_ptr<PicturePackets> packets, std::int64_t start, std::int64_t end)
     : m_packets(std::move(packets)), m_start(start), m_end(end),
+      m_hdr(HdrMetadata::of(m_packets->stream(), m_packets->movie().firstFrame()->picture())),
       m_request(requestFor(m_packets->stream(), m_packets->movie().firstFrame()->picture(), m_packets->outTimeBase())),
       m_scaler(m_request.format, m_request.width, m_request.height),
       m_line(0, usualStep(m_packets->stream(), m_packets->outTimeBase()), std::nullopt, end - start)
@@ -58,12 +67,14 @@ Result<std::unique_ptr<TrackSource>> EncodedVideoSource::open(std::unique_ptr<Pi
 
 Result<void> EncodedVideoSource::describe(AVStream& output)
 {
-    if (auto done = describeLike(m_packets->stream(), m_packets->outTimeBase(), output); !done)
+    if (auto done = describeLike(m_packets->stream(), m_packets->movie().firstFrame()->picture(),
+                                 m_packets->outTimeBase(), output);
+        !done)
         return done;
     const AVCodecContext& encoder = m_encoder->context();
     if (const int error = avcodec_parameters_from_context(output.codecpar, &encoder); error < 0)
         return base::Error::make("ffmpeg", error, textOf(error));
-    output.codecpar->codec_tag = MKTAG('a', 'v', 'c', '1');
+    output.codecpar->codec_tag = isHdr(m_request.transfer) ? MKTAG('h', 'v', 'c', '1') : MKTAG('a', 'v', 'c', '1');
     const auto isEnd = [this, behind = 0](const AVPacket& packet) mutable {
         const bool isShown = packet.pts != AV_NOPTS_VALUE && !(packet.flags & AV_PKT_FLAG_DISCARD);
         behind += isShown && m_packets->outTick(packet.pts) >= m_end;
@@ -139,11 +150,27 @@ Result<void> EncodedVideoSource::encode(const DecodedFrame& picture, std::int64_
     return moveOut();
 }
 
+/// Decoders forget it at a keyframe that does not say it again.
+Result<void> EncodedVideoSource::insertHdr(AVPacket& keyframe) const
+{
+    if (!isHdr(m_request.transfer) || m_hdr.isEmpty())
+        return {};
+    const Bytes unit = m_hdr.hevcUnit();
+    std::vector<ByteView> units = unitsBetweenStartCodes(payloadOf(keyframe));
+    units.insert(units.begin(), unit);
+    constexpr int kStartCodes = 0;
+    if (!replacePayload(keyframe, units, kStartCodes))
+        return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
+    return {};
+}
+
 Result<void> EncodedVideoSource::moveOut()
 {
     while (auto packet = m_encoder->take()) {
         packet->pts -= m_start;
         const bool isJoint = packet->flags & AV_PKT_FLAG_KEY;
+        if (auto done = isJoint ? insertHdr(*packet) : Result<void>(); !done)
+            return done;
         if (auto done = m_line.push(std::move(packet), isJoint); !done)
             return done;
     }

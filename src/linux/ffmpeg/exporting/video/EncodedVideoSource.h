@@ -1,6 +1,9 @@
-/// Pictures of a range, all encoded to H.264 without visible loss: for what cannot be copied. One thread.
+/// Pictures of a range, all encoded without visible loss: for what cannot be copied. One thread.
+///
+/// To H.264; those of a high dynamic range to HEVC, with all that the source says of their light.
 #pragma once
 
+#include "linux/ffmpeg/bitstream/HdrMetadata.h"
 #include "linux/ffmpeg/exporting/TrackSource.h"
 #include "linux/ffmpeg/exporting/video/PictureEncoder.h"
 #include "linux/ffmpeg/exporting/video/PictureFeed.h"
@@ -24,11 +27,13 @@ private:
 
     base::Result<void> goOn();
     base::Result<void> encode(const DecodedFrame& picture, std::int64_t until);
+    base::Result<void> insertHdr(AVPacket& keyframe) const;
     base::Result<void> moveOut();
 
     std::unique_ptr<PicturePackets> m_packets;
     std::int64_t m_start;
     std::int64_t m_end;
+    HdrMetadata m_hdr;
     EncoderRequest m_request;
     PictureScaler m_scaler;
     std::unique_ptr<PictureEncoder> m_encoder;

@@ -1,5 +1,6 @@
 #include "linux/ffmpeg/exporting/video/HevcSplicer.h"
 
+#include "linux/ffmpeg/bitstream/HdrMetadata.h"
 #include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/CannotCopy.h"
 
@@ -26,7 +27,7 @@ std::optional<std::uint32_t> freeId(const std::set<std::uint32_t>& taken, std::u
 
 } // namespace
 
-base::Result<std::unique_ptr<Splicer>> HevcSplicer::make(const AVStream& stream)
+base::Result<std::unique_ptr<Splicer>> HevcSplicer::make(const AVStream& stream, const AVFrame& picture)
 {
     auto header = hevc::Configuration::parse(extradataOf(*stream.codecpar));
     if (!header)
@@ -36,6 +37,8 @@ base::Result<std::unique_ptr<Splicer>> HevcSplicer::make(const AVStream& stream)
             return cannotCopy("a parameter set is damaged, or has layers");
     std::unique_ptr<HevcSplicer> splicer(new HevcSplicer);
     splicer->m_header = std::move(*header);
+    if (const auto hdr = HdrMetadata::of(stream, picture); !hdr.isEmpty())
+        splicer->m_hdrUnit = hdr.hevcUnit();
     return std::unique_ptr<Splicer>(std::move(splicer));
 }
 
@@ -179,6 +182,12 @@ base::Result<void> HevcSplicer::close(AVPacket& openJoint)
     return {};
 }
 
+void HevcSplicer::insertHdr(std::vector<ByteView>& units) const
+{
+    const auto isPicture = [](ByteView nal) { return hevc::unitOf(nal) <= Unit::LastPicture; };
+    units.insert(std::find_if(units.begin(), units.end(), isPicture), m_hdrUnit);
+}
+
 base::Result<void> HevcSplicer::adoptCopied(AVPacket& packet)
 {
     std::vector<ByteView> units = unitsIn(packet);
@@ -190,6 +199,10 @@ base::Result<void> HevcSplicer::adoptCopied(AVPacket& packet)
             return cannotCopy("its parameter sets change on the way");
     }
     std::erase_if(units, [](ByteView nal) { return hevc::isSet(nal) || hevc::unitOf(nal) == Unit::Delimiter; });
+    // Some say it only in the header, or once; behind another keyframe, decoders would have forgotten it.
+    if (!m_hdrUnit.empty() && (packet.flags & AV_PKT_FLAG_KEY)
+        && std::none_of(units.begin(), units.end(), hevc::saysHdr))
+        insertHdr(units);
     if (units.empty() || !replacePayload(packet, units, kStartCodes))
         return cannotCopy("a packet is damaged");
     return {};
@@ -206,7 +219,10 @@ base::Result<void> HevcSplicer::adoptEncoded(AVPacket& packet)
             return cannotCopy("the encoder's slices make no sense");
         slices.push_back(std::move(*slice));
     }
-    if (!replacePayload(packet, std::vector<ByteView>(slices.begin(), slices.end()), kStartCodes))
+    std::vector<ByteView> units(slices.begin(), slices.end());
+    if (!m_hdrUnit.empty() && (packet.flags & AV_PKT_FLAG_KEY))
+        insertHdr(units);
+    if (!replacePayload(packet, units, kStartCodes))
         return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
     return {};
 }

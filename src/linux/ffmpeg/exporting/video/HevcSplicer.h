@@ -11,7 +11,7 @@ namespace ffmpeg {
 /// Its packets and its header have start codes; the muxer makes lengths of them.
 class HevcSplicer final : public Splicer {
 public:
-    static base::Result<std::unique_ptr<Splicer>> make(const AVStream& stream);
+    static base::Result<std::unique_ptr<Splicer>> make(const AVStream& stream, const AVFrame& picture);
 
     bool isJoint(const AVPacket& keyframe) const override;
     bool isOpenJoint(const AVPacket& keyframe) const override;
@@ -30,11 +30,13 @@ private:
 
     std::vector<ByteView> unitsIn(const AVPacket& packet) const;
     std::vector<Bytes> usedSets() const;
+    void insertHdr(std::vector<ByteView>& units) const;
 
     hevc::Configuration m_header;
     std::set<std::uint32_t> m_usedPps; ///< empty when nobody looked
     hevc::Ids m_ids;                   ///< the encoder's
     std::vector<Bytes> m_encoderSets;
+    Bytes m_hdrUnit; ///< stands in each keyframe; empty when the movie says nothing
 };
 
 } // namespace ffmpeg

@@ -46,7 +46,10 @@ std::size_t leb128(ByteView bytes, std::size_t& at)
     return value;
 }
 
-enum class Obu : std::uint8_t { SequenceHeader = 1, FrameHeader = 3, Frame = 6 };
+enum class Obu : std::uint8_t { SequenceHeader = 1, FrameHeader = 3, Metadata = 5, Frame = 6 };
+
+constexpr std::uint8_t kContentLight = 1;
+constexpr std::uint8_t kMasteringDisplay = 2;
 
 } // namespace
 
@@ -85,7 +88,12 @@ PacketPictures picturesOfAv1(ByteView packet)
         const std::size_t size = header & 2 ? leb128(packet, at) : packet.size() - std::min(at, packet.size());
         if (at > packet.size() || size > packet.size() - at)
             break;
-        found.hasHeader = found.hasHeader || type == Obu::SequenceHeader;
+        if (type == Obu::SequenceHeader) {
+            found.hasHeader = true;
+            found.bytesToHeader = at + size;
+        }
+        if (type == Obu::Metadata && size > 0)
+            found.saysHdr = found.saysHdr || packet[at] == kContentLight || packet[at] == kMasteringDisplay;
         if ((type == Obu::FrameHeader || type == Obu::Frame) && size > 0) {
             BitReader in(packet.subspan(at, size));
             if (in.bit()) {

@@ -10,6 +10,9 @@ struct PacketPictures {
     int shownAgain = 0;       ///< shown by it, decoded before
     bool startsGroup = false; ///< its first is a keyframe that is shown
     bool hasHeader = false;   ///< AV1: a sequence header
+    /// AV1: how many bytes it takes up to the end of its sequence header; 0 when it has none.
+    std::size_t bytesToHeader = 0;
+    bool saysHdr = false; ///< AV1: of the display that the movie was mastered on, or how light it gets
 };
 
 /// What a VP9 packet holds; a superframe has several pictures.

@@ -1,5 +1,6 @@
 #include "linux/ffmpeg/exporting/video/KeyframeSplicer.h"
 
+#include "linux/ffmpeg/bitstream/HdrMetadata.h"
 #include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/CannotCopy.h"
 #include "linux/ffmpeg/exporting/video/HiddenPictures.h"
@@ -37,6 +38,7 @@ base::Result<std::unique_ptr<Splicer>> KeyframeSplicer::make(const AVStream& str
         if (extradata.size() <= kAv1ConfigurationBytes || extradata[0] != kAv1Marker)
             return cannotCopy("its sequence header is not in the file's header");
         splicer->m_header.assign(extradata.begin() + kAv1ConfigurationBytes, extradata.end());
+        splicer->m_hdrUnits = HdrMetadata::of(stream, picture).av1Units();
     }
     return std::unique_ptr<Splicer>(std::move(splicer));
 }
@@ -86,13 +88,21 @@ base::Result<void> KeyframeSplicer::describe(AVCodecParameters& parameters)
     return {};
 }
 
-base::Result<void> KeyframeSplicer::adoptCopied(AVPacket& packet)
+/// Behind pictures of another encoder the header of the file alone is not enough, and what is said of light is forgotten.
+base::Result<void> KeyframeSplicer::completeKeyframe(AVPacket& packet) const
 {
-    if (!m_isAv1 || !(packet.flags & AV_PKT_FLAG_KEY) || picturesOfAv1(payloadOf(packet)).hasHeader)
+    if (!m_isAv1 || !(packet.flags & AV_PKT_FLAG_KEY))
         return {};
-    // Behind pictures of another encoder the header of the file alone is not enough.
-    Bytes whole = m_header;
-    whole.insert(whole.end(), packet.data, packet.data + packet.size);
+    const ByteView payload = payloadOf(packet);
+    const auto pictures = picturesOfAv1(payload);
+    Bytes whole = pictures.hasHeader ? Bytes() : m_header;
+    const auto behindHeader = payload.begin() + static_cast<std::ptrdiff_t>(pictures.bytesToHeader);
+    whole.insert(whole.end(), payload.begin(), behindHeader);
+    if (!pictures.saysHdr)
+        whole.insert(whole.end(), m_hdrUnits.begin(), m_hdrUnits.end());
+    whole.insert(whole.end(), behindHeader, payload.end());
+    if (whole.size() == payload.size())
+        return {};
     AVBufferRef* buffer = av_buffer_alloc(whole.size() + AV_INPUT_BUFFER_PADDING_SIZE);
     if (!buffer)
         return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
@@ -102,6 +112,16 @@ base::Result<void> KeyframeSplicer::adoptCopied(AVPacket& packet)
     packet.data = buffer->data;
     packet.size = static_cast<int>(whole.size());
     return {};
+}
+
+base::Result<void> KeyframeSplicer::adoptCopied(AVPacket& packet)
+{
+    return completeKeyframe(packet);
+}
+
+base::Result<void> KeyframeSplicer::adoptEncoded(AVPacket& packet)
+{
+    return completeKeyframe(packet);
 }
 
 } // namespace ffmpeg

@@ -16,13 +16,16 @@ public:
     base::Result<void> join(const AVCodecContext& /*encoder*/) override { return {}; }
     base::Result<void> describe(AVCodecParameters& parameters) override;
     base::Result<void> adoptCopied(AVPacket& packet) override;
-    base::Result<void> adoptEncoded(AVPacket& /*packet*/) override { return {}; }
+    base::Result<void> adoptEncoded(AVPacket& packet) override;
 
 private:
     KeyframeSplicer() = default;
 
+    base::Result<void> completeKeyframe(AVPacket& packet) const;
+
     bool m_isAv1 = false;
-    Bytes m_header; ///< AV1: what a keyframe must start with
+    Bytes m_header;   ///< AV1: what a keyframe must start with
+    Bytes m_hdrUnits; ///< AV1: what stands behind that; empty when the movie says nothing
     AVPixelFormat m_format = AV_PIX_FMT_NONE;
     int m_width = 0;
     int m_height = 0;

@@ -33,6 +33,16 @@ AVPixelFormat formatForH264(AVPixelFormat source)
     return avcodec_find_best_pix_fmt_of_list(kFormats.data(), source, 0, nullptr);
 }
 
+AVPixelFormat formatForHdr(AVPixelFormat source)
+{
+    constexpr std::array kFormats{AV_PIX_FMT_YUV420P10, AV_PIX_FMT_YUV422P10, AV_PIX_FMT_YUV444P10,
+                                  AV_PIX_FMT_YUV420P12, AV_PIX_FMT_YUV422P12, AV_PIX_FMT_YUV444P12,
+                                  AV_PIX_FMT_NONE};
+    if (std::find(kFormats.begin(), kFormats.end(), source) != kFormats.end())
+        return source;
+    return avcodec_find_best_pix_fmt_of_list(kFormats.data(), source, 0, nullptr);
+}
+
 base::Result<Owned<AVFrame>> PictureScaler::fit(const AVFrame& picture)
 {
     const auto format = static_cast<AVPixelFormat>(picture.format);

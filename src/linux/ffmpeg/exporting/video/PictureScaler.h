@@ -8,6 +8,8 @@ namespace ffmpeg {
 
 /// The format nearest to `source` that x264 takes; alpha is left out.
 AVPixelFormat formatForH264(AVPixelFormat source);
+/// The one that x265 takes, of no less than 10 bits: fewer show steps in a high dynamic range.
+AVPixelFormat formatForHdr(AVPixelFormat source);
 
 class PictureScaler {
 public:

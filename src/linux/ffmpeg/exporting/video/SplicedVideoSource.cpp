@@ -138,7 +138,9 @@ Result<void> SplicedVideoSource::showToSplicer()
 
 Result<void> SplicedVideoSource::describe(AVStream& output)
 {
-    if (auto done = describeLike(m_packets->stream(), m_packets->outTimeBase(), output); !done)
+    if (auto done = describeLike(m_packets->stream(), m_packets->movie().firstFrame()->picture(),
+                                 m_packets->outTimeBase(), output);
+        !done)
         return done;
     if (auto done = m_splicer->describe(*output.codecpar); !done)
         return done;

@@ -13,7 +13,7 @@ base::Result<std::unique_ptr<Splicer>> Splicer::make(const AVStream& stream, con
     case AV_CODEC_ID_H264:
         return H264Splicer::make(stream);
     case AV_CODEC_ID_HEVC:
-        return HevcSplicer::make(stream);
+        return HevcSplicer::make(stream, picture);
     case AV_CODEC_ID_VP9:
     case AV_CODEC_ID_AV1:
         return KeyframeSplicer::make(stream, picture);

@@ -1,10 +1,12 @@
 #include "linux/ffmpeg/exporting/video/StreamTraits.h"
 
+#include "linux/ffmpeg/bitstream/HdrMetadata.h"
+
 #include <algorithm>
 
 namespace ffmpeg {
 
-base::Result<void> describeLike(const AVStream& source, AVRational timeBase, AVStream& output)
+base::Result<void> describeLike(const AVStream& source, const AVFrame& picture, AVRational timeBase, AVStream& output)
 {
     int error = avcodec_parameters_copy(output.codecpar, source.codecpar);
     if (error >= 0)
@@ -28,7 +30,7 @@ base::Result<void> describeLike(const AVStream& source, AVRational timeBase, AVS
     output.avg_frame_rate = source.avg_frame_rate;
     output.sample_aspect_ratio =
         source.sample_aspect_ratio.num ? source.sample_aspect_ratio : source.codecpar->sample_aspect_ratio;
-    return {};
+    return HdrMetadata::of(source, picture).describe(output);
 }
 
 std::int64_t usualStep(const AVStream& source, AVRational timeBase)
