@@ -177,6 +177,22 @@ TEST_F(Playback, TheEndOfTheMovieShowsTheBarsPlayAndTheStart)
     EXPECT_EQ(editor->avTrimmer()->value(), 0);
 }
 
+TEST_F(Playback, ATrimThatEndsWithTheMovieShowsTheBarsPlayAndTheStartToo)
+{
+    open();
+    trimFrom(5, editor->getPlayerDuration());
+    for (int run = 0; run < 2; ++run) {
+        editor->playAction();
+        EXPECT_TRUE(editor->isUIHidden());
+        player().advance(20);
+        settle();
+        EXPECT_FALSE(player().isPlaying());
+        EXPECT_FALSE(editor->isUIHidden());
+        EXPECT_EQ(player().currentTime(), MediaTime::zero());
+        EXPECT_TRUE(editor->isTrimming());
+    }
+}
+
 TEST_F(Playback, DraggingPausesAndPlayingDoesNotMoveThePlayHeadMeanwhile)
 {
     open();

@@ -232,13 +232,15 @@ public:
     bool hasObservers() const { return !m_observers.isEmpty(); }
 
     /// Plays on by `seconds` and calls, at once, everyone who waits for a moment on the way. Stops at the item's end,
-    /// which is announced. Does nothing while paused; a callback that pauses or seeks ends the step there.
+    /// which is announced, also where a callback pauses there. Does nothing while paused; a callback that pauses or seeks
+    /// ends the step there.
     void advance(double seconds)
     {
         const auto keepAlive = shared_from_this();
         const base::MediaTime target = currentTime() + base::MediaTime::fromSeconds(seconds, 600);
         const base::MediaTime end = m_item->duration();
         const base::MediaTime stop = end.isNumeric() && end < target ? end : target;
+        const bool wasPlaying = m_playing;
         while (m_playing && currentTime() < stop) {
             const base::MediaTime from = currentTime();
             const auto next = m_observers.nextAfter(from);
@@ -248,7 +250,7 @@ public:
             if (currentTime() != to)
                 return;
         }
-        if (m_playing && end.isNumeric() && currentTime() >= end)
+        if (wasPlaying && end.isNumeric() && currentTime() >= end)
             reachEnd();
     }
     /// Shows a picture, as when it was decoded.

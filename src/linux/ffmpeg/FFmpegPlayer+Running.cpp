@@ -141,9 +141,14 @@ void FFmpegPlayer::tick()
         }
     }
     m_observers.played(std::exchange(m_toldTo, now), now);
-    if (isOver())
+    const bool isAtEnd = now >= m_movie->duration();
+    if (isOver()) {
+        // Who pauses there has not kept the movie from ending.
+        if (isAtEnd && !m_playing && m_position >= m_movie->duration())
+            tellEnd();
         return;
-    if (now >= m_movie->duration())
+    }
+    if (isAtEnd)
         reachEnd();
     else
         scheduleTick();
@@ -195,6 +200,11 @@ void FFmpegPlayer::reachEnd()
     if (m_actionAtItemEnd == platform::ActionAtItemEnd::Pause)
         m_playing = false;
     showPicture(); // the last one, which may not have come in time
+    tellEnd();
+}
+
+void FFmpegPlayer::tellEnd()
+{
     m_engine->center.post(platform::kPlayerItemDidPlayToEndNotification, m_item);
 }
 

@@ -78,6 +78,7 @@ private:
     void scheduleTick();
     base::Instant untilTick(base::MediaTime next) const;
     void reachEnd();
+    void tellEnd();
     void setFrame(const FrameRef& frame);
 
     std::shared_ptr<Engine> m_engine;

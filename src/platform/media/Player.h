@@ -41,7 +41,8 @@ public:
     /// Called every `interval` while playing, and after each seek and step.
     [[nodiscard]] virtual ObserverToken addPeriodicTimeObserver(base::MediaTime interval,
                                                                 std::function<void(base::MediaTime)> callback) = 0;
-    /// Called whenever playing passes one of `times`.
+    /// Called whenever playing passes one of `times`. One that pauses at the item's end has not kept it from ending: that
+    /// is announced next.
     [[nodiscard]] virtual ObserverToken addBoundaryTimeObserver(std::vector<base::MediaTime> times,
                                                                 std::function<void()> callback) = 0;
     virtual void removeTimeObserver(const ObserverToken& token) = 0;

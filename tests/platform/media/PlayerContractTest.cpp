@@ -197,6 +197,34 @@ TEST_P(PlayerContract, TheEndPausesThereAndIsAnnouncedOnce)
     EXPECT_EQ(ends->count, 1);
 }
 
+TEST_P(PlayerContract, TheEndIsAnnouncedAlsoWhereABoundaryPausesThere)
+{
+    becomeReady();
+    const auto token = player->addBoundaryTimeObserver({at(4)}, [&] { player->pause(); });
+    for (int run = 1; run <= 2; ++run) {
+        player->seekToTime(at(3.8));
+        player->play();
+        letPlay(0.3);
+        EXPECT_EQ(ends->count, run);
+        EXPECT_FALSE(player->isPlaying());
+        EXPECT_EQ(player->currentTime(), at(4));
+    }
+    player->play();
+    letPlay(0.1);
+    EXPECT_EQ(ends->count, 3) << "where it stands at the end it ends again at once";
+}
+
+TEST_P(PlayerContract, WhereABoundaryAtTheEndGoesElsewhereItDoesNotEnd)
+{
+    becomeReady();
+    const auto token = player->addBoundaryTimeObserver({at(4)}, [&] { player->seekToTime(at(1)); });
+    player->seekToTime(at(3.9));
+    player->play();
+    letPlay(0.2);
+    EXPECT_EQ(ends->count, 0);
+    EXPECT_LT(player->currentTime(), at(1.2));
+}
+
 TEST_P(PlayerContract, SeekingWhilePlayingGoesOnPlaying)
 {
     becomeReady();
