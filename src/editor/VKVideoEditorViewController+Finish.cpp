@@ -40,8 +40,7 @@ void VKVideoEditorViewController::saveMixed(const std::shared_ptr<VKVideoEditorV
 {
     const platform::Platform& platform = self->m_platform;
     if (error) {
-        platform.system.log.error("Error Mixing video Audio tracks");
-        platform.system.log.error(error->description());
+        platform.system.log.error("Error Mixing video Audio tracks"); // whoever mixed has said why
     } else {
         if (const auto former = self->videoURL())
             VKExtensions::_srRemoveFile_completion(platform.files, *former, [](const base::ErrorRef&) {});
@@ -56,10 +55,7 @@ void VKVideoEditorViewController::saveMixed(const std::shared_ptr<VKVideoEditorV
 
 void VKVideoEditorViewController::savedToLibrary(const base::ErrorRef& error)
 {
-    if (error) {
-        base::Log& log = m_platform.system.log;
-        log.error("Error writing video to camera roll: " + std::to_string(error->code32()));
-        log.error(error->description());
-    }
+    if (error) // the library has said why
+        m_platform.system.log.error("Error writing video to camera roll: " + std::to_string(error->code32()));
     doneAction();
 }

@@ -4,6 +4,7 @@
 
 #include <gmock/gmock.h>
 
+#include <algorithm>
 #include <chrono>
 #include <csignal>
 #include <fstream>
@@ -189,6 +190,7 @@ TEST_F(Save, ALibraryThatCannotBeWrittenIsSaidAndTheHostIsToldAllTheSame)
     EXPECT_EQ(end.out, "SaveToCameraRoll\n");
     EXPECT_THAT(end.err, HasSubstr("Error writing video to camera roll: "));
     EXPECT_THAT(end.err, HasSubstr(library().native()));
+    EXPECT_EQ(std::count(end.err.begin(), end.err.end(), '\n'), 2) << "one line of words beside it: " << end.err;
     EXPECT_EQ(PrivateDirectory::read(library()), "not a directory");
 }
 

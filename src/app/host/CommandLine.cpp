@@ -35,6 +35,7 @@ Options of open, and of tour:
   --home-button yes|no      whether the device has a home button
   --graphics-quality N      10 spares a slow device live blurs
   --json                    print one JSON object in place of lines
+  --verbose                 say on standard error what the editor does
 
 MOVIE is never changed: the editor gets a name of its own for it, or a copy.
 Exit status: 0 done; 1 it could not be done; 2 a wrong option or file; 3 the editor ended early.
@@ -64,6 +65,12 @@ base::Result<void> takeOpenOption(OpenCommand& command, Words& words)
         if (words.hasOwnValue())
             return usageError("--json takes no value");
         command.json = true;
+        return {};
+    }
+    if (option == "--verbose") {
+        if (words.hasOwnValue())
+            return usageError("--verbose takes no value");
+        command.editorArguments.push_back(option);
         return {};
     }
     static constexpr const char* kOptions[] = {"--app-name", "--bundle-id", "--attachment",  "--message",

@@ -4,8 +4,11 @@
 #include "app/host/ProgressBar.h"
 #include "linux/dbus/EditRequest.h"
 
+#include <array>
 #include <cerrno>
+#include <cstdio>
 #include <filesystem>
+#include <random>
 #include <system_error>
 
 namespace host {
@@ -19,13 +22,27 @@ base::ErrorRef refused(const std::string& why)
     return base::Error::make(dbus::kBadInputDomain, EEXIST, why);
 }
 
+base::ErrorRef isThereAlready(const ExportOrder& order)
+{
+    return refused(order.output + " is there already; give --force to replace it");
+}
+
+/// A name beside a file, for what will take its place; nobody else has it.
+fs::path nameBeside(const fs::path& path)
+{
+    std::random_device random;
+    std::array<char, 32> name{};
+    std::snprintf(name.data(), name.size(), ".clipsa-%08x%08x.new", random(), random());
+    return path.parent_path() / name.data();
+}
+
 base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
 {
     std::error_code error;
     const fs::path output = fs::absolute(order.output, error);
     const bool isThere = fs::exists(fs::symlink_status(output, error));
     if (isThere && !order.force)
-        return refused(order.output + " is there already; give --force to replace it");
+        return isThereAlready(order);
     if (isThere && !fs::is_regular_file(output, error))
         return refused(order.output + " is not a file that could be replaced");
     if (fs::equivalent(order.movie, output, error))
@@ -35,17 +52,15 @@ base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
         return asset.error();
 
     // A file that is replaced is there until the new one is whole.
-    const fs::path written = isThere ? output.parent_path() / ("." + output.filename().native() + ".new") : output;
-    if (isThere)
-        fs::remove(written, error);
+    const fs::path written = order.force ? nameBeside(output) : output;
     const auto session = tool.media().exportSessionWithAsset(asset.value(), platform::ExportPreset::HighestQuality);
     session->setOutputURL(base::Url::fromPath(written.native()));
     session->setOutputFileType(platform::FileType::Mpeg4);
     order.setUp(*session, *asset.value());
     ProgressBar progress(order.doing);
     if (base::ErrorRef failure = tool.runExport(*session, [&] { progress.show(session->progress()); }))
-        return failure;
-    if (isThere) {
+        return failure->code() == EEXIST ? isThereAlready(order) : failure;
+    if (order.force) {
         fs::rename(written, output, error);
         if (error) {
             std::error_code ignored;

@@ -28,6 +28,9 @@ public:
     Thumbnails(const ThumbnailsCommand& command, fs::path folder, std::vector<base::MediaTime> times)
         : m_command(command), m_folder(std::move(folder)), m_times(std::move(times))
     {
+        std::error_code error;
+        const fs::file_status status = fs::status(command.movie, error);
+        m_permissions = error ? fs::perms::owner_all : status.permissions();
     }
 
     const std::vector<base::MediaTime>& times() const { return m_times; }
@@ -64,12 +67,13 @@ private:
         const auto png = ffmpeg::pngOf(image.bitmap());
         if (!png)
             return png.error();
-        return writeWholeFile(path(index), png.value(), m_command.force);
+        return writeWholeFile(path(index), png.value(), m_command.force, m_permissions);
     }
 
     const ThumbnailsCommand& m_command;
     const fs::path m_folder;
     const std::vector<base::MediaTime> m_times;
+    fs::perms m_permissions; ///< of the movie
     std::size_t m_came = 0;
     std::size_t m_failed = 0;
     base::ErrorRef m_firstError;

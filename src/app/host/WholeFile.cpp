@@ -6,11 +6,15 @@
 #include <cstdio>
 #include <fcntl.h>
 #include <string>
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace host {
 
 namespace {
+
+/// As any program makes a file that the user asked for; the user's umask has the last word.
+constexpr mode_t kMode = 0666;
 
 base::ErrorRef cannotWrite(const std::filesystem::path& path, int number)
 {
@@ -49,10 +53,12 @@ int giveName(const std::string& from, const std::filesystem::path& to, bool repl
 } // namespace
 
 base::Result<void> writeWholeFile(const std::filesystem::path& path, const std::vector<std::uint8_t>& bytes,
-                                  bool replaces)
+                                  bool replaces, std::filesystem::perms permissions)
 {
+    const auto mode = static_cast<mode_t>(permissions & std::filesystem::perms::all) & kMode;
     const std::string beside = path.parent_path() / ("." + path.filename().native() + "." + std::to_string(::getpid()));
-    const posix::FileDescriptor file(::open(beside.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0666));
+    const posix::FileDescriptor file(
+        ::open(beside.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, mode | S_IRUSR | S_IWUSR));
     if (!file)
         return cannotWrite(path, errno);
     int error = writeAll(file.get(), bytes);

@@ -25,6 +25,7 @@ base::Result<std::shared_ptr<OpenFile>> OpenFile::open(const std::string& path)
     if (!S_ISREG(about.st_mode))
         return Error::fromErrno(EINVAL, doing);
     file->m_identity = identityOf(about);
+    file->m_permissions = about.st_mode & ACCESSPERMS;
     return file;
 }
 

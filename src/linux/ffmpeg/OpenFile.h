@@ -23,6 +23,8 @@ public:
     /// The last component of the path, for messages.
     const std::string& name() const { return m_name; }
     std::int64_t size() const;
+    /// Who may read and write it.
+    mode_t permissions() const { return m_permissions; }
     /// Bytes read, 0 at the end, or a negative errno. Readers do not share a position.
     std::int64_t read(std::int64_t position, std::uint8_t* into, std::size_t count) const;
     /// Whether `path` leads to this very file as it was when it was opened, or leads nowhere any more.
@@ -41,6 +43,7 @@ private:
 
     int m_descriptor;
     std::string m_name;
+    mode_t m_permissions = S_IRUSR | S_IWUSR;
     Identity m_identity{};
 };
 

@@ -55,6 +55,22 @@ std::string extensionOf(std::string_view path)
     return "." + extension;
 }
 
+/// Recorders call their files like "Screencast from 2026-11-21 15-04-05", "2026-11-21_15-04-05" or "rec-20261121-150405".
+std::string withoutDate(std::string_view appName)
+{
+    static GRegex* const date =
+        g_regex_new(R"([\s_.-]*(?<![A-Za-z0-9])(?:19|20)\d\d[-_.]?[01]\d[-_.]?[0-3]\d(?:\sat\s|[\s_.T-]*))"
+                    R"([0-2]\d[-_.:]?[0-5]\d(?:[-_.:]?[0-5]\d)?(?:[-_.]\d{1,3})?(?:\s\(\d+\))?\s*$)",
+                    G_REGEX_RAW, {}, nullptr);
+    const std::string name(appName);
+    GMatchInfo* match = nullptr;
+    int start = 0;
+    const bool found =
+        g_regex_match(date, name.c_str(), {}, &match) && g_match_info_fetch_pos(match, 0, &start, nullptr);
+    g_match_info_free(match);
+    return found ? name.substr(0, static_cast<std::size_t>(start)) : name;
+}
+
 } // namespace
 
 std::string LibraryName::numbered(int number) const
@@ -64,7 +80,9 @@ std::string LibraryName::numbered(int number) const
 
 LibraryName libraryName(std::string_view appName, base::Date date, std::string_view path)
 {
-    return {fileNameSafe(appName) + " " + localTime(date), extensionOf(path)};
+    const std::string name = withoutDate(appName);
+    const bool isOnlyDate = name.empty() && !appName.empty();
+    return {(isOnlyDate ? "" : fileNameSafe(name) + " ") + localTime(date), extensionOf(path)};
 }
 
 std::string fileNameSafe(std::string_view text)

@@ -84,6 +84,7 @@ VideoLibrary::Transaction::open(const std::optional<base::Url>& url) const
                                  doing + ": it is not a file");
     if (status.st_size == 0)
         return base::Error::make(base::kPosixErrorDomain, ENODATA, doing + ": it is empty");
+    source.permissions = status.st_mode;
     source.size = static_cast<std::uint64_t>(status.st_size);
     const Recording recording = m_options.recording ? m_options.recording(source.path) : Recording{};
     source.date = recording.date.value_or(dateOf(status.st_mtim));
@@ -154,6 +155,8 @@ base::Result<posix::NewFile> VideoLibrary::Transaction::copy(const Source& sourc
         m_work.setProgress((done + part) / static_cast<double>(m_sources.size()));
         return !m_options.goOn || m_options.goOn();
     };
+    if (const int number = file.value().keepAsPrivateAs(source.permissions); number != 0)
+        return notCopied(number);
     const int from = source.file.get();
     const int to = file.value().descriptor();
     if (!posix::shareContents(from, to))

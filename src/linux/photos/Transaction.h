@@ -26,6 +26,7 @@ private:
     struct Source {
         std::string path;
         posix::FileDescriptor file;
+        mode_t permissions = 0;
         std::uint64_t size = 0; ///< bytes
         base::Date date;        ///< of the recording
         LibraryName name;

@@ -109,6 +109,15 @@ base::Result<NewFile> NewFile::makeHidden(int directory)
     }
 }
 
+int NewFile::keepAsPrivateAs(mode_t permissions)
+{
+    struct stat status = {};
+    if (::fstat(descriptor(), &status) != 0)
+        return errno;
+    const mode_t narrowed = (status.st_mode & permissions & (S_IRWXU | S_IRWXG | S_IRWXO)) | S_IRUSR | S_IWUSR;
+    return ::fchmod(descriptor(), narrowed) == 0 || errno == EPERM ? 0 : errno; // some file systems have none
+}
+
 base::Result<void> NewFile::seal(const timespec& modified)
 {
     const timespec times[] = {{0, UTIME_OMIT}, modified};
@@ -164,6 +173,8 @@ int NewFile::becomeHidden()
     if (!hidden)
         return static_cast<int>(hidden.error()->code());
     NewFile& copy = hidden.value();
+    if (const int number = copy.keepAsPrivateAs(status.st_mode); number != 0)
+        return number;
     if (!shareContents(descriptor(), copy.descriptor()))
         if (const int number =
                 copyContents(descriptor(), copy.descriptor(), static_cast<std::uint64_t>(status.st_size), {});

@@ -31,6 +31,9 @@ public:
     /// Whether it has a hidden name. Whoever makes such files sweeps, as they outlive a killed process.
     bool isHidden() const { return !m_hiddenName.empty(); }
 
+    /// Lets nobody read it who may not read a file with these permissions, which it was made from. 0, or errno.
+    int keepAsPrivateAs(mode_t permissions);
+
     /// Dates it, unless told to leave that out, and brings it to the disk. Once, after the last byte.
     base::Result<void> seal(const timespec& modified = {0, UTIME_OMIT});
 

@@ -61,6 +61,16 @@ protected:
     std::filesystem::path m_copy = m_target.path() / "movie.mp4";
 };
 
+TEST_F(HandingOver, ACopyHasThePermissionsOfTheMovie)
+{
+    for (const mode_t mode : {0600, 0640, 0644}) {
+        ASSERT_EQ(::chmod(m_movie.c_str(), mode), 0);
+        ASSERT_TRUE(handOver(host::HandOverWay::Copy));
+        EXPECT_EQ(statusOf(m_copy).st_mode & ACCESSPERMS, mode);
+        std::filesystem::remove(m_copy);
+    }
+}
+
 TEST_F(HandingOver, GivesASecondNameWithinAFileSystem)
 {
     const auto way = handOver();
@@ -79,7 +89,7 @@ TEST_F(HandingOver, CopiesWhereNothingElseWorks)
     EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
     EXPECT_EQ(statusOf(m_copy).st_mtim.tv_sec, kDate.tv_sec) << "the recording's date";
     EXPECT_EQ(statusOf(m_copy).st_mtim.tv_nsec, kDate.tv_nsec);
-    EXPECT_EQ(statusOf(m_copy).st_mode & 07777, 0600U);
+    EXPECT_EQ(statusOf(m_copy).st_mode & 07777, statusOf(m_movie).st_mode & 07777);
     expectUntouched();
 
     std::ofstream(m_copy) << "scribble";

@@ -121,7 +121,7 @@ TEST_F(OpeningAMovie, HandsOverTheRequiredValuesLast)
     const auto clipsa =
         start("report=" + report.native() + " finish= wait",
               {"--app-name", "Racer", "--bundle-id", "org.racer", "--attachment", attachment, "--message", "look",
-               "--tint", "#ff0000", "--device", "pad", "--home-button", "no", "--graphics-quality", "10"});
+               "--tint", "#ff0000", "--device", "pad", "--home-button", "no", "--graphics-quality", "10", "--verbose"});
     EXPECT_EQ(clipsa->wait(), 0) << clipsa->errors();
     const Words told = lines(tests::PrivateDirectory::read(report));
     ASSERT_GE(told.size(), 6U);
@@ -132,7 +132,7 @@ TEST_F(OpeningAMovie, HandsOverTheRequiredValuesLast)
                     "VKVideoEditorExtensionOverrideTintColorKey=1 0 0 1", "VKVideoEditorExtensionAppNameKey=Racer",
                     "VKVideoEditorExtensionBundleIdentifierKey=org.racer",
                     "VKVideoEditorExtensionMovieURLKey=/private/var/mobile/Library/Velkor/Tux Racer.mp4"));
-    for (const char* word : {"--device", "pad", "--home-button", "no", "--graphics-quality", "10"})
+    for (const char* word : {"--device", "pad", "--home-button", "no", "--graphics-quality", "10", "--verbose"})
         EXPECT_THAT(told, Contains(std::string("argument=") + word));
 }
 

@@ -14,8 +14,10 @@
 namespace {
 
 using testing::ElementsAre;
+using testing::EndsWith;
 using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::UnorderedElementsAre;
 
 using tests::movie;
 using tests::namesIn;
@@ -173,6 +175,54 @@ TEST_F(Trim, LeavesAWholeMovieOrNoneWheneverItIsKilled)
         }
     }
     EXPECT_LT(finished, kMoments);
+}
+
+TEST_F(Trim, ItsResultIsAsPrivateAsTheMovie)
+{
+    const fs::path source = directory.path() / "source.mp4";
+    const fs::path pictures = directory.path() / "pictures";
+    fs::copy_file(movie("clock.mp4"), source);
+    for (const auto& [given, kept] : {std::pair(0600, 0600), std::pair(0640, 0640), std::pair(0444, 0644)}) {
+        fs::permissions(source, fs::perms(given));
+        ASSERT_EQ(run({"trim", source, "--to", "1", "-o", out, "--force"}), 0) << errors;
+        EXPECT_EQ(fs::status(out).permissions(), fs::perms(kept));
+        ASSERT_EQ(run({"mix", source, "-o", out, "--force"}), 0) << errors;
+        EXPECT_EQ(fs::status(out).permissions(), fs::perms(kept));
+        ASSERT_EQ(run({"thumbnails", source, "-n", "1", "-o", pictures, "--force"}), 0) << errors;
+        EXPECT_EQ(fs::status(pictures / "0_00-00-00.000.png").permissions(), fs::perms(kept));
+    }
+}
+
+TEST_F(Trim, ReplacesNothingButTheFileItself)
+{
+    const fs::path beside = directory.path() / ".out.mp4.new";
+    std::ofstream(beside) << "mine";
+    std::ofstream(out) << "old";
+    ASSERT_EQ(run({"trim", movie("clock.mp4"), "--to", "1", "-o", out, "--force"}), 0) << errors;
+    EXPECT_EQ(tests::PrivateDirectory::read(beside), "mine");
+    EXPECT_THAT(namesIn(directory.path()), UnorderedElementsAre(".out.mp4.new", "out.mp4"));
+    EXPECT_NEAR(probe(out)["duration"].toDouble(), 1, 0.05);
+}
+
+TEST_F(Trim, TwoThatMakeOneFileAtOnceDoNotDisturbEachOther)
+{
+    for (const bool force : {true, false}) {
+        fs::remove(out);
+        Words words = {"trim", movie("groups.mp4"), "--to", "3", "-o", out};
+        if (force)
+            words.emplace_back("--force");
+        tests::Program first(command(words), {});
+        tests::Program second(command(words), {});
+        const std::vector<int> ends = {first.wait(), second.wait()};
+        EXPECT_THAT(ends, force ? UnorderedElementsAre(0, 0) : UnorderedElementsAre(0, 2))
+            << first.errors() << second.errors();
+        if (!force) {
+            EXPECT_THAT(first.errors() + second.errors(),
+                        EndsWith("out.mp4 is there already; give --force to replace it\n"));
+        }
+        EXPECT_NEAR(probe(out)["duration"].toDouble(), 3, 0.05);
+        EXPECT_THAT(namesIn(directory.path()), ElementsAre("out.mp4"));
+    }
 }
 
 } // namespace

@@ -23,6 +23,22 @@ TEST(ALibraryName, IsTheAppAndTheDateInLocalTime)
     EXPECT_EQ(libraryName("A", {kDate.secondsSince1970 + 0.999}, "a").numbered(1), "A 2026-11-21 15-04-05.mp4");
 }
 
+TEST(ALibraryName, HasTheDateOnce)
+{
+    for (const char* app : {"Screencast from 2026-11-21 15-03-59", "Screencast from 2026-11-21 15-03-59 (2)",
+                            "Screencast from - 20261121_150359", "Screencast from_2026-11-21_15.03.59.123",
+                            "Screencast from 2026-11-21 at 15.03.59", "Screencast from 2026-11-21T15:03:59"})
+        EXPECT_EQ(nameOf(app), "Screencast from 2026-11-21 15-04-05.mp4") << app;
+    EXPECT_EQ(nameOf("2026-11-21 15-03-59"), "2026-11-21 15-04-05.mp4");
+    EXPECT_EQ(nameOf(""), "Recording 2026-11-21 15-04-05.mp4");
+    const std::string longName(200, 'x');
+    EXPECT_EQ(nameOf(longName + " 2026-11-21 15-03-59"), nameOf(longName));
+    // Numbers that are no date.
+    EXPECT_EQ(nameOf("Level 2026"), "Level 2026 2026-11-21 15-04-05.mp4");
+    EXPECT_EQ(nameOf("Call 12345678 1504"), "Call 12345678 1504 2026-11-21 15-04-05.mp4");
+    EXPECT_EQ(nameOf("2026-11-21 15-03-59 best of"), "2026-11-21 15-03-59 best of 2026-11-21 15-04-05.mp4");
+}
+
 TEST(ALibraryName, HasTheExtensionOfTheMovieIfThatIsOne)
 {
     EXPECT_EQ(libraryName("A", kDate, "/a/b.webm").extension, ".webm");

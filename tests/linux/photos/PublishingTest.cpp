@@ -41,6 +41,17 @@ TEST_F(TheVideoLibrary, HoldsTheWholeMovieAndLeavesTheRecordingAsItWas)
     EXPECT_EQ(fs::hard_link_count(videos / name), 1U);
 }
 
+TEST_F(TheVideoLibrary, IsAsPrivateAsTheRecording)
+{
+    ASSERT_EQ(::chmod(source.c_str(), 0600), 0);
+    ASSERT_TRUE(save().success);
+    EXPECT_EQ(fs::status(published.back()).permissions(), fs::perms(0600));
+    tests::whileRefusing({tests::noUnnamedFiles()}, [&] {
+        ASSERT_TRUE(save().success);
+        EXPECT_EQ(fs::status(published.back()).permissions(), fs::perms(0600));
+    });
+}
+
 TEST_F(TheVideoLibrary, KeepsTheDateOfTheRecording)
 {
     recording.date = base::Date{1'500'000'000.25};

@@ -48,7 +48,11 @@ void FFmpegExportSession::start(std::function<void()> done)
     auto self = std::static_pointer_cast<FFmpegExportSession>(shared_from_this());
     // The movie is asked for here, because the asset is the main queue's.
     auto work = [self, movie = m_asset->movie(), why = m_asset->error(), done = std::move(done)]() mutable {
-        self->finish(movie ? self->work(movie) : base::Result<void>(why));
+        const auto result = movie ? self->work(movie) : base::Result<void>(why);
+        // Why it could not be opened was logged when it was tried.
+        if (movie && !result && !*self->m_cancelled)
+            self->m_engine->system.log.error(result.error()->description());
+        self->finish(result);
         movie = nullptr;
         std::exchange(done, nullptr)();
     };
@@ -102,8 +106,6 @@ void FFmpegExportSession::finish(const base::Result<void>& result)
 {
     if (result)
         *m_progress = 1;
-    else if (!*m_cancelled)
-        m_engine->system.log.error(result.error()->description());
     const std::lock_guard lock(m_mutex);
     m_status = result ? Status::Completed : *m_cancelled ? Status::Cancelled : Status::Failed;
     m_error = m_status == Status::Failed ? result.error() : nullptr;

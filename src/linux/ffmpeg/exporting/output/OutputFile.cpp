@@ -47,6 +47,8 @@ base::Result<std::unique_ptr<OutputFile>> OutputFile::create(const std::string& 
     if (!made)
         return file->failure(static_cast<int>(made.error()->code()));
     file->m_file.emplace(std::move(made).value());
+    if (const int error = file->m_source ? file->m_file->keepAsPrivateAs(file->m_source->permissions()) : 0; error != 0)
+        return file->failure(error);
     if (file->m_file->isHidden())
         posix::sweepNewFiles(file->m_directory.get());
     return file;

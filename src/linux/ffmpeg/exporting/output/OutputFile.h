@@ -17,7 +17,7 @@ namespace ffmpeg {
 class OutputFile {
 public:
     /// Fails when there is something of that name already. But `source`, where it is not null, may be about to be removed
-    /// from there: publish() gives that some time.
+    /// from there: publish() gives that some time. Nobody may read the file who may not read `source`.
     static base::Result<std::unique_ptr<OutputFile>> create(const std::string& path,
                                                             std::shared_ptr<const OpenFile> source = nullptr);
     OutputFile(const OutputFile&) = delete;
