@@ -29,6 +29,9 @@ struct RefusedSystemCall {
     std::uint32_t bits = 0;
     /// Only calls where the argument equals the bits.
     bool exactly = false;
+    /// And only with so much, or more, in this other argument.
+    unsigned other = 0;
+    std::uint32_t least = 0;
 };
 
 /// What a file system without unnamed files says.
@@ -48,16 +51,27 @@ inline std::vector<sock_filter> filterOf(const std::vector<RefusedSystemCall>& c
     const auto load = [](std::size_t offset) {
         return sock_filter(BPF_STMT(BPF_LD | BPF_W | BPF_ABS, static_cast<std::uint32_t>(offset)));
     };
+    // The lower half of an argument: flags, requests and places in small files have no other.
+    const auto loadArgument = [&](unsigned which) {
+        return load(offsetof(seccomp_data, args) + which * sizeof(std::uint64_t));
+    };
+    const auto unlessSkip = [](int test, std::uint32_t value, int steps) {
+        return sock_filter(
+            BPF_JUMP(static_cast<std::uint16_t>(BPF_JMP | test | BPF_K), value, 0, static_cast<std::uint8_t>(steps)));
+    };
     std::vector<sock_filter> filter;
     for (const RefusedSystemCall& refused : calls) {
+        const int ofOther = refused.least ? 2 : 0;
+        const int ofBits = refused.bits ? 2 : 0;
         filter.push_back(load(offsetof(seccomp_data, nr)));
-        // The lower half of the argument: flags and requests have no other.
-        filter.push_back(BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, static_cast<std::uint32_t>(refused.call), 0,
-                                  static_cast<std::uint8_t>(refused.bits ? 3 : 1)));
+        filter.push_back(unlessSkip(BPF_JEQ, static_cast<std::uint32_t>(refused.call), ofBits + ofOther + 1));
         if (refused.bits) {
-            filter.push_back(load(offsetof(seccomp_data, args) + refused.argument * sizeof(std::uint64_t)));
-            const int test = refused.exactly ? BPF_JEQ : BPF_JSET;
-            filter.push_back(BPF_JUMP(static_cast<std::uint16_t>(BPF_JMP | test | BPF_K), refused.bits, 0, 1));
+            filter.push_back(loadArgument(refused.argument));
+            filter.push_back(unlessSkip(refused.exactly ? BPF_JEQ : BPF_JSET, refused.bits, ofOther + 1));
+        }
+        if (refused.least) {
+            filter.push_back(loadArgument(refused.other));
+            filter.push_back(unlessSkip(BPF_JGE, refused.least, 1));
         }
         const auto error = static_cast<std::uint32_t>(refused.error) & SECCOMP_RET_DATA;
         filter.push_back(

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <string_view>
+#include <utility>
 
 namespace ffmpeg {
 
@@ -57,8 +58,11 @@ int Demuxer::readBytes(void* self, std::uint8_t* into, int count)
     const std::int64_t got = demuxer.m_file->read(demuxer.m_position, into, static_cast<std::size_t>(count));
     if (got == 0)
         return AVERROR_EOF;
-    if (got < 0)
+    if (got < 0) {
+        if (demuxer.m_readError == 0)
+            demuxer.m_readError = static_cast<int>(got);
         return static_cast<int>(got);
+    }
     demuxer.m_position += got;
     return static_cast<int>(got);
 }
@@ -98,6 +102,8 @@ base::Result<std::unique_ptr<Demuxer>> Demuxer::open(std::shared_ptr<OpenFile> f
 int Demuxer::begin()
 {
     m_position = 0;
+    m_readError = 0;
+    m_hasLookedAtPackets = false;
     auto* buffer = static_cast<std::uint8_t*>(av_malloc(kBufferSize));
     Owned<AVIOContext> io(avio_alloc_context(buffer, kBufferSize, 0, this, readBytes, nullptr, moveTo));
     AVFormatContext* opened = avformat_alloc_context();
@@ -114,12 +120,20 @@ int Demuxer::begin()
     // Movies with a header need no look at their packets, which would delay the first picture.
     const auto streams = context->streams;
     if (!hasTable(*context) || context->nb_streams == 0
-        || !std::all_of(streams, streams + context->nb_streams, [](AVStream* each) { return isKnown(*each); }))
+        || !std::all_of(streams, streams + context->nb_streams, [](AVStream* each) { return isKnown(*each); })) {
         if (const int error = avformat_find_stream_info(opened, nullptr); error < 0)
             return error;
+        m_hasLookedAtPackets = true;
+    }
     m_context = std::move(context); // before what it reads through
     m_io = std::move(io);
     return 0;
+}
+
+void Demuxer::lookAtPackets()
+{
+    if (!std::exchange(m_hasLookedAtPackets, true))
+        avformat_find_stream_info(m_context.get(), nullptr);
 }
 
 void Demuxer::select(const std::vector<int>& streams)
@@ -140,6 +154,9 @@ int Demuxer::read(AVPacket& packet)
         const int result = av_read_frame(m_context.get(), &packet);
         if (result >= 0 && stream(packet.stream_index).discard < AVDISCARD_ALL)
             return 0;
+        // The library takes a place that cannot be read for the end of the file.
+        if (result < 0 && m_readError != 0)
+            return m_readError;
         if (result == AVERROR_EOF || result == AVERROR_EXIT || result == AVERROR(EIO))
             return result;
         if (result >= 0)
@@ -151,11 +168,13 @@ int Demuxer::read(AVPacket& packet)
 
 bool Demuxer::seek(int stream, std::int64_t timestamp)
 {
+    m_readError = 0;
     return av_seek_frame(m_context.get(), stream, timestamp, AVSEEK_FLAG_BACKWARD) >= 0;
 }
 
 bool Demuxer::seekToByte(std::int64_t position)
 {
+    m_readError = 0;
     return avformat_seek_file(m_context.get(), -1, 0, position, position, AVSEEK_FLAG_BYTE) >= 0;
 }
 

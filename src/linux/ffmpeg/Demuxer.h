@@ -27,6 +27,9 @@ public:
     AVStream& stream(int index) { return *m_context->streams[index]; }
     int streamCount() const { return static_cast<int>(m_context->nb_streams); }
     bool isCancelled() const { return m_cancelled && *m_cancelled; }
+    /// Reads packets to know what headers do not tell, profiles for example; what was read comes all the same. Opening
+    /// does that already for files without a header, and the library fails when it is asked twice.
+    void lookAtPackets();
     /// From now on reading stops when this is set.
     void setCancelled(Cancelled cancelled) { m_cancelled = std::move(cancelled); }
 
@@ -34,6 +37,8 @@ public:
     void select(const std::vector<int>& streams);
     /// 0, AVERROR_EOF at the end or where the file is cut, or another error after which nothing more can be read.
     int read(AVPacket& packet);
+    /// Why bytes could not be read since the last seek, as a negative errno; 0 while all could.
+    int readError() const { return m_readError; }
     /// To the keyframe at or before `timestamp` of `stream`. False when the file cannot do that.
     bool seek(int stream, std::int64_t timestamp);
     bool seekToByte(std::int64_t position);
@@ -56,6 +61,8 @@ private:
     std::shared_ptr<OpenFile> m_file;
     Cancelled m_cancelled;
     std::int64_t m_position = 0;
+    int m_readError = 0;
+    bool m_hasLookedAtPackets = false;
     Owned<AVIOContext> m_io;
     Owned<AVFormatContext> m_context;
     std::optional<std::vector<int>> m_selected; ///< all when nobody said

@@ -58,9 +58,18 @@ std::int64_t OpenFile::read(std::int64_t position, std::uint8_t* into, std::size
         const ssize_t got = pread(m_descriptor, into, count, position);
         if (got >= 0)
             return got;
-        if (errno != EINTR)
-            return -errno;
+        if (errno == EINTR)
+            continue;
+        const int error = errno;
+        ++m_failedReads;
+        return -error;
     }
+}
+
+bool OpenFile::hasChanged() const
+{
+    struct stat about {};
+    return fstat(m_descriptor, &about) != 0 || identityOf(about) != m_identity;
 }
 
 bool OpenFile::isStillAt(const std::string& path) const

@@ -1,8 +1,9 @@
-/// A movie's file, opened once and held open: it stays readable after it was removed. Immutable; any thread.
+/// A movie's file, opened once and held open: it stays readable after it was removed. Any thread.
 #pragma once
 
 #include "base/Result.h"
 
+#include <atomic>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -27,6 +28,11 @@ public:
     mode_t permissions() const { return m_permissions; }
     /// Bytes read, 0 at the end, or a negative errno. Readers do not share a position.
     std::int64_t read(std::int64_t position, std::uint8_t* into, std::size_t count) const;
+    /// How many reads have failed so far. Demuxers take a place that cannot be read for the end of the file: who needs
+    /// all of it asks before and afterwards.
+    int failedReads() const { return m_failedReads; }
+    /// Whether somebody has written to it since it was opened.
+    bool hasChanged() const;
     /// Whether `path` leads to this very file as it was when it was opened, or leads nowhere any more.
     bool isStillAt(const std::string& path) const;
 
@@ -45,6 +51,7 @@ private:
     std::string m_name;
     mode_t m_permissions = S_IRUSR | S_IWUSR;
     Identity m_identity{};
+    mutable std::atomic<int> m_failedReads = 0;
 };
 
 } // namespace ffmpeg

@@ -28,7 +28,7 @@ std::shared_ptr<const PacketIndex> PacketIndex::build(Demuxer& demuxer, int vide
                                         (packet->flags & AV_PKT_FLAG_KEY) != 0,
                                         (packet->flags & AV_PKT_FLAG_DISCARD) != 0});
     }
-    if (result == AVERROR_EXIT)
+    if (result == AVERROR_EXIT || demuxer.readError() != 0)
         return nullptr;
     std::stable_sort(index->m_packets.begin(), index->m_packets.end(),
                      [](const PacketEntry& a, const PacketEntry& b) { return a.pts < b.pts; });

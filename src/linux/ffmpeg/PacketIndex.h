@@ -22,7 +22,7 @@ struct PacketEntry {
 
 class PacketIndex {
 public:
-    /// Reads `demuxer` from its start to its end. Null when that was cancelled.
+    /// Reads `demuxer` from its start to its end. Null when that was cancelled or failed.
     /// `video` is the picture stream, or -1 when only the length is wanted.
     static std::shared_ptr<const PacketIndex> build(Demuxer& demuxer, int video);
 

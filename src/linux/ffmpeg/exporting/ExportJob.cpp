@@ -110,10 +110,27 @@ base::ErrorRef named(const Movie& movie, const base::ErrorRef& error)
                        "“" + movie.file()->name() + "” cannot be exported: " + error->description() + ".");
 }
 
+/// Whoever reads takes the first place that cannot be read for the movie's end, and knows nothing of bytes that became
+/// others: what was made then is not the movie. Null when the file was whole all the time.
+base::ErrorRef whyNotWhole(const OpenFile& file, int failedReadsBefore)
+{
+    const std::string begin = "“" + file.name() + "” cannot be exported: ";
+    if (file.hasChanged())
+        return Error::make("ffmpeg", AVERROR(EBUSY),
+                           begin + "it was changed meanwhile; try again when nothing writes to it any more.");
+    if (file.failedReads() != failedReadsBefore)
+        return Error::make("ffmpeg", AVERROR(EIO),
+                           begin
+                               + "it cannot be read to its end, because its disk or the way to it fails; "
+                                 "copy it to another one and try again.");
+    return nullptr;
+}
+
 } // namespace
 
 Result<void> ExportJob::run() const
 {
+    const int failedReads = movie->file()->failedReads();
     const auto found = rangeIn(*movie, range);
     if (!found)
         return found.error();
@@ -123,7 +140,12 @@ Result<void> ExportJob::run() const
     Attempt attempt(*this, found.value(), *file.value());
     VideoMode video = movie->video() ? VideoMode::Copy : VideoMode::Encode;
     SoundMode sound = SoundMode::Copy;
-    Result<void> done = attempt.run(video, sound);
+    const auto attempted = [&] {
+        Result<void> done = attempt.run(video, sound);
+        const auto why = *cancelled ? nullptr : whyNotWhole(*movie->file(), failedReads);
+        return why ? Result<void>(why) : done;
+    };
+    Result<void> done = attempted();
     while (!done && !*cancelled) {
         const std::string name = "“" + movie->file()->name() + "” is encoded as a whole: ";
         if (saysCannotCopy(done.error()) && video == VideoMode::Copy)
@@ -136,7 +158,7 @@ Result<void> ExportJob::run() const
                      + ".");
         if (auto cleared = file.value()->clear(); !cleared)
             return cleared;
-        done = attempt.run(video, sound);
+        done = attempted();
     }
     if (*cancelled)
         return Error::make("ffmpeg", AVERROR_EXIT, "it is no longer wanted");
