@@ -160,7 +160,7 @@ base::Result<MovieFacts> MovieFacts::of(const Movie& movie, const Cancelled& can
     if (!opened)
         return opened.error();
     Demuxer& demuxer = *opened.value();
-    avformat_find_stream_info(&demuxer.context(), nullptr); // profiles and layouts; all else is known without it
+    demuxer.lookAtPackets(); // profiles and layouts; all else is known without it
     MovieFacts facts;
     facts.container = containerOf(demuxer);
     facts.duration = movie.duration().isNumeric() ? movie.duration().seconds() : 0;
