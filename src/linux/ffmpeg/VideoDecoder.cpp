@@ -24,13 +24,15 @@ VideoDecoder::VideoDecoder(Owned<AVCodecContext> context, const VideoTrack& trac
 }
 
 base::Result<std::unique_ptr<VideoDecoder>> VideoDecoder::open(const AVStream& stream, const VideoTrack& track,
-                                                               int threads, const HardwareDevice* hardware)
+                                                               int threads, const HardwareDevice* hardware, Size size)
 {
     const AVCodec* codec = avcodec_find_decoder(stream.codecpar->codec_id);
     if (!codec)
         return failure(AVERROR_DECODER_NOT_FOUND, stream);
     Owned<AVCodecContext> context(avcodec_alloc_context3(codec));
     int error = avcodec_parameters_to_context(context.get(), stream.codecpar);
+    if (size == Size::OfStream && stream.codecpar->codec_id == AV_CODEC_ID_H264) // others go by their stream anyway
+        context->width = context->height = 0;
     context->pkt_timebase = stream.time_base;
     context->thread_count = threads;
     context->thread_type = FF_THREAD_FRAME;

@@ -14,9 +14,13 @@ namespace ffmpeg {
 
 class VideoDecoder {
 public:
+    /// A file can show less of its pictures than their stream would.
+    enum class Size { OfFile, OfStream };
+
     /// `hardware` can be null.
     static base::Result<std::unique_ptr<VideoDecoder>> open(const AVStream& stream, const VideoTrack& track,
-                                                            int threads, const HardwareDevice* hardware = nullptr);
+                                                            int threads, const HardwareDevice* hardware = nullptr,
+                                                            Size size = Size::OfFile);
 
     void send(const AVPacket& packet);
     /// No packet comes any more: the pictures that are still inside come out.

@@ -72,6 +72,29 @@ void readPictureOrder(BitReader& in, Sps& sps)
     }
 }
 
+void readSize(BitReader& in, Sps& sps)
+{
+    constexpr std::uint32_t kMost = 1 << 12; // macroblocks a side; no level allows so many
+    constexpr int kMacroblock = 16;
+    const std::uint32_t columns = in.ue() + 1;
+    const std::uint32_t rows = in.ue() + 1;
+    sps.macroblocks = columns * rows;
+    sps.isProgressive = in.bit() != 0;
+    if (!sps.isProgressive)
+        in.skip(1);
+    in.skip(1);
+    std::array<int, 4> cropped{}; // left, right, top, bottom; in samples of colour, of a field where it can be one
+    if (in.bit())
+        for (int& each : cropped)
+            each = static_cast<int>(std::min(in.ue(), kMost * kMacroblock));
+    const bool isSubsampled = sps.chromaFormat != 0 && !sps.hasSeparatePlanes;
+    const int across = isSubsampled && sps.chromaFormat < 3 ? 2 : 1;
+    const int fields = sps.isProgressive ? 1 : 2;
+    const int down = (isSubsampled && sps.chromaFormat == 1 ? 2 : 1) * fields;
+    sps.width = static_cast<int>(std::min(columns, kMost)) * kMacroblock - across * (cropped[0] + cropped[1]);
+    sps.height = static_cast<int>(std::min(rows, kMost)) * kMacroblock * fields - down * (cropped[2] + cropped[3]);
+}
+
 void skipRates(BitReader& in)
 {
     const std::uint32_t count = std::min<std::uint32_t>(in.ue() + 1, 32);
@@ -134,15 +157,7 @@ std::optional<Sps> parseSps(ByteView nal)
     readPictureOrder(in, sps);
     sps.referenceFrames = in.ue();
     sps.hasFrameNumGaps = in.bit() != 0;
-    sps.macroblocks = in.ue() + 1;
-    sps.macroblocks *= in.ue() + 1;
-    sps.isProgressive = in.bit() != 0;
-    if (!sps.isProgressive)
-        in.skip(1);
-    in.skip(1);
-    if (in.bit())
-        for (int i = 0; i < 4; ++i)
-            in.ue();
+    readSize(in, sps);
     sps.vuiBit = in.position();
     if (in.bit()) {
         skipUsability(in);

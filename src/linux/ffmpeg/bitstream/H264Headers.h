@@ -44,6 +44,9 @@ struct Sps {
     bool hasFrameNumGaps = false;
     std::uint32_t macroblocks = 0; ///< of a picture that is not interlaced
     bool isProgressive = true;
+    /// Of the pictures that are shown, in pixels. Containers may show less.
+    int width = 0;
+    int height = 0;
     /// How far pictures are reordered, and how many a decoder keeps. Nothing when it is not said.
     struct Restriction {
         std::uint32_t reorderFrames;

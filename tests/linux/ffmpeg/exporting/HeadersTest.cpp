@@ -75,6 +75,16 @@ TEST_F(Headers, OfH264SayHowFarPicturesAreReordered)
     EXPECT_EQ(h264::parseSps(*changed)->level, h264::parseSps(sps)->level);
 }
 
+TEST_F(Headers, OfH264SayHowLargeItsPicturesAre)
+{
+    for (const char* name : {"h264.mp4", "h264-422.mp4", "h264-444.mp4", "h264-interlaced.mp4", "h264-odd.mp4"}) {
+        const auto sps = h264::parseSps(h264::Configuration::parse(headerOf(name))->sps.front());
+        ASSERT_TRUE(sps) << name;
+        EXPECT_EQ(sps->width, 320) << name;
+        EXPECT_EQ(sps->height, 180) << name;
+    }
+}
+
 TEST_F(Headers, ThatAreDamagedAreRefused)
 {
     const ffmpeg::Bytes h264Header = headerOf("h264-b.mp4");

@@ -24,9 +24,9 @@ EncoderRequest requestFor(const AVStream& stream, const AVFrame& picture, AVRati
     request.encoder = isHevc ? "libx265" : "libx264";
     request.format = isHevc ? formatForHdr(request.format) : formatForH264(request.format);
     const AVPixFmtDescriptor& about = *av_pix_fmt_desc_get(request.format);
-    // Odd sizes have half a sample of colour at the edge, which x264 refuses.
-    request.width = std::max(request.width >> about.log2_chroma_w << about.log2_chroma_w, 1 << about.log2_chroma_w);
-    request.height = std::max(request.height >> about.log2_chroma_h << about.log2_chroma_h, 1 << about.log2_chroma_h);
+    // Odd sizes have half a sample of colour at the edge, which x264 refuses. What is added the file does not show.
+    request.width = AV_CEIL_RSHIFT(request.width, about.log2_chroma_w) << about.log2_chroma_w;
+    request.height = AV_CEIL_RSHIFT(request.height, about.log2_chroma_h) << about.log2_chroma_h;
     if (request.matrix == AVCOL_SPC_RGB)
         request.matrix = AVCOL_SPC_BT709;
     request.isInterlaced = false;
@@ -75,12 +75,15 @@ Result<void> EncodedVideoSource::describe(AVStream& output)
     if (const int error = avcodec_parameters_from_context(output.codecpar, &encoder); error < 0)
         return base::Error::make("ffmpeg", error, textOf(error));
     output.codecpar->codec_tag = isHdr(m_request.transfer) ? MKTAG('h', 'v', 'c', '1') : MKTAG('a', 'v', 'c', '1');
+    const AVFrame& first = m_packets->movie().firstFrame()->picture();
+    output.codecpar->width = first.width;
+    output.codecpar->height = first.height;
     const auto isEnd = [this, behind = 0](const AVPacket& packet) mutable {
         const bool isShown = packet.pts != AV_NOPTS_VALUE && !(packet.flags & AV_PKT_FLAG_DISCARD);
         behind += isShown && m_packets->outTick(packet.pts) >= m_end;
         return behind > PicturePackets::kFarthestReorder;
     };
-    auto feed = PictureFeed::start(*m_packets, m_start, PictureFeed::Before::Decode, isEnd);
+    auto feed = PictureFeed::start(*m_packets, m_start, PictureFeed::Before::Decode, PictureFeed::Size::OfFile, isEnd);
     if (!feed)
         return feed.error();
     m_feed = std::move(feed).value();

@@ -131,6 +131,9 @@ base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDept
             std::max({m_restriction.bufferedFrames, buffered, m_restriction.reorderFrames, 1U});
     }
     const h264::Sps& sps = m_sps.front();
+    // What the file leaves out of the pictures at their edges the stream still has: an odd row, for one.
+    request.width = sps.width;
+    request.height = sps.height;
     request.encoder = "libx264";
     if (sps.profile == FF_PROFILE_H264_BASELINE)
         request.options["profile"] = "baseline";

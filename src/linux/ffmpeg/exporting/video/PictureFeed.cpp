@@ -14,10 +14,10 @@ PictureFeed::PictureFeed(PicturePackets& packets, std::unique_ptr<VideoDecoder> 
 }
 
 base::Result<std::unique_ptr<PictureFeed>> PictureFeed::start(PicturePackets& packets, std::int64_t from, Before before,
-                                                              IsEnd isEnd)
+                                                              Size size, IsEnd isEnd)
 {
     const int threads = static_cast<int>(std::thread::hardware_concurrency()) + 1;
-    auto decoder = VideoDecoder::open(packets.stream(), packets.track(), threads);
+    auto decoder = VideoDecoder::open(packets.stream(), packets.track(), threads, nullptr, size);
     if (!decoder)
         return decoder.error();
     packets.seek(from);

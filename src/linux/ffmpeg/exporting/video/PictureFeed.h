@@ -15,11 +15,12 @@ public:
     using IsEnd = std::function<bool(const AVPacket&)>;
 
     enum class Before { Decode, Skip };
+    using Size = VideoDecoder::Size;
 
     /// Goes to the keyframe before `from`, which is a tick of the output. Pictures before it come out too, but with
     /// Before::Skip only what others need. `packets` lives longer; nobody else reads it before this has ended.
     static base::Result<std::unique_ptr<PictureFeed>> start(PicturePackets& packets, std::int64_t from, Before before,
-                                                            IsEnd isEnd);
+                                                            Size size, IsEnd isEnd);
 
     /// The next picture in the order of presentation; null at the end. Packets that were damaged give none.
     base::Result<FrameRef> next();

@@ -21,6 +21,34 @@ int matrixOf(AVColorSpace space)
     return space;
 }
 
+/// The same with its last column and row twice where it has fewer, so that they do not bleed into what is behind them.
+base::Result<Owned<AVFrame>> extended(const AVFrame& picture, int width, int height)
+{
+    auto out = newFrame();
+    out->format = picture.format;
+    out->width = width;
+    out->height = height;
+    if (av_frame_get_buffer(out.get(), 0) < 0 || av_frame_copy_props(out.get(), &picture) < 0)
+        return noMemory();
+    const auto format = static_cast<AVPixelFormat>(picture.format);
+    const auto bytes = static_cast<std::size_t>(av_pix_fmt_desc_get(format)->comp[0].depth + 7) / 8;
+    for (int plane = 0; plane < 4 && out->data[plane]; ++plane) {
+        const auto row = static_cast<std::size_t>(av_image_get_linesize(format, width, plane));
+        const auto known = static_cast<std::size_t>(av_image_get_linesize(format, picture.width, plane));
+        const int shift = plane == 1 || plane == 2 ? av_pix_fmt_desc_get(format)->log2_chroma_h : 0;
+        const int knownRows = AV_CEIL_RSHIFT(picture.height, shift);
+        for (int y = 0; y < AV_CEIL_RSHIFT(height, shift); ++y) {
+            const std::uint8_t* from =
+                picture.data[plane] + std::ptrdiff_t(std::min(y, knownRows - 1)) * picture.linesize[plane];
+            std::uint8_t* to = out->data[plane] + std::ptrdiff_t(y) * out->linesize[plane];
+            std::copy_n(from, known, to);
+            for (std::size_t x = known; x < row; ++x)
+                to[x] = to[x - bytes];
+        }
+    }
+    return out;
+}
+
 } // namespace
 
 AVPixelFormat formatForH264(AVPixelFormat source)
@@ -46,15 +74,12 @@ AVPixelFormat formatForHdr(AVPixelFormat source)
 base::Result<Owned<AVFrame>> PictureScaler::fit(const AVFrame& picture)
 {
     const auto format = static_cast<AVPixelFormat>(picture.format);
-    const bool hasSize = picture.width / 2 == m_width / 2 && picture.height / 2 == m_height / 2;
-    if (hasSize && picture.width >= m_width && picture.height >= m_height && format == m_format) {
+    if (picture.width == m_width && picture.height == m_height && format == m_format) {
         Owned<AVFrame> same(av_frame_clone(&picture));
-        if (same) { // an odd row or column at the edge is left out
-            same->width = m_width;
-            same->height = m_height;
-        }
         return same ? base::Result<Owned<AVFrame>>(std::move(same)) : noMemory();
     }
+    if ((picture.width + 1) / 2 == m_width / 2 && (picture.height + 1) / 2 == m_height / 2 && format == m_format)
+        return extended(picture, m_width, m_height);
     // Multiples of 4, so that they begin on whole samples of every plane.
     const double scale = std::min(double(m_width) / picture.width, double(m_height) / picture.height);
     const bool fills = std::abs(picture.width * scale - m_width) < 4 && std::abs(picture.height * scale - m_height) < 4;

@@ -15,7 +15,7 @@ class PictureScaler {
 public:
     PictureScaler(AVPixelFormat format, int width, int height) : m_format(format), m_width(width), m_height(height) {}
 
-    /// The picture itself where it fits already; else scaled to the whole width or height, black beside it.
+    /// The picture itself where it fits already, extended by the odd row or column that it lacks; else scaled to the whole width or height, black beside it.
     base::Result<Owned<AVFrame>> fit(const AVFrame& picture);
 
 private:

@@ -191,7 +191,7 @@ Result<void> SplicedVideoSource::beginStretch(State state)
         behind += !(packet.flags & AV_PKT_FLAG_DISCARD) && pts > m_plan.lastPts;
         return behind > PicturePackets::kFarthestReorder;
     };
-    auto feed = PictureFeed::start(*m_packets, from, PictureFeed::Before::Skip, isEnd);
+    auto feed = PictureFeed::start(*m_packets, from, PictureFeed::Before::Skip, PictureFeed::Size::OfStream, isEnd);
     if (!feed)
         return feed.error();
     m_feed = std::move(feed).value();
