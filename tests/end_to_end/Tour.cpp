@@ -65,6 +65,33 @@ TEST_F(Tour, FailsWhenThereIsNothingToSee)
     EXPECT_THAT(m_machine.remains(), IsEmpty());
 }
 
+TEST_F(Tour, GoesThroughMoviesThatAreShortStandStillOrBeginLate)
+{
+    for (const char* name : {"non-square.mp4", "still.mp4", "start-offset.mp4"}) {
+        const auto end = take(m_machine.movie(name), {"--output", m_output});
+        EXPECT_EQ(end.exitStatus, 0) << name << ": " << end.err;
+        EXPECT_THAT(end.out, HasSubstr("12-trimmed.png"));
+        EXPECT_THAT(end.out, HasSubstr("has finished"));
+    }
+    EXPECT_THAT(m_machine.remains(), IsEmpty());
+}
+
+TEST_F(Tour, SaysThatThereAreNoPicturesToShow)
+{
+    const auto end = take(m_machine.movie("audio-only.m4a"), {"--output", m_output});
+    EXPECT_TRUE(end.inTime);
+    EXPECT_EQ(end.exitStatus, 3);
+    EXPECT_THAT(end.err, HasSubstr("the movie has no pictures to show, only sound"));
+    EXPECT_THAT(m_machine.remains(), IsEmpty());
+}
+
+TEST_F(Tour, FindsAPlaceForItsSocketWhereHomeHasALongName)
+{
+    m_machine.set("XDG_CACHE_HOME", m_machine.home() / std::string(150, 'x'));
+    const auto end = take(m_machine.movie("clock.mp4"), {"--output", m_output});
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+}
+
 TEST_F(Tour, NeedsAPlaceForItsPictures)
 {
     const auto movie = m_machine.movie("clock.mp4");

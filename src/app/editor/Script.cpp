@@ -172,8 +172,11 @@ bool Script::waitFor(const std::string& what)
     const auto editor = m_program.editor();
     if (!editor)
         return false;
-    if (what == "picture")
+    if (what == "picture") {
+        if (editor->currentItemLoaded() && editor->avAsset()->tracksWithMediaType(platform::MediaType::Video).empty())
+            fail("the movie has no pictures to show, only sound");
         return m_program.hasShownPicture();
+    }
     if (what == "ready")
         return editor->currentItemLoaded() || editor->avPlayerItem()->status() == platform::PlayerItem::Status::Failed;
     if (what == "thumbnails") {
@@ -192,17 +195,25 @@ bool Script::waitFor(const std::string& what)
     return false;
 }
 
-bool Script::waitForFrame(const Words& words) const
+bool Script::waitForFrame(const Words& words)
 {
-    constexpr double kLongestFrame = 0.5; // seconds: recordings stand still
+    constexpr double kLongestFrame = 0.5; // seconds
+    constexpr base::Instant kStill = std::chrono::seconds(3);
     const auto editor = m_program.editor();
     const auto frame = editor ? editor->avPlayer()->currentFrame() : nullptr;
     if (!frame)
         return false;
     if (words.size() > 2)
         return frame->time().seconds() >= number(words[2]);
+    // A recording that stands still has one picture for a long time, and one that begins late has its first picture
+    // before that: what does not change any more is the one.
+    const base::Instant now = m_program.system().clock.now();
+    if (m_waitedFrame.lock() != frame || m_waitedSince < *m_since) {
+        m_waitedFrame = frame;
+        m_waitedSince = now;
+    }
     const double since = editor->avPlayer()->currentTime().seconds() - frame->time().seconds();
-    return since >= 0 && since < kLongestFrame;
+    return (since >= 0 && since < kLongestFrame) || now - m_waitedSince > kStill;
 }
 
 std::optional<base::Point> Script::middleOf(const std::string& name) const

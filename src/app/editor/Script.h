@@ -6,7 +6,8 @@
 ///   wait hidden|shown      until the chrome has faded out or in
 ///   wait thumbnails        until the strip has all its pictures
 ///   wait trimming|trimmed  until trim mode is on; until it is off and the movie then shown is ready
-///   wait frame [SECONDS]   until the picture of the present time is on the screen, or that of SECONDS or a later one
+///   wait frame [SECONDS]   until the picture of the present time is on the screen (the one that does not change any more,
+///                          where the recording stands still), or that of SECONDS or a later one
 ///   tap NAME  |  tap X Y   touch a control by its accessible name, or a place in points
 ///   drag X1 Y1 X2 Y2       touch, move in small steps, lift
 ///   drag NAME DX           the same from a control's middle, DX points to the right
@@ -27,6 +28,7 @@
 #include "app/editor/TransitionTrial.h"
 #include "base/Clock.h"
 #include "base/Geometry.h"
+#include "platform/media/VideoFrame.h"
 
 #include <memory>
 #include <optional>
@@ -52,7 +54,7 @@ private:
     /// Whether the command is done; if not, it is tried again a little later.
     bool carryOut(const Words& words);
     bool waitFor(const std::string& what);
-    bool waitForFrame(const Words& words) const;
+    bool waitForFrame(const Words& words);
     std::optional<base::Point> middleOf(const std::string& name) const;
     bool tap(const Words& words);
     bool drag(const Words& words);
@@ -71,7 +73,9 @@ private:
     std::size_t m_next = 0;
     std::optional<base::Instant> m_since;
     std::optional<TransitionTrial> m_trial;
-    std::optional<base::Point> m_finger; ///< where it is held
+    std::weak_ptr<const platform::VideoFrame> m_waitedFrame; ///< what is there while `wait frame` waits…
+    base::Instant m_waitedSince{};                           ///< …and since when
+    std::optional<base::Point> m_finger;                     ///< where it is held
     std::shared_ptr<bool> m_alive = std::make_shared<bool>(true);
 };
 

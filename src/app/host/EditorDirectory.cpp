@@ -20,6 +20,7 @@ namespace {
 
 constexpr std::string_view kPrefix = "editor-";
 constexpr const char* kLock = "lock";
+constexpr const char* kSocket = "socket";
 constexpr time_t kDay = 24 * 60 * 60;
 
 std::string environmentPath(const char* name)
@@ -33,6 +34,23 @@ std::string socketOutside(const std::string& directory)
 {
     const std::string runtime = environmentPath("XDG_RUNTIME_DIR");
     return runtime.empty() ? "" : runtime + "/clipsa-" + directory.substr(directory.rfind('/') + 1);
+}
+
+/// And where, if that path is too long too, or is not known.
+std::string temporaryDirectory(const std::string& directory)
+{
+    return "/tmp/clipsa-" + directory.substr(directory.rfind('/') + 1);
+}
+
+void removeTemporaryDirectory(const std::string& path)
+{
+    // Its place is everybody's: only what is ours is looked into.
+    const posix::FileDescriptor directory(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+    struct stat status = {};
+    if (!directory || ::fstat(directory.get(), &status) != 0 || status.st_uid != ::geteuid())
+        return;
+    ::unlinkat(directory.get(), kSocket, 0);
+    ::rmdir(path.c_str());
 }
 
 /// False when something of it is left.
@@ -60,6 +78,7 @@ void removeDirectory(const std::string& path)
         removeAll(path);
     if (const std::string socket = socketOutside(path); !socket.empty())
         ::unlink(socket.c_str());
+    removeTemporaryDirectory(temporaryDirectory(path));
 }
 
 /// Takes the lock of a directory: held by nobody else as long as the result lives.
@@ -156,11 +175,17 @@ EditorDirectory::~EditorDirectory()
 
 base::Result<std::string> EditorDirectory::socketPath() const
 {
-    for (const std::string& path : {m_path + "/socket", socketOutside(m_path)})
+    // It may be that of somebody else, or gone.
+    const std::string outside = socketOutside(m_path);
+    const bool hasRuntime = !outside.empty() && ::access(outside.substr(0, outside.rfind('/')).c_str(), W_OK) == 0;
+    for (const std::string& path : {m_path + "/" + kSocket, hasRuntime ? outside : std::string()})
         if (!path.empty() && path.size() <= dbus::HostConnection::kMaximumPathSize)
             return path;
-    return base::Error::make(base::kPosixErrorDomain, ENAMETOOLONG,
-                             "the path of " + m_path + " is too long for a socket; set XDG_RUNTIME_DIR");
+    const std::string temporary = temporaryDirectory(m_path);
+    if (::mkdir(temporary.c_str(), S_IRWXU) != 0)
+        return base::Error::fromErrno(errno,
+                                      "the path of " + m_path + " is too long for a socket; cannot make " + temporary);
+    return temporary + "/" + kSocket;
 }
 
 } // namespace host

@@ -181,9 +181,22 @@ TEST_F(EditorDirectories, ALongPathGetsItsSocketElsewhere)
     }
     EXPECT_FALSE(std::filesystem::exists(socket)) << "goes with the directory";
 
+    const std::string runtimes[] = {"", "/nowhere", runtime.path() / std::string(100, 'y')};
+    std::filesystem::create_directory(runtimes[2]);
+    for (const std::string& variable : runtimes) {
+        ::setenv("XDG_RUNTIME_DIR", variable.c_str(), 1);
+        {
+            const auto directory = make();
+            socket = directory.socketPath().value();
+            EXPECT_THAT(socket, StartsWith("/tmp/clipsa-editor-"));
+            EXPECT_EQ(std::filesystem::status(std::filesystem::path(socket).parent_path()).permissions(),
+                      std::filesystem::perms::owner_all)
+                << "nobody else reaches it";
+            std::ofstream{socket};
+        }
+        EXPECT_FALSE(std::filesystem::exists(std::filesystem::path(socket).parent_path())) << "goes with it, too";
+    }
     ::unsetenv("XDG_RUNTIME_DIR");
-    const auto directory = make();
-    EXPECT_THAT(directory.socketPath().error()->description(), HasSubstr("set XDG_RUNTIME_DIR"));
     if (before)
         ::setenv("XDG_RUNTIME_DIR", kept.c_str(), 1);
 }
