@@ -10,6 +10,7 @@
 #include <filesystem>
 #include <random>
 #include <system_error>
+#include <unistd.h>
 
 namespace host {
 
@@ -27,6 +28,17 @@ base::ErrorRef isThereAlready(const ExportOrder& order)
     return refused(order.output + " is there already; give --force to replace it");
 }
 
+/// Looked at before the movie, which takes longer. Null when there is nothing wrong with the directory.
+base::ErrorRef whyNotInto(const fs::path& folder)
+{
+    std::error_code error;
+    if (!fs::is_directory(folder, error))
+        return refused("there is no directory " + folder.native() + "; make it first, or choose another");
+    if (::access(folder.c_str(), W_OK | X_OK) != 0)
+        return refused("nothing may be written into " + folder.native() + "; choose another directory");
+    return nullptr;
+}
+
 /// A name beside a file, for what will take its place; nobody else has it.
 fs::path nameBeside(const fs::path& path)
 {
@@ -40,6 +52,8 @@ base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
 {
     std::error_code error;
     const fs::path output = fs::absolute(order.output, error);
+    if (base::ErrorRef why = whyNotInto(output.parent_path()))
+        return why;
     const bool isThere = fs::exists(fs::symlink_status(output, error));
     if (isThere && !order.force)
         return isThereAlready(order);

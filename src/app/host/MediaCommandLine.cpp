@@ -4,6 +4,8 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <iterator>
+#include <string_view>
 #include <utility>
 
 namespace host {
@@ -51,6 +53,22 @@ std::optional<base::Size> sizeIn(const std::string& text)
     if (!width || !height || *width < 1 || *height < 1 || *width > kLargestSide || *height > kLargestSide)
         return std::nullopt;
     return base::Size{double(*width), double(*height)};
+}
+
+/// What is written is an MP4 movie: under the name of another kind, programs that go by names would not play it.
+base::Result<void> expectNameOfMp4(const std::string& command, const std::string& output)
+{
+    static constexpr std::string_view kOthers[] = {".3gp",  ".asf", ".avi", ".flv",  ".gif", ".h264", ".hevc",
+                                                   ".m2ts", ".mka", ".mkv", ".mpeg", ".mpg", ".mts",  ".mxf",
+                                                   ".ogg",  ".ogv", ".ts",  ".webm", ".wmv", ".y4m"};
+    std::string extension = output.substr(std::min(output.rfind('.'), output.size()));
+    for (char& each : extension)
+        if (each >= 'A' && each <= 'Z')
+            each = static_cast<char>(each - 'A' + 'a');
+    if (std::find(std::begin(kOthers), std::end(kOthers), extension) == std::end(kOthers))
+        return {};
+    return usageError(command + " writes an MP4 movie, and " + output
+                      + " is the name of another kind; let it end in .mp4");
 }
 
 base::Result<void> unknownOption(const std::string& command, const Words& words)
@@ -119,6 +137,8 @@ base::Result<void> expectWhole(const TrimCommand& command)
 {
     if (command.output.empty())
         return usageError("trim needs -o OUT, for the new movie");
+    if (const auto named = expectNameOfMp4("trim", command.output); !named)
+        return named;
     if (command.to && !(*command.to > command.from))
         return usageError("--to must be behind --from");
     return {};
@@ -137,7 +157,7 @@ base::Result<void> expectWhole(const MixCommand& command)
 {
     if (command.output.empty())
         return usageError("mix needs -o OUT, for the new movie");
-    return {};
+    return expectNameOfMp4("mix", command.output);
 }
 
 base::Result<void> takeOption(ProbeCommand& command, Words& words)

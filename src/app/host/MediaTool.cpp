@@ -97,8 +97,8 @@ base::Result<std::shared_ptr<platform::Asset>> MediaTool::open(const std::string
     asset->whenLoaded([&loaded] { loaded = true; });
     if (!runUntil([&] { return loaded; }))
         return base::Error::fromErrno(ECANCELED, "cannot open " + path);
-    if (asset->error())
-        return asset->error();
+    if (asset->error()) // the engine's words, but the user's file
+        return base::Error::make(dbus::kBadInputDomain, asset->error()->code(), asset->error()->description());
     return asset;
 }
 

@@ -348,8 +348,9 @@ base::Result<std::unique_ptr<RecorderService>> RecorderService::start(Launcher l
     const auto connection =
         QDBusConnection::connectToBus(QDBusConnection::SessionBus, QStringLiteral("clipsa-service-%1").arg(++count));
     if (!connection.isConnected())
-        return base::Error::make(kErrorDomain, kNotConnected,
-                                 "there is no session bus: " + fromQt(connection.lastError().message()));
+        return base::Error::make(
+            kErrorDomain, kNotConnected,
+            "there is no session bus; start this in a graphical session, or with dbus-run-session");
     auto bus = std::make_unique<Bus>(connection, std::move(launcher), idle, std::move(whenIdle));
     if (const auto started = bus->start(); !started)
         return started.error();

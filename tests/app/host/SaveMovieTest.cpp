@@ -142,7 +142,7 @@ TEST_F(SavingFromAShell, SaysWhyAMovieCannotBeOpened)
     EXPECT_EQ(save({home / "nothing.mp4"}), 2);
     EXPECT_THAT(errors, HasSubstr("there is no file"));
     const fs::path movie = recording("not-a-movie.mp4");
-    EXPECT_EQ(save({movie}), 1);
+    EXPECT_EQ(save({movie}), 2);
     EXPECT_THAT(errors, HasSubstr("is not a movie"));
     expectFailure(movie);
     EXPECT_FALSE(fs::exists(videos));
