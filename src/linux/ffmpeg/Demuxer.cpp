@@ -20,11 +20,20 @@ int refuseToOpen(AVFormatContext*, AVIOContext**, const char*, int, AVDictionary
     return AVERROR(EPERM);
 }
 
+/// Whether the header of its stream is known. Browsers leave it to the first packet.
+bool hasHeader(const AVCodecParameters& parameters)
+{
+    const AVCodecID codec = parameters.codec_id;
+    const bool needsOne = codec == AV_CODEC_ID_H264 || codec == AV_CODEC_ID_HEVC || codec == AV_CODEC_ID_AV1;
+    return !needsOne || parameters.extradata_size > 0;
+}
+
 bool isKnown(const AVStream& stream)
 {
     const AVCodecParameters& parameters = *stream.codecpar;
     if (parameters.codec_type == AVMEDIA_TYPE_VIDEO)
-        return parameters.codec_id != AV_CODEC_ID_NONE && parameters.width > 0 && parameters.height > 0;
+        return parameters.codec_id != AV_CODEC_ID_NONE && parameters.width > 0 && parameters.height > 0
+               && hasHeader(parameters);
     if (parameters.codec_type == AVMEDIA_TYPE_AUDIO)
         return parameters.codec_id != AV_CODEC_ID_NONE && parameters.sample_rate > 0
                && parameters.ch_layout.nb_channels > 0;

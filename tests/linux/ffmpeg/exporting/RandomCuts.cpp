@@ -68,7 +68,8 @@ INSTANTIATE_TEST_SUITE_P(
         Kind{"pcm.mov", true, 39}, Kind{"opus.webm", true, 40}, Kind{"opus.mkv", true, 41},
         Kind{"h264-422.mp4", true, 42}, Kind{"h264-full-range.mp4", true, 43}, Kind{"hevc-422.mp4", true, 44},
         Kind{"h264-fields.mp4", true, 45}, Kind{"h264-fields-apart.mp4", false, 46}, Kind{"h264-odd.mp4", true, 47},
-        Kind{"vp9-odd.webm", true, 48}, Kind{"vp9-422-10bit.mkv", true, 47}),
+        Kind{"vp9-odd.webm", true, 48}, Kind{"h264-recorded.mkv", true, 49}, Kind{"h264-recorded-one.mkv", false, 50},
+        Kind{"av1.ivf", true, 51}, Kind{"vp9-422-10bit.mkv", true, 47}),
     [](const auto& each) {
         std::string name = each.param.file;
         std::replace_if(

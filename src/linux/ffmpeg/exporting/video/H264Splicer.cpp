@@ -25,7 +25,7 @@ base::Result<std::unique_ptr<Splicer>> H264Splicer::make(const AVStream& stream)
     const ByteView extradata = extradataOf(*stream.codecpar);
     auto header = h264::Configuration::parse(extradata);
     if (!header)
-        return cannotCopy("its parameter sets are not in the file's header");
+        return cannotCopy("its parameter sets are neither in the file's header nor in the first packet");
     if (header->hasExtensions)
         return cannotCopy("its parameter sets have extensions");
     std::unique_ptr<H264Splicer> splicer(new H264Splicer);

@@ -31,7 +31,7 @@ base::Result<std::unique_ptr<Splicer>> HevcSplicer::make(const AVStream& stream,
 {
     auto header = hevc::Configuration::parse(extradataOf(*stream.codecpar));
     if (!header)
-        return cannotCopy("its parameter sets are not in the file's header");
+        return cannotCopy("its parameter sets are neither in the file's header nor in the first packet");
     for (const Bytes& set : header->sets)
         if (hevc::unitOf(set) == Unit::Sps && !hevc::parseSps(set))
             return cannotCopy("a parameter set is damaged, or has layers");

@@ -12,7 +12,7 @@ namespace ffmpeg {
 namespace {
 
 constexpr std::size_t kAv1ConfigurationBytes = 4; ///< of "av1C", before the sequence header
-constexpr std::uint8_t kAv1Marker = 0x81;
+constexpr std::uint8_t kAv1Marker = 0x80;         ///< of "av1C"; without it there is the sequence header alone
 
 /// VP9 has at least two columns of tiles where pictures are wider.
 constexpr int kWidestVp9Tile = 4096;
@@ -35,9 +35,10 @@ base::Result<std::unique_ptr<Splicer>> KeyframeSplicer::make(const AVStream& str
     splicer->m_height = picture.height;
     if (splicer->m_isAv1) {
         const ByteView extradata = extradataOf(*stream.codecpar);
-        if (extradata.size() <= kAv1ConfigurationBytes || extradata[0] != kAv1Marker)
-            return cannotCopy("its sequence header is not in the file's header");
-        splicer->m_header.assign(extradata.begin() + kAv1ConfigurationBytes, extradata.end());
+        const std::size_t start = !extradata.empty() && (extradata[0] & kAv1Marker) ? kAv1ConfigurationBytes : 0;
+        if (extradata.size() <= start)
+            return cannotCopy("its sequence header is neither in the file's header nor in the first packet");
+        splicer->m_header.assign(extradata.begin() + static_cast<std::ptrdiff_t>(start), extradata.end());
         splicer->m_hdrUnits = HdrMetadata::of(stream, picture).av1Units();
     }
     return std::unique_ptr<Splicer>(std::move(splicer));
