@@ -4,12 +4,15 @@
 
 #include <algorithm>
 #include <array>
+#include <tuple>
 
 namespace ffmpeg::h264 {
 
 namespace {
 
 constexpr std::size_t kHeaderBytes = 4; ///< NAL header, profile, constraints, level
+constexpr std::size_t kProfileByte = 1;
+constexpr std::size_t kConstraintsByte = 2;
 
 /// Profiles whose sets tell the chroma format and the bit depths.
 bool isHigh(std::uint8_t profile)
@@ -42,7 +45,7 @@ void readHigh(BitReader& in, Sps& sps)
         sps.hasSeparatePlanes = in.bit() != 0;
     sps.lumaDepth = in.ue() + 8;
     sps.chromaDepth = in.ue() + 8;
-    in.skip(1);
+    sps.bypassesTransform = in.bit() != 0;
     if (in.bit()) {
         const int lists = sps.chromaFormat == 3 ? 12 : 8;
         for (int i = 0; i < lists; ++i)
@@ -76,23 +79,24 @@ void readSize(BitReader& in, Sps& sps)
 {
     constexpr std::uint32_t kMost = 1 << 12; // macroblocks a side; no level allows so many
     constexpr int kMacroblock = 16;
-    const std::uint32_t columns = in.ue() + 1;
+    sps.macroblocksWide = in.ue() + 1;
     const std::uint32_t rows = in.ue() + 1;
-    sps.macroblocks = columns * rows;
+    sps.macroblocks = sps.macroblocksWide * rows;
     sps.isProgressive = in.bit() != 0;
     if (!sps.isProgressive)
         in.skip(1);
     in.skip(1);
-    std::array<int, 4> cropped{}; // left, right, top, bottom; in samples of colour, of a field where it can be one
     if (in.bit())
-        for (int& each : cropped)
+        for (int& each : sps.cropping)
             each = static_cast<int>(std::min(in.ue(), kMost * kMacroblock));
     const bool isSubsampled = sps.chromaFormat != 0 && !sps.hasSeparatePlanes;
     const int across = isSubsampled && sps.chromaFormat < 3 ? 2 : 1;
     const int fields = sps.isProgressive ? 1 : 2;
     const int down = (isSubsampled && sps.chromaFormat == 1 ? 2 : 1) * fields;
-    sps.width = static_cast<int>(std::min(columns, kMost)) * kMacroblock - across * (cropped[0] + cropped[1]);
-    sps.height = static_cast<int>(std::min(rows, kMost)) * kMacroblock * fields - down * (cropped[2] + cropped[3]);
+    sps.width = static_cast<int>(std::min(sps.macroblocksWide, kMost)) * kMacroblock
+                - across * (sps.cropping[0] + sps.cropping[1]);
+    sps.height =
+        static_cast<int>(std::min(rows, kMost)) * kMacroblock * fields - down * (sps.cropping[2] + sps.cropping[3]);
 }
 
 void skipRates(BitReader& in)
@@ -137,6 +141,36 @@ void skipUsability(BitReader& in)
     in.skip(1);
 }
 
+/// What a set promises about single pictures: whether they look beyond the edge of others; the least compression of
+/// pictures and of macroblocks, 0 for none; how far motion goes, as powers of two.
+struct Reach {
+    bool isBeyondPicture = true;
+    std::array<std::uint32_t, 4> bounds{2, 1, 16, 16}; // what is meant where nothing is said
+};
+
+Reach reachOf(const Bytes& payload, const Sps& sps)
+{
+    Reach reach;
+    if (!sps.restriction)
+        return reach;
+    BitReader in(payload);
+    in.skip(static_cast<int>(sps.restrictionBit) + 1);
+    reach.isBeyondPicture = in.bit() != 0;
+    for (std::uint32_t& each : reach.bounds)
+        each = in.ue();
+    return reach;
+}
+
+Reach wider(Reach a, const Reach& b)
+{
+    a.isBeyondPicture = a.isBeyondPicture || b.isBeyondPicture;
+    for (std::size_t i = 0; i < 2; ++i)
+        a.bounds[i] = a.bounds[i] == 0 || b.bounds[i] == 0 ? 0 : std::min(a.bounds[i], b.bounds[i]);
+    for (std::size_t i = 2; i < 4; ++i)
+        a.bounds[i] = std::max(a.bounds[i], b.bounds[i]);
+    return a;
+}
+
 } // namespace
 
 std::optional<Sps> parseSps(ByteView nal)
@@ -155,6 +189,7 @@ std::optional<Sps> parseSps(ByteView nal)
         readHigh(in, sps);
     sps.frameNumBits = bitCount(in.ue());
     readPictureOrder(in, sps);
+    sps.referencesBit = in.position();
     sps.referenceFrames = in.ue();
     sps.hasFrameNumGaps = in.bit() != 0;
     readSize(in, sps);
@@ -175,34 +210,45 @@ std::optional<Sps> parseSps(ByteView nal)
     return sps;
 }
 
-std::optional<Bytes> withRestriction(ByteView nal, Sps::Restriction restriction)
+bool canFollow(const Sps& a, const Sps& b)
 {
-    const auto sps = parseSps(nal);
-    if (!sps)
+    const auto shape = [](const Sps& sps) {
+        return std::tie(sps.chromaFormat, sps.lumaDepth, sps.chromaDepth, sps.hasSeparatePlanes, sps.bypassesTransform,
+                        sps.macroblocksWide, sps.macroblocks, sps.isProgressive, sps.cropping);
+    };
+    return shape(a) == shape(b);
+}
+
+std::optional<Bytes> inUseLike(ByteView nal, ByteView source, Sps::Restriction restriction)
+{
+    const auto own = parseSps(nal);
+    const auto like = parseSps(source);
+    if (!own || !like)
         return std::nullopt;
-    const Bytes payload = withoutEmulation(nal);
+    Bytes payload = withoutEmulation(nal);
+    if (isHigh(own->profile) == isHigh(like->profile) && rank(like->profile) > rank(own->profile)) {
+        payload[kProfileByte] = like->profile;
+        payload[kConstraintsByte] = own->constraints & like->constraints;
+    }
     BitWriter out;
-    out.copy(payload, 0, sps->vuiBit);
+    out.copy(payload, 0, own->referencesBit);
+    BitReader in(payload);
+    in.skip(static_cast<int>(own->referencesBit));
+    in.ue();
+    out.ue(std::max(own->referenceFrames, like->referenceFrames));
+    out.copy(payload, in.position(), own->vuiBit);
+
+    const Bytes usability = withoutEmulation(source);
     out.bit(1);
-    if (sps->restrictionBit > 0)
-        out.copy(payload, sps->vuiBit + 1, sps->restrictionBit);
+    if (like->restrictionBit > 0)
+        out.copy(usability, like->vuiBit + 1, like->restrictionBit);
     else
         out.bits(0, 8); // none of what can stand before it
     out.bit(1);
-    BitReader was(payload);
-    was.skip(static_cast<int>(sps->restrictionBit) + 1);
-    if (sps->restriction) {
-        out.bit(was.bit());
-        for (int i = 0; i < 4; ++i)
-            out.ue(was.ue());
-    } else {
-        // The values that are meant where nothing is said.
-        out.bit(1);
-        out.ue(2);
-        out.ue(1);
-        out.ue(16);
-        out.ue(16);
-    }
+    const Reach reach = wider(reachOf(payload, *own), reachOf(usability, *like));
+    out.bit(reach.isBeyondPicture);
+    for (const std::uint32_t each : reach.bounds)
+        out.ue(each);
     out.ue(restriction.reorderFrames);
     out.ue(restriction.bufferedFrames);
     out.finish();

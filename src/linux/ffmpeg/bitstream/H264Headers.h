@@ -3,6 +3,7 @@
 
 #include "linux/ffmpeg/bitstream/Bits.h"
 
+#include <array>
 #include <cstdint>
 #include <optional>
 #include <vector>
@@ -28,6 +29,19 @@ inline Unit unitOf(ByteView nal)
 }
 
 /// A sequence parameter set.
+///
+/// Two streams are joined under one header by giving each sets of its own. Decoders look up a slice's sets, but what they
+/// derived from the first sequence set they often keep until the size or format of pictures changes. What these say:
+/// - id, bits of frame numbers and of the picture order, its type, gaps, inference of direct blocks: looked up for each
+///   slice, and forgotten with each IDR. They may differ.
+/// - chroma format, depths, planes of their own, bypassing of the transform, size, fields or not, cropping: they make
+///   buffers, tables of functions and the order in which coefficients are read. They must be the same (canFollow()).
+/// - profile, level, number of references, restriction of reordering: by them a decoder is chosen, its buffers counted,
+///   and pictures held back. The set that is added asks for what the other one does (inUseLike()).
+/// - usability (aspect, colours, chroma location, timing): what changes there has players and decoders begin anew. The set
+///   that is added says the same, word for word (inUseLike()); what it says of its references' reach is the wider of both.
+/// - scaling lists, and all of a picture set (entropy coding, weights, quantisers, transform sizes): looked up for each
+///   slice, like the tables made of them. They may differ.
 struct Sps {
     std::uint32_t id = 0;
     std::uint8_t profile = 0;
@@ -37,13 +51,17 @@ struct Sps {
     std::uint32_t lumaDepth = 8;
     std::uint32_t chromaDepth = 8;
     bool hasSeparatePlanes = false;
+    bool bypassesTransform = false; ///< of blocks with the finest quantiser, which are without loss then
     int frameNumBits = 4;
     std::uint32_t orderType = 0;
     int orderBits = 4; ///< of the picture order count, of type 0
     std::uint32_t referenceFrames = 0;
     bool hasFrameNumGaps = false;
     std::uint32_t macroblocks = 0; ///< of a picture that is not interlaced
+    std::uint32_t macroblocksWide = 0;
     bool isProgressive = true;
+    /// Left, right, top, bottom; in samples of colour, of a field where it can be one.
+    std::array<int, 4> cropping{};
     /// Of the pictures that are shown, in pixels. Containers may show less.
     int width = 0;
     int height = 0;
@@ -53,14 +71,18 @@ struct Sps {
         std::uint32_t bufferedFrames;
     };
     std::optional<Restriction> restriction;
-    std::size_t vuiBit = 0;         ///< position of the flag that announces the usability information
+    std::size_t referencesBit = 0;  ///< position of the number of references
+    std::size_t vuiBit = 0;         ///< of the flag that announces the usability information
     std::size_t restrictionBit = 0; ///< of the flag inside it that announces the restriction; 0 without the former
 };
 
 /// Nothing when it is damaged.
 std::optional<Sps> parseSps(ByteView nal);
-/// The same set, saying this about reordering.
-std::optional<Bytes> withRestriction(ByteView nal, Sps::Restriction restriction);
+/// Whether slices of one set can follow those of the other in one stream.
+bool canFollow(const Sps& a, const Sps& b);
+/// The same set, for pictures that are used as those of `source` are, and saying this about reordering. Nothing when one
+/// of them is damaged.
+std::optional<Bytes> inUseLike(ByteView nal, ByteView source, Sps::Restriction restriction);
 
 struct PpsIds {
     std::uint32_t pps;

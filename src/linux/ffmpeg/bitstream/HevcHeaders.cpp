@@ -3,6 +3,7 @@
 #include "linux/ffmpeg/bitstream/NalUnits.h"
 
 #include <algorithm>
+#include <tuple>
 
 namespace ffmpeg::hevc {
 
@@ -52,22 +53,78 @@ std::optional<Sps> parseSps(ByteView nal)
         return std::nullopt;
     in.skip(1 + kProfileBits);
     sps.id = in.ue();
-    if (in.ue() == 3)
-        in.skip(1);
-    in.ue();
-    in.ue();
+    sps.chromaFormat = in.ue();
+    if (sps.chromaFormat == 3)
+        sps.hasSeparatePlanes = in.bit() != 0;
+    sps.width = in.ue();
+    sps.height = in.ue();
     if (in.bit())
-        for (int i = 0; i < 4; ++i)
-            in.ue();
-    in.ue();
-    in.ue();
+        for (std::uint32_t& side : sps.window)
+            side = in.ue();
+    sps.lumaDepth = in.ue() + 8;
+    sps.chromaDepth = in.ue() + 8;
     in.ue();
     in.skip(1);
-    in.ue();
-    sps.reorderPictures = in.ue();
+    sps.bufferingBit = in.position();
+    for (std::uint32_t* each : {&sps.buffering.pictures, &sps.buffering.reordered, &sps.buffering.latency})
+        *each = in.ue();
     if (in.isBeyond() || sps.id > 15)
         return std::nullopt;
     return sps;
+}
+
+bool canFollow(const Sps& a, const Sps& b)
+{
+    const auto looks = [](const Sps& sps) {
+        const std::uint32_t across = sps.chromaFormat == 1 || sps.chromaFormat == 2 ? 2 : 1;
+        const std::uint32_t down = sps.chromaFormat == 1 ? 2 : 1;
+        return std::tuple(sps.chromaFormat, sps.hasSeparatePlanes, sps.lumaDepth, sps.chromaDepth, sps.window[0],
+                          sps.window[2], sps.width - across * (sps.window[0] + sps.window[1]),
+                          sps.height - down * (sps.window[2] + sps.window[3]));
+    };
+    return looks(a) == looks(b);
+}
+
+std::optional<Bytes> withBuffering(ByteView nal, const Sps& source)
+{
+    const auto own = parseSps(nal);
+    const Bytes payload = withoutEmulation(nal);
+    const std::size_t end = endOf(payload);
+    if (!own || own->bufferingBit > end)
+        return std::nullopt;
+    BitWriter out;
+    out.copy(payload, 0, own->bufferingBit);
+    out.ue(std::max(own->buffering.pictures, source.buffering.pictures));
+    out.ue(std::max(own->buffering.reordered, source.buffering.reordered));
+    const bool isBounded = own->buffering.latency > 0 && source.buffering.latency > 0;
+    out.ue(isBounded ? std::max(own->buffering.latency, source.buffering.latency) : 0);
+    BitReader in(payload);
+    in.skip(static_cast<int>(own->bufferingBit));
+    for (int i = 0; i < 3; ++i)
+        in.ue();
+    out.copy(payload, in.position(), end);
+    out.finish();
+    return withEmulation(out.bytes());
+}
+
+bool allowsLossless(ByteView pps)
+{
+    const Bytes payload = beginningOf(pps);
+    BitReader in(payload);
+    in.skip(kHeaderBits);
+    in.ue();
+    in.ue();
+    in.skip(7);
+    in.ue();
+    in.ue();
+    in.se();
+    in.skip(2);
+    if (in.bit())
+        in.ue();
+    in.se();
+    in.se();
+    in.skip(3);
+    return in.bit() != 0;
 }
 
 Ids idsOfPps(ByteView nal)

@@ -6,6 +6,7 @@
 
 #include "linux/ffmpeg/bitstream/Bits.h"
 
+#include <array>
 #include <cstdint>
 #include <optional>
 #include <vector>
@@ -47,15 +48,46 @@ struct Ids {
     std::uint32_t pps = 0;
 };
 
+/// A sequence parameter set, of a stream without layers in time.
+///
+/// Two streams are joined under one header by giving each sets of its own. Another set becomes active only where a group
+/// begins that needs nothing before it, and decoders derive all anew from it: coding tools, block sizes, scaling lists,
+/// bits of the picture order, quantisers, and all of a picture set may differ. What may not:
+/// - chroma format, depths, planes of their own, the part that is shown: what is decoded into is made for them.
+/// - how many pictures are kept and how far they are reordered: where that changes, or the coded size, decoders may forget
+///   the pictures that they have not shown yet. The set that is added says of it what the other one does
+///   (withBuffering()), and its coded size is the same where the encoder can make it so.
+/// - usability (aspect, colours): the encoder is told what the pictures say.
+/// - passing blocks by without transform, which a picture set allows: decoders look it up, but what is without loss must
+///   stay so.
 struct Sps {
     std::uint32_t id = 0;
     std::uint32_t vps = 0;
-    std::uint32_t reorderPictures = 0;
+    std::uint32_t chromaFormat = 1;
+    bool hasSeparatePlanes = false;
+    std::uint32_t width = 0; ///< as coded
+    std::uint32_t height = 0;
+    std::array<std::uint32_t, 4> window{}; ///< samples of chroma that are not shown: left, right, top, bottom
+    std::uint32_t lumaDepth = 8;
+    std::uint32_t chromaDepth = 8;
+    struct Buffering {
+        std::uint32_t pictures = 0; ///< one less than are kept
+        std::uint32_t reordered = 0;
+        std::uint32_t latency = 0; ///< one more than are shown later at most than what is decoded behind them; 0: any
+    };
+    Buffering buffering;
+    std::size_t bufferingBit = 0; ///< its position
 };
 
 std::uint32_t idOfVps(ByteView nal);
 /// Nothing when it is damaged, or has layers in time.
 std::optional<Sps> parseSps(ByteView nal);
+/// Whether pictures of both look alike to whoever shows them.
+bool canFollow(const Sps& a, const Sps& b);
+/// The same set, for a stream whose pictures are kept and reordered at least like those of `source`.
+std::optional<Bytes> withBuffering(ByteView nal, const Sps& source);
+/// Whether blocks may be kept as they are, without loss.
+bool allowsLossless(ByteView pps);
 /// Its own number and that of its sequence set.
 Ids idsOfPps(ByteView nal);
 /// The picture set that a slice refers to.

@@ -67,8 +67,8 @@ TEST_F(Headers, OfH264SayHowFarPicturesAreReordered)
 {
     const auto configuration = h264::Configuration::parse(headerOf("h264-b.mp4"));
     const ffmpeg::Bytes& sps = configuration->sps.front();
-    EXPECT_EQ(h264::withRestriction(sps, *h264::parseSps(sps)->restriction), sps) << "the same written again";
-    const auto changed = h264::withRestriction(sps, {1, 5});
+    EXPECT_EQ(h264::inUseLike(sps, sps, *h264::parseSps(sps)->restriction), sps) << "the same written again";
+    const auto changed = h264::inUseLike(sps, sps, {1, 5});
     ASSERT_TRUE(changed);
     EXPECT_EQ(h264::parseSps(*changed)->restriction->reorderFrames, 1U);
     EXPECT_EQ(h264::parseSps(*changed)->restriction->bufferedFrames, 5U);
@@ -101,7 +101,7 @@ TEST_F(Headers, ThatAreDamagedAreRefused)
         other[random() % other.size()] = static_cast<std::uint8_t>(random());
         if (const auto found = h264::Configuration::parse(one))
             for (const auto& set : found->sps)
-                h264::withRestriction(set, {1, 2});
+                h264::inUseLike(set, found->sps.front(), {1, 2});
         if (const auto found = hevc::Configuration::parse(other))
             for (const auto& set : found->sets)
                 hevc::renumbered(set, {1, 1, 15});

@@ -97,16 +97,18 @@ void H264Splicer::see(const AVPacket& copied)
     }
 }
 
-/// Otherwise each export of an export would leave one more set behind.
-void H264Splicer::dropUnused(h264::Configuration& header) const
+/// Those that something copied refers to: otherwise each export of an export would leave one more set behind.
+h264::Configuration H264Splicer::usedSets() const
 {
+    h264::Configuration used = m_header;
     if (m_usedPps.empty())
-        return;
+        return used;
     std::set<std::uint32_t> usedSps;
-    std::erase_if(header.pps, [&](const Bytes& nal) { return !m_usedPps.contains(h264::idsOfPps(nal).pps); });
-    for (const Bytes& nal : header.pps)
+    std::erase_if(used.pps, [&](const Bytes& nal) { return !m_usedPps.contains(h264::idsOfPps(nal).pps); });
+    for (const Bytes& nal : used.pps)
         usedSps.insert(h264::idsOfPps(nal).sps);
-    std::erase_if(header.sps, [&](const Bytes& nal) { return !usedSps.contains(h264::parseSps(nal)->id); });
+    std::erase_if(used.sps, [&](const Bytes& nal) { return !usedSps.contains(h264::parseSps(nal)->id); });
+    return used;
 }
 
 base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDepth)
@@ -130,7 +132,10 @@ base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDept
         m_restriction.bufferedFrames =
             std::max({m_restriction.bufferedFrames, buffered, m_restriction.reorderFrames, 1U});
     }
-    const h264::Sps& sps = m_sps.front();
+    m_used = usedSets();
+    if (m_used.sps.empty())
+        return cannotCopy("its pictures refer to parameter sets that are not in the file's header");
+    const h264::Sps sps = *h264::parseSps(m_used.sps.front());
     // What the file leaves out of the pictures at their edges the stream still has: an odd row, for one.
     request.width = sps.width;
     request.height = sps.height;
@@ -139,15 +144,23 @@ base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDept
         request.options["profile"] = "baseline";
     else if (sps.profile == FF_PROFILE_H264_MAIN)
         request.options["profile"] = "main";
-    request.options.insert({{"preset", kPreset}, {"crf", kQuality}, {"a53cc", "0"}});
+    request.options.insert({{"preset", kPreset}, {"a53cc", "0"}});
+    // Only what is without loss itself can stand beside what may be: see h264::Sps.
+    request.options.insert(sps.bypassesTransform ? std::pair("qp", "0") : std::pair("crf", kQuality));
     // Left to itself the preset makes a baseline stream, and decoders in hardware do not like the profile to change.
-    const bool isMain = sps.profile == FF_PROFILE_H264_MAIN;
+    const char* tool = ":8x8dct=1";
+    if (sps.profile == FF_PROFILE_H264_BASELINE)
+        tool = ":cabac=0";
+    else if (sps.profile == FF_PROFILE_H264_MAIN)
+        tool = ":cabac=1";
     std::string params = "stitchable=1:scenecut=0:keyint=infinite:bframes=0:ref=1:mbtree=0";
-    params.append(isMain ? ":cabac=1" : ":8x8dct=1").append(":sps-id=").append(std::to_string(id));
+    params.append(tool).append(":sps-id=").append(std::to_string(id));
     constexpr std::uint8_t kLowestSensibleLevel = 10;
     const bool isLevel1b = sps.level == 11 && (sps.constraints & 0x10);
     if (sps.level >= kLowestSensibleLevel && !isLevel1b)
         params.append(":level=").append(std::to_string(sps.level));
+    if (!sps.isProgressive && !request.isInterlaced)
+        params.append(":fake-interlaced=1"); // whole pictures among such that may be of fields
     request.options["x264-params"] = params;
     return {};
 }
@@ -159,10 +172,14 @@ base::Result<void> H264Splicer::join(const AVCodecContext& encoder)
     if (!header)
         return cannotCopy("the encoder did not tell its parameter sets");
     for (const Bytes& nal : header->sps) {
-        const auto same = h264::withRestriction(nal, m_restriction);
-        if (!same)
+        const auto own = h264::inUseLike(nal, m_used.sps.front(), m_restriction);
+        const auto sps = own ? h264::parseSps(*own) : std::nullopt;
+        if (!sps)
             return cannotCopy("the encoder's parameter sets make no sense");
-        m_encoderSps.push_back(*same);
+        for (const Bytes& used : m_used.sps)
+            if (!h264::canFollow(*sps, *h264::parseSps(used)))
+                return cannotCopy("no pictures can be encoded that decoders take for its own");
+        m_encoderSps.push_back(*own);
     }
     m_encoderPps = header->pps;
     return {};
@@ -170,8 +187,7 @@ base::Result<void> H264Splicer::join(const AVCodecContext& encoder)
 
 base::Result<void> H264Splicer::describe(AVCodecParameters& parameters)
 {
-    h264::Configuration all = m_header;
-    dropUnused(all);
+    h264::Configuration all = usedSets();
     if (m_hasStartCodes)
         all.lengthSize = 4;
     all.sps.insert(all.sps.end(), m_encoderSps.begin(), m_encoderSps.end());

@@ -1,4 +1,5 @@
-/// Joins H.264 with what x264 encodes: its parameter sets get an id of their own, and stand beside the stream's.
+/// Joins H.264 with what x264 encodes: its parameter sets get an id of their own, and stand beside the stream's. They must
+/// agree with those in all that decoders keep from one to the other: h264::Sps says what that is.
 #pragma once
 
 #include "linux/ffmpeg/bitstream/H264Headers.h"
@@ -29,12 +30,13 @@ private:
     std::vector<ByteView> unitsIn(const AVPacket& packet) const;
     bool isKnown(ByteView set) const;
     const h264::Sps& spsOf(ByteView slice) const;
-    void dropUnused(h264::Configuration& header) const;
+    h264::Configuration usedSets() const;
 
     h264::Configuration m_header;
     bool m_hasStartCodes = false;
     std::vector<h264::Sps> m_sps;
     std::set<std::uint32_t> m_usedPps; ///< empty when nobody looked
+    h264::Configuration m_used;        ///< when pictures are encoded: the sets of those that are copied
     h264::Sps::Restriction m_restriction{0, 1};
     std::vector<Bytes> m_encoderSps;
     std::vector<Bytes> m_encoderPps;

@@ -25,6 +25,18 @@ std::optional<std::uint32_t> freeId(const std::set<std::uint32_t>& taken, std::u
     return std::nullopt;
 }
 
+/// The size of the smallest blocks by which the encoder fills up pictures to the size that `sps` has.
+std::uint32_t blockSizeFor(const hevc::Sps& sps, const EncoderRequest& request)
+{
+    constexpr std::uint32_t kSmallest = 8;
+    for (const std::uint32_t block : {kSmallest, 16U, 32U}) {
+        const auto filled = [&](int side) { return (static_cast<std::uint32_t>(side) + block - 1) / block * block; };
+        if (filled(request.width) == sps.width && filled(request.height) == sps.height)
+            return block;
+    }
+    return kSmallest;
+}
+
 } // namespace
 
 base::Result<std::unique_ptr<Splicer>> HevcSplicer::make(const AVStream& stream, const AVFrame& picture)
@@ -74,7 +86,7 @@ int HevcSplicer::reorderDepth() const
     std::uint32_t depth = 0;
     for (const Bytes& set : m_header.sets)
         if (hevc::unitOf(set) == Unit::Sps)
-            depth = std::max(depth, hevc::parseSps(set)->reorderPictures);
+            depth = std::max(depth, hevc::parseSps(set)->buffering.reordered);
     return static_cast<int>(std::min<std::uint32_t>(depth, 16));
 }
 
@@ -129,11 +141,21 @@ base::Result<void> HevcSplicer::prepare(EncoderRequest& request, int /*reorderDe
     if (!vps || !sps || !pps)
         return cannotCopy("all ids of parameter sets are taken");
     m_ids = {*vps, *sps, *pps};
+    bool isLossless = false;
+    for (const Bytes& set : usedSets()) {
+        if (hevc::unitOf(set) == Unit::Sps)
+            m_used.push_back(*hevc::parseSps(set));
+        else if (hevc::unitOf(set) == Unit::Pps)
+            isLossless = isLossless || hevc::allowsLossless(set);
+    }
+    if (m_used.empty())
+        return cannotCopy("its pictures refer to parameter sets that are not in the file's header");
     request.encoder = "libx265";
     // Nearly without loss: it stands beside untouched pictures.
-    request.options = {{"preset", "veryfast"},
-                       {"x265-params", "crf=8:bframes=0:scenecut=0:open-gop=0:ref=1:cutree=0:info=0:aud=0:hrd=0:"
-                                       "repeat-headers=0:log-level=none"}};
+    std::string params = isLossless ? "lossless=1" : "crf=8";
+    params.append(":bframes=0:scenecut=0:open-gop=0:ref=1:cutree=0:info=0:aud=0:hrd=0:repeat-headers=0:log-level=none");
+    params.append(":min-cu-size=").append(std::to_string(blockSizeFor(m_used.front(), request)));
+    request.options = {{"preset", "veryfast"}, {"x265-params", params}};
     return {};
 }
 
@@ -145,6 +167,14 @@ base::Result<void> HevcSplicer::join(const AVCodecContext& encoder)
         return cannotCopy("the encoder did not tell its parameter sets");
     for (const Bytes& set : header->sets) {
         auto own = hevc::renumbered(set, m_ids);
+        for (const hevc::Sps& used : m_used) {
+            if (!own || hevc::unitOf(*own) != Unit::Sps)
+                break;
+            const auto sps = hevc::parseSps(*own);
+            if (sps && !hevc::canFollow(*sps, used))
+                return cannotCopy("no pictures can be encoded that decoders take for its own");
+            own = hevc::withBuffering(*own, used);
+        }
         if (!own)
             return cannotCopy("the encoder's parameter sets make no sense");
         m_encoderSets.push_back(std::move(*own));

@@ -1,4 +1,5 @@
-/// Joins HEVC with what x265 encodes: its parameter sets are given numbers of their own, and stand beside the stream's.
+/// Joins HEVC with what x265 encodes: its parameter sets are given numbers of their own, and stand beside the stream's. They
+/// must agree with those in what hevc::Sps says.
 #pragma once
 
 #include "linux/ffmpeg/bitstream/HevcHeaders.h"
@@ -34,6 +35,7 @@ private:
 
     hevc::Configuration m_header;
     std::set<std::uint32_t> m_usedPps; ///< empty when nobody looked
+    std::vector<hevc::Sps> m_used;     ///< when pictures are encoded: of those that are copied
     hevc::Ids m_ids;                   ///< the encoder's
     std::vector<Bytes> m_encoderSets;
     Bytes m_hdrUnit; ///< stands in each keyframe; empty when the movie says nothing

@@ -1,4 +1,12 @@
 /// Joins VP9 and AV1 with what is encoded beside it: their keyframes bring all headers along.
+///
+/// A keyframe that is shown leaves nothing of what was decoded before: not pictures, nor probabilities, segments, filters'
+/// differences, quantisers or films of grain. So nothing of these must agree. What is decoded into (profile, depth,
+/// subsampling, size) and what players ask for (matrix, range) does, because the encoder is given pictures of the stream:
+/// one that changes any of them on the way is not joined. Two things are not the pictures':
+/// - AV1's sequence header (bits of the order of pictures, tools, levels) begins a sequence anew where it differs from the
+///   last, so each keyframe that is copied behind others must bring its own.
+/// - VP9's size for rendering: decoders pass it by.
 #pragma once
 
 #include "linux/ffmpeg/bitstream/Bits.h"

@@ -57,8 +57,8 @@ Result<std::unique_ptr<TrackSource>> SplicedVideoSource::open(std::unique_ptr<Pi
         return plan.error();
     std::unique_ptr<SplicedVideoSource> source(new SplicedVideoSource(
         std::move(packets), std::move(splicer).value(), std::move(plan).value(), start, end, std::move(log)));
-    for (const auto& step : {&SplicedVideoSource::findInterruptions, &SplicedVideoSource::prepareEncoder,
-                             &SplicedVideoSource::showToSplicer}) {
+    for (const auto& step : {&SplicedVideoSource::findInterruptions, &SplicedVideoSource::showToSplicer,
+                             &SplicedVideoSource::prepareEncoder}) {
         if (const auto done = (*source.*step)(); !done)
             return done.error();
     }
