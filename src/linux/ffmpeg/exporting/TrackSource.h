@@ -4,6 +4,7 @@
 #include "base/MediaTime.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
+#include "linux/ffmpeg/exporting/video/JointWitness.h"
 
 namespace ffmpeg {
 
@@ -25,6 +26,9 @@ public:
     /// The next packet, in the time base that describe() left, `start` being 0. Times before 0 are what a decoder needs
     /// but nobody sees or hears: an edit list hides them. False when there is none left.
     virtual base::Result<bool> next(AVPacket& packet) = 0;
+
+    /// When all have come: where packets of different origin follow each other, and what is to be seen there.
+    virtual base::Result<std::vector<Joint>> joints() { return std::vector<Joint>(); }
 };
 
 } // namespace ffmpeg

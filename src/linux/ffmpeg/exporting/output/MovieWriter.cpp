@@ -97,8 +97,13 @@ public:
                 return done.error();
         }
         std::vector<TrackSummary> summaries;
-        for (const Track& each : m_tracks)
+        for (const Track& each : m_tracks) {
+            auto joints = each.source->joints();
+            if (!joints)
+                return joints.error();
             summaries.push_back(each.summary);
+            summaries.back().joints = std::move(joints).value();
+        }
         return summaries;
     }
 

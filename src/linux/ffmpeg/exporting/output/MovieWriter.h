@@ -18,6 +18,7 @@ struct TrackSummary {
     std::int64_t packets = 0;
     std::int64_t firstPts = 0;
     std::int64_t lastPts = 0; ///< the latest
+    std::vector<Joint> joints;
 };
 
 struct WriteJob {

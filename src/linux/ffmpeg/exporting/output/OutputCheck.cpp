@@ -91,6 +91,47 @@ Result<void> checkGroups(Demuxer& demuxer, int stream)
     return {};
 }
 
+/// So many packets of the movie from one on, in the order of decoding.
+Result<void> take(Demuxer& demuxer, int stream, const JointSide& side, std::vector<Owned<AVPacket>>& packets)
+{
+    const AVIndexEntry* first = avformat_index_get_entry(&demuxer.stream(stream), static_cast<int>(side.firstPacket));
+    if (!first || !demuxer.seek(stream, first->timestamp))
+        return wrong("it cannot be read from each joint");
+    const std::int64_t position = first->pos;
+    bool isThere = false;
+    for (std::int64_t left = side.packets; left > 0;) {
+        auto packet = newPacket();
+        if (demuxer.read(*packet) != 0)
+            return wrong("packets at a joint are missing");
+        isThere = isThere || packet->pos == position;
+        if (!isThere)
+            continue;
+        packets.push_back(std::move(packet));
+        --left;
+    }
+    return {};
+}
+
+/// Players decode what was encoded and what was copied in one go: by one decoder, which keeps some of what it learnt.
+Result<void> checkJoint(Demuxer& demuxer, int stream, const Joint& joint)
+{
+    std::vector<Owned<AVPacket>> packets;
+    std::vector<PictureLook> expected;
+    for (const JointSide* side : {&joint.before, &joint.after}) {
+        if (auto taken = take(demuxer, stream, *side, packets); side->packets > 0 && !taken)
+            return taken;
+        expected.insert(expected.end(), side->looks.begin(), side->looks.end());
+    }
+    const auto seen = looksOf(*demuxer.stream(stream).codecpar, packets);
+    if (!seen)
+        return seen.error();
+    std::erase_if(expected, [](const PictureLook& look) { return look.isDamaged; });
+    auto next = expected.begin();
+    for (const PictureLook& look : seen.value())
+        next += next != expected.end() && next->hash == look.hash;
+    return next == expected.end() ? Result<void>() : wrong("pictures beside a joint are not what they should be");
+}
+
 } // namespace
 
 Result<void> checkOutput(const OutputFile& file, const std::vector<TrackSummary>& written, const Cancelled& cancelled)
@@ -122,6 +163,9 @@ Result<void> checkOutput(const OutputFile& file, const std::vector<TrackSummary>
             return wrong("its pictures end too late");
         if (auto checked = checkGroups(demuxer, i); !checked)
             return checked;
+        for (const Joint& joint : track.joints)
+            if (auto checked = checkJoint(demuxer, i, joint); !checked)
+                return checked;
     }
     return {};
 }

@@ -7,8 +7,9 @@
 
 namespace ffmpeg {
 
-/// The error says what is wrong: a track, its first picture or sound, its length, or a group that cannot be decoded. It
-/// saysCannotCopySound() where that is a matter of the sound alone, and saysCannotCopy() otherwise.
+/// The error says what is wrong: a track, its first picture or sound, its length, a group that cannot be decoded, or
+/// pictures beside a joint that are not the source's. It saysCannotCopySound() where that is a matter of the sound alone,
+/// and saysCannotCopy() otherwise.
 base::Result<void> checkOutput(const OutputFile& file, const std::vector<TrackSummary>& written,
                                const Cancelled& cancelled);
 

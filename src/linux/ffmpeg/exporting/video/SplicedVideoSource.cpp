@@ -171,6 +171,8 @@ Result<void> SplicedVideoSource::beginStretch(State state)
         return {};
     }
     if (state == State::Copy) {
+        if (auto begun = m_witness.beginStretch(*m_packets->stream().codecpar); !begun)
+            return begun;
         if (!m_copied)
             m_packets->seek(m_plan.copyFrom);
         return {};
@@ -179,6 +181,8 @@ Result<void> SplicedVideoSource::beginStretch(State state)
         if (auto opened = openEncoder(); !opened)
             return opened;
     }
+    if (auto begun = m_witness.beginStretch(m_encoder->context()); !begun)
+        return begun;
     const std::int64_t from = state == State::Head ? m_plan.firstPts : m_plan.tail.front();
     m_lastEncoded = kNone;
     m_hasReachedJoint = false;
@@ -213,6 +217,7 @@ Result<void> SplicedVideoSource::encodeSome()
         if (coded.width != m_request.width || coded.height != m_request.height || coded.format != m_request.format)
             return cannotCopy("its pictures change their size or format");
         m_lastEncoded = pts;
+        m_witness.seePicture(coded);
         if (auto done = m_encoder->encode(coded, std::max(pts, m_start), m_packets->outTicks(coded.pkt_duration));
             !done)
             return done;
@@ -221,9 +226,10 @@ Result<void> SplicedVideoSource::encodeSome()
     }
     while (auto packet = m_encoder->take()) {
         packet->pts -= m_start;
+        const bool isJoint = packet->flags & AV_PKT_FLAG_KEY;
+        m_witness.seePacket(*packet, isJoint);
         if (auto done = m_splicer->adoptEncoded(*packet); !done)
             return done;
-        const bool isJoint = packet->flags & AV_PKT_FLAG_KEY;
         if (auto done = m_line->push(std::move(packet), isJoint); !done)
             return done;
     }
@@ -275,6 +281,7 @@ Result<void> SplicedVideoSource::copyOne()
         return cannotCopy("its header changes on the way");
     m_lastDts = std::max(m_lastDts, packet->dts);
     const bool isJoint = (packet->flags & AV_PKT_FLAG_KEY) && m_splicer->isJoint(*packet);
+    m_witness.seePacket(*packet, isJoint);
     if (auto done = m_splicer->adoptCopied(*packet); !done)
         return done;
     av_packet_free_side_data(packet.get());

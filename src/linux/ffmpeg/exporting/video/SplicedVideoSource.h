@@ -25,6 +25,7 @@ public:
     base::Result<void> describe(AVStream& output) override;
     /// May still find that the packets cannot be copied.
     base::Result<bool> next(AVPacket& packet) override;
+    base::Result<std::vector<Joint>> joints() override { return m_witness.joints(); }
 
 private:
     enum class State { Head, Copy, Tail, Ended };
@@ -62,7 +63,8 @@ private:
     bool m_hasReachedJoint = false;          ///< decoding the head
     bool m_isPastJoint = false;              ///< copying
     std::int64_t m_lastDts = AV_NOPTS_VALUE; ///< of what was copied, in the stream's ticks
-    Owned<AVPacket> m_copied;                ///< where copying begins, when it was read already
+    JointWitness m_witness;
+    Owned<AVPacket> m_copied; ///< where copying begins, when it was read already
 };
 
 } // namespace ffmpeg
