@@ -145,6 +145,19 @@ TEST_F(AnOutput, HasItsIndexInFront)
     EXPECT_LT(bytes.find("moov"), bytes.find("mdat"));
 }
 
+TEST_F(AnOutput, TakesNoMoreRoomThanItNeeds)
+{
+    for (const char* name : {"h264.mp4", "h264-b.mp4", "two-tracks.mp4", "hevc.mp4", "h264-fragmented.mp4"}) {
+        ASSERT_EQ(cut(exportMovie(name), output(), std::nullopt), ExportStatus::Completed) << errorText();
+        const auto size = std::filesystem::file_size(output());
+        const auto source = std::filesystem::file_size(exportMovie(name));
+        EXPECT_LT(size, source + source / 20 + 2000) << name;
+        const std::string bytes = bytesOf(output());
+        EXPECT_LT(bytes.find("moov"), bytes.find("mdat"));
+        std::filesystem::remove(output());
+    }
+}
+
 TEST_F(AnOutput, IsMadeOfAMovieWhoseFileIsGone)
 {
     std::filesystem::copy_file(exportMovie("h264.mp4"), output("source.mp4"));
@@ -222,6 +235,7 @@ TEST_F(AnOutput, HasRoomForItsIndexAlsoWhereMorePacketsComeThanThought)
     const std::string bytes = bytesOf(output());
     EXPECT_LT(bytes.find("moov"), bytes.find("mdat"));
     EXPECT_EQ(DecodedMovie(output()).all().size(), 150U);
+    EXPECT_LT(bytes.size(), std::filesystem::file_size(exportMovie("h264-b.mp4")) + 2000);
 }
 
 TEST_F(AnOutput, WhoseSoundIsWrongIsNoReasonToEncodeItsPictures)

@@ -1,5 +1,6 @@
 #include "linux/ffmpeg/exporting/output/MovieWriter.h"
 
+#include "linux/ffmpeg/exporting/output/IndexRoom.h"
 #include "linux/ffmpeg/exporting/output/TrackTurns.h"
 
 #include <algorithm>
@@ -243,6 +244,8 @@ private:
         avio_flush(m_io.get());
         if (error >= 0)
             error = m_io->error;
+        if (error >= 0)
+            error = closeIndexRoom(m_job.file);
         return error < 0 ? Result<void>(failure(error)) : Result<void>();
     }
 
