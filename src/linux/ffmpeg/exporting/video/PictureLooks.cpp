@@ -77,6 +77,8 @@ base::Result<std::vector<PictureLook>> looksOf(const AVCodecParameters& paramete
         return failure(AVERROR_DECODER_NOT_FOUND);
     int error = avcodec_parameters_to_context(decoder.get(), &parameters);
     decoder->thread_count = 1;
+    // What a file leaves out of pictures at their edges an encoder is given.
+    decoder->width = decoder->height = 0;
     if (error >= 0)
         error = avcodec_open2(decoder.get(), codec, nullptr);
     if (error < 0)
