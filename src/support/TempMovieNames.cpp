@@ -1,10 +1,43 @@
 #include "support/TempMovieNames.h"
 
+#include <cstddef>
+
 namespace support {
+
+namespace {
+
+/// Bytes of an app's name, so that the seconds and the ending still fit into a file's.
+constexpr std::size_t kLongestAppName = 200;
+
+bool continuesCharacter(char byte)
+{
+    return (static_cast<unsigned char>(byte) & 0xC0) == 0x80;
+}
+
+/// What stands for a byte that no file name may have; empty when it may.
+std::string_view substituteFor(char byte)
+{
+    if (byte == '/')
+        return "\u2044"; // looks the same
+    return static_cast<unsigned char>(byte) < 0x20 || byte == 0x7F ? " " : "";
+}
+
+} // namespace
 
 std::string trimmedMovieName(std::string_view appName)
 {
-    return std::string(appName) + "_";
+    std::string name;
+    for (const char byte : appName) {
+        const std::string_view substitute = substituteFor(byte);
+        name += substitute.empty() ? std::string_view(&byte, 1) : substitute;
+    }
+    if (name.size() > kLongestAppName) {
+        std::size_t end = kLongestAppName;
+        while (end > 0 && continuesCharacter(name[end]))
+            --end;
+        name.resize(end);
+    }
+    return name + "_";
 }
 
 std::string tempMovieStem(std::string_view tempPath, std::string_view name)

@@ -16,7 +16,7 @@ inline constexpr std::string_view kMixedMovieName = "VKClipsa_Final";
 /// The copy that is handed to the video service.
 inline constexpr std::string_view kUploadMovieName = "VKClipsa_YouTube";
 
-/// The output of trimming a recording of that app.
+/// The output of trimming a recording of that app: its name as far as a file's name can have it.
 std::string trimmedMovieName(std::string_view appName);
 
 /// `tempPath`, a slash whatever it ends with, `name`: the two slashes in a row are how these paths are known.

@@ -100,6 +100,14 @@ TEST_F(Trimming, TwoTrimsInOneSecondHaveOneName)
     EXPECT_NE(editor->trimFileURL(), *first);
 }
 
+TEST_F(Trimming, AnAppNameThatNoFileCanHaveGivesALegalName)
+{
+    open();
+    editor->setApplicationName("AC/DC");
+    EXPECT_EQ(editor->trimFileURL().lastPathComponent().find("AC\u2044DC_"), 0U);
+    EXPECT_EQ(editor->applicationName(), "AC/DC") << "it is shown as it is";
+}
+
 TEST_F(Trimming, SuccessShowsTheTrimmedMovieAndLeavesTheMode)
 {
     open();

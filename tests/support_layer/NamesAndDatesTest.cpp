@@ -41,6 +41,25 @@ TEST(TheNameOfATemporaryMovie, KeepsTheLettersOfAnAppName)
     EXPECT_EQ(url.lastPathComponent(), "Šach %i_7.mp4");
 }
 
+TEST(TheNameOfATemporaryMovie, HasNothingThatNoFileNameMayHave)
+{
+    EXPECT_EQ(support::trimmedMovieName("AC/DC"), "AC\u2044DC_");
+    EXPECT_EQ(support::trimmedMovieName(std::string("a\0b\nc", 5)), "a b c_");
+    EXPECT_EQ(support::trimmedMovieName(".."), ".._");
+    EXPECT_EQ(support::trimmedMovieName(""), "_");
+}
+
+TEST(TheNameOfATemporaryMovie, IsNoLongerThanFileSystemsTakeAndHasWholeLetters)
+{
+    std::string letters = "x";
+    for (int i = 0; i < 200; ++i)
+        letters += "ж";
+    const std::string name = support::tempMovieUrl(support::trimmedMovieName(letters), {1'700'000'000}).path();
+    EXPECT_LE(name.size(), 255U);
+    const std::string stem = support::trimmedMovieName(letters);
+    EXPECT_EQ(stem.substr(stem.size() - 3), "ж_");
+}
+
 TEST(TheTextOfADate, NeedsANewFormatterEveryTimeAndStaysInTheDevicesZone)
 {
     const tests::FakeCalendar calendar;

@@ -4,6 +4,7 @@
 #include "base/System.h"
 #include "linux/ffmpeg/FFmpegMediaFramework.h"
 #include "linux/ffmpeg/Movie.h"
+#include "linux/ffmpeg/exporting/output/OutputClaims.h"
 
 #include <map>
 #include <memory>
@@ -31,6 +32,7 @@ struct Engine {
     const base::System& system;
     runtime::NotificationCenter& center;
     const Options options;
+    OutputClaims outputs;
 
 private:
     std::map<std::string, std::weak_ptr<Movie>> m_movies; ///< by resolved path

@@ -3,6 +3,7 @@
 #include "linux/ffmpeg/exporting/ExportJob.h"
 
 #include <cassert>
+#include <cerrno>
 #include <thread>
 #include <utility>
 
@@ -35,11 +36,34 @@ void FFmpegExportSession::exportAsynchronously(std::function<void()> done)
         assert(m_status == Status::Unknown);
         m_status = Status::Waiting;
     }
+    if (const base::ErrorRef refusal = claimOutput()) {
+        start(std::move(done), refusal);
+        return;
+    }
     auto self = std::static_pointer_cast<FFmpegExportSession>(shared_from_this());
     m_asset->whenLoaded([self, done = std::move(done)]() mutable { self->start(std::move(done)); });
 }
 
-void FFmpegExportSession::start(std::function<void()> done)
+std::string FFmpegExportSession::outputPath(const base::Url& url) const
+{
+    const auto& resolve = m_engine->options.resolvePath;
+    return resolve ? resolve(url.path()) : url.path();
+}
+
+/// Null, or why this export cannot begin. Without a file to write to it fails later.
+base::ErrorRef FFmpegExportSession::claimOutput()
+{
+    const auto url = outputURL();
+    if (!url || !url->isFile())
+        return nullptr;
+    m_claim = m_engine->outputs.take(outputPath(*url));
+    if (m_claim)
+        return nullptr;
+    return base::Error::make("ffmpeg", AVERROR(EEXIST),
+                             "“" + url->lastPathComponent() + "” cannot be written: another export is writing it.");
+}
+
+void FFmpegExportSession::start(std::function<void()> done, const base::ErrorRef& refusal)
 {
     {
         const std::lock_guard lock(m_mutex);
@@ -47,10 +71,12 @@ void FFmpegExportSession::start(std::function<void()> done)
     }
     auto self = std::static_pointer_cast<FFmpegExportSession>(shared_from_this());
     // The movie is asked for here, because the asset is the main queue's.
-    auto work = [self, movie = m_asset->movie(), why = m_asset->error(), done = std::move(done)]() mutable {
-        const auto result = movie ? self->work(movie) : base::Result<void>(why);
+    auto work = [self, refusal, movie = refusal ? nullptr : m_asset->movie(), why = m_asset->error(),
+                 done = std::move(done)]() mutable {
+        const auto result = refusal ? base::Result<void>(refusal) : movie ? self->work(movie) : base::Result<void>(why);
+        self->m_claim = nullptr;
         // Why it could not be opened was logged when it was tried.
-        if (movie && !result && !*self->m_cancelled)
+        if ((refusal || movie) && !result && !*self->m_cancelled)
             self->m_engine->system.log.error(result.error()->description());
         self->finish(result);
         movie = nullptr;
@@ -83,10 +109,9 @@ base::Result<void> FFmpegExportSession::work(const std::shared_ptr<const Movie>&
     if (!url || !url->isFile())
         return base::Error::make("ffmpeg", AVERROR(EINVAL),
                                  "“" + movie->file()->name() + "” cannot be exported: there is no file to write to.");
-    const auto& resolve = m_engine->options.resolvePath;
     ExportJob job;
     job.movie = movie;
-    job.output = resolve ? resolve(url->path()) : url->path();
+    job.output = outputPath(*url);
     job.range = m_range;
     job.mix = m_mix;
     job.cancelled = m_cancelled;

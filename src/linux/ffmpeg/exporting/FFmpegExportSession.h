@@ -34,7 +34,9 @@ public:
 private:
     FFmpegExportSession(std::shared_ptr<Engine> engine, std::shared_ptr<FFmpegAsset> asset);
 
-    void start(std::function<void()> done);
+    base::ErrorRef claimOutput();
+    std::string outputPath(const base::Url& url) const;
+    void start(std::function<void()> done, const base::ErrorRef& refusal = nullptr);
     base::Result<void> work(const std::shared_ptr<const Movie>& movie) const;
     void finish(const base::Result<void>& result);
 
@@ -43,6 +45,8 @@ private:
     std::shared_ptr<FFmpegAsset> m_asset;
     std::optional<base::MediaTimeRange> m_range;
     std::optional<platform::AudioMix> m_mix;
+
+    OutputClaim m_claim; ///< on the output, until it has its name or is given up
 
     std::shared_ptr<base::Work> m_underWay; ///< the main queue's, then the export's thread's
 

@@ -4,6 +4,7 @@
 
 #include <gmock/gmock.h>
 
+#include <future>
 #include <limits>
 #include <thread>
 
@@ -51,6 +52,28 @@ TEST_F(AnExport, MayWaitForTheMainQueueWhereItTellsItsEnd)
     EXPECT_TRUE(waitFor([&] { return told.load(); }));
     EXPECT_TRUE(ran);
     EXPECT_EQ(files(), std::vector<std::string>{"out.mp4"});
+}
+
+TEST_F(AnExport, ToTheNameOfAnotherThatIsUnderWayFailsAtOnceAndTheOtherIsThere)
+{
+    const auto first = sessionFor(exportMovie("h264.mp4"), output(), fromTo(1, 2));
+    const auto keepOpen = asset;
+    const auto second = sessionFor(exportMovie("h264.mp4"), output(), fromTo(3, 4));
+    std::atomic<bool> ended = false;
+    std::promise<void> refused;
+    first->exportAsynchronously([&] { ended = true; });
+    second->exportAsynchronously([&] { refused.set_value(); });
+    // The main queue stands still meanwhile: no movie is opened for it.
+    ASSERT_EQ(refused.get_future().wait_for(std::chrono::seconds(30)), std::future_status::ready);
+    EXPECT_EQ(second->status(), ExportStatus::Failed);
+    EXPECT_THAT(second->error()->description(), HasSubstr("“out.mp4” cannot be written"));
+    ASSERT_TRUE(waitFor([&] { return ended.load(); }));
+    EXPECT_EQ(first->status(), ExportStatus::Completed);
+    EXPECT_EQ(DecodedMovie(output()).all().size(), 30U);
+
+    std::filesystem::remove(output());
+    EXPECT_EQ(cut(exportMovie("h264.mp4"), output(), fromTo(3, 4)), ExportStatus::Completed)
+        << "the name is free again";
 }
 
 TEST_F(AnExport, LeavesTheSourceAsItIs)
