@@ -106,6 +106,9 @@ void VKVideoEditorExtensionViewController::setupVideoEditorController()
         VKVideoEditorViewController::initWithBundleIdentifier_URL_applicationName_overrideTintColor_size(
             extensionContext()->platform(), bundleIdentifier(), movieURL(), appName(), overrideTintColor(),
             view()->bounds());
+    // The former one stays, covered: its buttons are not to be found by a key or by assistive technology.
+    if (const auto former = videoEditorViewController())
+        former->view()->setHidden(true);
     setVideoEditorViewController(editor);
     editor->setFileAttachmentURL(fileAttachmentURL());
     editor->setOverrideShareMessage(overrideShareMessage());

@@ -74,6 +74,8 @@ void View::setHidden(bool hidden)
         return;
     m_hidden = hidden;
     setNeedsDisplay();
+    if (const auto itsWindow = hidden ? window() : nullptr)
+        itsWindow->forgetStrays();
 }
 
 void View::setBackgroundColor(Color color)

@@ -5,6 +5,18 @@
 
 namespace platform {
 
+namespace {
+
+bool isHiddenInTree(std::shared_ptr<View> view)
+{
+    for (; view; view = view->superview())
+        if (view->isHidden())
+            return true;
+    return false;
+}
+
+} // namespace
+
 Window::Window(base::MainQueue& mainQueue, base::Size size, double scale)
     : View({{0, 0}, size}), m_mainQueue(mainQueue), m_scale(scale)
 {
@@ -108,7 +120,7 @@ void Window::forgetStrays()
     const auto isHere = [this](const Responder& responder) { return responder.window().get() == this; };
     if (const auto responder = firstResponder(); responder && !isHere(*responder))
         m_firstResponder.reset();
-    if (const auto view = m_focusedView.lock(); view && !isHere(*view))
+    if (const auto view = m_focusedView.lock(); view && (!isHere(*view) || isHiddenInTree(view)))
         clearFocus();
 }
 

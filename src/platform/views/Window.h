@@ -83,7 +83,7 @@ private:
     friend class View;
 
     void cancelTouch(int id);
-    /// Forgets the focus and the first responder when they are out of the window.
+    /// Forgets the focus and the first responder when they are out of the window, the former also when it is hidden.
     void forgetStrays();
     void focus(const std::shared_ptr<View>& view);
     std::vector<std::shared_ptr<View>> focusableViews() const;
