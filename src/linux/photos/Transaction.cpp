@@ -1,5 +1,6 @@
 #include "linux/photos/Transaction.h"
 
+#include "linux/photos/UnsavedMovie.h"
 #include "linux/posix/CopyContents.h"
 
 #include <cerrno>
@@ -142,6 +143,17 @@ base::Result<std::vector<std::string>> VideoLibrary::Transaction::commit()
     for (std::string& name : names)
         name = library.path() + "/" + name;
     return names;
+}
+
+std::vector<base::Result<std::string>> VideoLibrary::Transaction::keepUnsaved(const base::ErrorRef& why) const
+{
+    std::vector<base::Result<std::string>> kept;
+    for (const Source& source : m_sources)
+        kept.push_back(photos::keepUnsaved(source.file.get(), source.name, m_options.unsavedDirectories));
+    // One that could not even be opened.
+    if (m_error)
+        kept.emplace_back(why);
+    return kept;
 }
 
 base::Result<posix::NewFile> VideoLibrary::Transaction::copy(const Source& source, const LibraryDirectory& directory,

@@ -22,7 +22,8 @@ UserDirectories UserDirectories::ofUser()
     const std::filesystem::path home = g_get_home_dir();
     return {plain(videos ? std::filesystem::path(videos) : home / "Videos"),
             plain(std::filesystem::path(g_get_user_cache_dir()) / "thumbnails"),
-            plain(std::filesystem::path(g_get_user_data_dir()) / "recently-used.xbel")};
+            plain(std::filesystem::path(g_get_user_data_dir()) / "recently-used.xbel"),
+            plain(std::filesystem::path(g_get_user_data_dir()) / "clipsa/unsaved")};
 }
 
 } // namespace photos

@@ -34,6 +34,7 @@ base::Result<void> VideoLibrary::perform(const ChangeBlock& changes, base::Work&
     const auto files = transaction.commit();
     if (!files) {
         m_log.error(files.error()->description());
+        keepUnsaved(transaction, files.error());
         return files.error();
     }
     for (const std::string& file : files.value())
@@ -52,6 +53,15 @@ void VideoLibrary::announce(const std::string& file)
             logFailure("no thumbnail of " + file, made.error());
     if (const auto added = addRecentFile(m_options.directories.recentFiles, file); !added)
         logFailure(file + " is not among the recent files", added.error());
+}
+
+void VideoLibrary::keepUnsaved(const Transaction& transaction, const base::ErrorRef& why)
+{
+    if (m_options.unsavedDirectories.empty())
+        return;
+    for (const auto& kept : transaction.keepUnsaved(why))
+        if (m_options.unsaved)
+            m_options.unsaved(why, kept);
 }
 
 base::Result<void> VideoLibrary::makeThumbnail(const std::string& file)

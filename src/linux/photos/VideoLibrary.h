@@ -20,6 +20,7 @@
 #include <functional>
 #include <optional>
 #include <string>
+#include <vector>
 
 namespace photos {
 
@@ -46,6 +47,11 @@ struct LibraryOptions {
     std::function<void(const std::string& path)> published;
     /// Asked while a movie is copied: false ends the transaction with ECANCELED.
     std::function<bool()> goOn = {};
+    /// Where a movie is kept that could not be put into the library, the better place first: whoever asked for the change
+    /// may remove it right after the completion. None: it is not kept.
+    std::vector<std::string> unsavedDirectories = {};
+    /// Told before the completion why a movie is not in the library, and where it is kept, or why it is not.
+    std::function<void(const base::ErrorRef& why, const base::Result<std::string>& kept)> unsaved = {};
 };
 
 class VideoLibrary final : public platform::PhotoLibrary {
@@ -60,6 +66,7 @@ private:
 
     base::Result<void> perform(const ChangeBlock& changes, base::Work& work);
     void announce(const std::string& file);
+    void keepUnsaved(const Transaction& transaction, const base::ErrorRef& why);
     base::Result<void> makeThumbnail(const std::string& file);
     void logFailure(const std::string& what, const base::ErrorRef& error);
 

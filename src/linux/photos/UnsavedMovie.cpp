@@ -1,0 +1,82 @@
+#include "linux/photos/UnsavedMovie.h"
+
+#include "linux/photos/LibraryDirectory.h"
+#include "linux/posix/CopyContents.h"
+#include "linux/posix/NewFile.h"
+
+#include <cerrno>
+#include <cstdint>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace photos {
+
+namespace {
+
+/// Needs no room; nothing where there can be no second name: on another file system, or of a file without any.
+base::Result<std::string> link(int movie, const LibraryName& name, const LibraryDirectory& directory)
+{
+    const std::string open = "/proc/self/fd/" + std::to_string(movie);
+    for (int number = 1;; ++number) {
+        std::string candidate = name.numbered(number);
+        if (::linkat(AT_FDCWD, open.c_str(), directory.descriptor(), candidate.c_str(), AT_SYMLINK_FOLLOW) == 0)
+            return candidate;
+        if (errno != EEXIST)
+            return base::Error::fromErrno(errno, "naming it " + candidate);
+    }
+}
+
+base::Result<std::string> copy(int movie, const LibraryName& name, const LibraryDirectory& directory)
+{
+    struct stat status = {};
+    if (::fstat(movie, &status) != 0)
+        return base::Error::fromErrno(errno, "looking at it");
+    posix::sweepNewFiles(directory.descriptor());
+    auto file = posix::NewFile::make(directory.descriptor());
+    if (!file)
+        return file.error();
+    const int to = file.value().descriptor();
+    if (!posix::shareContents(movie, to))
+        if (const int number = posix::copyContents(movie, to, static_cast<std::uint64_t>(status.st_size), {});
+            number != 0)
+            return base::Error::fromErrno(number, "copying it");
+    if (const auto sealed = file.value().seal(status.st_mtim); !sealed)
+        return sealed.error();
+    return directory.publish(file.value(), name);
+}
+
+base::Result<std::string> keepIn(const std::string& path, int movie, const LibraryName& name)
+{
+    const auto directory = LibraryDirectory::open(path);
+    if (!directory)
+        return directory.error();
+    auto kept = link(movie, name, directory.value());
+    if (kept)
+        posix::flush(movie); // as a copy is brought to the disk; its end is as good as it gets
+    else
+        kept = copy(movie, name, directory.value());
+    if (!kept)
+        return base::Error::make(kept.error()->domain(), kept.error()->code(),
+                                 "cannot keep it in " + path + ": " + kept.error()->description());
+    // A name that a power cut takes is no reason to keep none.
+    static_cast<void>(directory.value().flush());
+    return path + "/" + kept.value();
+}
+
+} // namespace
+
+base::Result<std::string> keepUnsaved(int movie, const LibraryName& name, const std::vector<std::string>& directories)
+{
+    base::ErrorRef error;
+    for (const std::string& directory : directories) {
+        auto kept = keepIn(directory, movie, name);
+        if (kept)
+            return kept;
+        if (!error)
+            error = kept.error();
+    }
+    return error;
+}
+
+} // namespace photos

@@ -1,0 +1,113 @@
+// A movie that could not be put into the library: whoever made it removes it, so it is kept elsewhere before.
+#include "linux/photos/UnsavedMovie.h"
+
+#include "linux/photos/LibraryFixture.h"
+#include "linux/posix/FileDescriptor.h"
+
+#include <fcntl.h>
+#include <fstream>
+
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::SizeIs;
+
+namespace tests {
+
+namespace {
+
+class UnsavedMovie : public LibraryFixture {
+protected:
+    UnsavedMovie() { std::ofstream(videos) << "not a directory"; }
+
+    const fs::path first = home.path() / ".local/share/clipsa/unsaved";
+    const fs::path second = home.path() / "cache/unsaved";
+    std::vector<std::string> kept;
+    std::vector<std::string> refusals;
+
+    photos::LibraryOptions keeping()
+    {
+        photos::LibraryOptions made = options();
+        made.unsavedDirectories = {first, second};
+        made.unsaved = [this](const base::ErrorRef&, const base::Result<std::string>& path) {
+            if (path)
+                kept.push_back(path.value());
+            else
+                refusals.push_back(path.error()->description());
+        };
+        return made;
+    }
+    Outcome saveKeeping() { return save(base::Url::fromPath(source), keeping()); }
+};
+
+} // namespace
+
+TEST_F(UnsavedMovie, IsAnotherNameOfTheSameFile)
+{
+    const Outcome outcome = saveKeeping();
+    EXPECT_FALSE(outcome.success);
+    ASSERT_THAT(kept, ElementsAre((first / name).native()));
+    EXPECT_TRUE(fs::equivalent(kept.front(), source)) << "it took room on a disk that may be full";
+    fs::remove(source);
+    EXPECT_TRUE(holds(kept.front(), bytes));
+}
+
+TEST_F(UnsavedMovie, TakesThePlaceOfNone)
+{
+    saveKeeping();
+    saveKeeping();
+    EXPECT_THAT(kept, ElementsAre((first / name).native(), (first / "Tux Racer 2026-11-21 15-04-05 (2).mp4").native()));
+}
+
+TEST_F(UnsavedMovie, IsKeptBesideTheStoreWhereTheUsersDataCannotBeWritten)
+{
+    home.write(".local/share/clipsa", "not a directory");
+    saveKeeping();
+    ASSERT_THAT(kept, ElementsAre((second / name).native()));
+    EXPECT_TRUE(holds(kept.front(), bytes));
+}
+
+TEST_F(UnsavedMovie, IsSaidToBeNowhereWhenItIs)
+{
+    home.write(".local/share/clipsa", "not a directory");
+    home.write("cache/unsaved", "not a directory");
+    saveKeeping();
+    EXPECT_THAT(kept, IsEmpty());
+    EXPECT_THAT(refusals, ElementsAre(HasSubstr(first.native())));
+}
+
+TEST_F(UnsavedMovie, WithoutANameLeftIsCopiedWithItsDate)
+{
+    const posix::FileDescriptor file(::open(source.c_str(), O_RDONLY | O_CLOEXEC));
+    const double date = modified(source);
+    fs::remove(source);
+    const auto path = photos::keepUnsaved(file.get(), {"movie", ".mp4"}, {first});
+    ASSERT_TRUE(path) << path.error()->description();
+    EXPECT_TRUE(holds(path.value(), bytes));
+    EXPECT_EQ(modified(path.value()), date);
+    EXPECT_THAT(namesIn(first), SizeIs(1));
+}
+
+TEST_F(UnsavedMovie, IsKeptOnlyWhereThatWasAskedFor)
+{
+    save();
+    EXPECT_FALSE(fs::exists(first));
+    EXPECT_FALSE(fs::exists(second));
+}
+
+TEST_F(UnsavedMovie, IsNoneWhenTheMovieWasSaved)
+{
+    fs::remove(videos);
+    EXPECT_TRUE(saveKeeping().success);
+    EXPECT_THAT(kept, IsEmpty());
+    EXPECT_FALSE(fs::exists(first));
+}
+
+TEST_F(UnsavedMovie, ThatIsNotThereIsSaidToBeNowhere)
+{
+    save(base::Url::fromPath(home.path() / "gone.mp4"), keeping());
+    EXPECT_THAT(kept, IsEmpty());
+    EXPECT_THAT(refusals, ElementsAre(HasSubstr("gone.mp4")));
+}
+
+} // namespace tests
