@@ -142,11 +142,14 @@ struct HostConnection::State final : QDBusVirtualObject {
             peer.send(message.createErrorReply(QDBusError::InvalidArgs, QStringLiteral("there is no such item")));
             return;
         }
-        items[item].attachments[attachment].load([message, peer](const base::Result<runtime::Value>& loaded) {
-            const auto value = loaded ? toWire(loaded.value()) : base::Result<QVariant>(loaded.error());
-            peer.send(value ? message.createReply(QVariant::fromValue(QDBusVariant(value.value())))
-                            : message.createErrorReply(QDBusError::Failed, toQt(value.error()->description())));
-        });
+        // By its name: whoever holds the connection itself keeps it open, and an answer can be long in coming.
+        items[item].attachments[attachment].load(
+            [message, name = peer.name()](const base::Result<runtime::Value>& loaded) {
+                const auto value = loaded ? toWire(loaded.value()) : base::Result<QVariant>(loaded.error());
+                QDBusConnection(name).send(
+                    value ? message.createReply(QVariant::fromValue(QDBusVariant(value.value())))
+                          : message.createErrorReply(QDBusError::Failed, toQt(value.error()->description())));
+            });
     }
 
     std::vector<HostItem> items;
