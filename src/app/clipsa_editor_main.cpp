@@ -23,6 +23,8 @@ int main(int argc, char* argv[])
     }
     // Keeps our directory alive as long as we live, but not as long as programs that we start.
     fcntl(dbus::kEditorLockDescriptor, F_SETFD, FD_CLOEXEC);
+    if (options.value().report)
+        fcntl(*options.value().report, F_SETFD, FD_CLOEXEC);
     app::chooseDrawing();
     std::optional<app::DisplayWatch> watch(std::in_place);
     QGuiApplication application(argc, argv);

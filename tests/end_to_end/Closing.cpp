@@ -62,7 +62,7 @@ TEST_F(Closing, InJsonTheListOfActivitiesIsEmptyToo)
     m_machine.setScript(kClose);
     const auto end = m_machine.open(movie, {"--json"});
     EXPECT_EQ(end.exitStatus, 0) << end.err;
-    EXPECT_EQ(end.out, "{\"activityTypes\":[],\"movie\":\"" + movie.native() + "\"}\n");
+    EXPECT_EQ(end.out, "{\"activityTypes\":[],\"movie\":\"" + movie.native() + "\",\"saved\":[],\"unsaved\":[]}\n");
 }
 
 TEST_F(Closing, TheEscapeKeyClosesToo)
@@ -78,6 +78,17 @@ TEST_F(Closing, TheUserCanCloseBeforeAnythingIsLoaded)
     m_machine.setScript("tap Cancel");
     const auto end = m_machine.open(m_machine.movie("long-gop.mp4"));
     EXPECT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_THAT(m_machine.remains(), IsEmpty());
+}
+
+TEST_F(Closing, ATrimThatIsUnderWayIsGivenUp)
+{
+    // All of it would be encoded again.
+    m_machine.setScript("wait ready\nwait frame\nkey right\nkey i\nkey return\nclose");
+    const auto end = m_machine.open(m_machine.movie("long-gop.mp4"));
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_EQ(end.out, "SaveToCameraRoll\n");
+    EXPECT_THAT(end.err, HasSubstr("VQVideoEditorViewController: Export Trim Video Cancelled\n"));
     EXPECT_THAT(m_machine.remains(), IsEmpty());
 }
 

@@ -35,11 +35,16 @@ protected:
     void setScript(const std::string& steps) { m_machine.setScript("wait picture\nwait ready\n" + steps); }
     Child::End open() { return m_machine.open(m_movie, {"--app-name", "Tux Racer"}); }
     std::filesystem::path library() const { return m_machine.home() / "Videos"; }
-    std::vector<std::filesystem::path> saved() const
+    std::vector<std::filesystem::path> saved() const { return filesIn(library()); }
+    std::vector<std::filesystem::path> unsaved() const
+    {
+        return filesIn(m_machine.home() / ".local/share/clipsa/unsaved");
+    }
+    static std::vector<std::filesystem::path> filesIn(const std::filesystem::path& directory)
     {
         std::vector<std::filesystem::path> found;
-        if (std::filesystem::is_directory(library()))
-            for (const auto& entry : std::filesystem::directory_iterator(library()))
+        if (std::filesystem::is_directory(directory))
+            for (const auto& entry : std::filesystem::directory_iterator(directory))
                 found.push_back(entry.path());
         return found;
     }
@@ -181,17 +186,42 @@ TEST_F(Save, LeavesTheWholeMovieOrNothingWheneverTheEditorIsKilled)
     EXPECT_LT(found, kMoments);
 }
 
-TEST_F(Save, ALibraryThatCannotBeWrittenIsSaidAndTheHostIsToldAllTheSame)
+TEST_F(Save, ALibraryThatCannotBeWrittenIsSaidAndTheMovieIsKeptElsewhere)
 {
     std::ofstream(library()) << "not a directory";
     setScript("tap Save");
     const auto end = open();
-    EXPECT_EQ(end.exitStatus, 0);
+    EXPECT_EQ(end.exitStatus, 1);
     EXPECT_EQ(end.out, "SaveToCameraRoll\n");
     EXPECT_THAT(end.err, HasSubstr("Error writing video to camera roll: "));
     EXPECT_THAT(end.err, HasSubstr(library().native()));
-    EXPECT_EQ(std::count(end.err.begin(), end.err.end(), '\n'), 2) << "one line of words beside it: " << end.err;
+    EXPECT_EQ(std::count(end.err.begin(), end.err.end(), '\n'), 3)
+        << "one line of the editor's words, one of the host's: " << end.err;
     EXPECT_EQ(PrivateDirectory::read(library()), "not a directory");
+    ASSERT_THAT(unsaved(), SizeIs(1));
+    EXPECT_THAT(end.err, HasSubstr("it is kept as " + unsaved().front().native()));
+    EXPECT_EQ(numbersIn(unsaved().front()), numbers(0, 119));
+    expectMixed(unsaved().front());
+}
+
+TEST_F(Save, ThatFailsLosesNoCutAlsoWhenTheUserHasClosedMeanwhile)
+{
+    std::ofstream(library()) << "not a directory";
+    setScript(R"(
+        key right
+        wait frame 1
+        key i
+        key return
+        wait trimmed
+        wait frame 0
+        tap Save
+        tap Done)");
+    const auto end = m_machine.open(m_movie, {"--app-name", "Tux Racer", "--json"});
+    EXPECT_EQ(end.exitStatus, 1);
+    ASSERT_THAT(unsaved(), SizeIs(1));
+    EXPECT_EQ(unsaved().front().filename(), "Tux Racer 2024-05-17 09-30-00.mp4");
+    EXPECT_THAT(end.out, HasSubstr("\"unsaved\":[\"" + unsaved().front().native() + "\"]"));
+    EXPECT_EQ(numbersIn(unsaved().front()), numbers(30, 119));
 }
 
 TEST_F(Save, ADamagedMovieIsSavedToo)

@@ -20,8 +20,8 @@ base::Result<EditorOptions> EditorOptions::parse(const std::vector<std::string>&
     EditorOptions options;
     for (std::size_t i = 0; i < arguments.size(); ++i) {
         const std::string& name = arguments[i];
-        if (name == "--verbose") {
-            options.verbose = true;
+        if (name == "--verbose" || name == "--explain") {
+            (name == "--verbose" ? options.verbose : options.explain) = true;
             continue;
         }
         if (i + 1 == arguments.size())
@@ -39,12 +39,12 @@ base::Result<EditorOptions> EditorOptions::parse(const std::vector<std::string>&
             if (value != "yes" && value != "no")
                 return usage("--home-button is yes or no, not \"" + value + "\"");
             options.hasHomeButton = value == "yes";
-        } else if (name == "--graphics-quality") {
-            std::int32_t quality = 0;
-            const auto [end, error] = std::from_chars(value.data(), value.data() + value.size(), quality);
+        } else if (name == "--graphics-quality" || name == "--report") {
+            std::int32_t number = 0;
+            const auto [end, error] = std::from_chars(value.data(), value.data() + value.size(), number);
             if (error != std::errc() || end != value.data() + value.size())
-                return usage("--graphics-quality is a number, not \"" + value + "\"");
-            options.graphicsQuality = quality;
+                return usage(name + " is a number, not \"" + value + "\"");
+            (name == "--report" ? options.report : options.graphicsQuality) = number;
         } else {
             return usage("there is no option \"" + name + "\"");
         }

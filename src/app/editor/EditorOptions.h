@@ -18,7 +18,9 @@ struct EditorOptions {
     std::optional<platform::InterfaceIdiom> idiom;
     std::optional<bool> hasHomeButton;
     std::optional<std::int32_t> graphicsQuality;
+    std::optional<std::int32_t> report; ///< the open file that tells the host of saved movies
     bool verbose = false;
+    bool explain = false; ///< in the window what is wrong with the movie, as nobody else will
 
     /// Arguments as the host passes them, program name left out.
     static base::Result<EditorOptions> parse(const std::vector<std::string>& arguments);

@@ -1,6 +1,7 @@
 #include "app/editor/EditorProgram.h"
 
 #include "app/editor/MovieThumbnail.h"
+#include "app/editor/NoticeScreen.h"
 #include "app/editor/Script.h"
 #include "app/editor/StartTrace.h"
 #include "extension/VKVideoEditorExtensionContext.h"
@@ -16,8 +17,10 @@
 
 #include <algorithm>
 #include <cstdlib>
+#include <filesystem>
 #include <optional>
 #include <string>
+#include <utility>
 
 namespace app {
 
@@ -25,6 +28,8 @@ namespace {
 
 /// Pictures for the strip stand back behind the player, whose seeks a finger waits for.
 constexpr int kImageNiceness = 10;
+
+constexpr std::int32_t kNoHomeButton = 2; ///< the capability service's answer on devices without one
 
 constexpr base::Size kPhoneWindow{390, 760};   // points: a phone on a desktop
 constexpr base::Size kDesktopWindow{960, 640}; // points
@@ -84,6 +89,7 @@ base::StreamLog::Style logStyle()
 EditorProgram::EditorProgram(const EditorOptions& options)
     : m_options(options), m_log(stderr, logStyle(), options.verbose), m_mainQueue(m_clock),
       m_loop(m_mainQueue), m_system{m_log, m_clock, m_mainQueue, m_backgroundQueue, m_defaultQueue},
+      m_report(posix::FileDescriptor(options.report.value_or(-1))),
       m_window(std::make_shared<platform::Window>(m_mainQueue, firstWindowSize(options), 1.0)),
       m_device(deviceValues(options), [this] { return m_window->bounds().width(); }),
       m_images([this] { return m_window->scale(); }), m_files(m_system, mounts(options)),
@@ -93,7 +99,7 @@ EditorProgram::EditorProgram(const EditorOptions& options)
       m_photos(libraryOptions(), m_log, m_works), m_platform{m_system, m_notifications, m_device, *m_window, m_images,
                                                              m_files,  m_calendar,      m_media,  m_photos},
       m_presenter(m_window, m_clock), m_connection(std::make_shared<dbus::ExtensionConnection>(m_mainQueue)),
-      m_payload(m_mainQueue, [this] { show(); }), m_busy(options.deviceRoot),
+      m_payload(m_mainQueue, [this] { openMovie(); }), m_busy(options.deviceRoot),
       m_workWatch(m_mainQueue, m_works,
                   {[this] {
                        learnAboutRecording();
@@ -164,8 +170,67 @@ base::Result<void> EditorProgram::start()
     // Loads the view, which starts the loads of the payload.
     m_window->setRootViewController(m_extension.principal);
     m_payload.startedAll();
-    m_mainQueue.postAfter(kPayloadLimit, [this] { show(); });
+    m_mainQueue.postAfter(kPayloadLimit, [this] { waitForPayload(); });
     return {};
+}
+
+/// The extension would build an editor of nothing if it appeared now, whose buttons do what they say.
+void EditorProgram::waitForPayload()
+{
+    if (m_shown || !m_extension.principal)
+        return;
+    showNotice("Waiting for the recording…");
+    m_presenter.showWork(std::nullopt);
+    if (m_script && m_script->beginsWithWaiting())
+        m_script->start();
+}
+
+/// In place of the extension, which has not appeared then or disappears.
+void EditorProgram::showNotice(const std::string& words)
+{
+    m_waiting = true;
+    const bool hasHomeButton = m_device.integerAnswer(platform::kDeviceHomeButtonKey, 0) != kNoHomeButton;
+    // The extension's view follows the window, as its editors are as large as it is.
+    m_window->setRootViewController(std::make_shared<NoticeScreen>(
+        words, hasHomeButton,
+        NoticeScreen::Handlers{
+            [this] { m_mainQueue.post([this] { closeRequested(); }); }, // not inside the tap on what goes then
+            [view = m_extension.principal->view()](base::Rect bounds) { view->setFrame(bounds); }}));
+    if (!m_window->isVisible())
+        openWindow();
+}
+
+/// Most movies are open by now, or will be in a moment: what is none gets no window whose Save would keep it.
+void EditorProgram::openMovie()
+{
+    const auto current = editor();
+    const auto asset = current ? current->avAsset() : nullptr;
+    if (!asset || !asset->url()) {
+        show();
+        return;
+    }
+    asset->whenLoaded([this, weak = std::weak_ptr(asset)] {
+        const auto opened = weak.lock();
+        if (opened && opened->error())
+            refuse(opened->error()->description());
+        else
+            show();
+    });
+    m_mainQueue.postAfter(kOpeningLimit, [this] { show(); });
+}
+
+void EditorProgram::refuse(const std::string& why)
+{
+    if (!m_extension.principal)
+        return;
+    m_report.add({dbus::MovieNote::Kind::Refused, {}, why});
+    if (!m_options.explain) {
+        disconnected();
+        return;
+    }
+    m_shown = true; // there is nothing else to be shown
+    m_presenter.hideWork();
+    showNotice("There is no movie in this file.\n" + why);
 }
 
 void EditorProgram::show()
@@ -175,14 +240,24 @@ void EditorProgram::show()
     m_shown = true;
     markStart("payload");
     learnAboutRecording();
+    if (std::exchange(m_waiting, false)) {
+        m_presenter.hideWork();
+        m_window->setRootViewController(m_extension.principal);
+    } else {
+        openWindow();
+    }
+    if (m_script && !m_script->hasStarted())
+        m_script->start();
+}
+
+void EditorProgram::openWindow()
+{
     if (m_device.userInterfaceIdiom() == platform::InterfaceIdiom::Phone && !m_options.idiom
         && QGuiApplication::platformName() != "offscreen")
         m_presenter.showFullScreen();
     else
         m_presenter.show();
     markStart("window");
-    if (m_script)
-        m_script->start();
 }
 
 std::shared_ptr<VKVideoEditorViewController> EditorProgram::editor() const
@@ -193,8 +268,9 @@ std::shared_ptr<VKVideoEditorViewController> EditorProgram::editor() const
 
 void EditorProgram::closeRequested()
 {
-    // As the close button: the host is told what was done, and then closes us.
-    if (const auto current = editor())
+    // As the close button: the host is told what was done, and then closes us. Before the recording is there nothing has
+    // been done, not even looked at.
+    if (const auto current = editor(); current && !m_waiting)
         current->doneAction();
     else
         disconnected();
@@ -205,15 +281,23 @@ void EditorProgram::disconnected()
     if (!m_extension.principal)
         return;
     m_script.reset();
+    cancelTrims();
     m_presenter.hide();
     m_window->setVisible(false);
     // The editors go with the controller, and empty the temporary store as they go.
-    if (const auto current = editor(); current && current->isExporting())
-        current->exportSession()->cancelExport(); // nobody is left to see what a trim would make
     m_window->setRootViewController(nullptr);
     m_extension = {};
     m_connection->flush();
     leaveWhenDone();
+}
+
+/// Nobody is left to see what they would make. Before the views go: with them the controller lets go of its editor.
+void EditorProgram::cancelTrims() const
+{
+    for (const auto& child : m_extension.principal->childViewControllers())
+        if (const auto each = std::dynamic_pointer_cast<VKVideoEditorViewController>(child);
+            each && each->isExporting())
+            each->exportSession()->cancelExport();
 }
 
 /// A save that is under way holds its editor, and the movie with it. Its end calls again.
@@ -237,11 +321,24 @@ void EditorProgram::learnAboutRecording()
 
 photos::LibraryOptions EditorProgram::libraryOptions()
 {
-    return {photos::UserDirectories::ofUser(),
-            [this](const std::string& path) { return m_files.resolvedPath(path); },
-            [this](const std::string&) { return m_recording.value(); },
-            [this](const std::string& path, int side) { return movieThumbnail(m_mainQueue, m_media, path, side); },
-            {}};
+    photos::LibraryOptions options;
+    options.directories = photos::UserDirectories::ofUser();
+    options.resolvedPath = [this](const std::string& path) { return m_files.resolvedPath(path); };
+    options.recording = [this](const std::string&) { return m_recording.value(); };
+    options.thumbnail = [this](const std::string& path, int side) {
+        return movieThumbnail(m_mainQueue, m_media, path, side);
+    };
+    options.published = [this](const std::string& path) { m_report.add({dbus::MovieNote::Kind::Saved, path, {}}); };
+    // A save ends the editor, whose end empties the store: what could not be saved must be elsewhere by then. Beside the
+    // store there is always a way, as it needs no room there.
+    options.unsavedDirectories = {options.directories.unsaved,
+                                  std::filesystem::path(m_options.deviceRoot).parent_path().parent_path() / "unsaved"};
+    options.unsaved = [this](const base::ErrorRef& why, const base::Result<std::string>& kept) {
+        const std::string words = why->description();
+        m_report.add({dbus::MovieNote::Kind::Unsaved, kept.valueOr({}),
+                      kept ? words : words + "; " + kept.error()->description()});
+    };
+    return options;
 }
 
 } // namespace app

@@ -1,7 +1,6 @@
 /// The editor process: makes the platform on Linux, starts the extension in it, and ends with its host. GUI thread.
 ///
-/// From a connection to a host it takes the payload; the window opens once the payload has been loaded, or has not come
-/// in time. When the host closes the connection, or dies, the extension disappears and run() returns; a save that is
+/// From a connection to a host it takes the payload; the extension appears once that has been loaded. When the host closes the connection, or dies, the extension disappears and run() returns; a save that is
 /// under way then is finished first, without a window.
 #pragma once
 
@@ -11,6 +10,7 @@
 #include "base/SharedValue.h"
 #include "base/WorkList.h"
 #include "linux/dbus/BusyMark.h"
+#include "linux/dbus/EditorReport.h"
 #include "linux/dbus/ExtensionConnection.h"
 #include "linux/ffmpeg/FFmpegMediaFramework.h"
 #include "linux/icu/Calendar.h"
@@ -32,11 +32,14 @@ class Script;
 
 class EditorProgram {
 public:
-    /// A host that does not hand over its payload in that time gets a window that shows what there is.
+    /// A host that has not handed over its payload by then gets a window that says so, and waits for it.
     static constexpr base::Instant kPayloadLimit = std::chrono::seconds(1);
     /// A host that does not close the connection in that time, once it has been told that the user has finished, hangs:
     /// the window closes without it.
     static constexpr base::Instant kFarewellLimit = std::chrono::seconds(3);
+
+    /// A movie that takes longer to open is shown opening.
+    static constexpr base::Instant kOpeningLimit = std::chrono::milliseconds(250);
 
     explicit EditorProgram(const EditorOptions& options);
     ~EditorProgram();
@@ -54,9 +57,15 @@ public:
 
 private:
     base::Result<void> start();
+    void waitForPayload();
+    void showNotice(const std::string& words);
+    void openMovie();
+    void refuse(const std::string& why);
     void show();
+    void openWindow();
     void closeRequested();
     void disconnected();
+    void cancelTrims() const;
     void leaveWhenDone();
     photos::LibraryOptions libraryOptions();
     void learnAboutRecording();
@@ -73,6 +82,7 @@ private:
 
     base::WorkList m_works;
     base::SharedValue<photos::Recording> m_recording; ///< what the library calls it
+    dbus::EditorReport m_report;
     runtime::NotificationCenter m_notifications;
     std::shared_ptr<platform::Window> m_window;
     xdg::DeviceProfile m_device;
@@ -90,6 +100,7 @@ private:
     dbus::BusyMark m_busy;
     WorkWatch m_workWatch;
     std::unique_ptr<Script> m_script;
+    bool m_waiting = false; ///< the window is open, but not on the extension
     bool m_shown = false;
     bool m_leaving = false;
     bool m_pictureSeen = false;

@@ -84,8 +84,14 @@ Script::Script(EditorProgram& program, const std::string& path) : m_program(prog
 
 Script::~Script() = default;
 
+bool Script::beginsWithWaiting() const
+{
+    return !m_commands.empty() && m_commands.front() == Words{"wait", "waiting"};
+}
+
 void Script::start()
 {
+    m_started = true;
     next();
 }
 
@@ -149,6 +155,10 @@ bool Script::carryOut(const Words& words)
         return lift();
     if (command == "key")
         return key(argument(1));
+    if (command == "close") {
+        m_program.presenter().quickWindow().close();
+        return true;
+    }
     if (command == "scheme") {
         m_program.presenter().setScheme(argument(1) == "dark" ? qtui::Scheme::Dark : qtui::Scheme::Light);
         return true;
@@ -169,6 +179,8 @@ bool Script::carryOut(const Words& words)
 
 bool Script::waitFor(const std::string& what)
 {
+    if (what == "waiting")
+        return true; // it is not started earlier
     const auto editor = m_program.editor();
     if (!editor)
         return false;

@@ -2,6 +2,7 @@
 ///
 /// A script is a text file, one command a line, `#` for comments:
 ///   size W H               resize the window, in points
+///   wait waiting           first of all: begin while the window waits for the recording
 ///   wait picture|ready     until the movie's first picture is shown; until its item is ready (or failed)
 ///   wait hidden|shown      until the chrome has faded out or in
 ///   wait thumbnails        until the strip has all its pictures
@@ -13,6 +14,7 @@
 ///   drag NAME DX           the same from a control's middle, DX points to the right
 ///   hold …                 the same without lifting; `lift` does that
 ///   key NAME               space, escape, return, left, right, home, end, tab, comma, period, undo, i, o
+///   close                  ask the window to close, as its title bar does
 ///   scheme light|dark
 ///   pause MILLISECONDS     let time pass
 ///   picture FILE [WORDS]   once nothing moves or fades, write what is on the screen as a PNG, into $CLIPSA_PICTURES or
@@ -46,7 +48,10 @@ public:
     Script(EditorProgram& program, const std::string& path);
     ~Script();
 
+    /// Whether it is for the window that waits for the recording.
+    bool beginsWithWaiting() const;
     void start();
+    bool hasStarted() const { return m_started; }
 
 private:
     using Words = std::vector<std::string>;
@@ -71,6 +76,7 @@ private:
     EditorProgram& m_program;
     std::vector<Words> m_commands;
     std::size_t m_next = 0;
+    bool m_started = false;
     std::optional<base::Instant> m_since;
     std::optional<TransitionTrial> m_trial;
     std::weak_ptr<const platform::VideoFrame> m_waitedFrame; ///< what is there while `wait frame` waits…

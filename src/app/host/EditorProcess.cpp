@@ -1,5 +1,6 @@
 #include "app/host/EditorProcess.h"
 
+#include "linux/dbus/EditorReport.h"
 #include "linux/dbus/ExtensionConnection.h"
 #include "linux/posix/FileDescriptor.h"
 
@@ -66,6 +67,8 @@ int spawn(const ProcessStart& start, pid_t& pid)
     ::posix_spawn_file_actions_adddup2(&files, STDERR_FILENO, STDOUT_FILENO);
     if (start.lock >= 0)
         ::posix_spawn_file_actions_adddup2(&files, start.lock, dbus::kEditorLockDescriptor);
+    if (start.report >= 0)
+        ::posix_spawn_file_actions_adddup2(&files, start.report, dbus::kEditorReportDescriptor);
 
     posix_spawnattr_t attributes;
     ::posix_spawnattr_init(&attributes);

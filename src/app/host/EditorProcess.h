@@ -25,7 +25,9 @@ struct ProcessStart {
     std::string program;
     std::vector<std::string> arguments;
     std::vector<std::pair<std::string, std::string>> environment; ///< added to ours
-    int lock = -1; ///< inherited as dbus::kEditorLockDescriptor; nothing else is, but the standard streams
+    // Nothing but these is inherited, and the standard streams.
+    int lock = -1;   ///< as dbus::kEditorLockDescriptor
+    int report = -1; ///< as dbus::kEditorReportDescriptor; its own number is higher
 };
 
 class EditorProcess {

@@ -10,6 +10,7 @@
 #include <QObject>
 #include <QTimer>
 
+#include <cerrno>
 #include <csignal>
 #include <utility>
 
@@ -22,10 +23,18 @@ constexpr std::chrono::milliseconds kLastWords{500};
 
 } // namespace
 
+std::string EditorOutcome::words() const
+{
+    if (!handedOver && end.signal == 0 && end.exitStatus == 0)
+        return "the editor was closed before the recording was there";
+    return "the editor ended early, " + end.words();
+}
+
 struct EditorSession::State final : QObject {
-    State(dbus::EditRequest editRequest, EditorDirectory editorDirectory, const Place& editorPlace, Handlers callbacks)
-        : request(std::move(editRequest)), directory(std::move(editorDirectory)), place(editorPlace),
-          handlers(std::move(callbacks)), movie(std::make_shared<Promise>())
+    State(dbus::EditRequest editRequest, EditorDirectory editorDirectory, dbus::EditorReport editorReport,
+          const Place& editorPlace, Handlers callbacks)
+        : request(std::move(editRequest)), directory(std::move(editorDirectory)), report(std::move(editorReport)),
+          place(editorPlace), handlers(std::move(callbacks)), movie(std::make_shared<Promise>())
     {
         if (request.attachment || !request.attachmentPath.empty())
             attachment = std::make_shared<Promise>();
@@ -38,12 +47,15 @@ struct EditorSession::State final : QObject {
     void close();
     void whenTimeIsUp();
     void processEnded(ProcessEnd end);
+    void tellNotes();
     void end();
     void leave();
 
     // In the order in which they must outlive each other: the directory goes when the process has gone.
     dbus::EditRequest request;
     EditorDirectory directory;
+    dbus::EditorReport report;
+    std::size_t toldNotes = 0; ///< of the report
     Place place;
     Handlers handlers;
     std::shared_ptr<Promise> movie;
@@ -71,6 +83,7 @@ base::Result<void> EditorSession::State::start()
                                       .finished =
                                           [this](std::vector<std::string> activityTypes) {
                                               outcome.activityTypes = std::move(activityTypes);
+                                              tellNotes();
                                               // Later, because closing destroys what calls us.
                                               QMetaObject::invokeMethod(this, &State::close, Qt::QueuedConnection);
                                               if (handlers.finished)
@@ -86,9 +99,11 @@ base::Result<void> EditorSession::State::start()
     connection = std::move(listening).value();
 
     ProcessStart editor{place.editorProgram,
-                        {"--connect", connection->address(), "--device-root", directory.deviceRoot()},
+                        {"--connect", connection->address(), "--device-root", directory.deviceRoot(), "--report",
+                         std::to_string(dbus::kEditorReportDescriptor)},
                         request.environment,
-                        directory.lock()};
+                        directory.lock(),
+                        report.descriptor()};
     editor.arguments.insert(editor.arguments.end(), request.editorArguments.begin(), request.editorArguments.end());
     auto started = EditorProcess::start(editor, [this](ProcessEnd ended) { processEnded(ended); });
     if (!started)
@@ -161,6 +176,18 @@ void EditorSession::State::processEnded(ProcessEnd ended)
         timer.start(kLastWords);
 }
 
+void EditorSession::State::tellNotes()
+{
+    const std::vector<dbus::MovieNote> notes = report.notes();
+    for (; toldNotes < notes.size(); ++toldNotes) {
+        const dbus::MovieNote& note = notes[toldNotes];
+        if (note.kind == dbus::MovieNote::Kind::Refused)
+            outcome.error = base::Error::make(dbus::kBadInputDomain, EINVAL, note.why);
+        if (handlers.noted)
+            handlers.noted(note);
+    }
+}
+
 void EditorSession::State::end()
 {
     if (std::exchange(waitsForFiles, true))
@@ -176,7 +203,9 @@ void EditorSession::State::end()
 void EditorSession::State::leave()
 {
     timer.stop();
+    tellNotes();
     outcome.end = processEnd.value_or(ProcessEnd{});
+    outcome.handedOver = movie->isFulfilled();
     if (const auto ended = std::exchange(handlers.ended, {}))
         ended(outcome); // may destroy us
 }
@@ -191,7 +220,11 @@ base::Result<std::unique_ptr<EditorSession>> EditorSession::start(dbus::EditRequ
     auto directory = EditorDirectory::make(place.directoriesRoot);
     if (!directory)
         return directory.error();
-    auto state = std::make_unique<State>(std::move(request), std::move(directory).value(), place, std::move(handlers));
+    auto report = dbus::EditorReport::make();
+    if (!report)
+        return report.error();
+    auto state = std::make_unique<State>(std::move(request), std::move(directory).value(), std::move(report).value(),
+                                         place, std::move(handlers));
     if (const auto started = state->start(); !started)
         return started.error();
     return std::unique_ptr<EditorSession>(new EditorSession(std::move(state)));

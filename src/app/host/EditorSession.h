@@ -8,6 +8,7 @@
 #include "app/host/HandOver.h"
 #include "base/Result.h"
 #include "linux/dbus/EditRequest.h"
+#include "linux/dbus/EditorReport.h"
 
 #include <chrono>
 #include <functional>
@@ -23,10 +24,16 @@ struct EditorOutcome {
     std::optional<std::vector<std::string>> activityTypes;
     /// How the editor's process ended.
     ProcessEnd end;
-    /// Why there was nothing to edit, if so: the movie could not be handed over.
+    /// Why there was nothing to edit, if so: the movie could not be handed over, or is none (of dbus::kBadInputDomain;
+    /// the editor has said so on standard error).
     base::ErrorRef error;
     /// Whether the editor went because close() asked it to.
     bool closed = false;
+    /// Whether the movie had arrived by then.
+    bool handedOver = false;
+
+    /// For who did not ask for it: "the editor ended early, by signal 9 (Killed)".
+    std::string words() const;
 };
 
 class EditorSession {
@@ -42,6 +49,9 @@ public:
         std::chrono::milliseconds patienceWithFiles = std::chrono::seconds(2);
     };
     struct Handlers {
+        /// What became of a movie, in order. All of it is told before `ended`, and what is known by then before
+        /// `finished`.
+        std::function<void(const dbus::MovieNote&)> noted = {};
         /// The user has finished; the editor is being closed.
         std::function<void(const std::vector<std::string>& activityTypes)> finished;
         /// A copy has been under way for a second; at most once.

@@ -18,34 +18,72 @@ namespace host {
 
 namespace {
 
-void print(const std::vector<std::string>& activityTypes, const OpenCommand& command, const std::string& movie)
+void printLines(const std::vector<std::string>& activityTypes)
 {
-    if (command.json) {
-        QJsonArray types;
-        for (const std::string& type : activityTypes)
-            types.append(QString::fromStdString(type));
-        const QJsonObject object{{QStringLiteral("activityTypes"), types},
-                                 {QStringLiteral("movie"), QString::fromStdString(movie)}};
-        std::printf("%s\n", QJsonDocument(object).toJson(QJsonDocument::Compact).constData());
-    } else {
-        for (const std::string& type : activityTypes)
-            std::printf("%s\n", type.c_str());
-    }
+    for (const std::string& type : activityTypes)
+        std::printf("%s\n", type.c_str());
     std::fflush(stdout);
 }
 
-int exitStatus(const EditorOutcome& outcome, const std::string& movie)
+QJsonArray arrayOf(const std::vector<std::string>& texts)
+{
+    QJsonArray array;
+    for (const std::string& text : texts)
+        array.append(QString::fromStdString(text));
+    return array;
+}
+
+/// What became of the movies that the user saved, by where they are.
+struct SavedMovies {
+    std::vector<std::string> saved;
+    std::vector<std::string> unsaved;
+    bool isComplete = true; ///< whether all that was to be saved was
+};
+
+void printObject(const std::vector<std::string>& activityTypes, const SavedMovies& movies, const std::string& movie)
+{
+    const QJsonObject object{{QStringLiteral("activityTypes"), arrayOf(activityTypes)},
+                             {QStringLiteral("movie"), QString::fromStdString(movie)},
+                             {QStringLiteral("saved"), arrayOf(movies.saved)},
+                             {QStringLiteral("unsaved"), arrayOf(movies.unsaved)}};
+    std::printf("%s\n", QJsonDocument(object).toJson(QJsonDocument::Compact).constData());
+    std::fflush(stdout);
+}
+
+void take(const dbus::MovieNote& note, SavedMovies& movies)
+{
+    switch (note.kind) {
+    case dbus::MovieNote::Kind::Saved:
+        movies.saved.push_back(note.path);
+        break;
+    case dbus::MovieNote::Kind::Unsaved:
+        movies.isComplete = false;
+        if (note.path.empty()) {
+            complain("the movie is not in your videos, and could not be kept elsewhere: " + note.why);
+            break;
+        }
+        movies.unsaved.push_back(note.path);
+        complain("the movie is not in your videos; it is kept as " + note.path);
+        break;
+    case dbus::MovieNote::Kind::Refused:
+        break; // the outcome has it
+    }
+}
+
+int exitStatus(const EditorOutcome& outcome, const SavedMovies& movies, const std::string& movie)
 {
     if (outcome.activityTypes)
-        return kExitDone;
+        return movies.isComplete ? kExitDone : kExitFailed;
     if (outcome.closed)
         return kExitEditorEnded; // whoever interrupted us knows
+    if (outcome.error && outcome.error->domain() == dbus::kBadInputDomain)
+        return kExitUsage; // the editor has said which file and why
     const std::string untouched = "; your recording is untouched: " + movie;
     if (outcome.error) {
         complain(outcome.error->description() + untouched);
         return kExitFailed;
     }
-    complain("the editor ended early, " + outcome.end.words() + untouched);
+    complain(outcome.words() + untouched);
     return kExitEditorEnded;
 }
 
@@ -95,13 +133,21 @@ int openMovie(const OpenCommand& command, OpenVariation variation)
     EditorSession::Handlers handlers;
     handlers.finished = std::move(variation.finished);
     if (!handlers.finished)
-        handlers.finished = [&](const std::vector<std::string>& types) { print(types, command, movie); };
+        handlers.finished = [&](const std::vector<std::string>& types) {
+            if (!command.json)
+                printLines(types);
+        };
+    SavedMovies movies;
+    handlers.noted = [&](const dbus::MovieNote& note) { take(note, movies); };
     handlers.copying = [&](std::uint64_t bytes) {
         complain("copying " + movie + " (" + std::to_string(bytes / 1'000'000)
                  + " MB), because the editor's directory is on another file system");
     };
     handlers.ended = [&](const EditorOutcome& outcome) {
-        status = exitStatus(outcome, movie);
+        // Only now it is known what became of a save that was under way when the user finished.
+        if (command.json && outcome.activityTypes)
+            printObject(*outcome.activityTypes, movies, movie);
+        status = exitStatus(outcome, movies, movie);
         QCoreApplication::exit();
     };
     auto started = EditorSession::start(std::move(request), {program.value(), root.value()}, std::move(handlers));

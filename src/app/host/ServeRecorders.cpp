@@ -27,7 +27,7 @@ std::string failureOf(const EditorOutcome& outcome)
         return {};
     if (outcome.error)
         return outcome.error->description();
-    return outcome.closed ? "the editor was closed" : "the editor ended early, " + outcome.end.words();
+    return outcome.closed ? "the editor was closed" : outcome.words();
 }
 
 /// First its request is made ready on a thread of its own, because a recorder's files may lie on a slow disk; then it is
@@ -75,6 +75,7 @@ private:
         if (!root)
             return root.error();
         EditorSession::Handlers handlers;
+        handlers.noted = m_events.noted;
         handlers.finished = m_events.completed;
         handlers.ended = [ended = m_events.ended](const EditorOutcome& outcome) { ended(failureOf(outcome)); };
         auto session = EditorSession::start(std::move(request), {program.value(), root.value()}, std::move(handlers));

@@ -25,6 +25,8 @@ inline constexpr const char* kServiceIntrospection = R"XML(
 inline constexpr const char* kSessionIntrospection = R"XML(
   <interface name="org.clipsa.RecorderSession1">
     <method name="Close"/>
+    <signal name="Saved"><arg type="s" name="path"/></signal>
+    <signal name="SaveFailed"><arg type="s" name="path"/><arg type="s" name="message"/></signal>
     <signal name="Completed"><arg type="as" name="activityTypes"/></signal>
     <signal name="Failed"><arg type="s" name="message"/></signal>
   </interface>

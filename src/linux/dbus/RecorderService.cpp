@@ -174,6 +174,7 @@ private:
             EditRequest request;
             request.moviePath = url && url->isFile() ? url->path() : fromQt(uri);
             takePlatformData(data, request);
+            request.editorArguments.emplace_back("--explain"); // file managers do not wait for how it ends
             launch(std::move(request), fromQt(message.service()), false,
                    [=, this](const base::Result<std::uint64_t>& session) {
                        if (!session)
@@ -217,12 +218,18 @@ private:
             tellCaller(started.error());
             forgetLater(number);
         };
+        events.noted = [this, number](const MovieNote& note) {
+            if (note.kind == MovieNote::Kind::Saved)
+                tell(number, QStringLiteral("Saved"), {toQt(note.path)});
+            else if (note.kind == MovieNote::Kind::Unsaved)
+                tell(number, QStringLiteral("SaveFailed"), {toQt(note.path), toQt(note.why)});
+        };
         events.completed = [this, number](const std::vector<std::string>& activityTypes) {
-            tell(number, QStringLiteral("Completed"), toQt(activityTypes));
+            tell(number, QStringLiteral("Completed"), {toQt(activityTypes)});
         };
         events.ended = [this, number](const std::string& failure) {
             if (!failure.empty())
-                tell(number, QStringLiteral("Failed"), toQt(failure));
+                tell(number, QStringLiteral("Failed"), {toQt(failure)});
             forgetLater(number);
         };
         m_idle.stop();
@@ -239,14 +246,15 @@ private:
             this, [this, number] { forget(number); }, Qt::QueuedConnection);
     }
 
-    void tell(std::uint64_t number, const QString& signal, const QVariant& value)
+    void tell(std::uint64_t number, const QString& signal, const QVariantList& values)
     {
         const auto session = m_sessions.find(number);
         if (session == m_sessions.end() || !session->second.isCallers)
             return;
         auto message = QDBusMessage::createTargetedSignal(toQt(session->second.caller), pathOf(number),
                                                           QLatin1String(kSessionInterface), signal);
-        m_connection.send(message << value);
+        message.setArguments(values);
+        m_connection.send(message);
     }
 
     void forget(std::uint64_t number)

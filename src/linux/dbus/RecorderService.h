@@ -6,6 +6,7 @@
 
 #include "base/Result.h"
 #include "linux/dbus/EditRequest.h"
+#include "linux/dbus/EditorReport.h"
 
 #include <chrono>
 #include <functional>
@@ -30,6 +31,8 @@ public:
         /// The first, and the only one when there is an error: no editor could be started. One of kBadInputDomain is
         /// told to the caller as its own.
         std::function<void(const base::Result<void>& started)> started;
+        /// What became of a movie; some of it also after `completed`.
+        std::function<void(const MovieNote& note)> noted;
         std::function<void(const std::vector<std::string>& activityTypes)> completed;
         /// The last; `failure` says why the user did not get to finish, and is empty after `completed`.
         std::function<void(const std::string& failure)> ended;

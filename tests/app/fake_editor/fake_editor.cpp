@@ -7,10 +7,13 @@
 //   wait               waits until the host closes the connection, then goes on
 //   tell=PIPE          writes the same into a named pipe, once somebody reads
 //   remove-movie       removes the movie that was handed over, as saving does
+//   saved=FILE unsaved=FILE   reports a movie that was saved, or could not be
+//   refuse             reports that what was handed over is no movie
 //   busy               has something to finish from now on
 //   hang               stays, whatever the host does; only SIGKILL helps
 
 #include "linux/dbus/BusyMark.h"
+#include "linux/dbus/EditorReport.h"
 #include "linux/dbus/ExtensionConnection.h"
 #include "platform/views/Color.h"
 
@@ -23,6 +26,7 @@
 #include <fstream>
 #include <future>
 #include <sstream>
+#include <string>
 #include <unistd.h>
 
 namespace {
@@ -136,6 +140,7 @@ int main(int argc, char* argv[])
         [](const base::ErrorRef& error) { std::fprintf(stderr, "fake editor: %s\n", error->description().c_str()); });
     // Never destroyed: it stays busy until the kernel ends it, as sanitizers take their time on the way out.
     static auto& busy = *new dbus::BusyMark(argument(argc, argv, "--device-root"));
+    dbus::EditorReport report(posix::FileDescriptor(std::stoi(argument(argc, argv, "--report"))));
     const char* const script = std::getenv("FAKE_EDITOR");
     for (const std::string& step : split(script ? script : "", ' ')) {
         const std::string word = step.substr(0, step.find('='));
@@ -159,6 +164,12 @@ int main(int argc, char* argv[])
             std::_Exit(std::atoi(value.c_str()));
         } else if (word == "crash") {
             std::abort();
+        } else if (word == "saved") {
+            report.add({dbus::MovieNote::Kind::Saved, value, ""});
+        } else if (word == "unsaved") {
+            report.add({dbus::MovieNote::Kind::Unsaved, value, "the disk is full"});
+        } else if (word == "refuse") {
+            report.add({dbus::MovieNote::Kind::Refused, "", "it is no movie"});
         } else if (word == "busy") {
             busy.set();
         } else if (word == "hang") {

@@ -104,7 +104,54 @@ TEST_F(OpeningAMovie, PrintsOneObjectOnRequest)
 {
     const auto clipsa = start("finish=a,b wait", {"--json"});
     EXPECT_EQ(clipsa->wait(), 0);
-    EXPECT_EQ(clipsa->output(), "{\"activityTypes\":[\"a\",\"b\"],\"movie\":\"" + m_movie.native() + "\"}\n");
+    EXPECT_EQ(clipsa->output(),
+              "{\"activityTypes\":[\"a\",\"b\"],\"movie\":\"" + m_movie.native() + "\",\"saved\":[],\"unsaved\":[]}\n");
+}
+
+TEST_F(OpeningAMovie, ASaveThatFailedIsSaidWithThePlaceWhereTheMovieIsKept)
+{
+    const auto clipsa = start("unsaved=/data/unsaved/race.mp4 finish=save wait");
+    EXPECT_EQ(clipsa->wait(), 1);
+    EXPECT_EQ(clipsa->output(), "save\n") << "what the editor told";
+    EXPECT_EQ(clipsa->errors(), "clipsa: the movie is not in your videos; it is kept as /data/unsaved/race.mp4\n");
+    expectUntouched();
+}
+
+TEST_F(OpeningAMovie, ASaveThatFailedAfterTheUserHadClosedIsSaidToo)
+{
+    const auto clipsa = start("finish=save wait unsaved=/data/unsaved/race.mp4");
+    EXPECT_EQ(clipsa->wait(), 1);
+    EXPECT_THAT(clipsa->errors(), HasSubstr("/data/unsaved/race.mp4"));
+}
+
+TEST_F(OpeningAMovie, ASaveThatFailedBeforeACrashIsSaidToo)
+{
+    const auto clipsa = start("unsaved=/data/unsaved/race.mp4 crash");
+    EXPECT_EQ(clipsa->wait(), 3);
+    EXPECT_THAT(clipsa->errors(), AllOf(HasSubstr("/data/unsaved/race.mp4"), HasSubstr("by signal 6")));
+}
+
+TEST_F(OpeningAMovie, AMovieThatCouldBeKeptNowhereIsSaidToBeLost)
+{
+    const auto clipsa = start("unsaved= finish=save wait");
+    EXPECT_EQ(clipsa->wait(), 1);
+    EXPECT_THAT(clipsa->errors(), AllOf(HasSubstr("could not be kept"), HasSubstr("the disk is full")));
+}
+
+TEST_F(OpeningAMovie, WhatTheEditorRefusesIsAWrongFile)
+{
+    const auto clipsa = start("refuse say=because exit=0");
+    EXPECT_EQ(clipsa->wait(), 2);
+    EXPECT_THAT(clipsa->output(), IsEmpty());
+    EXPECT_EQ(clipsa->errors(), "because\n") << "it is said once";
+    expectUntouched();
+}
+
+TEST_F(OpeningAMovie, TheObjectSaysWhatWasSavedAlsoBehindAClosedWindow)
+{
+    const auto clipsa = start("finish=save wait saved=/videos/a.mp4 unsaved=/data/b.mp4", {"--json"});
+    EXPECT_EQ(clipsa->wait(), 1);
+    EXPECT_THAT(clipsa->output(), HasSubstr("\"saved\":[\"/videos/a.mp4\"],\"unsaved\":[\"/data/b.mp4\"]}\n"));
 }
 
 TEST_F(OpeningAMovie, PrintsNothingWhenNothingWasDone)

@@ -100,6 +100,12 @@ TEST_F(Service, TellsOfAnEditorThatEndedEarly)
     expectScenario("failed");
 }
 
+TEST_F(Service, TellsWhatBecameOfSavedMoviesBeforeAndBehindTheUsersLastWord)
+{
+    startBus("saved=/videos/a.mp4 finish=save,save wait unsaved=/data/b.mp4");
+    expectScenario("saves");
+}
+
 TEST_F(Service, ClosesTheEditorsOfARecorderThatVanishes)
 {
     const auto there = pipe("PIPE_THERE");

@@ -24,14 +24,15 @@ class Recorder:
     def __init__(self):
         self.bus = BusConnection(ADDRESS)
         self.signals = []
-        for member in ("Completed", "Failed"):
+        for member in ("Saved", "SaveFailed", "Completed", "Failed"):
             self.bus.add_signal_receiver(self.arrived, member, "org.clipsa.RecorderSession1", path_keyword="path",
                                          member_keyword="member")
         self.recorder = dbus.Interface(self.bus.get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"),
                                        "org.clipsa.Recorder1")
 
-    def arrived(self, value, path, member):
-        self.signals.append((path, member, [str(v) for v in value] if member == "Completed" else str(value)))
+    def arrived(self, value, *more, path, member):
+        value = [str(v) for v in value] if member == "Completed" else str(value)
+        self.signals.append((path, member, value) + tuple(str(m) for m in more))
 
     def edit(self, file=MOVIE, **options):
         options = {key.replace("_", "-"): value for key, value in options.items()}
@@ -55,6 +56,15 @@ class Recorder:
 def until(predicate):
     while not predicate():
         GLib.MainContext.default().iteration(True)
+
+
+def saves():
+    """What was saved when the user finished is told before that, the rest behind it."""
+    recorder = Recorder()
+    session = recorder.edit()
+    until(lambda: len(recorder.signals) == 3)
+    assert recorder.signals == [(session, "Saved", "/videos/a.mp4"), (session, "Completed", ["save", "save"]),
+                                (session, "SaveFailed", "/data/b.mp4", "the disk is full")], recorder.signals
 
 
 def completed():
