@@ -13,7 +13,7 @@ std::string descriptionForCode(std::int64_t code)
     case VKErrorNoMovie:
         return "There is no movie to save. Record it again, or open the file itself.";
     case VKErrorExportFailed:
-        return "The movie could not be exported. It is still there as it was: free some space, then try again.";
+        return "The movie could not be exported. It is still there as it was.";
     default:
         return "Something went wrong (error " + std::to_string(code) + ").";
     }

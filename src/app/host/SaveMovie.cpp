@@ -128,8 +128,10 @@ base::Result<std::string> save(MediaTool& tool, const SaveCommand& command, Prog
     progress.clear();
     tool.tellLog(base::MemoryLog::Line::Kind::Message); // what is left out of the mix
     if (error) {
-        complain("the sound of " + command.movie + " cannot be mixed (" + error->description()
-                 + "); it is saved as it is");
+        const bool isSilent = asset.value()->tracksWithMediaType(platform::MediaType::Audio).empty();
+        complain((isSilent ? command.movie + " cannot be made into an MP4 movie ("
+                           : "the sound of " + command.movie + " cannot be mixed (")
+                 + error->description() + "); it is saved as it is");
         std::error_code ignored; // a relative path was opened a moment ago
         movie = fs::absolute(command.movie, ignored).native();
     }
