@@ -26,6 +26,27 @@ INSTANTIATE_TEST_SUITE_P(, WholeMovies,
                              return name;
                          });
 
+class Bursts : public CutsTest {};
+
+TEST_F(Bursts, KeepAllOfTheirPicturesAndTheTimeOfTheLastOrOfAKeyframe)
+{
+    ASSERT_NO_FATAL_FAILURE(take(exportMovie("h264-bursts.mkv")));
+    int bursts = 0;
+    for (std::size_t i = 0; i + 1 < source.size(); ++i)
+        if (source[i].seconds == source[i + 1].seconds) {
+            const bool isKeyframe = source[i].number == 0 || source[i].number == 30;
+            source[i + (isKeyframe ? 1 : 0)].seconds += isKeyframe ? 0.001 : -0.001;
+            ++bursts;
+        }
+    ASSERT_EQ(bursts, 18);
+    const double length = asset->duration().seconds();
+    cutAndCheck(0, length);
+    EXPECT_EQ(copies, int(source.size()));
+    for (double start = 0.02; start < 1.9; start += 0.16)
+        cutAndCheck(start, start + 1.03);
+    EXPECT_FALSE(saysEncodedAsAWhole());
+}
+
 struct Edited {
     const char* file;
     int copies; ///< of the whole

@@ -25,7 +25,8 @@ base::Result<void> PictureLine::push(Owned<AVPacket> packet, bool isJoint)
         dts = m_pending.top();
         m_pending.pop();
         if (dts > packet->pts || (m_count > 0 && dts <= m_lastDts))
-            return cannotCopy("its pictures are reordered farther than it says");
+            return cannotCopy(dts == m_lastDts ? "several pictures have the same time"
+                                               : "its pictures are reordered farther than it says");
     }
     ++m_count;
     m_lastDts = packet->dts = dts;

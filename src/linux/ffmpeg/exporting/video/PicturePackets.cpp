@@ -3,8 +3,16 @@
 #include "linux/ffmpeg/exporting/CannotCopy.h"
 
 #include <algorithm>
+#include <iterator>
+#include <utility>
 
 namespace ffmpeg {
+
+namespace {
+
+constexpr std::size_t kMostOfOneTime = 64; ///< more is a broken file, not a burst
+
+} // namespace
 
 PicturePackets::PicturePackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer)
     : m_movie(std::move(movie)), m_demuxer(std::move(demuxer)),
@@ -25,6 +33,9 @@ base::Result<std::unique_ptr<PicturePackets>> PicturePackets::open(std::shared_p
 
 void PicturePackets::seek(std::int64_t outTick)
 {
+    m_ready.clear();
+    m_next = nullptr;
+    m_ended = 0;
     const std::int64_t second = std::max<std::int64_t>(1, av_rescale_q(1, {1, 1}, track().timeBase));
     const std::int64_t wanted = outTick / m_scale + track().origin;
     std::int64_t back = 0;
@@ -49,6 +60,47 @@ void PicturePackets::seek(std::int64_t outTick)
 }
 
 int PicturePackets::read(AVPacket& packet)
+{
+    if (m_ready.empty())
+        if (const int result = gatherOneTime(); result != 0)
+            return result;
+    av_packet_unref(&packet);
+    av_packet_move_ref(&packet, m_ready.front().get());
+    m_ready.pop_front();
+    return 0;
+}
+
+int PicturePackets::gatherOneTime()
+{
+    if (m_ended != 0)
+        return m_ended;
+    if (!m_next) {
+        m_next = newPacket();
+        if (const int result = readAsItIs(*m_next); result != 0) {
+            m_next = nullptr;
+            return result;
+        }
+    }
+    const std::int64_t pts = m_next->pts;
+    const auto isHidden = [](const AVPacket& each) { return (each.flags & AV_PKT_FLAG_DISCARD) != 0; };
+    std::ptrdiff_t keyframe = -1;
+    do {
+        keyframe = m_next->flags & AV_PKT_FLAG_KEY ? std::ssize(m_ready) : keyframe;
+        m_ready.push_back(std::exchange(m_next, newPacket()));
+        m_ended = readAsItIs(*m_next);
+    } while (m_ended == 0 && pts != AV_NOPTS_VALUE && m_next->pts == pts
+             && isHidden(*m_next) == isHidden(*m_ready.back()) && m_ready.size() < kMostOfOneTime);
+    if (m_ended != 0)
+        m_next = nullptr;
+    // A keyframe keeps its time: whoever begins there does not know what stood before it. Else the last does, which is
+    // the one that was seen.
+    const std::ptrdiff_t fixed = keyframe >= 0 ? keyframe : std::ssize(m_ready) - 1;
+    for (std::ptrdiff_t i = 0; pts != AV_NOPTS_VALUE && i < std::ssize(m_ready); ++i)
+        m_ready[static_cast<std::size_t>(i)]->pts = pts + i - fixed;
+    return 0;
+}
+
+int PicturePackets::readAsItIs(AVPacket& packet)
 {
     if (!m_hasPeeked)
         return m_demuxer->read(packet);

@@ -1,13 +1,15 @@
 /// Reads the packets of a movie's pictures in the order of decoding, from any place. One thread.
 ///
 /// Packets keep the stream's own ticks, as its decoder wants them; outTick() makes them those of the output: on the
-/// movie's time line, and as fine as all times that the movie tells.
+/// movie's time line, and as fine as all times that the movie tells. Packets that follow each other with one time, which
+/// clocks of milliseconds make of pictures that came in a burst, get times of their own, a tick apart.
 #pragma once
 
 #include "linux/ffmpeg/Movie.h"
 #include "linux/ffmpeg/exporting/video/Splicer.h"
 #include "linux/ffmpeg/exporting/video/VideoPlan.h"
 
+#include <deque>
 #include <memory>
 
 namespace ffmpeg {
@@ -51,6 +53,8 @@ public:
 private:
     PicturePackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer);
 
+    int readAsItIs(AVPacket& packet);
+    int gatherOneTime();
     base::Result<PicturePacket> look(const AVPacket& packet, const Splicer& splicer) const;
 
     std::shared_ptr<const Movie> m_movie;
@@ -59,6 +63,9 @@ private:
     Owned<AVPacket> m_packet;
     Owned<AVPacket> m_peeked;
     bool m_hasPeeked = false;
+    std::deque<Owned<AVPacket>> m_ready; ///< of one time in the file
+    Owned<AVPacket> m_next;              ///< what follows them
+    int m_ended = 0;                     ///< or why nothing does
     bool m_startsMovie = false;
 };
 
