@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <chrono>
 #include <mutex>
+#include <optional>
 #include <string>
 #include <utility>
 
@@ -14,7 +15,10 @@ namespace {
 
 using SteadyClock = std::chrono::steady_clock;
 
-constexpr std::uint32_t kLatency = kSampleRate / 25; ///< frames: 40 ms, which no desktop server refuses
+/// Between two places that a device tells; longer ones are those of a device that stands still.
+constexpr std::int64_t kLongestStep = kSampleRate / 40;
+/// A device that asks for samples, and has not told where it is for so long, never will.
+constexpr std::chrono::milliseconds kLongestSilence{500};
 
 struct Context {
     cubeb* handle = nullptr;
@@ -47,32 +51,38 @@ public:
         wanted.rate = kSampleRate;
         wanted.channels = 2;
         wanted.layout = CUBEB_LAYOUT_STEREO;
-        if (cubeb_stream_init(m_context->handle, &m_stream, "Clipsa", nullptr, nullptr, nullptr, &wanted, kLatency,
+        if (cubeb_stream_init(m_context->handle, &m_stream, "Clipsa", nullptr, nullptr, nullptr, &wanted, kFramesAhead,
                               dataWanted, stateChanged, this)
             != CUBEB_OK) {
             m_stream = nullptr;
             return false;
         }
-        if (cubeb_stream_start(m_stream) != CUBEB_OK)
-            return false;
-        std::uint32_t latency = 0;
-        cubeb_stream_get_latency(m_stream, &latency);
-        const std::lock_guard lock(m_mutex);
-        m_latency = std::clamp(latency, kLatency, static_cast<std::uint32_t>(kSampleRate));
-        return true;
+        return cubeb_stream_start(m_stream) == CUBEB_OK;
     }
 
     std::int64_t framesHeard() const override
     {
+        std::uint64_t place = 0;
+        // Without the lock: the device has one of its own, and holds it while it wants data.
+        const bool isKnown = cubeb_stream_get_position(m_stream, &place) == CUBEB_OK;
+        const auto now = SteadyClock::now();
         const std::lock_guard lock(m_mutex);
-        if (m_askedAt == SteadyClock::time_point{})
-            return m_heard;
-        const std::chrono::duration<double> elapsed = SteadyClock::now() - m_askedAt;
-        std::int64_t heard = m_before + static_cast<std::int64_t>(elapsed.count() * kSampleRate) - m_latency;
-        // A device that has died is not waited for: pictures go on in silence.
-        if (!m_failed)
-            heard = std::min(heard, m_given);
-        m_heard = std::max(m_heard, heard);
+        const auto framesFrom = [&](SteadyClock::time_point from) {
+            return static_cast<std::int64_t>(std::chrono::duration<double>(now - from).count() * kSampleRate);
+        };
+        if (m_failedAt)
+            // A device that has died is not waited for: pictures go on in silence.
+            return m_heard = std::max(m_heard, m_heardAtFailure + framesFrom(*m_failedAt));
+        if (isKnown && static_cast<std::int64_t>(place) > m_place) {
+            m_place = static_cast<std::int64_t>(place);
+            m_placedAt = now;
+        }
+        std::int64_t heard = m_place;
+        if (m_place > 0)
+            heard += std::min(framesFrom(m_placedAt), kLongestStep); // some tell it in steps
+        else if (m_askedAt && now - *m_askedAt > kLongestSilence)
+            heard = m_before + framesFrom(m_latestAt) - kFramesAhead; // it never tells
+        m_heard = std::max(m_heard, std::min(heard, m_given));
         return m_heard;
     }
 
@@ -82,7 +92,8 @@ private:
         auto& me = *static_cast<CubebOutput*>(self);
         me.m_fill(static_cast<float*>(output), static_cast<std::size_t>(frames));
         const std::lock_guard lock(me.m_mutex);
-        me.m_askedAt = SteadyClock::now();
+        me.m_latestAt = SteadyClock::now();
+        me.m_askedAt = me.m_askedAt.value_or(me.m_latestAt);
         me.m_before = me.m_given;
         me.m_given += frames;
         return frames;
@@ -93,9 +104,8 @@ private:
             return;
         auto& me = *static_cast<CubebOutput*>(self);
         const std::lock_guard lock(me.m_mutex);
-        me.m_failed = true;
-        if (me.m_askedAt == SteadyClock::time_point{})
-            me.m_askedAt = SteadyClock::now();
+        me.m_heardAtFailure = me.m_heard;
+        me.m_failedAt = me.m_failedAt.value_or(SteadyClock::now());
     }
 
     std::shared_ptr<Context> m_context;
@@ -103,11 +113,14 @@ private:
     cubeb_stream* m_stream = nullptr;
 
     mutable std::mutex m_mutex;
-    SteadyClock::time_point m_askedAt{};
-    std::int64_t m_before = 0; ///< given before the latest call for data
+    std::optional<SteadyClock::time_point> m_askedAt; ///< first
+    SteadyClock::time_point m_latestAt{};             ///< that it asked
+    std::int64_t m_before = 0;                        ///< given before that
     std::int64_t m_given = 0;
-    std::int64_t m_latency = kLatency;
-    bool m_failed = false;
+    mutable std::int64_t m_place = 0; ///< where the device says it is; 0 until it does
+    mutable SteadyClock::time_point m_placedAt{};
+    std::optional<SteadyClock::time_point> m_failedAt;
+    std::int64_t m_heardAtFailure = 0;
     mutable std::int64_t m_heard = 0;
 };
 

@@ -14,8 +14,9 @@ namespace {
 
 /// A sound server that does not answer for so long is not waited for.
 constexpr base::Instant kPatience = std::chrono::seconds(2);
-/// The device's time is not the clock's; it is asked again at most this often.
+/// The device's time is not the clock's; it is asked again at most this often, and at least that often.
 constexpr base::Instant kShortestWait = std::chrono::milliseconds(1);
+constexpr base::Instant kLongestWait = std::chrono::milliseconds(100);
 
 } // namespace
 
@@ -85,20 +86,40 @@ void FFmpegPlayer::startSound()
     m_sound->start(m_generation, m_position.convertedTo(kSampleRate).value);
     main.postAfter(kPatience, [weak, generation = m_generation] {
         const auto self = weak.lock();
-        if (self && generation == self->m_generation && self->m_playing && !self->m_running) {
-            self->silence();
-            self->run();
-        }
+        if (self && generation == self->m_generation && self->m_playing && !self->m_running)
+            self->run(); // the sound may still come
     });
 }
 
 void FFmpegPlayer::soundStarted(std::uint64_t generation, std::shared_ptr<const AudioOutput> output)
 {
-    if (generation != m_generation || !m_playing || m_running)
+    if (generation != m_generation || !m_playing || m_output)
         return;
+    if (!m_running) {
+        m_output = std::move(output);
+        run();
+    } else if (output) {
+        // Too late for the start: from here on it is heard.
+        m_sound->hurryTo(currentTime().convertedTo(kSampleRate).value);
+        const std::int64_t gone = (currentTime() - m_position).convertedTo(kSampleRate).value;
+        m_soundClock.start(gone, m_engine->system.clock.now(), true);
+        m_output = std::move(output);
+        tick();
+    }
+}
 
-    m_output = std::move(output);
-    run();
+/// Since it runs.
+std::int64_t FFmpegPlayer::framesHeard() const
+{
+    return m_soundClock.frames(m_output->framesHeard() + m_sound->skipped(), m_engine->system.clock.now());
+}
+
+/// A device that does nothing shall go on with the pictures, should it come back.
+void FFmpegPlayer::hurrySound()
+{
+    const std::int64_t heard = framesHeard();
+    if (m_soundClock.isOnItsOwn())
+        m_sound->hurryTo(m_position.convertedTo(kSampleRate).value + heard);
 }
 
 void FFmpegPlayer::silence()
@@ -111,6 +132,7 @@ void FFmpegPlayer::silence()
 void FFmpegPlayer::run()
 {
     m_startedAt = m_engine->system.clock.now();
+    m_soundClock.start(0, m_startedAt, false);
     m_toldTo = m_position;
     m_running = true;
     tick();
@@ -132,6 +154,8 @@ void FFmpegPlayer::tick()
     const std::uint64_t generation = m_generation;
     // Whoever is called can pause or seek: then this run is over.
     const auto isOver = [&] { return generation != m_generation || !m_running; };
+    if (m_output)
+        hurrySound();
     const MediaTime now = currentTime();
     if (m_pictures) {
         if (const FrameRef due = m_pictures->takeDue(m_movie->video()->tickAt(now))) {
@@ -186,7 +210,7 @@ base::Instant FFmpegPlayer::untilTick(MediaTime next) const
         ++ticks.value;
     if (m_output) {
         const MediaTime wait = ticks - currentTime();
-        return std::max(kShortestWait, base::Instant(wait.convertedTo(1'000'000'000).value));
+        return std::clamp(base::Instant(wait.convertedTo(1'000'000'000).value), kShortestWait, kLongestWait);
     }
     const std::int64_t fromStart = ticks.value - m_position.convertedTo(timescale).value;
     const base::Instant due(av_rescale_rnd(fromStart, 1'000'000'000, timescale, AV_ROUND_UP));

@@ -75,7 +75,7 @@ base::MediaTime FFmpegPlayer::currentTime() const
     if (!m_running)
         return m_position;
     const MediaTime elapsed =
-        m_output ? MediaTime::make(m_output->framesHeard(), kSampleRate)
+        m_output ? MediaTime::make(framesHeard(), kSampleRate)
                  : MediaTime::make((m_engine->system.clock.now() - m_startedAt).count(), 1'000'000'000);
     const MediaTime now = m_position + elapsed.convertedTo(m_movie->timescale());
     return now < m_movie->duration() ? now : m_movie->duration();

@@ -1,12 +1,13 @@
 /// Plays an item: the current picture, the sound, and who is told when. Main queue only.
 ///
-/// Time goes on with what the sound device has played; where nothing is heard, with the system's clock. It stands still
-/// after play() and seeks until picture and sound are there.
+/// Time goes on with what the sound device has played; where nothing is heard, with the system's clock, also while a device
+/// does nothing. It stands still after play() and seeks until picture and sound are there, or one of them takes too long.
 #pragma once
 
 #include "linux/ffmpeg/Engine.h"
 #include "linux/ffmpeg/FFmpegPlayerItem.h"
 #include "linux/ffmpeg/PictureWorker.h"
+#include "linux/ffmpeg/SoundClock.h"
 #include "linux/ffmpeg/SoundWorker.h"
 #include "platform/media/Player.h"
 #include "platform/media/TimeObservers.h"
@@ -68,9 +69,11 @@ private:
     void start();
     void picturesArrived(std::uint64_t generation, const FrameRef& frame);
     void startSound();
+    std::int64_t framesHeard() const;
     void soundStarted(std::uint64_t generation, std::shared_ptr<const AudioOutput> output);
     void silence();
     void run();
+    void hurrySound();
     void halt();
 
     // While running.
@@ -89,6 +92,7 @@ private:
     /// What time goes by while running; null for the system's clock. Let go before the sound worker is told anything:
     /// the device must end on the worker's thread.
     std::shared_ptr<const AudioOutput> m_output;
+    mutable SoundClock m_soundClock; ///< while running with an output
 
     platform::TimeObservers m_observers;
     FrameRef m_frame;

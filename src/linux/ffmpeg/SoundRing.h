@@ -1,7 +1,7 @@
 /// Samples on their way from the mixer to the device, by their place on the movie's time line.
 ///
 /// One thread writes, one reads, neither waits. A device that is ahead of the mixer hears silence and time goes on: what
-/// comes too late is passed over, so sound never lags behind the pictures.
+/// comes too late is passed over, so sound never lags behind the pictures. Nor does that of a device that comes late.
 #pragma once
 
 #include <algorithm>
@@ -21,7 +21,14 @@ public:
     {
         m_written = frame;
         m_read = frame;
+        m_earliest = frame;
+        m_skipped = 0;
     }
+
+    /// What lies before `frame` is no longer wanted: the next that is read is this or a later one. Any thread.
+    void hurryTo(std::int64_t frame) { m_earliest = frame; }
+    /// How many frames were left out for that since reset(). Any thread.
+    std::int64_t skipped() const { return m_skipped; }
 
     /// What the writer is to write next: where it stopped, or where the reader is when that is ahead.
     std::int64_t next() const { return std::max(m_written.load(), m_read.load()); }
@@ -44,7 +51,9 @@ public:
     /// The next `frames` pairs; silence where nothing was written in time.
     void read(float* into, std::size_t frames)
     {
-        const std::int64_t from = m_read.load();
+        const std::int64_t late = std::max<std::int64_t>(0, m_earliest - m_read);
+        m_skipped += late;
+        const std::int64_t from = m_read + late;
         const std::int64_t written = m_written.load(std::memory_order_acquire);
         const auto ready =
             static_cast<std::size_t>(std::clamp<std::int64_t>(written - from, 0, static_cast<std::int64_t>(frames)));
@@ -64,6 +73,8 @@ private:
     std::int64_t m_capacity;
     std::atomic<std::int64_t> m_written{0};
     std::atomic<std::int64_t> m_read{0};
+    std::atomic<std::int64_t> m_earliest{0};
+    std::atomic<std::int64_t> m_skipped{0};
 };
 
 } // namespace ffmpeg

@@ -9,10 +9,12 @@ namespace ffmpeg {
 
 namespace {
 
-constexpr std::size_t kChunk = 1024;               ///< frames mixed at a time
-constexpr std::size_t kPrefill = kSampleRate / 10; ///< frames that are ready before the device starts
-/// The ring holds a second: this often is enough to keep it filled.
+constexpr std::size_t kChunk = 1024; ///< frames mixed at a time
+/// Ready before the device starts: more than it asks for at once.
+constexpr std::size_t kPrefill = kFramesAhead + kSampleRate / 10;
+/// The ring holds more than a second: this often is enough to keep it filled.
 constexpr std::chrono::milliseconds kFillInterval{100};
+constexpr std::size_t kLowRoom = kSampleRate / 2; ///< as soon as there is more, the ring is filled
 
 } // namespace
 
@@ -74,7 +76,7 @@ void SoundWorker::loop()
         {
             std::unique_lock lock(m_mutex);
             const auto hasWork = [&] {
-                return *m_cancelled || done != m_generation || (m_output && m_ring.room() > kSampleRate / 2);
+                return *m_cancelled || done != m_generation || (m_output && m_ring.room() > kLowRoom);
             };
             if (m_output)
                 m_changed.wait_for(lock, kFillInterval, hasWork);
@@ -93,7 +95,7 @@ void SoundWorker::loop()
                 begin(opened, wanted, frame);
         }
         if (m_output && opened)
-            fillRing(*opened, kSampleRate);
+            fillRing(*opened, kRing);
     }
     m_output.reset();
 }
@@ -115,7 +117,7 @@ void SoundWorker::begin(SoundMixer* mixer, std::uint64_t generation, std::int64_
                     return;
                 }
                 m_ring.read(samples, frames);
-                if (m_ring.room() > kSampleRate / 2)
+                if (m_ring.room() > kLowRoom)
                     m_changed.notify_all(); // a wake-up that is missed is made up for by the interval
             });
         }

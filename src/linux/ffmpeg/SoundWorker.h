@@ -28,6 +28,10 @@ public:
 
     /// Plays from this frame of the movie on, in pairs of samples.
     void start(std::uint64_t generation, std::int64_t frame);
+    /// The pictures are at this frame already: what the device asks for next is not from before it.
+    void hurryTo(std::int64_t frame) { m_ring.hurryTo(frame); }
+    /// Frames that were left out for that since the start, beside those that the device was given.
+    std::int64_t skipped() const { return m_ring.skipped(); }
     /// Silence at once; the device goes soon after.
     void stop();
 
@@ -49,8 +53,10 @@ private:
     bool m_plays = false;
     std::atomic<bool> m_muted{true};
 
+    static constexpr std::size_t kRing = std::size_t{2} * kSampleRate; ///< frames
+
     // The thread's own, but for the ring's reading end, which is the device's.
-    SoundRing m_ring{kSampleRate};
+    SoundRing m_ring{kRing};
     std::shared_ptr<AudioOutput> m_output;
 
     std::thread m_thread;

@@ -2,6 +2,8 @@
 #include "support/DrivenDevice.h"
 #include "support/EngineTest.h"
 
+#include <algorithm>
+#include <atomic>
 #include <cmath>
 #include <numbers>
 
@@ -48,6 +50,14 @@ protected:
         player = std::dynamic_pointer_cast<ffmpeg::FFmpegPlayer>(framework.playerWithPlayerItem(item));
         player->play();
         ASSERT_TRUE(waitFor([&] { return player->isRunning(); }));
+    }
+
+    void letTimePass(std::chrono::milliseconds by)
+    {
+        for (std::chrono::milliseconds gone{0}; gone < by; gone += 10ms) {
+            clock.advance(10ms);
+            mainQueue.drain();
+        }
     }
 
     tests::DrivenDevice device;
@@ -102,7 +112,7 @@ TEST_F(Sound, TimeGoesOnWithWhatTheDeviceHasPlayed)
     ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
     playFile(heard, "clock.mp4");
     EXPECT_EQ(player->currentTime(), at(0));
-    clock.advance(10s);
+    clock.advance(900ms);
     EXPECT_EQ(player->currentTime(), at(0)) << "the clock does not count";
     const auto samples = device.play(24000);
     EXPECT_EQ(player->currentTime(), at(0.5));
@@ -139,6 +149,100 @@ TEST_F(Sound, ADeviceThatIsAheadHearsSilenceAndTimeGoesOn)
         const auto samples = device.play(240);
         return !samples.empty() && std::abs(samples[100]) > 1e-3f;
     })) << "it catches up";
+}
+
+TEST_F(Sound, ADeviceMayWantMuchAtOnceAtTheFirstMoment)
+{
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+    playFile(heard, "clock.mp4");
+    const auto samples = device.play(ffmpeg::kFramesAhead + 4800);
+    const auto from = mixer("clock.mp4");
+    const auto wanted = mix(*from, 0.3);
+    ASSERT_EQ(samples.size(), wanted.size());
+    for (std::size_t i = 0; i < samples.size(); ++i)
+        ASSERT_NEAR(samples[i], wanted[i], 1e-6) << i;
+}
+
+TEST_F(Sound, ADeviceThatNeverAsksDoesNotStopThePictures)
+{
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+    playFile(heard, "clock.mp4");
+    letTimePass(3000ms);
+    EXPECT_NEAR(player->currentTime().seconds(), 2, 0.001) << "it was waited for at first";
+    EXPECT_TRUE(waitFor([&] { return tests::numberIn(player->currentFrame()) == 60; }));
+    letTimePass(2100ms);
+    EXPECT_FALSE(player->isPlaying()) << "the end is reached";
+}
+
+TEST_F(Sound, ADeviceThatWakesUpLateIsHeardAtTheTimeOfThePictures)
+{
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+    playFile(heard, "start-offset.mp4"); // silent up to 1.5 s
+    letTimePass(2000ms);
+    EXPECT_NEAR(player->currentTime().seconds(), 1, 0.001);
+    std::int64_t frames = 0;
+    ASSERT_TRUE(waitFor([&] {
+        const auto samples = device.play(1200);
+        frames += 1200;
+        clock.advance(25ms);
+        mainQueue.drain();
+        return std::any_of(samples.begin(), samples.end(), [](float each) { return std::abs(each) > 0.02f; });
+    }));
+    EXPECT_NEAR(1 + static_cast<double>(frames) / 48000, 1.5, 0.11) << "no sooner, no later";
+    EXPECT_NEAR(player->currentTime().seconds(), 1.5, 0.03);
+}
+
+TEST_F(Sound, ADeviceThatStopsOnTheWayIsLeftBehindUntilItGoesOn)
+{
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, device.maker()});
+    playFile(heard, "clock.mp4");
+    device.play(24000);
+    EXPECT_EQ(player->currentTime(), at(0.5));
+    letTimePass(2000ms);
+    EXPECT_NEAR(player->currentTime().seconds(), 1.5, 0.001);
+    device.play(4800);
+    EXPECT_NEAR(player->currentTime().seconds(), 1.5, 0.11);
+    device.play(24000);
+    EXPECT_NEAR(player->currentTime().seconds(), 2, 0.11);
+}
+
+TEST_F(Sound, ADeviceThatIsOpenedLateIsHeardFromThereOn)
+{
+    const auto isHeldUp = std::make_shared<std::atomic<bool>>(true);
+    const auto make = [isHeldUp, maker = device.maker()](ffmpeg::AudioOutput::Fill fill) {
+        isHeldUp->wait(true);
+        return maker(std::move(fill));
+    };
+    const auto open = [&](int*) {
+        *isHeldUp = false;
+        isHeldUp->notify_all();
+    };
+    ffmpeg::FFmpegMediaFramework heard(system, center, {{}, make});
+    int any = 0;
+    std::unique_ptr<int, decltype(open)> opener(&any, open); // also where an assertion fails
+    item = heard.playerItemWithAsset(heard.assetWithURL(base::Url::fromPath(movie("start-offset.mp4"))));
+    player = std::dynamic_pointer_cast<ffmpeg::FFmpegPlayer>(heard.playerWithPlayerItem(item));
+    player->play();
+    ASSERT_TRUE(waitFor([&] {
+        clock.advance(2100ms);
+        mainQueue.drain();
+        return player->isRunning();
+    })) << "it is not waited for any longer";
+    letTimePass(1000ms);
+    EXPECT_NEAR(player->currentTime().seconds(), 1, 0.01);
+    opener.reset();
+    ASSERT_TRUE(waitFor([&] { return device.isPlaying(); }));
+    mainQueue.drain();
+    std::int64_t frames = 0;
+    ASSERT_TRUE(waitFor([&] {
+        const auto samples = device.play(1200);
+        frames += 1200;
+        clock.advance(25ms);
+        mainQueue.drain();
+        return std::any_of(samples.begin(), samples.end(), [](float each) { return std::abs(each) > 0.02f; });
+    }));
+    EXPECT_NEAR(1 + static_cast<double>(frames) / 48000, 1.5, 0.11);
+    EXPECT_NEAR(player->currentTime().seconds(), 1.5, 0.03);
 }
 
 TEST_F(Sound, WithoutADeviceMoviesPlayByTheClock)
