@@ -136,6 +136,8 @@ int Demuxer::begin()
     }
     m_context = std::move(context); // before what it reads through
     m_io = std::move(io);
+    m_isFresh = true;
+    m_peeked.reset();
     return 0;
 }
 
@@ -157,6 +159,14 @@ void Demuxer::select(const std::vector<int>& streams)
 int Demuxer::read(AVPacket& packet)
 {
     av_packet_unref(&packet);
+    if (m_lost != 0)
+        return m_lost;
+    m_isFresh = false;
+    if (m_peeked) {
+        av_packet_move_ref(&packet, m_peeked.get());
+        m_peeked.reset();
+        return 0;
+    }
     for (int tries = 0; tries < kErrorsInARow; ++tries) {
         if (isCancelled())
             return AVERROR_EXIT;
@@ -175,42 +185,6 @@ int Demuxer::read(AVPacket& packet)
     return AVERROR_INVALIDDATA;
 }
 
-bool Demuxer::seek(int stream, std::int64_t timestamp)
-{
-    m_readError = 0;
-    return av_seek_frame(m_context.get(), stream, timestamp, AVSEEK_FLAG_BACKWARD) >= 0;
-}
-
-bool Demuxer::seekToByte(std::int64_t position)
-{
-    m_readError = 0;
-    return avformat_seek_file(m_context.get(), -1, 0, position, position, AVSEEK_FLAG_BYTE) >= 0;
-}
-
-bool Demuxer::seekToStart(int stream)
-{
-    if (!seeksByTable())
-        return seekToByte(0);
-    // Matroska's table is that of the pictures. Of the sound it knows what happened to be read, and its parser does not
-    // find its way from another place: only a new one begins where the file does.
-    if (!isMov() && this->stream(stream).codecpar->codec_type != AVMEDIA_TYPE_VIDEO)
-        return startOver();
-    // Some formats search forwards from a negative time only; far enough before any start, and no overflow in sums.
-    return seek(stream, INT64_MIN / 4) || seekToByte(0);
-}
-
-bool Demuxer::startOver()
-{
-    const std::int64_t position = m_position;
-    if (begin() < 0) {
-        m_position = position;
-        return false;
-    }
-    if (m_selected)
-        select(std::vector<int>(*m_selected));
-    return true;
-}
-
 bool Demuxer::seeksByTable() const
 {
     return hasTable(*m_context);
@@ -219,6 +193,11 @@ bool Demuxer::seeksByTable() const
 bool Demuxer::isMov() const
 {
     return isOfKind(*m_context, "mov");
+}
+
+bool Demuxer::isMatroska() const
+{
+    return isOfKind(*m_context, "matroska");
 }
 
 } // namespace ffmpeg

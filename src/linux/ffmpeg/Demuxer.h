@@ -12,6 +12,8 @@
 
 namespace ffmpeg {
 
+struct PacketEntry;
+
 /// Set by whoever no longer wants the result; reading then fails soon. Shared, because the reader may live longer.
 using Cancelled = std::shared_ptr<const std::atomic<bool>>;
 
@@ -39,21 +41,37 @@ public:
     int read(AVPacket& packet);
     /// Why bytes could not be read since the last seek, as a negative errno; 0 while all could.
     int readError() const { return m_readError; }
-    /// To the keyframe at or before `timestamp` of `stream`. False when the file cannot do that.
+    /// To the last keyframe at or before `timestamp` of `stream` that is known; later ones may follow where the file has no
+    /// table. False when there is none; the reader stands anywhere then.
     bool seek(int stream, std::int64_t timestamp);
-    bool seekToByte(std::int64_t position);
-    /// To the first packet of all. Streams and context may be others afterwards, of the same file: ask for them again.
+    /// The same for sound, to `moment` in microseconds of the file's own time; `pictures` is the picture stream, or -1.
+    bool seekSound(int sound, int pictures, std::int64_t moment);
+    /// What is read next of `stream` is this packet, with the times that it has for who reads the file from its start.
+    /// No other stream may be selected. False when it is not found; the reader stands anywhere then.
+    bool seekTo(int stream, const PacketEntry& packet);
+    /// To the first packet of all.
     bool seekToStart(int stream);
+    // After seekTo() and seekToStart() streams and context may be others, of the same file: ask for them again.
 
-    /// Whether the file's own table finds keyframes; a movie without one needs a PacketIndex.
+    /// Whether the file's format has a table by which seek() goes, and tells in its header when the movie begins.
     bool seeksByTable() const;
+    /// Whether that table has keyframes of `stream`; else a movie needs a PacketIndex. Of a reader that has read no packet
+    /// yet; moves it.
+    bool findsKeyframes(int stream);
     bool isMov() const;
+    bool isMatroska() const;
 
 private:
     Demuxer(std::shared_ptr<OpenFile> file, Cancelled cancelled);
 
+    enum class Way { ByPlace, ByTime };
+
     int begin();
+    void leave();
     bool startOver();
+    void keepTable(AVFormatContext& before);
+    bool seekToByte(std::int64_t position);
+    bool readUpTo(int stream, const PacketEntry& wanted);
 
     static int readBytes(void* self, std::uint8_t* into, int count);
     static std::int64_t moveTo(void* self, std::int64_t offset, int whence);
@@ -66,6 +84,10 @@ private:
     Owned<AVIOContext> m_io;
     Owned<AVFormatContext> m_context;
     std::optional<std::vector<int>> m_selected; ///< all when nobody said
+    bool m_isFresh = false;                     ///< no packet was read since the file was opened
+    Owned<AVPacket> m_peeked;                   ///< read already
+    int m_lost = 0;                             ///< why a reader that should start over could not
+    Way m_way = Way::ByPlace;                   ///< that led to a packet before
 };
 
 } // namespace ffmpeg

@@ -65,6 +65,8 @@ base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file,
 void Movie::describe()
 {
     AVFormatContext& context = m_spare->context();
+    if (!m_spare->isMatroska()) // its table is read when somebody wants it
+        m_hasTable = m_spare->isMov();
     // Broadcast streams start at any time; movies with a header mean what they say.
     if (!m_spare->seeksByTable() && context.start_time != AV_NOPTS_VALUE)
         m_origin = context.start_time;
@@ -234,6 +236,21 @@ base::Result<std::unique_ptr<Demuxer>> Movie::demuxer(Cancelled cancelled) const
         }
     }
     return Demuxer::open(m_file, std::move(cancelled));
+}
+
+bool Movie::hasTable(const Cancelled& cancelled) const
+{
+    const std::lock_guard lock(m_tableMutex);
+    if (!m_hasTable) {
+        auto reader = Demuxer::open(m_file, cancelled);
+        if (!reader)
+            return false;
+        const bool found = reader.value()->findsKeyframes(m_video ? m_video->stream : m_audioStreams.front());
+        if (!found && reader.value()->isCancelled())
+            return false;
+        m_hasTable = found;
+    }
+    return *m_hasTable;
 }
 
 std::shared_ptr<const PacketIndex> Movie::packetIndex(const Cancelled& cancelled) const

@@ -44,6 +44,8 @@ public:
 
     /// A reader of the shared file. The first call gives the one that opened the movie.
     base::Result<std::unique_ptr<Demuxer>> demuxer(Cancelled cancelled) const;
+    /// Whether a reader's table finds the keyframes; else the packet index does.
+    bool hasTable(const Cancelled& cancelled) const;
     /// Made by the first who asks, while others wait. Null when that was cancelled or the file cannot be read.
     std::shared_ptr<const PacketIndex> packetIndex(const Cancelled& cancelled) const;
 
@@ -69,6 +71,8 @@ private:
 
     mutable std::mutex m_mutex;
     mutable std::unique_ptr<Demuxer> m_spare;
+    mutable std::mutex m_tableMutex;
+    mutable std::optional<bool> m_hasTable;
     mutable std::mutex m_indexMutex;
     mutable std::shared_ptr<const PacketIndex> m_index;
 };

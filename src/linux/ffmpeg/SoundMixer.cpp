@@ -18,9 +18,10 @@ constexpr float kRelease = 1.0f / 4800;
 
 } // namespace
 
-SoundMixer::SoundMixer(std::unique_ptr<Demuxer> demuxer, std::vector<std::unique_ptr<SoundTrack>> tracks,
-                       std::int64_t origin)
-    : m_demuxer(std::move(demuxer)), m_tracks(std::move(tracks)), m_origin(origin), m_packet(newPacket())
+SoundMixer::SoundMixer(const Movie& movie, std::unique_ptr<Demuxer> demuxer,
+                       std::vector<std::unique_ptr<SoundTrack>> tracks)
+    : m_demuxer(std::move(demuxer)), m_tracks(std::move(tracks)), m_origin(movie.origin()),
+      m_pictures(movie.video() ? movie.video()->stream : -1), m_packet(newPacket())
 {
 }
 
@@ -45,7 +46,7 @@ base::Result<std::unique_ptr<SoundMixer>> SoundMixer::open(const std::shared_ptr
         return base::Error::make("ffmpeg", AVERROR_DECODER_NOT_FOUND,
                                  "“" + movie->file()->name() + "” has no sound that can be played.");
     demuxer.value()->select(streams);
-    return std::unique_ptr<SoundMixer>(new SoundMixer(std::move(demuxer).value(), std::move(tracks), movie->origin()));
+    return std::unique_ptr<SoundMixer>(new SoundMixer(*movie, std::move(demuxer).value(), std::move(tracks)));
 }
 
 void SoundMixer::seek(std::int64_t frame)
@@ -56,9 +57,8 @@ void SoundMixer::seek(std::int64_t frame)
     for (const auto& track : m_tracks)
         track->seek(frame);
     const int stream = m_tracks.front()->stream();
-    const std::int64_t microseconds = av_rescale(frame, AV_TIME_BASE, kSampleRate) + m_origin - kRunUp;
-    const std::int64_t tick = av_rescale_q(microseconds, AV_TIME_BASE_Q, m_demuxer->stream(stream).time_base);
-    if (microseconds <= m_origin || !m_demuxer->seek(stream, tick))
+    const std::int64_t moment = av_rescale(frame, AV_TIME_BASE, kSampleRate) + m_origin - kRunUp;
+    if (moment <= m_origin || !m_demuxer->seekSound(stream, m_pictures, moment))
         m_demuxer->seekToStart(stream);
 }
 

@@ -23,7 +23,7 @@ public:
     void mix(float* into, std::size_t frames);
 
 private:
-    SoundMixer(std::unique_ptr<Demuxer> demuxer, std::vector<std::unique_ptr<SoundTrack>> tracks, std::int64_t origin);
+    SoundMixer(const Movie& movie, std::unique_ptr<Demuxer> demuxer, std::vector<std::unique_ptr<SoundTrack>> tracks);
 
     void readUntil(std::int64_t frame);
     void limit(float* samples, std::size_t frames);
@@ -31,6 +31,7 @@ private:
     std::unique_ptr<Demuxer> m_demuxer;
     std::vector<std::unique_ptr<SoundTrack>> m_tracks;
     std::int64_t m_origin;
+    int m_pictures; ///< the picture stream; -1 when there is only sound
     Owned<AVPacket> m_packet;
     std::int64_t m_position = 0;
     bool m_ended = false;

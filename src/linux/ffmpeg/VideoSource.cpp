@@ -146,11 +146,12 @@ void VideoSource::seek(std::int64_t tick)
     m_soughtTick = tick;
     m_skippedTo = kNever;
     m_stepBack = 0;
-    if (!m_demuxer->seeksByTable()) {
-        if (!m_index)
+    if (!m_movie->hasTable(m_cancelled)) {
+        // Who starts to play does not wait for an index.
+        if (!m_index && tick > m_movie->firstFrame()->pts())
             m_index = m_movie->packetIndex(m_cancelled);
         const PacketEntry* keyframe = m_index ? m_index->keyframeAt(tick) : nullptr;
-        m_fromStart = !keyframe || keyframe->position < 0 || !m_demuxer->seekToByte(keyframe->position);
+        m_fromStart = !keyframe || !m_demuxer->seekTo(m_track.stream, *keyframe);
         if (m_fromStart)
             m_demuxer->seekToStart(m_track.stream);
         return;

@@ -21,7 +21,7 @@ PictureWalk::PictureWalk(std::shared_ptr<const Movie> movie, std::unique_ptr<Dem
       m_decoder(std::move(decoder)), m_cancelled(std::move(cancelled)), m_ahead(m_demuxer->stream(m_track.stream))
 {
     m_demuxer->select({m_track.stream});
-    if (!m_demuxer->seeksByTable()) {
+    if (!m_movie->hasTable(m_cancelled)) {
         m_index = m_movie->packetIndex(m_cancelled);
         return;
     }
@@ -111,9 +111,9 @@ void PictureWalk::seek(std::int64_t tick)
     m_keyframe = kNever;
     m_soughtTick = tick;
     m_stepBack = 0;
-    if (!m_demuxer->seeksByTable()) {
+    if (!m_movie->hasTable(m_cancelled)) {
         const PacketEntry* keyframe = m_index ? m_index->keyframeAt(tick) : nullptr;
-        m_fromStart = !keyframe || keyframe->position < 0 || !m_demuxer->seekToByte(keyframe->position);
+        m_fromStart = !keyframe || !m_demuxer->seekTo(m_track.stream, *keyframe);
     } else {
         const auto keyframe = keyframeBefore(tick);
         m_fromStart = (keyframe && !keyframeBefore(*keyframe - 1)) || !m_demuxer->seek(m_track.stream, tick);

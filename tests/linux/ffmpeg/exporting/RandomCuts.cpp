@@ -49,6 +49,14 @@ TEST_P(RandomCuts, HaveExactlyTheirPictures)
         }
 }
 
+std::string nameOf(const testing::TestParamInfo<Kind>& each)
+{
+    std::string name = each.param.file;
+    std::replace_if(
+        name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
+    return name;
+}
+
 INSTANTIATE_TEST_SUITE_P(
     , RandomCuts,
     testing::Values(
@@ -70,12 +78,16 @@ INSTANTIATE_TEST_SUITE_P(
         Kind{"h264-fields.mp4", true, 45}, Kind{"h264-fields-apart.mp4", false, 46}, Kind{"h264-odd.mp4", true, 47},
         Kind{"vp9-odd.webm", true, 48}, Kind{"h264-recorded.mkv", true, 49}, Kind{"h264-recorded-one.mkv", false, 50},
         Kind{"av1.ivf", true, 51}, Kind{"vp9-422-10bit.mkv", true, 47}),
-    [](const auto& each) {
-        std::string name = each.param.file;
-        std::replace_if(
-            name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-        return name;
-    });
+    nameOf);
+
+INSTANTIATE_TEST_SUITE_P(InOtherContainers, RandomCuts,
+                         testing::Values(Kind{"h264.avi", false, 101}, Kind{"mpeg4.avi", false, 102},
+                                         Kind{"wmv.asf", false, 103}, Kind{"h264.flv", true, 104},
+                                         Kind{"mpeg2.mpg", false, 105}, Kind{"h264.nut", true, 106},
+                                         Kind{"theora.ogv", false, 107}, Kind{"vp8-one-group.webm", false, 108},
+                                         Kind{"vp8-live.webm", false, 109}, Kind{"h264-one-group.mkv", false, 110},
+                                         Kind{"h264-live.mkv", true, 111}, Kind{"h264-live-one-group.mkv", false, 112}),
+                         nameOf);
 
 } // namespace
 } // namespace tests

@@ -124,10 +124,8 @@ bool TrackPackets::trySeek(double seconds)
 {
     if (!m_demuxer->seeksByTable() || seconds <= 0)
         return false;
-    const bool ownTable = m_demuxer->isMov() || !m_movie->video();
-    const int by = ownTable ? m_stream : m_movie->video()->stream;
     const auto moment = static_cast<std::int64_t>(seconds * AV_TIME_BASE) + m_movie->origin();
-    if (!m_demuxer->seek(by, av_rescale_q(moment, AV_TIME_BASE_Q, m_demuxer->stream(by).time_base)))
+    if (!m_demuxer->seekSound(m_stream, m_movie->video() ? m_movie->video()->stream : -1, moment))
         return false;
     if (m_filter)
         av_bsf_flush(m_filter.get());

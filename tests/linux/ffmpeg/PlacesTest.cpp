@@ -1,0 +1,213 @@
+// Movies in containers of every kind: whoever goes to a place finds there what stands there for who came from the start.
+#include "linux/ffmpeg/SoundMixer.h"
+#include "linux/ffmpeg/VideoSource.h"
+#include "linux/ffmpeg/images/PictureWalk.h"
+#include "support/EngineTest.h"
+
+#include <algorithm>
+#include <fstream>
+#include <limits>
+#include <numeric>
+#include <random>
+#include <vector>
+
+namespace {
+
+using ffmpeg::SoundMixer;
+using ffmpeg::VideoSource;
+
+constexpr int kRate = 48000;
+
+class Places : public tests::EngineTest {
+protected:
+    struct Shown {
+        std::int64_t pts;
+        int number;
+    };
+
+    void use(const std::string& name)
+    {
+        auto file = ffmpeg::OpenFile::open(movie("export/" + name));
+        auto result = ffmpeg::Movie::open(std::move(file).value(), cancelled);
+        ASSERT_TRUE(result) << result.error()->description();
+        opened = result.value();
+    }
+    /// All pictures in one go from the start, by a reader that was never moved.
+    std::vector<Shown> everyPicture()
+    {
+        const auto demuxer = std::move(ffmpeg::Demuxer::open(opened->file(), cancelled)).value();
+        const int stream = opened->video()->stream;
+        const auto decoder =
+            std::move(ffmpeg::VideoDecoder::open(demuxer->stream(stream), *opened->video(), 1)).value();
+        demuxer->select({stream});
+        std::vector<Shown> all;
+        const auto takeAll = [&] {
+            while (const auto frame = decoder->receive())
+                all.push_back({frame->pts(), tests::numberIn(frame)});
+        };
+        for (const auto packet = ffmpeg::newPacket(); demuxer->read(*packet) == 0; takeAll())
+            decoder->send(*packet);
+        decoder->finish();
+        takeAll();
+        return all;
+    }
+    static std::vector<Shown> shuffled(std::vector<Shown> all)
+    {
+        std::shuffle(all.begin(), all.end(), std::mt19937(7));
+        all.resize(std::min<std::size_t>(all.size(), 24));
+        return all;
+    }
+    static std::vector<float> mix(SoundMixer& from, double seconds)
+    {
+        std::vector<float> samples(static_cast<std::size_t>(seconds * kRate) * 2);
+        from.mix(samples.data(), samples.size() / 2);
+        return samples;
+    }
+    /// What is left of the power of `part` when what is heard so much earlier in `all` than at `frame` is taken away.
+    static double differenceOf(const std::vector<float>& part, const std::vector<float>& all, int frame, int late)
+    {
+        double power = 0;
+        double difference = 0;
+        constexpr std::size_t kStep = 12; // the noise has nothing above 2.5 kHz
+        for (std::size_t i = 0; i < part.size(); i += kStep) {
+            const std::int64_t at = (std::int64_t{frame} - late) * 2 + std::int64_t(i);
+            const float expected = at < 0 ? 0 : all[std::size_t(at)];
+            power += double(expected) * double(expected);
+            difference += std::pow(double(part[i]) - double(expected), 2);
+        }
+        return difference / power;
+    }
+    /// By how many pairs of samples `part` is late.
+    static int latenessOf(const std::vector<float>& part, const std::vector<float>& all, int frame)
+    {
+        constexpr int kFarthest = kRate / 200;
+        int best = 0;
+        for (int late = -kFarthest; late <= kFarthest; ++late)
+            if (differenceOf(part, all, frame, late) < differenceOf(part, all, frame, best))
+                best = late;
+        return best;
+    }
+    /// All that this process ever read, in bytes.
+    static std::int64_t bytesRead()
+    {
+        std::ifstream about("/proc/self/io");
+        std::string name;
+        std::int64_t count = 0;
+        about >> name >> count;
+        EXPECT_EQ(name, "rchar:");
+        return count;
+    }
+
+    std::shared_ptr<std::atomic<bool>> cancelled = std::make_shared<std::atomic<bool>>(false);
+    std::shared_ptr<const ffmpeg::Movie> opened;
+};
+
+class PlacesIn : public Places, public testing::WithParamInterface<const char*> {};
+
+INSTANTIATE_TEST_SUITE_P(ContainersOfEveryKind, PlacesIn,
+                         testing::Values("h264.avi", "mpeg4.avi", "wmv.asf", "h264.flv", "mpeg2.mpg", "h264.nut",
+                                         "theora.ogv", "h264-b.ts", "vp8-one-group.webm", "vp8-live.webm",
+                                         "h264-one-group.mkv", "h264-live.mkv", "h264-live-one-group.mkv",
+                                         "many-bytes.mkv", "sound.mkv", "sound-fragmented.mp4"),
+                         [](const auto& about) {
+                             std::string name = about.param;
+                             std::replace_if(
+                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
+                             return name;
+                         });
+
+TEST_P(PlacesIn, HaveTheirPictureInThePlayerWhereverOneComesFrom)
+{
+    ASSERT_NO_FATAL_FAILURE(use(GetParam()));
+    const auto all = everyPicture();
+    ASSERT_GE(all.size(), 100u);
+    for (std::size_t i = 1; i < all.size(); ++i)
+        ASSERT_EQ(all[i].number, all[i - 1].number + 1);
+    const auto source = std::move(VideoSource::open(opened, cancelled, 1)).value();
+    for (const Shown& each : shuffled(all)) {
+        const auto shown = source->at(each.pts, VideoSource::Want::Full, [] { return false; });
+        ASSERT_TRUE(shown) << each.number;
+        EXPECT_EQ(tests::numberIn(shown->frame), each.number);
+        EXPECT_EQ(shown->frame->pts(), each.pts);
+    }
+}
+
+TEST_P(PlacesIn, HaveTheirThumbnailWhereverOneComesFrom)
+{
+    ASSERT_NO_FATAL_FAILURE(use(GetParam()));
+    const auto all = everyPicture();
+    const auto walk = std::move(ffmpeg::PictureWalk::open(opened, cancelled)).value();
+    for (const Shown& each : shuffled(all)) {
+        const auto frame = walk->at(each.pts, ffmpeg::PictureWalk::Then::Rest);
+        ASSERT_TRUE(frame) << each.number;
+        EXPECT_EQ(tests::numberIn(frame), each.number);
+    }
+}
+
+TEST_P(PlacesIn, HaveTheirSoundWhereverOneComesFrom)
+{
+    ASSERT_NO_FATAL_FAILURE(use(GetParam()));
+    if (opened->audioStreams().empty())
+        GTEST_SKIP() << "it has no sound";
+    const auto from = std::move(SoundMixer::open(opened, cancelled)).value();
+    const auto all = mix(*from, 3);
+    for (const int frame : {96000, 24000, 110001, 60000, 0, 130000, 1}) {
+        from->seek(frame);
+        const auto part = mix(*from, 0.1);
+        // Containers round times to milliseconds.
+        const int late = latenessOf(part, all, frame);
+        EXPECT_LE(std::abs(late), kRate / 1000) << "at " << frame;
+        EXPECT_LT(differenceOf(part, all, frame, late), 0.05) << "at " << frame;
+    }
+}
+
+TEST_F(Places, InAMovieWithATableAreFoundWithoutReadingOnToItsEnd)
+{
+    ASSERT_NO_FATAL_FAILURE(use("many-bytes.mkv"));
+    const std::int64_t size = opened->file()->size();
+    ASSERT_GT(size, 4'000'000);
+    const auto sound = std::move(SoundMixer::open(opened, cancelled)).value();
+    for (const double seconds : {2.1, 1.2, 3.3, 0.4}) {
+        const std::int64_t before = bytesRead();
+        sound->seek(std::int64_t(seconds * kRate));
+        mix(*sound, 0.1);
+        EXPECT_LT(bytesRead() - before, size * 45 / 100) << "the sound at " << seconds;
+    }
+    const auto source = std::move(VideoSource::open(opened, cancelled, 1)).value();
+    for (const double seconds : {2.01, 1.01, 3.01}) {
+        const std::int64_t before = bytesRead();
+        ASSERT_TRUE(source->at(std::int64_t(seconds * 1000), VideoSource::Want::Full, [] { return false; }));
+        EXPECT_LT(bytesRead() - before, size * 35 / 100) << "the picture at " << seconds;
+    }
+}
+
+TEST_F(Places, BeforeTheirTableIsKnownAreTheFileTooWhenThereIsNone)
+{
+    for (const auto* name : {"vp8-one-group.webm", "vp8-live.webm", "h264-live.mkv"}) {
+        ASSERT_NO_FATAL_FAILURE(use(name));
+        EXPECT_FALSE(opened->hasTable(cancelled)) << name;
+    }
+    for (const auto* name : {"many-bytes.mkv", "vp9.webm", "h264.mp4"}) {
+        ASSERT_NO_FATAL_FAILURE(use(name));
+        EXPECT_TRUE(opened->hasTable(cancelled)) << name;
+    }
+}
+
+TEST_F(Places, AtTheStartCostAReaderThatWasNeverMovedNothing)
+{
+    ASSERT_NO_FATAL_FAILURE(use("h264-live-one-group.mkv"));
+    const auto demuxer = std::move(ffmpeg::Demuxer::open(opened->file(), cancelled)).value();
+    const std::int64_t before = bytesRead();
+    EXPECT_TRUE(demuxer->seekToStart(0));
+    EXPECT_LT(bytesRead() - before, 200) << "but for what the question reads";
+    const auto packet = ffmpeg::newPacket();
+    ASSERT_EQ(demuxer->read(*packet), 0);
+    const std::int64_t first = packet->pos;
+    ASSERT_EQ(demuxer->read(*packet), 0);
+    EXPECT_NE(packet->pos, first);
+    EXPECT_TRUE(demuxer->seekToStart(0));
+    ASSERT_EQ(demuxer->read(*packet), 0);
+    EXPECT_EQ(packet->pos, first);
+}
+
+} // namespace
