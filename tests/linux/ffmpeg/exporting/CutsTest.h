@@ -26,9 +26,13 @@ protected:
     {
         ASSERT_EQ(open(path), Status::ReadyToPlay);
         movie = path;
-        source = DecodedMovie(path).all();
+        DecodedMovie decoded(path);
+        source = decoded.all();
         ASSERT_FALSE(source.empty());
-        const double origin = path.ends_with(".ts") ? source.front().seconds : 0;
+        // These begin at 0 whatever comes first; others where their first packet does.
+        const bool beginsAtZero =
+            path.ends_with(".mp4") || path.ends_with(".mov") || path.ends_with(".mkv") || path.ends_with(".webm");
+        const double origin = beginsAtZero ? 0 : double(decoded.context().start_time) / AV_TIME_BASE;
         for (DecodedPicture& each : source)
             each.seconds -= origin;
         const auto tracks = asset->tracks();
@@ -37,6 +41,8 @@ protected:
         });
         for (int i = 0; i < static_cast<int>(count); ++i)
             sounds.push_back(decodeSound(path, i));
+        for (DecodedSound& each : sounds)
+            each.start -= std::llround(origin * each.rate);
     }
 
     std::vector<Expected> expected(double start, double end) const

@@ -30,7 +30,16 @@ bool SoundDecoder::send(const AVPacket* packet)
 
 const AVFrame* SoundDecoder::receive()
 {
-    return avcodec_receive_frame(m_context.get(), m_frame.get()) >= 0 ? m_frame.get() : nullptr;
+    if (avcodec_receive_frame(m_context.get(), m_frame.get()) < 0)
+        return nullptr;
+    AVFrame& frame = *m_frame;
+    // What WMA holds back to the very end has no packet whose time it could have.
+    if (frame.best_effort_timestamp == AV_NOPTS_VALUE)
+        frame.best_effort_timestamp = m_expected;
+    if (frame.best_effort_timestamp != AV_NOPTS_VALUE && frame.sample_rate > 0)
+        m_expected = frame.best_effort_timestamp
+                     + av_rescale_q(frame.nb_samples, {1, frame.sample_rate}, m_context->pkt_timebase);
+    return &frame;
 }
 
 int SoundDecoder::surplusOf(const AVFrame& frame)

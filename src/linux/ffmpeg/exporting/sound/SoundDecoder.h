@@ -4,6 +4,7 @@
 
 #include "linux/ffmpeg/Libraries.h"
 
+#include <cstdint>
 #include <memory>
 
 namespace ffmpeg {
@@ -26,6 +27,7 @@ private:
 
     Owned<AVCodecContext> m_context;
     Owned<AVFrame> m_frame;
+    std::int64_t m_expected = AV_NOPTS_VALUE; ///< when the next frame begins
 };
 
 } // namespace ffmpeg

@@ -65,7 +65,10 @@ DecodedSound decodeSound(const std::string& path, int track, bool everything)
                 pointers.push_back(reinterpret_cast<std::uint8_t*>(plane.data()));
             swr_convert(made, pointers.data(), frame->nb_samples,
                         const_cast<const std::uint8_t**>(frame->extended_data), frame->nb_samples);
-            const std::int64_t at = av_rescale_q(frame->pts, stream->time_base, {1, frame->sample_rate});
+            // What a decoder gives at the very end may have no time of its own.
+            const std::int64_t at = frame->pts == AV_NOPTS_VALUE
+                                        ? sound.start + static_cast<std::int64_t>(sound.length())
+                                        : av_rescale_q(frame->pts, stream->time_base, {1, frame->sample_rate});
             if (isFirst)
                 sound.start = at;
             isFirst = false;
