@@ -182,6 +182,21 @@ TEST(VideoPlan, TakesNoHiddenPictureForTheOneOfTheSameTime)
     EXPECT_THAT(cut.tail, ElementsAre(4));
 }
 
+TEST(VideoPlan, SaysWhyMostIsEncoded)
+{
+    const auto why = [](const std::string& words, std::int64_t start, std::int64_t end) {
+        return ffmpeg::whyMostIsEncoded(plan(words, start, end), 2);
+    };
+    EXPECT_THAT(why("0J 1 2 3 4 5 6 7J 8 9", 1, 10), HasSubstr("begins late"));
+    EXPECT_THAT(why("0J 1 2+ 3 4 5 6 7 8 9", 0, 9), HasSubstr("shown behind it"));
+    EXPECT_EQ(why("0J 1 2 3 4 5 6 7J 8 9 10 11 12 13 14 15", 1, 16), "") << "less than a half";
+    EXPECT_EQ(why("0J 1 2 3 4J 5", 1, 6), "") << "only for a moment";
+    ffmpeg::VideoPlan found = plan("0J 1 2 3 4J 5 6 7 8 9 10 11", 0, 12);
+    EXPECT_EQ(ffmpeg::whyMostIsEncoded(found, 2), "");
+    found.gaps.push_back({2, 9});
+    EXPECT_THAT(ffmpeg::whyMostIsEncoded(found, 2), HasSubstr("an edit list"));
+}
+
 TEST(VideoPlan, SaysWhyAllIsEncoded)
 {
     EXPECT_THAT(plan("0J 1 1 2", 0, 2).reason, HasSubstr("the same time"));

@@ -62,6 +62,9 @@ Result<std::unique_ptr<TrackSource>> SplicedVideoSource::open(std::unique_ptr<Pi
         if (const auto done = (*source.*step)(); !done)
             return done.error();
     }
+    const auto why = whyMostIsEncoded(source->m_plan, source->m_packets->outTimeBase().den);
+    if (!why.empty() && source->m_log)
+        source->m_log("“" + source->m_packets->movie().file()->name() + "” is encoded for the most part: " + why + ".");
     return std::unique_ptr<TrackSource>(std::move(source));
 }
 

@@ -141,6 +141,23 @@ std::optional<std::vector<VideoGap>> findGaps(const std::vector<PicturePacket>& 
     return gaps;
 }
 
+std::string whyMostIsEncoded(const VideoPlan& plan, std::int64_t second)
+{
+    constexpr std::int64_t kSecondsThatNobodyNotices = 2;
+    std::int64_t inGaps = 0;
+    for (const VideoGap& each : plan.gaps)
+        inGaps += each.joint.value_or(each.firstPts) - each.firstPts;
+    const std::int64_t head = plan.copyFrom - plan.firstPts;
+    const std::int64_t tail = plan.tail.empty() ? 0 : plan.lastPts - plan.tail.front();
+    const std::int64_t encoded = head + inGaps + tail;
+    if (encoded <= kSecondsThatNobodyNotices * second || 2 * encoded <= plan.lastPts - plan.firstPts)
+        return {};
+    if (inGaps > std::max(head, tail))
+        return "an edit list leaves out pictures on the way, and groups of them begin far behind";
+    return head > tail ? "the first group of pictures in the range begins late"
+                       : "pictures near the end of the range need others that are shown behind it";
+}
+
 VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int64_t start, std::int64_t end)
 {
     VideoPlan plan;

@@ -80,6 +80,10 @@ VideoPlan planVideo(const PacketWindow& head, const PacketWindow& tail, std::int
 /// around one are too entangled.
 std::optional<std::vector<VideoGap>> findGaps(const std::vector<PicturePacket>& packets);
 
+/// Why more is encoded than somebody expects who knows that movies are copied; empty where it is as expected. `second` is
+/// in ticks.
+std::string whyMostIsEncoded(const VideoPlan& plan, std::int64_t second);
+
 /// How many packets that are shown later precede one in the order of decoding, at most. What is hidden is not counted.
 int reorderDepthOf(const std::vector<PicturePacket>& packets);
 
