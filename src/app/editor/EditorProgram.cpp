@@ -200,7 +200,8 @@ void EditorProgram::showNotice(const std::string& words)
         openWindow();
 }
 
-/// Most movies are open by now, or will be in a moment: what is none gets no window whose Save would keep it.
+/// What is no movie gets no window whose Save would keep it. Most movies are open by now, or will be in a moment; the
+/// window is made ready for the others while they are being opened.
 void EditorProgram::openMovie()
 {
     const auto current = editor();
@@ -216,7 +217,10 @@ void EditorProgram::openMovie()
         else
             show();
     });
-    m_mainQueue.postAfter(kOpeningLimit, [this] { show(); });
+    m_mainQueue.postAfter(kOpeningLimit, [this] {
+        if (!m_shown && !m_waiting && m_extension.principal)
+            showNotice({});
+    });
 }
 
 void EditorProgram::refuse(const std::string& why)

@@ -38,8 +38,8 @@ public:
     /// the window closes without it.
     static constexpr base::Instant kFarewellLimit = std::chrono::seconds(3);
 
-    /// A movie that takes longer to open is shown opening.
-    static constexpr base::Instant kOpeningLimit = std::chrono::milliseconds(250);
+    /// What is no movie is known by then, as a rule; a movie that takes longer to open gets its window meanwhile.
+    static constexpr base::Instant kOpeningLimit = std::chrono::milliseconds(40);
 
     explicit EditorProgram(const EditorOptions& options);
     ~EditorProgram();

@@ -14,7 +14,8 @@ using runtime::Selector;
 
 namespace {
 
-constexpr std::size_t kLettersInALine = 44; // as many as fit on a narrow phone
+constexpr std::size_t kLettersInALine = 38; // as many as fit on a narrow phone
+constexpr double kFontSize = 15;            // points
 constexpr double kLineHeight = 24;          // points
 constexpr double kMargin = 16;              // points, on either side of a line
 constexpr platform::Color kWordsColor{1, 1, 1, 1};
@@ -62,6 +63,7 @@ void NoticeScreen::loadView()
     for (const std::string& line : linesOf(m_words)) {
         const auto label = std::make_shared<Label>();
         label->setText(line);
+        label->setFontSize(kFontSize);
         label->setTextColor(kWordsColor);
         label->setTextAlignment(platform::TextAlignment::Center);
         view()->addSubview(label);

@@ -25,8 +25,8 @@ constexpr std::chrono::milliseconds kLastWords{500};
 
 std::string EditorOutcome::words() const
 {
-    if (!handedOver && end.signal == 0 && end.exitStatus == 0)
-        return "the editor was closed before the recording was there";
+    if (end.signal == 0 && end.exitStatus == 0)
+        return "the editor was closed before it showed the recording";
     return "the editor ended early, " + end.words();
 }
 
@@ -205,7 +205,6 @@ void EditorSession::State::leave()
     timer.stop();
     tellNotes();
     outcome.end = processEnd.value_or(ProcessEnd{});
-    outcome.handedOver = movie->isFulfilled();
     if (const auto ended = std::exchange(handlers.ended, {}))
         ended(outcome); // may destroy us
 }

@@ -29,8 +29,6 @@ struct EditorOutcome {
     base::ErrorRef error;
     /// Whether the editor went because close() asked it to.
     bool closed = false;
-    /// Whether the movie had arrived by then.
-    bool handedOver = false;
 
     /// For who did not ask for it: "the editor ended early, by signal 9 (Killed)".
     std::string words() const;

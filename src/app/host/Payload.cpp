@@ -46,12 +46,6 @@ void Promise::whenKept(dbus::LoadedItem answer)
         answer(*value);
 }
 
-bool Promise::isFulfilled() const
-{
-    const std::lock_guard lock(m_mutex);
-    return m_value && *m_value;
-}
-
 std::vector<dbus::HostItem> payloadItems(const dbus::EditRequest& request, std::shared_ptr<Promise> movie,
                                          std::shared_ptr<Promise> attachment)
 {

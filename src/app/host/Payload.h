@@ -20,11 +20,9 @@ public:
     /// Once.
     void keep(base::Result<runtime::Value> value);
     void whenKept(dbus::LoadedItem answer);
-    /// Whether it was kept, and not with an error.
-    bool isFulfilled() const;
 
 private:
-    mutable std::mutex m_mutex;
+    std::mutex m_mutex;
     std::optional<base::Result<runtime::Value>> m_value;
     std::vector<dbus::LoadedItem> m_waiting;
 };

@@ -203,7 +203,7 @@ TEST_F(OpeningAMovie, TheEditorMayRemoveWhatItWasGiven)
 TEST_F(OpeningAMovie, SaysHowAnEditorEndedThatDidNotFinish)
 {
     const std::pair<const char*, const char*> ways[] = {
-        {"crash", "by signal 6"}, {"exit=7", "with exit status 7"}, {"", "with exit status 0"}};
+        {"crash", "by signal 6"}, {"exit=7", "with exit status 7"}, {"", "closed before it showed the recording"}};
     for (const auto& [script, words] : ways) {
         const auto clipsa = start(script);
         EXPECT_EQ(clipsa->wait(), 3);
