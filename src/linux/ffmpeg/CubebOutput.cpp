@@ -15,6 +15,8 @@ namespace {
 
 using SteadyClock = std::chrono::steady_clock;
 
+/// Silence that a device is given first: servers and amplifiers swallow the first 10 to 20 ms of what they begin with.
+constexpr std::int64_t kLeadIn = kSampleRate / 25;
 /// Between two places that a device tells; longer ones are those of a device that stands still.
 constexpr std::int64_t kLongestStep = kSampleRate / 40;
 /// A device that asks for samples, and has not told where it is for so long, never will.
@@ -82,7 +84,7 @@ public:
             heard += std::min(framesFrom(m_placedAt), kLongestStep); // some tell it in steps
         else if (m_askedAt && now - *m_askedAt > kLongestSilence)
             heard = m_before + framesFrom(m_latestAt) - kFramesAhead; // it never tells
-        m_heard = std::max(m_heard, std::min(heard, m_given));
+        m_heard = std::max(m_heard, std::min(heard, m_given) - kLeadIn);
         return m_heard;
     }
 
@@ -90,7 +92,11 @@ private:
     static long dataWanted(cubeb_stream*, void* self, const void*, void* output, long frames)
     {
         auto& me = *static_cast<CubebOutput*>(self);
-        me.m_fill(static_cast<float*>(output), static_cast<std::size_t>(frames));
+        auto* samples = static_cast<float*>(output);
+        // Only this thread changes what was given.
+        const std::int64_t silent = std::clamp<std::int64_t>(kLeadIn - me.m_given, 0, frames);
+        std::fill_n(samples, 2 * silent, 0.0f);
+        me.m_fill(samples + 2 * silent, static_cast<std::size_t>(frames - silent));
         const std::lock_guard lock(me.m_mutex);
         me.m_latestAt = SteadyClock::now();
         me.m_askedAt = me.m_askedAt.value_or(me.m_latestAt);
