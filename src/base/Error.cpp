@@ -1,9 +1,67 @@
 #include "base/Error.h"
 
+#include <cerrno>
 #include <system_error>
 #include <utility>
 
 namespace base {
+
+namespace {
+
+/// What an error number comes to for somebody who uses a computer and does not program it.
+std::string wordsFor(int number)
+{
+    switch (number) {
+    case EACCES:
+    case EPERM:
+        return "that is not allowed";
+    case EBUSY:
+    case ETXTBSY:
+        return "somebody else is using it";
+    case ECANCELED:
+        return "it was given up";
+    case EDQUOT:
+        return "there is no room left in your share of the disk";
+    case EEXIST:
+        return "there is such a file already";
+    case EFBIG:
+        return "the disk takes no file that large";
+    case EINVAL:
+        return "it is not of the right kind";
+    case EIO:
+        return "the disk or the network has an error";
+    case EISDIR:
+        return "it is a directory";
+    case ELOOP:
+        return "it is a link that leads round in circles";
+    case EMFILE:
+    case ENFILE:
+        return "too many files are open";
+    case ENAMETOOLONG:
+        return "the name is too long";
+    case ENOENT:
+        return "there is no such file or directory";
+    case ENOMEM:
+        return "there is not enough memory";
+    case ENOSPC:
+        return "there is no room left on the disk";
+    case ENOTDIR:
+        return "a part of its path is no directory";
+    case EOPNOTSUPP:
+    case ENOSYS:
+        return "the disk cannot do that";
+    case EROFS:
+        return "the disk can only be read";
+    case ESTALE:
+    case ENODEV:
+    case ENXIO:
+        return "the disk or the network is not there any more";
+    default:
+        return std::generic_category().message(number);
+    }
+}
+
+} // namespace
 
 Error::Error(std::string domain, std::int64_t code, UserInfo userInfo)
     : m_domain(std::move(domain)), m_code(code), m_userInfo(std::move(userInfo))
@@ -17,7 +75,7 @@ ErrorRef Error::make(std::string domain, std::int64_t code, std::string descript
 
 ErrorRef Error::fromErrno(int number, const std::string& doing)
 {
-    return make(kPosixErrorDomain, number, doing + ": " + std::generic_category().message(number));
+    return make(kPosixErrorDomain, number, doing + ": " + wordsFor(number));
 }
 
 std::string Error::description() const

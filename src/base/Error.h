@@ -26,7 +26,8 @@ public:
     /// The usual way to make one: code for the caller, `description` for the reader.
     static ErrorRef make(std::string domain, std::int64_t code, std::string description);
 
-    /// An error of the operating system (`errno`), with what was being done to which file.
+    /// An error of the operating system (`errno`), with what was being done to which file. Its description
+    /// goes on with what that number means, in plain words.
     static ErrorRef fromErrno(int number, const std::string& doing);
 
     const std::string& domain() const { return m_domain; }

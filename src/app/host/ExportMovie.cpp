@@ -7,6 +7,7 @@
 #include <array>
 #include <cerrno>
 #include <cstdio>
+#include <cstdlib>
 #include <filesystem>
 #include <random>
 #include <system_error>
@@ -26,6 +27,25 @@ base::ErrorRef refused(const std::string& why)
 base::ErrorRef isThereAlready(const ExportOrder& order)
 {
     return refused(order.output + " is there already; give --force to replace it");
+}
+
+/// With what can be done about it.
+base::ErrorRef explained(const base::ErrorRef& failure, const ExportOrder& order)
+{
+    std::string words = failure->description();
+    if (words.ends_with('.'))
+        words.pop_back();
+    switch (std::abs(failure->code())) { // the engine's numbers of the system's errors are negative
+    case EEXIST:
+        return isThereAlready(order);
+    case ENOSPC:
+    case EDQUOT:
+    case EFBIG:
+        return base::Error::make(failure->domain(), failure->code(),
+                                 words + "; make room there, or choose another directory");
+    default:
+        return failure;
+    }
 }
 
 /// Looked at before the movie, which takes longer. Null when there is nothing wrong with the directory.
@@ -73,7 +93,7 @@ base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
     order.setUp(*session, *asset.value());
     ProgressBar progress(order.doing);
     if (base::ErrorRef failure = tool.runExport(*session, [&] { progress.show(session->progress()); }))
-        return failure->code() == EEXIST ? isThereAlready(order) : failure;
+        return explained(failure, order);
     if (order.force) {
         fs::rename(written, output, error);
         if (error) {

@@ -81,8 +81,8 @@ private:
 
 base::ErrorRef cannotWrite(const fs::path& folder, const std::error_code& error)
 {
-    return base::Error::make(dbus::kBadInputDomain, error.value(),
-                             "cannot write pictures into " + folder.native() + ": " + error.message());
+    const auto why = base::Error::fromErrno(error.value(), "cannot write pictures into " + folder.native());
+    return base::Error::make(dbus::kBadInputDomain, error.value(), why->description());
 }
 
 /// Looked at before anything is made: either all names are free, or none is used.

@@ -2,11 +2,10 @@
 
 #include "app/host/ExitStatus.h"
 #include "app/host/Streams.h"
+#include "base/Error.h"
 
 #include <cerrno>
-#include <cstring>
 #include <filesystem>
-#include <string>
 #include <system_error>
 #include <unistd.h>
 
@@ -19,8 +18,7 @@ int startMediaProgram(char* const words[])
     for (const auto& program : {own / "clipsa-media", own.parent_path() / "libexec/clipsa/clipsa-media"}) {
         ::execv(program.c_str(), words);
         if (errno != ENOENT && errno != ENOTDIR) {
-            // NOLINTNEXTLINE(concurrency-mt-unsafe): there is one thread
-            complain("cannot start " + program.native() + ": " + std::strerror(errno));
+            complain(base::Error::fromErrno(errno, "cannot start " + program.native())->description());
             return kExitFailed;
         }
     }

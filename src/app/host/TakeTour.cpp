@@ -114,7 +114,7 @@ int takeTour(const TourCommand& command)
     if (!error && ::access(folder.c_str(), W_OK) != 0)
         error = {errno, std::generic_category()};
     if (error) {
-        complain("cannot write pictures into " + command.output + ": " + error.message());
+        complain(base::Error::fromErrno(error.value(), "cannot write pictures into " + command.output)->description());
         return kExitUsage;
     }
 

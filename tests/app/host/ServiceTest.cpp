@@ -81,6 +81,12 @@ TEST_F(Service, ReadsNobodysFileWhereItServesTheOthers)
     expectScenario("slow_file");
 }
 
+TEST_F(Service, EndsWithItsBusWhateverAFileDoes)
+{
+    startBus("wait", {{SYS_pread64, tests::kHeldUp, 2, 64, true}});
+    expectScenario("bus_end");
+}
+
 TEST_F(Service, WaitsForNoCopyThatNobodyWants)
 {
     startBus("wait", {{SYS_linkat, EXDEV}, tests::noReflinks(), {SYS_copy_file_range, tests::kHeldUp}});

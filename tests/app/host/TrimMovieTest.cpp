@@ -143,6 +143,16 @@ TEST_F(Trim, NeverReplacesTheMovieItself)
     EXPECT_EQ(fs::file_size(out), fs::file_size(movie("clock.mp4")));
 }
 
+TEST_F(Trim, SaysWhatToDoWhenTheDiskIsFull)
+{
+    tests::whileRefusing({{SYS_pwrite64, ENOSPC}}, [&] {
+        EXPECT_EQ(run({"trim", movie("clock.mp4"), "--to", "2", "-o", out}), 1);
+    });
+    EXPECT_THAT(errors, HasSubstr("the disk is full; make room there, or choose another directory\n"));
+    EXPECT_EQ(std::count(errors.begin(), errors.end(), '\n'), 1) << errors;
+    EXPECT_THAT(namesIn(directory.path()), IsEmpty());
+}
+
 TEST_F(Trim, SaysWhatIsWrongWithTheDirectory)
 {
     EXPECT_EQ(run({"trim", movie("clock.mp4"), "-o", directory.path() / "none/out.mp4"}), 2);

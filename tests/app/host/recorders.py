@@ -6,6 +6,7 @@ Fails with a traceback when the service does not keep a promise.
 """
 
 import os
+import select
 import signal
 import sys
 
@@ -195,6 +196,21 @@ def slow_copy():
     until(lambda: recorder.signals)
     assert recorder.signals == [(session, "Failed", "the editor was closed")], recorder.signals
     expect_leaving_after_sigterm(recorder.bus)
+
+
+def bus_end():
+    """The file of one cannot be read, and the bus ends: so does the service."""
+    slow, quick = Recorder(), Recorder()
+    start_edit(slow)
+    quick.edit(name="a.mp4")  # behind the other: the service has that one too
+    service = dbus.Interface(quick.bus.get_object("org.freedesktop.DBus", "/org/freedesktop/DBus"),
+                             "org.freedesktop.DBus")
+    process = os.pidfd_open(service.GetConnectionUnixProcessID("org.clipsa.Clipsa"))
+    bus = os.pidfd_open(service.GetConnectionUnixProcessID("org.freedesktop.DBus"))
+    for recorder in (slow, quick):
+        recorder.bus.set_exit_on_disconnect(False)
+    signal.pidfd_send_signal(bus, signal.SIGKILL)
+    assert select.select([process], [], [], 30)[0], "the service is still there"
 
 
 globals()[SCENARIO]()
