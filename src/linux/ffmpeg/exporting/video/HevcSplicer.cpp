@@ -15,6 +15,8 @@ namespace {
 
 constexpr std::uint32_t kMostSets = 16; ///< of the two kinds whose numbers end there
 constexpr int kStartCodes = 0;
+/// The finest is nearly without loss.
+constexpr QualityScale kQuality{8, 18, 30, 6};
 
 /// The lowest number from `first` to `last` that is free.
 std::optional<std::uint32_t> freeId(const std::set<std::uint32_t>& taken, std::uint32_t first, std::uint32_t last)
@@ -151,9 +153,10 @@ base::Result<void> HevcSplicer::prepare(EncoderRequest& request, int /*reorderDe
     if (m_used.empty())
         return cannotCopy("its pictures refer to parameter sets that are not in the file's header");
     request.encoder = "libx265";
-    // Nearly without loss: it stands beside untouched pictures.
-    std::string params = isLossless ? "lossless=1" : "crf=8";
-    params.append(":bframes=0:scenecut=0:open-gop=0:ref=1:cutree=0:info=0:aud=0:hrd=0:repeat-headers=0:log-level=none");
+    if (!isLossless)
+        request.scale = kQuality;
+    std::string params = isLossless ? "lossless=1:" : "";
+    params.append("bframes=0:scenecut=0:open-gop=0:ref=1:cutree=0:info=0:aud=0:hrd=0:repeat-headers=0:log-level=none");
     params.append(":min-cu-size=").append(std::to_string(blockSizeFor(m_used.front(), request)));
     request.options = {{"preset", "veryfast"}, {"x265-params", params}};
     return {};

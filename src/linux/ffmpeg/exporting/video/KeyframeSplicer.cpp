@@ -17,6 +17,10 @@ constexpr std::uint8_t kAv1Marker = 0x80;         ///< of "av1C"; without it the
 /// VP9 has at least two columns of tiles where pictures are wider.
 constexpr int kWidestVp9Tile = 4096;
 
+/// The finest are nearly without loss.
+constexpr QualityScale kVp9Quality{4, 16, 44, 10};
+constexpr QualityScale kAv1Quality{6, 18, 46, 10};
+
 int vp9Profile(AVPixelFormat format)
 {
     const AVPixFmtDescriptor& about = *av_pix_fmt_desc_get(format);
@@ -58,21 +62,21 @@ int KeyframeSplicer::picturesHeldBack(const AVPacket& packet) const
 
 base::Result<void> KeyframeSplicer::prepare(EncoderRequest& request, int /*reorderDepth*/)
 {
-    // No picture before its time, and nearly without loss: it stands beside untouched ones.
+    // No picture before its time.
     if (m_isAv1) {
         request.encoder = "libaom-av1";
-        request.options = {
-            {"usage", "realtime"}, {"cpu-used", "7"}, {"crf", "6"}, {"lag-in-frames", "0"}, {"row-mt", "1"}};
+        request.scale = kAv1Quality;
+        request.options = {{"usage", "realtime"}, {"cpu-used", "7"}, {"lag-in-frames", "0"}, {"row-mt", "1"}};
     } else {
         request.encoder = "libvpx-vp9";
+        request.scale = kVp9Quality;
         request.profile = vp9Profile(m_format);
         // Threads write each column of tiles into a buffer that is too small for what is nearly without loss, unless its
         // colours are halved both ways; one column, or one thread, is written straight into the packet.
         if (request.width > kWidestVp9Tile)
             request.threads = 1;
-        request.options = {
-            {"tile-columns", "0"},  {"deadline", "realtime"}, {"cpu-used", "7"}, {"crf", "4"}, {"b", "0"},
-            {"lag-in-frames", "0"}, {"auto-alt-ref", "0"},    {"row-mt", "1"}};
+        request.options = {{"tile-columns", "0"},  {"deadline", "realtime"}, {"cpu-used", "7"}, {"b", "0"},
+                           {"lag-in-frames", "0"}, {"auto-alt-ref", "0"},    {"row-mt", "1"}};
     }
     return {};
 }

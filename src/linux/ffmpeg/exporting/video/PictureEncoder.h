@@ -8,9 +8,18 @@
 #include <deque>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 
 namespace ffmpeg {
+
+/// Values of "crf" between which an encoder can be asked for the quality that a source deserves: DeservedQuality.h.
+struct QualityScale {
+    int finest;
+    int trial;
+    int coarsest;
+    int stepsAHalf; ///< coarser by so many it makes about half of the bytes
+};
 
 /// What comes out. Everything is as in the source, unless a codec cannot do that.
 struct EncoderRequest {
@@ -31,6 +40,7 @@ struct EncoderRequest {
     int keyframeInterval = 0; ///< pictures; 0 for one group
     int threads = 0;          ///< as many as there are cores
     std::map<std::string, std::string> options;
+    std::optional<QualityScale> scale; ///< nothing where the options say all
 
     /// The source's picture in all that is not the encoder's own: size, format, colours, aspect, rate.
     static EncoderRequest like(const AVStream& stream, const AVFrame& picture, AVRational timeBase);

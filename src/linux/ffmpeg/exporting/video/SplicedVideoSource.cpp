@@ -1,6 +1,7 @@
 #include "linux/ffmpeg/exporting/video/SplicedVideoSource.h"
 
 #include "linux/ffmpeg/exporting/CannotCopy.h"
+#include "linux/ffmpeg/exporting/video/DeservedQuality.h"
 #include "linux/ffmpeg/exporting/video/StreamTraits.h"
 
 #include <algorithm>
@@ -103,6 +104,10 @@ Result<void> SplicedVideoSource::prepareEncoder()
         return {};
     if (auto prepared = m_splicer->prepare(m_request, plan.reorderDepth); !prepared)
         return prepared;
+    if (m_request.scale) {
+        const std::int64_t first = plan.encodesHead() || plan.tail.empty() ? plan.firstPts : plan.tail.front();
+        m_request.options["crf"] = std::to_string(deservedQuality(*m_packets, first, m_request, *m_splicer));
+    }
     if (auto opened = openEncoder(); !opened)
         return cannotCopy(opened.error()->description());
     return m_splicer->join(m_encoder->context());
