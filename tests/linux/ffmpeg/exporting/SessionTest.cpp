@@ -196,6 +196,27 @@ TEST_F(AnExport, OfAMovieWithATimeCodeIsCopiedWithoutIt)
     EXPECT_FALSE(saysEncodedAsAWhole());
 }
 
+TEST_F(AnExport, OfAMovieThatBeginsSmallHasItsLargestSize)
+{
+    for (const char* name : {"vp8-growing.webm", "vp9-growing.webm"}) {
+        for (const double start : {0.0, 0.2}) {
+            ASSERT_EQ(cut(exportMovie(name), output(), fromTo(start, 1.8)), ExportStatus::Completed) << errorText();
+            DecodedMovie decoded(output());
+            // As the header says, which nothing that was decoded changes.
+            AVFormatContext* opened = nullptr;
+            ASSERT_GE(avformat_open_input(&opened, output().c_str(), nullptr, nullptr), 0);
+            const ffmpeg::Owned<AVFormatContext> header(opened);
+            EXPECT_EQ(header->streams[0]->codecpar->width, 320) << name;
+            EXPECT_EQ(header->streams[0]->codecpar->height, 180) << name;
+            const auto pictures = decoded.all();
+            ASSERT_EQ(pictures.size(), start > 0 ? 48U : 54U) << name;
+            EXPECT_EQ(pictures.back().number, 53);
+            EXPECT_EQ(pictures.back().luma.size(), 320U * 180);
+            std::filesystem::remove(output());
+        }
+    }
+}
+
 TEST_F(AnExport, KeepsHowThePictureIsTurned)
 {
     ASSERT_EQ(cut(exportMovie("h264-rotated.mp4"), output(), fromTo(1.1, 3)), ExportStatus::Completed);

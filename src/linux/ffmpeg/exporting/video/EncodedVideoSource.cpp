@@ -1,6 +1,7 @@
 #include "linux/ffmpeg/exporting/video/EncodedVideoSource.h"
 
 #include "linux/ffmpeg/bitstream/NalUnits.h"
+#include "linux/ffmpeg/exporting/video/LargestPicture.h"
 #include "linux/ffmpeg/exporting/video/StreamTraits.h"
 
 #include <algorithm>
@@ -17,6 +18,20 @@ namespace {
 constexpr const char* kQuality = "12";
 constexpr double kSecondsBetweenKeyframes = 2; ///< so that seeking is quick
 
+/// What becomes of RGB must say how it was converted: players take the matrix of standard definition for small pictures
+/// that do not.
+void describeRgb(EncoderRequest& request)
+{
+    const bool isWide = request.primaries == AVCOL_PRI_BT2020;
+    request.matrix = isWide ? AVCOL_SPC_BT2020_NCL : AVCOL_SPC_BT709;
+    if (request.primaries == AVCOL_PRI_UNSPECIFIED)
+        request.primaries = AVCOL_PRI_BT709;
+    if (request.transfer == AVCOL_TRC_UNSPECIFIED)
+        request.transfer = AVCOL_TRC_BT709;
+    if (request.range == AVCOL_RANGE_UNSPECIFIED)
+        request.range = AVCOL_RANGE_MPEG;
+}
+
 EncoderRequest requestFor(const AVStream& stream, const AVFrame& picture, AVRational timeBase)
 {
     EncoderRequest request = EncoderRequest::like(stream, picture, timeBase);
@@ -27,8 +42,8 @@ EncoderRequest requestFor(const AVStream& stream, const AVFrame& picture, AVRati
     // Odd sizes have half a sample of colour at the edge, which x264 refuses. What is added the file does not show.
     request.width = AV_CEIL_RSHIFT(request.width, about.log2_chroma_w) << about.log2_chroma_w;
     request.height = AV_CEIL_RSHIFT(request.height, about.log2_chroma_h) << about.log2_chroma_h;
-    if (request.matrix == AVCOL_SPC_RGB)
-        request.matrix = AVCOL_SPC_BT709;
+    if (isRgb(static_cast<AVPixelFormat>(picture.format)))
+        describeRgb(request);
     request.isInterlaced = false;
     request.keyframeInterval =
         std::max(1, static_cast<int>(std::lround(av_q2d(request.frameRate) * kSecondsBetweenKeyframes)));
@@ -45,11 +60,12 @@ EncoderRequest requestFor(const AVStream& stream, const AVFrame& picture, AVRati
 
 } // namespace
 
-EncodedVideoSource::EncodedVideoSource(std::unique_ptr<PicturePackets> packets, std::int64_t start, std::int64_t end)
-    : m_packets(std::move(packets)), m_start(start), m_end(end),
-      m_hdr(HdrMetadata::of(m_packets->stream(), m_packets->movie().firstFrame()->picture())),
-      m_request(requestFor(m_packets->stream(), m_packets->movie().firstFrame()->picture(), m_packets->outTimeBase())),
-      m_scaler(m_request.format, m_request.width, m_request.height),
+EncodedVideoSource::EncodedVideoSource(std::unique_ptr<PicturePackets> packets, const AVFrame& picture,
+                                       std::int64_t start, std::int64_t end)
+    : m_packets(std::move(packets)), m_start(start), m_end(end), m_shownWidth(picture.width),
+      m_shownHeight(picture.height), m_hdr(HdrMetadata::of(m_packets->stream(), picture)),
+      m_request(requestFor(m_packets->stream(), picture, m_packets->outTimeBase())),
+      m_scaler(m_request.format, m_request.width, m_request.height, m_request.matrix),
       m_line(0, usualStep(m_packets->stream(), m_packets->outTimeBase()), std::nullopt, end - start)
 {
 }
@@ -57,7 +73,11 @@ EncodedVideoSource::EncodedVideoSource(std::unique_ptr<PicturePackets> packets, 
 Result<std::unique_ptr<TrackSource>> EncodedVideoSource::open(std::unique_ptr<PicturePackets> packets,
                                                               std::int64_t start, std::int64_t end)
 {
-    std::unique_ptr<EncodedVideoSource> source(new EncodedVideoSource(std::move(packets), start, end));
+    const auto largest = largestPicture(*packets, start, end);
+    if (!largest)
+        return largest.error();
+    std::unique_ptr<EncodedVideoSource> source(
+        new EncodedVideoSource(std::move(packets), largest.value()->picture(), start, end));
     auto encoder = PictureEncoder::open(source->m_request);
     if (!encoder)
         return encoder.error();
@@ -75,9 +95,8 @@ Result<void> EncodedVideoSource::describe(AVStream& output)
     if (const int error = avcodec_parameters_from_context(output.codecpar, &encoder); error < 0)
         return base::Error::make("ffmpeg", error, textOf(error));
     output.codecpar->codec_tag = isHdr(m_request.transfer) ? MKTAG('h', 'v', 'c', '1') : MKTAG('a', 'v', 'c', '1');
-    const AVFrame& first = m_packets->movie().firstFrame()->picture();
-    output.codecpar->width = first.width;
-    output.codecpar->height = first.height;
+    output.codecpar->width = m_shownWidth;
+    output.codecpar->height = m_shownHeight;
     const auto isEnd = [this, behind = 0](const AVPacket& packet) mutable {
         const bool isShown = packet.pts != AV_NOPTS_VALUE && !(packet.flags & AV_PKT_FLAG_DISCARD);
         behind += isShown && m_packets->outTick(packet.pts) >= m_end;

@@ -23,7 +23,9 @@ public:
     base::Result<bool> next(AVPacket& packet) override;
 
 private:
-    EncodedVideoSource(std::unique_ptr<PicturePackets> packets, std::int64_t start, std::int64_t end);
+    /// `picture` is like those that come out.
+    EncodedVideoSource(std::unique_ptr<PicturePackets> packets, const AVFrame& picture, std::int64_t start,
+                       std::int64_t end);
 
     base::Result<void> goOn();
     base::Result<void> encode(const DecodedFrame& picture, std::int64_t until);
@@ -33,6 +35,8 @@ private:
     std::unique_ptr<PicturePackets> m_packets;
     std::int64_t m_start;
     std::int64_t m_end;
+    int m_shownWidth; ///< what is coded can have a column or row more
+    int m_shownHeight;
     HdrMetadata m_hdr;
     EncoderRequest m_request;
     PictureScaler m_scaler;

@@ -141,6 +141,10 @@ base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDept
     request.width = sps.width;
     request.height = sps.height;
     request.encoder = "libx264";
+    if (request.format == AV_PIX_FMT_GBRP) { // which the encoder wants packed
+        request.encoder = "libx264rgb";
+        request.format = AV_PIX_FMT_BGR24;
+    }
     if (sps.profile == FF_PROFILE_H264_BASELINE)
         request.options["profile"] = "baseline";
     else if (sps.profile == FF_PROFILE_H264_MAIN)

@@ -51,6 +51,25 @@ enum class Obu : std::uint8_t { SequenceHeader = 1, FrameHeader = 3, Metadata = 
 constexpr std::uint8_t kContentLight = 1;
 constexpr std::uint8_t kMasteringDisplay = 2;
 
+/// `in` stands behind what says whether a keyframe is shown.
+void readSize(BitReader& in, std::uint32_t profile, PacketPictures& found)
+{
+    constexpr int kSyncCode = 24;
+    constexpr std::uint32_t kRgb = 7;
+    in.skip(1 + kSyncCode);
+    if (profile >= 2)
+        in.skip(1); // 10 or 12 bits
+    const bool isAnyFormat = profile & 1;
+    if (in.bits(3) == kRgb)
+        in.skip(isAnyFormat ? 1 : 0);
+    else
+        in.skip(isAnyFormat ? 4 : 1); // range and subsampling
+    found.width = static_cast<int>(in.bits(16)) + 1;
+    found.height = static_cast<int>(in.bits(16)) + 1;
+    if (in.isBeyond())
+        found.width = found.height = 0;
+}
+
 } // namespace
 
 PacketPictures picturesOfVp9(ByteView packet)
@@ -61,7 +80,8 @@ PacketPictures picturesOfVp9(ByteView packet)
         BitReader in(frame);
         in.skip(2);
         const std::uint32_t low = in.bit();
-        if (low + 2 * in.bit() == 3)
+        const std::uint32_t profile = low + 2 * in.bit();
+        if (profile == 3)
             in.skip(1);
         if (in.bit()) {
             ++found.shownAgain;
@@ -71,6 +91,8 @@ PacketPictures picturesOfVp9(ByteView packet)
         const bool isShown = in.bit();
         found.hidden += !isShown;
         found.startsGroup = found.startsGroup || (isFirst && isKeyframe && isShown);
+        if (isKeyframe)
+            readSize(in, profile, found);
         isFirst = false;
     }
     return found;

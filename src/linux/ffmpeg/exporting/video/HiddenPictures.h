@@ -6,10 +6,11 @@
 namespace ffmpeg {
 
 struct PacketPictures {
-    int hidden = 0;           ///< decoded, not shown by this packet
-    int shownAgain = 0;       ///< shown by it, decoded before
-    bool startsGroup = false; ///< its first is a keyframe that is shown
-    bool hasHeader = false;   ///< AV1: a sequence header
+    int hidden = 0;            ///< decoded, not shown by this packet
+    int shownAgain = 0;        ///< shown by it, decoded before
+    int width = 0, height = 0; ///< VP9: of its keyframe; 0 when it has none
+    bool startsGroup = false;  ///< its first is a keyframe that is shown
+    bool hasHeader = false;    ///< AV1: a sequence header
     /// AV1: how many bytes it takes up to the end of its sequence header; 0 when it has none.
     std::size_t bytesToHeader = 0;
     bool saysHdr = false; ///< AV1: of the display that the movie was mastered on, or how light it gets

@@ -60,6 +60,17 @@ int KeyframeSplicer::picturesHeldBack(const AVPacket& packet) const
     return pictures.hidden - pictures.shownAgain;
 }
 
+void KeyframeSplicer::see(const AVPacket& copied)
+{
+    if (!(copied.flags & AV_PKT_FLAG_KEY))
+        return;
+    const auto pictures = picturesOfVp9(payloadOf(copied));
+    if (std::int64_t{pictures.width} * pictures.height <= std::int64_t{m_width} * m_height)
+        return;
+    m_width = pictures.width;
+    m_height = pictures.height;
+}
+
 base::Result<void> KeyframeSplicer::prepare(EncoderRequest& request, int /*reorderDepth*/)
 {
     // No picture before its time.

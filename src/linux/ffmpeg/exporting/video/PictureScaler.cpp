@@ -13,12 +13,30 @@ base::ErrorRef noMemory()
     return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
 }
 
-/// As the encoder's stream is described; RGB has no matrix of its own.
-int matrixOf(AVColorSpace space)
+/// The scaler has tables of its own for these, which know no matrix but that of standard definition.
+bool isOfPalette(AVPixelFormat format)
 {
-    if (space == AVCOL_SPC_RGB || space == AVCOL_SPC_UNSPECIFIED)
-        return SWS_CS_ITU709;
-    return space;
+    constexpr std::array kFormats{AV_PIX_FMT_PAL8, AV_PIX_FMT_RGB8, AV_PIX_FMT_BGR8, AV_PIX_FMT_RGB4_BYTE,
+                                  AV_PIX_FMT_BGR4_BYTE};
+    return std::find(kFormats.begin(), kFormats.end(), format) != kFormats.end();
+}
+
+/// The same picture without a palette.
+base::Result<Owned<AVFrame>> plain(const AVFrame& picture)
+{
+    auto out = newFrame();
+    out->format = AV_PIX_FMT_BGR24;
+    out->width = picture.width;
+    out->height = picture.height;
+    if (av_frame_get_buffer(out.get(), 0) < 0 || av_frame_copy_props(out.get(), &picture) < 0)
+        return noMemory();
+    const Owned<SwsContext> context(sws_getContext(picture.width, picture.height,
+                                                   static_cast<AVPixelFormat>(picture.format), picture.width,
+                                                   picture.height, AV_PIX_FMT_BGR24, 0, nullptr, nullptr, nullptr));
+    if (!context)
+        return noMemory();
+    sws_scale(context.get(), picture.data, picture.linesize, 0, picture.height, out->data, out->linesize);
+    return out;
 }
 
 /// The same with its last column and row twice where it has fewer, so that they do not bleed into what is behind them.
@@ -71,8 +89,18 @@ AVPixelFormat formatForHdr(AVPixelFormat source)
     return avcodec_find_best_pix_fmt_of_list(kFormats.data(), source, 0, nullptr);
 }
 
+bool isRgb(AVPixelFormat format)
+{
+    const AVPixFmtDescriptor* about = av_pix_fmt_desc_get(format);
+    return about && (about->flags & (AV_PIX_FMT_FLAG_RGB | AV_PIX_FMT_FLAG_PAL));
+}
+
 base::Result<Owned<AVFrame>> PictureScaler::fit(const AVFrame& picture)
 {
+    if (isOfPalette(static_cast<AVPixelFormat>(picture.format))) {
+        auto same = plain(picture);
+        return same ? fit(*same.value()) : std::move(same);
+    }
     const auto format = static_cast<AVPixelFormat>(picture.format);
     if (picture.width == m_width && picture.height == m_height && format == m_format) {
         Owned<AVFrame> same(av_frame_clone(&picture));
@@ -96,7 +124,7 @@ base::Result<Owned<AVFrame>> PictureScaler::fit(const AVFrame& picture)
         m_fromWidth = picture.width;
         m_fromHeight = picture.height;
         m_fromFormat = picture.format;
-        const int* table = sws_getCoefficients(matrixOf(picture.colorspace));
+        const int* table = sws_getCoefficients(isRgb(format) ? m_matrix : picture.colorspace);
         const int full = picture.color_range == AVCOL_RANGE_JPEG;
         sws_setColorspaceDetails(m_scaler.get(), table, full, table, full, 0, 1 << 16, 1 << 16);
     }

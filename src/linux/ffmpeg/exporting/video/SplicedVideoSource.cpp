@@ -40,7 +40,7 @@ Result<VideoPlan> planFor(PicturePackets& packets, const Splicer& splicer, std::
 SplicedVideoSource::SplicedVideoSource(std::unique_ptr<PicturePackets> packets, std::unique_ptr<Splicer> splicer,
                                        VideoPlan plan, std::int64_t start, std::int64_t end, TellLog log)
     : m_packets(std::move(packets)), m_splicer(std::move(splicer)), m_plan(std::move(plan)), m_start(start), m_end(end),
-      m_log(std::move(log)),
+      m_log(std::move(log)), m_format(static_cast<AVPixelFormat>(m_packets->movie().firstFrame()->picture().format)),
       m_request(EncoderRequest::like(m_packets->stream(), m_packets->movie().firstFrame()->picture(),
                                      m_packets->outTimeBase())),
       m_lastEncoded(kNone)
@@ -210,6 +210,17 @@ Result<void> SplicedVideoSource::beginStretch(State state)
     return {};
 }
 
+Result<void> SplicedVideoSource::encode(const AVFrame& picture, std::int64_t pts)
+{
+    const std::int64_t duration = m_packets->outTicks(picture.pkt_duration);
+    if (m_request.format == m_format)
+        return m_encoder->encode(picture, pts, duration);
+    if (!m_packer)
+        m_packer.emplace(m_request.format, m_request.width, m_request.height, m_request.matrix);
+    const auto packed = m_packer->fit(picture);
+    return packed ? m_encoder->encode(*packed.value(), pts, duration) : Result<void>(packed.error());
+}
+
 Result<void> SplicedVideoSource::encodeSome()
 {
     const std::int64_t from = m_state == State::Head ? m_plan.firstPts : m_plan.tail.front();
@@ -222,12 +233,11 @@ Result<void> SplicedVideoSource::encodeSome()
         if (pts < from || pts >= to || pts <= m_lastEncoded)
             return {};
         const AVFrame& coded = picture->picture();
-        if (coded.width != m_request.width || coded.height != m_request.height || coded.format != m_request.format)
+        if (coded.width != m_request.width || coded.height != m_request.height || coded.format != m_format)
             return cannotCopy("its pictures change their size or format");
         m_lastEncoded = pts;
         m_witness.seePicture(coded);
-        if (auto done = m_encoder->encode(coded, std::max(pts, m_start), m_packets->outTicks(coded.pkt_duration));
-            !done)
+        if (auto done = encode(coded, std::max(pts, m_start)); !done)
             return done;
     } else if (auto done = m_encoder->finish(); !done) {
         return done;

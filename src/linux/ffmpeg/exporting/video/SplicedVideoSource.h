@@ -6,9 +6,11 @@
 #include "linux/ffmpeg/exporting/video/PictureFeed.h"
 #include "linux/ffmpeg/exporting/video/PictureLine.h"
 #include "linux/ffmpeg/exporting/video/PicturePackets.h"
+#include "linux/ffmpeg/exporting/video/PictureScaler.h"
 #include "linux/ffmpeg/exporting/video/Splicer.h"
 
 #include <functional>
+#include <optional>
 #include <string>
 
 namespace ffmpeg {
@@ -39,6 +41,7 @@ private:
     base::Result<void> goOn();
     base::Result<void> beginStretch(State state);
     base::Result<void> encodeSome();
+    base::Result<void> encode(const AVFrame& picture, std::int64_t pts);
     base::Result<void> copyOne();
     base::Result<void> leap();
     bool isFirstCopied(const AVPacket& packet) const;
@@ -53,9 +56,11 @@ private:
     std::int64_t m_end;
     TellLog m_log;
 
+    AVPixelFormat m_format; ///< of the source's pictures
     EncoderRequest m_request;
     std::vector<std::uint8_t> m_encoderHeader; ///< the same in each stretch
     std::unique_ptr<PictureEncoder> m_encoder;
+    std::optional<PictureScaler> m_packer; ///< where the encoder wants the same in another format
     std::unique_ptr<PictureFeed> m_feed;
     std::int64_t m_lastEncoded;
     std::unique_ptr<PictureLine> m_line;

@@ -32,7 +32,8 @@ public:
     virtual bool wantsToSee() const { return false; }
     virtual void see(const AVPacket& /*copied*/) {}
 
-    /// Completes what the pictures beside the copied ones are encoded with.
+    /// Completes what the pictures beside the copied ones are encoded with. Its format may become another that holds the
+    /// same.
     virtual base::Result<void> prepare(EncoderRequest& request, int reorderDepth) = 0;
     /// The encoder is open: its header joins the stream's. Called once, and only when something is encoded.
     virtual base::Result<void> join(const AVCodecContext& encoder) = 0;
