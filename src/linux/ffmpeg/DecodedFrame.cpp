@@ -1,5 +1,7 @@
 #include "linux/ffmpeg/DecodedFrame.h"
 
+#include "linux/ffmpeg/ToneMap.h"
+
 #include <algorithm>
 #include <vector>
 
@@ -34,6 +36,8 @@ Plain plainFormat(const AVFrame& picture)
 
 int matrixOf(const AVFrame& picture)
 {
+    if (picture.format == AV_PIX_FMT_PAL8)
+        return SWS_CS_ITU601; // the scaler turns palettes into brightness and colour by no other
     switch (picture.colorspace) {
     case AVCOL_SPC_BT709:
         return SWS_CS_ITU709;
@@ -48,6 +52,8 @@ int matrixOf(const AVFrame& picture)
     case AVCOL_SPC_BT2020_CL:
         return SWS_CS_BT2020;
     default:
+        if (ToneMap::isNeededFor(picture))
+            return SWS_CS_BT2020;
         // Who does not say follows the custom: high definition is BT.709.
         return picture.height >= 720 ? SWS_CS_ITU709 : SWS_CS_ITU601;
     }
@@ -105,6 +111,13 @@ SwsContext* scaler(const AVFrame& picture, int width, int height, AVPixelFormat 
 
 constexpr int kLargest = 16384; ///< pixels; nothing that is drawn is larger
 
+bool scale(SwsContext* context, const AVFrame& picture, std::uint8_t* target, std::ptrdiff_t stride, int height)
+{
+    std::uint8_t* const targets[4] = {target};
+    const int strides[4] = {static_cast<int>(stride)};
+    return sws_scale(context, picture.data, picture.linesize, 0, picture.height, targets, strides) == height;
+}
+
 bool hasAlpha(const AVFrame& picture)
 {
     const AVPixFmtDescriptor* about = av_pix_fmt_desc_get(static_cast<AVPixelFormat>(picture.format));
@@ -127,6 +140,28 @@ DecodedFrame::DecodedFrame(Owned<AVFrame> picture, std::int64_t pts, base::Media
         std::max(0, av_image_get_buffer_size(format, m_picture->width, m_picture->height, kAlignment)));
 }
 
+bool DecodedFrame::renderMapped(SwsContext* context, std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int width,
+                                int height) const
+{
+    constexpr int kAlignment = 64; // of rows, for the scaler's sake
+    const int rowBytes = FFALIGN(width * 2, kAlignment);
+    const std::size_t planeBytes = static_cast<std::size_t>(rowBytes) * static_cast<std::size_t>(height);
+    thread_local std::vector<std::uint8_t> planes;
+    planes.resize(planeBytes * 3 + kAlignment);
+    std::uint8_t* const targets[4] = {planes.data(), planes.data() + planeBytes, planes.data() + 2 * planeBytes};
+    const int strides[4] = {rowBytes, rowBytes, rowBytes};
+    if (sws_scale(context, m_picture->data, m_picture->linesize, 0, m_picture->height, targets, strides) != height)
+        return false;
+    const ToneMap map = ToneMap::of(*m_picture);
+    for (int y = 0; y < height; ++y) {
+        const auto row = [&](int plane) {
+            return reinterpret_cast<const std::uint16_t*>(targets[plane] + std::ptrdiff_t(y) * rowBytes);
+        };
+        map.apply({row(2), row(0), row(1)}, bgra + y * bytesPerRow, width);
+    }
+    return true;
+}
+
 bool DecodedFrame::render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int width, int height, Quality quality) const
 {
     if (!bgra || width <= 0 || height <= 0 || width > kLargest || height > kLargest || bytesPerRow < width * 4)
@@ -134,7 +169,9 @@ bool DecodedFrame::render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int wi
     const int flags = quality == Quality::Exact ? SWS_BICUBIC | SWS_ACCURATE_RND | SWS_FULL_CHR_H_INT : SWS_BILINEAR;
     const int scaledWidth = m_orientation.transpose ? height : width;
     const int scaledHeight = m_orientation.transpose ? width : height;
-    SwsContext* context = scaler(*m_picture, scaledWidth, scaledHeight, AV_PIX_FMT_BGRA, flags);
+    const bool isMapped = ToneMap::isNeededFor(*m_picture);
+    SwsContext* context =
+        scaler(*m_picture, scaledWidth, scaledHeight, isMapped ? ToneMap::kFormat : AV_PIX_FMT_BGRA, flags);
     if (!context)
         return false;
     thread_local std::vector<std::uint8_t> scaled;
@@ -145,10 +182,8 @@ bool DecodedFrame::render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int wi
         scaled.resize(static_cast<std::size_t>(stride) * static_cast<std::size_t>(scaledHeight) + 64);
         target = scaled.data();
     }
-    std::uint8_t* const targets[4] = {target};
-    const int strides[4] = {static_cast<int>(stride)};
-    if (sws_scale(context, m_picture->data, m_picture->linesize, 0, m_picture->height, targets, strides)
-        != scaledHeight)
+    if (isMapped ? !renderMapped(context, target, stride, scaledWidth, scaledHeight)
+                 : !scale(context, *m_picture, target, stride, scaledHeight))
         return false;
     if (!m_orientation.isIdentity())
         turn(m_orientation, target, stride, scaledWidth, scaledHeight, bgra, bytesPerRow);
@@ -175,6 +210,8 @@ FrameRef DecodedFrame::reduced(const FrameRef& frame, int limit)
         return nullptr;
     SwsContext* context = scaler(from, to->width, to->height, AV_PIX_FMT_YUV420P, SWS_FAST_BILINEAR);
     if (!context || sws_scale(context, from.data, from.linesize, 0, from.height, to->data, to->linesize) != to->height)
+        return nullptr;
+    if (av_frame_copy_props(to.get(), &from) < 0)
         return nullptr;
     to->color_range = plainFormat(from).fullRange ? AVCOL_RANGE_JPEG : AVCOL_RANGE_MPEG;
     switch (matrixOf(from)) {

@@ -32,6 +32,8 @@ public:
     static std::shared_ptr<const DecodedFrame> reduced(const std::shared_ptr<const DecodedFrame>& frame, int limit);
 
 private:
+    bool renderMapped(SwsContext* context, std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int width, int height) const;
+
     Owned<AVFrame> m_picture;
     std::int64_t m_pts;
     base::MediaTime m_time;

@@ -90,4 +90,74 @@ TEST_F(Rendering, AReducedPictureLooksTheSame)
     EXPECT_EQ(ffmpeg::DecodedFrame::reduced(full, 960), full);
 }
 
+/// A picture of one colour, of 10 bits a channel: the codes of limited range.
+std::shared_ptr<const ffmpeg::DecodedFrame> picture(AVColorTransferCharacteristic transfer, int y, int u, int v)
+{
+    auto frame = ffmpeg::newFrame();
+    frame->format = AV_PIX_FMT_YUV420P10;
+    frame->width = 64;
+    frame->height = 32;
+    frame->color_trc = transfer;
+    frame->color_primaries = AVCOL_PRI_BT2020;
+    frame->colorspace = AVCOL_SPC_BT2020_NCL;
+    frame->color_range = AVCOL_RANGE_MPEG;
+    EXPECT_GE(av_frame_get_buffer(frame.get(), 0), 0);
+    const std::array<int, 3> codes{y, u, v};
+    for (std::size_t plane = 0; plane < 3; ++plane)
+        for (int row = 0; row < (plane ? 16 : 32); ++row)
+            std::fill_n(reinterpret_cast<std::uint16_t*>(frame->data[plane] + row * frame->linesize[plane]),
+                        plane ? 32 : 64, static_cast<std::uint16_t>(codes[plane]));
+    return std::make_shared<ffmpeg::DecodedFrame>(std::move(frame), 0, base::MediaTime::make(0, 30),
+                                                  ffmpeg::Orientation{}, AVRational{1, 1});
+}
+
+std::array<int, 3> shown(const ffmpeg::DecodedFrame& frame, Quality quality)
+{
+    const auto pixels = tests::pixelsOf(frame, 40, 20, quality);
+    const auto* pixel = pixels.at(20, 10);
+    return {pixel[2], pixel[1], pixel[0]};
+}
+
+// PQ codes a page's white, 203 candelas, as 0.58, half of it as 0.51, and a peak of 1000 as 0.75. HLG codes it as 0.75.
+TEST(HighDynamicRange, IsBroughtToThatOfTheScreen)
+{
+    for (const Quality quality : {Quality::Exact, Quality::Fast}) {
+        const auto code = [](double part) { return static_cast<int>(64 + part * 876 + 0.5); };
+        const auto grey = [&](AVColorTransferCharacteristic transfer, double part) {
+            const auto colour = shown(*picture(transfer, code(part), 512, 512), quality);
+            EXPECT_NEAR(colour[0], colour[1], 1);
+            EXPECT_NEAR(colour[2], colour[1], 1);
+            return colour[1];
+        };
+        EXPECT_EQ(grey(AVCOL_TRC_SMPTE2084, 0), 0);
+        EXPECT_NEAR(grey(AVCOL_TRC_SMPTE2084, 0.5096), 188, 3) << "half of a page's white, as on any screen";
+        EXPECT_NEAR(grey(AVCOL_TRC_SMPTE2084, 0.5807), 226, 3) << "a page";
+        EXPECT_NEAR(grey(AVCOL_TRC_SMPTE2084, 0.7518), 255, 1) << "the peak";
+        EXPECT_EQ(grey(AVCOL_TRC_SMPTE2084, 1), 255);
+        EXPECT_EQ(grey(AVCOL_TRC_ARIB_STD_B67, 0), 0);
+        EXPECT_NEAR(grey(AVCOL_TRC_ARIB_STD_B67, 0.75), 226, 4) << "a page";
+        EXPECT_NEAR(grey(AVCOL_TRC_ARIB_STD_B67, 1), 255, 1);
+    }
+}
+
+TEST(HighDynamicRange, KeepsTheColoursOfTheScreen)
+{
+    // The screen's red at half of a page's white, (0.627, 0.069, 0.016) of that in wide primaries.
+    const auto red = shown(*picture(AVCOL_TRC_SMPTE2084, 342, 446, 601), Quality::Exact);
+    EXPECT_GT(red[0], 170);
+    EXPECT_LT(red[1], 40);
+    EXPECT_LT(red[2], 40);
+}
+
+TEST(HighDynamicRange, LooksTheSameInAReducedPicture)
+{
+    const auto full = picture(AVCOL_TRC_SMPTE2084, 500, 480, 540);
+    const auto small = ffmpeg::DecodedFrame::reduced(full, 32);
+    ASSERT_TRUE(small && small->isReduced());
+    const auto a = shown(*full, Quality::Exact);
+    const auto b = shown(*small, Quality::Exact);
+    for (std::size_t c = 0; c < 3; ++c)
+        EXPECT_NEAR(a[c], b[c], 5);
+}
+
 } // namespace
