@@ -1,13 +1,13 @@
 // Movies in containers of every kind: whoever goes to a place finds there what stands there for who came from the start.
 #include "linux/ffmpeg/SoundMixer.h"
 #include "linux/ffmpeg/VideoSource.h"
+#include "linux/ffmpeg/exporting/sound/TrackPackets.h"
 #include "linux/ffmpeg/images/PictureWalk.h"
 #include "support/EngineTest.h"
 
 #include <algorithm>
+#include <cmath>
 #include <fstream>
-#include <limits>
-#include <numeric>
 #include <random>
 #include <vector>
 
@@ -181,7 +181,22 @@ TEST_F(Places, InAMovieWithATableAreFoundWithoutReadingOnToItsEnd)
     }
 }
 
-TEST_F(Places, BeforeTheirTableIsKnownAreTheFileTooWhenThereIsNone)
+TEST_F(Places, AtAPicturesPlaceHaveSoundThatBeginsShortlyBefore)
+{
+    ASSERT_NO_FATAL_FAILURE(use("many-bytes.mkv"));
+    const auto packets =
+        std::move(ffmpeg::TrackPackets::open(opened, opened->audioStreams().front(), cancelled)).value();
+    const auto packet = ffmpeg::newPacket();
+    for (const double seconds : {2.0, 3.0, 2.02}) {
+        packets->seek(seconds);
+        ASSERT_EQ(packets->read(*packet), 0);
+        const double begins = double(packet->pts) * av_q2d(packets->stream().time_base);
+        EXPECT_LE(begins, seconds);
+        EXPECT_GT(begins, seconds - 1.5) << "not from the start";
+    }
+}
+
+TEST_F(Places, AreFoundByATableOnlyWhereThereIsOne)
 {
     for (const auto* name : {"vp8-one-group.webm", "vp8-live.webm", "h264-live.mkv"}) {
         ASSERT_NO_FATAL_FAILURE(use(name));

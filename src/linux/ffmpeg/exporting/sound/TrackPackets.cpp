@@ -9,6 +9,14 @@
 
 namespace ffmpeg {
 
+namespace {
+
+// Microseconds: how far before a place another is tried, and how much farther each time.
+constexpr std::int64_t kFarthestBack = std::int64_t{2} * AV_TIME_BASE;
+constexpr std::int64_t kStepBack = AV_TIME_BASE;
+
+} // namespace
+
 TrackPackets::TrackPackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer, int stream)
     : m_movie(std::move(movie)), m_demuxer(std::move(demuxer)), m_stream(stream),
       m_parameters(avcodec_parameters_alloc())
@@ -124,19 +132,28 @@ bool TrackPackets::trySeek(double seconds)
 {
     if (!m_demuxer->seeksByTable() || seconds <= 0)
         return false;
-    const auto moment = static_cast<std::int64_t>(seconds * AV_TIME_BASE) + m_movie->origin();
-    if (!m_demuxer->seekSound(m_stream, m_movie->video() ? m_movie->video()->stream : -1, moment))
-        return false;
-    if (m_filter)
-        av_bsf_flush(m_filter.get());
-    m_expected = AV_NOPTS_VALUE;
-    m_isFromStart = false;
-    auto packet = newPacket();
-    if (readFiltered(*packet) < 0 || packet->pts == AV_NOPTS_VALUE
-        || av_compare_ts(packet->pts, stream().time_base, moment, AV_TIME_BASE_Q) > 0)
-        return false;
-    m_ahead = std::move(packet);
-    return true;
+    const auto start = static_cast<std::int64_t>(seconds * AV_TIME_BASE);
+    const std::int64_t moment = start + m_movie->origin();
+    // A place in the pictures' table can lie between two packets of the sound.
+    for (std::int64_t back = 0; back <= kFarthestBack && back < start; back += kStepBack) {
+        if (!m_demuxer->seekSound(m_stream, m_movie->video() ? m_movie->video()->stream : -1, moment - back))
+            return false;
+        if (m_filter)
+            av_bsf_flush(m_filter.get());
+        m_expected = AV_NOPTS_VALUE;
+        m_isFromStart = false;
+        auto packet = newPacket();
+        if (readFiltered(*packet) < 0 || packet->pts == AV_NOPTS_VALUE)
+            return false;
+        const std::int64_t late = av_rescale_q(packet->pts, stream().time_base, AV_TIME_BASE_Q) - moment;
+        if (late <= 0) {
+            m_ahead = std::move(packet);
+            return true;
+        }
+        if (late > kStepBack)
+            return false; // it begins later, or has a gap
+    }
+    return false;
 }
 
 void TrackPackets::seek(double seconds)
