@@ -89,6 +89,15 @@ int H264Splicer::reorderDepth() const
     return static_cast<int>(std::min<std::uint32_t>(depth, 16));
 }
 
+bool H264Splicer::showsInOrder() const
+{
+    constexpr std::uint32_t kInOrder = 2; // the type of picture order that knows no other
+    return std::all_of(m_sps.begin(), m_sps.end(), [](const h264::Sps& each) {
+        return each.profile == FF_PROFILE_H264_BASELINE || each.orderType == kInOrder
+               || (each.restriction && each.restriction->reorderFrames == 0);
+    });
+}
+
 void H264Splicer::see(const AVPacket& copied)
 {
     for (const ByteView nal : unitsIn(copied)) {

@@ -16,6 +16,7 @@ public:
     bool isJoint(const AVPacket& keyframe) const override;
     bool holdsHalf(const AVPacket& packet) const override;
     int reorderDepth() const override;
+    bool showsInOrder() const override;
     bool wantsToSee() const override { return m_header.pps.size() > 1 || m_header.sps.size() > 1; }
     void see(const AVPacket& copied) override;
     base::Result<void> prepare(EncoderRequest& request, int reorderDepth) override;

@@ -47,7 +47,7 @@ void PicturePackets::seek(std::int64_t outTick)
         if (m_startsMovie)
             m_demuxer->seekToStart(track().stream);
         do {
-            m_hasPeeked = m_demuxer->read(*m_peeked) == 0;
+            m_hasPeeked = readFile(*m_peeked) == 0;
         } while (m_hasPeeked && !m_startsMovie && !(m_peeked->flags & AV_PKT_FLAG_KEY));
         // Before what an edit list hides there may be pictures of the same times that it shows.
         const bool isEarly = m_hasPeeked && m_peeked->pts != AV_NOPTS_VALUE && !(m_peeked->flags & AV_PKT_FLAG_DISCARD)
@@ -100,10 +100,18 @@ int PicturePackets::gatherOneTime()
     return 0;
 }
 
+int PicturePackets::readFile(AVPacket& packet)
+{
+    const int result = m_demuxer->read(packet);
+    if (result == 0 && m_showsInOrder && packet.pts == AV_NOPTS_VALUE)
+        packet.pts = packet.dts;
+    return result;
+}
+
 int PicturePackets::readAsItIs(AVPacket& packet)
 {
     if (!m_hasPeeked)
-        return m_demuxer->read(packet);
+        return readFile(packet);
     m_hasPeeked = false;
     av_packet_unref(&packet);
     av_packet_move_ref(&packet, m_peeked.get());

@@ -35,6 +35,9 @@ public:
     std::int64_t outTicks(std::int64_t duration) const { return duration * m_scale; }
     AVRational outTimeBase() const { return {1, track().timescale}; }
 
+    /// AVI and ASF tell only when packets are decoded. From now on they are shown then.
+    void setShowsInOrder() { m_showsInOrder = true; }
+
     /// What is read next is a keyframe shown at or before this tick of the output, or the first packet of all.
     void seek(std::int64_t outTick);
     /// As Demuxer::read.
@@ -53,6 +56,7 @@ public:
 private:
     PicturePackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer);
 
+    int readFile(AVPacket& packet);
     int readAsItIs(AVPacket& packet);
     int gatherOneTime();
     base::Result<PicturePacket> look(const AVPacket& packet, const Splicer& splicer) const;
@@ -63,6 +67,7 @@ private:
     Owned<AVPacket> m_packet;
     Owned<AVPacket> m_peeked;
     bool m_hasPeeked = false;
+    bool m_showsInOrder = false;
     std::deque<Owned<AVPacket>> m_ready; ///< of one time in the file
     Owned<AVPacket> m_next;              ///< what follows them
     int m_ended = 0;                     ///< or why nothing does

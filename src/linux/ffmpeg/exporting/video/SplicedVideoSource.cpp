@@ -53,6 +53,8 @@ Result<std::unique_ptr<TrackSource>> SplicedVideoSource::open(std::unique_ptr<Pi
     auto splicer = Splicer::make(packets->stream(), packets->movie().firstFrame()->picture());
     if (!splicer)
         return splicer.error();
+    if (splicer.value()->showsInOrder())
+        packets->setShowsInOrder();
     auto plan = planFor(*packets, *splicer.value(), start, end);
     if (!plan)
         return plan.error();

@@ -27,6 +27,8 @@ public:
     virtual bool holdsHalf(const AVPacket& /*packet*/) const { return false; }
     /// How far the stream says that its pictures are reordered; 0 when it does not.
     virtual int reorderDepth() const { return 0; }
+    /// Whether the stream says that its pictures are shown in the order of decoding.
+    virtual bool showsInOrder() const { return false; }
 
     /// Whether it must see every packet that will be copied before the header is known.
     virtual bool wantsToSee() const { return false; }
