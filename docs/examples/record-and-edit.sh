@@ -20,7 +20,7 @@ fi
 status=0
 done=$(clipsa open "$recording" --app-name "${1:-Screen recording}") || status=$?
 if [ "$status" -ne 0 ]; then
-    echo "The editor has not finished." >&2
+    echo "Clipsa ended with status $status, for the reason that it gave." >&2
 elif [ -n "$done" ]; then
     echo "Done with the recording: $done"
 else

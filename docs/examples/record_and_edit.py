@@ -17,14 +17,22 @@ DAY = 24 * 60 * 60  # seconds
 DBusGMainLoop(set_as_default=True)
 loop = GLib.MainLoop()
 status = 1
+save_status = 0
 
 
 def completed(activity_types):
     global status
     for activity_type in activity_types:
         print(activity_type)
-    status = 0
+    status = save_status
     loop.quit()
+
+
+def save_failed(path, message):
+    global save_status
+    where = f"it is kept as {path}" if path else "it could not be kept elsewhere"
+    print(f"the movie is not in your videos ({message}); {where}", file=sys.stderr)
+    save_status = 1
 
 
 def failed(message):
@@ -50,6 +58,7 @@ try:
     bus = dbus.SessionBus()
     # Listened to before the call, so that no answer can be missed; they come to us alone.
     bus.add_signal_receiver(completed, "Completed", SESSION)
+    bus.add_signal_receiver(save_failed, "SaveFailed", SESSION)
     bus.add_signal_receiver(failed, "Failed", SESSION)
     recorder = dbus.Interface(bus.get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"), "org.clipsa.Recorder1")
     with open(movie, "rb") as file:

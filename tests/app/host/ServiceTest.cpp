@@ -166,6 +166,16 @@ TEST_F(Service, TellsTheExampleInPythonWhatIsWrong)
     EXPECT_THAT(wrong.errors(), HasSubstr("not a regular file"));
 }
 
+TEST_F(Service, TheExampleInPythonSaysWhereAMovieIsKeptThatWasNotSaved)
+{
+    startBus("unsaved=/data/unsaved/race.mp4 finish=save wait");
+    tests::Program example({kPython, tests::sourceFile("docs/examples/record_and_edit.py"), m_movie}, {});
+    EXPECT_EQ(example.wait(), 1);
+    EXPECT_EQ(example.output(), "save\n");
+    EXPECT_THAT(example.errors(), AllOf(StartsWith("the movie is not in your videos ("),
+                                        HasSubstr("); it is kept as /data/unsaved/race.mp4\n")));
+}
+
 TEST_F(Service, TheExampleInPythonSaysWhatItNeeds)
 {
     const std::string example = tests::sourceFile("docs/examples/record_and_edit.py");
@@ -249,8 +259,15 @@ TEST_F(ExampleInShell, ReplacesNoOlderRecording)
 TEST_F(ExampleInShell, KeepsTheRecordingWhenTheEditorCrashes)
 {
     EXPECT_EQ(run("crash"), 3);
-    EXPECT_THAT(m_errors, HasSubstr("The editor has not finished."));
+    EXPECT_THAT(m_errors, HasSubstr("Clipsa ended with status 3"));
     EXPECT_THAT(m_output, StartsWith("It stays in /"));
+    EXPECT_THAT(recordings(), ElementsAre("moving pictures"));
+}
+
+TEST_F(ExampleInShell, SaysThatTheMovieWasNotSaved)
+{
+    EXPECT_EQ(run("unsaved=/data/unsaved/race.mp4 finish=save wait"), 1);
+    EXPECT_THAT(m_errors, AllOf(HasSubstr("it is kept as /data/unsaved/race.mp4"), HasSubstr("ended with status 1")));
     EXPECT_THAT(recordings(), ElementsAre("moving pictures"));
 }
 
