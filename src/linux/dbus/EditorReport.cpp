@@ -19,7 +19,7 @@ constexpr int kLeastDescriptor = 16;
 constexpr std::size_t kTextsOfAnEntry = 3;
 constexpr std::array<std::string_view, 3> kKinds{"saved", "unsaved", "refused"}; // in the order of their numbers
 /// More than anybody saves in one session.
-constexpr std::size_t kMaximumSize = 1024 * 1024;
+constexpr std::size_t kMaximumSize = std::size_t{1024} * 1024;
 
 std::string contents(int file)
 {
