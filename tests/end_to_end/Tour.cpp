@@ -60,7 +60,7 @@ TEST_F(Tour, FailsWhenThereIsNothingToSee)
 {
     const auto end = take(m_machine.movie("not-a-movie.mp4"), {"--output", m_output});
     EXPECT_TRUE(end.inTime);
-    EXPECT_EQ(end.exitStatus, 3);
+    EXPECT_EQ(end.exitStatus, 2);
     EXPECT_THAT(end.err, Not(IsEmpty()));
     EXPECT_THAT(m_machine.remains(), IsEmpty());
 }
