@@ -69,7 +69,7 @@ std::array<std::uint8_t, kShades> codesOfShades()
 std::size_t shadeOf(float light)
 {
     // By way of a signed number, which processors make of a fraction at once.
-    return static_cast<std::size_t>(static_cast<int>(std::clamp(light, 0.0F, 1.0F) * (kShades - 1) + 0.5F));
+    return static_cast<std::size_t>(static_cast<int>(std::clamp(light, 0.0F, 1.0F) * (kShades - 0.5F)));
 }
 
 /// Darker than half of a page's white stays as it is; what is brighter comes together, up to the peak, which becomes the
