@@ -152,6 +152,9 @@ std::string wordsAbout(const std::string& file, const ffmpeg::MovieFacts& facts)
     std::string text = line("Movie", file);
     text += line("Container", facts.container);
     text += line("Length", length(facts.duration));
+    if (facts.isCutOff)
+        text += line("", facts.durationBeforeCut > 0 ? "cut off: its header tells of " + length(facts.durationBeforeCut)
+                                                     : std::string("cut off: the rest of its file is missing"));
     text += line("Size", size(facts.bytes) + bitRate(facts.bitRate));
     if (facts.picture)
         text += aboutPicture(*facts.picture);
@@ -166,6 +169,10 @@ std::string jsonAbout(const std::string& file, const ffmpeg::MovieFacts& facts)
 {
     JsonObject object;
     object.add("file", file).add("container", facts.container).add("duration", facts.duration);
+    if (facts.isCutOff)
+        object.addFlag("cutOff", true);
+    if (facts.durationBeforeCut > 0)
+        object.add("durationBeforeCut", facts.durationBeforeCut);
     object.add("bytes", facts.bytes);
     if (facts.bitRate > 0)
         object.add("bitRate", facts.bitRate);

@@ -1,5 +1,7 @@
 #include "linux/ffmpeg/Demuxer.h"
 
+#include "linux/ffmpeg/FileMarks.h"
+
 #include <algorithm>
 #include <string_view>
 #include <utility>
@@ -9,6 +11,8 @@ namespace ffmpeg {
 namespace {
 
 constexpr int kBufferSize = 64 * 1024;
+constexpr unsigned kMostTracks = 64;
+constexpr int kTooManyTracks = AVERROR(E2BIG);
 constexpr int kErrorsInARow = 64; ///< after so many failed reads without a packet there is nothing more to come
 
 /// Formats that hold movies in one file. Playlists and the like, which name other files, are left out on purpose.
@@ -38,6 +42,17 @@ bool isKnown(const AVStream& stream)
         return parameters.codec_id != AV_CODEC_ID_NONE && parameters.sample_rate > 0
                && parameters.ch_layout.nb_channels > 0;
     return parameters.codec_type != AVMEDIA_TYPE_UNKNOWN;
+}
+
+/// Why it cannot be opened, and what to do.
+std::string whyNot(const OpenFile& file, int error)
+{
+    if (error == kTooManyTracks)
+        return "it has more than " + std::to_string(kMostTracks) + " tracks, as no recording has";
+    if (error == AVERROR_INVALIDDATA && lacksIndex(file))
+        return "its index is missing, because its recorder was stopped before the end or only a part of it was copied; "
+               "copy it again, or have it repaired";
+    return textOf(error);
 }
 
 bool isOfKind(const AVFormatContext& context, std::string_view kind)
@@ -103,7 +118,8 @@ base::Result<std::unique_ptr<Demuxer>> Demuxer::open(std::shared_ptr<OpenFile> f
     std::unique_ptr<Demuxer> demuxer(new Demuxer(std::move(file), std::move(cancelled)));
     if (const int error = demuxer->begin(); error < 0)
         return base::Error::make("ffmpeg", error,
-                                 "“" + demuxer->m_file->name() + "” is not a movie that can be opened: " + textOf(error)
+                                 "“" + demuxer->m_file->name() + "” is not a movie that can be opened: "
+                                     + whyNot(*demuxer->m_file, demuxer->m_readError ? demuxer->m_readError : error)
                                      + ".");
     return demuxer;
 }
@@ -119,7 +135,6 @@ int Demuxer::begin()
     opened->pb = io.get();
     opened->io_open = refuseToOpen;
     opened->interrupt_callback = {[](void* self) { return int(static_cast<Demuxer*>(self)->isCancelled()); }, this};
-    opened->max_streams = 64;
     opened->probesize = 4 << 20;
     opened->max_analyze_duration = 2 * AV_TIME_BASE;
     opened->format_whitelist = av_strdup(kFormats);
@@ -134,6 +149,8 @@ int Demuxer::begin()
             return error;
         m_hasLookedAtPackets = true;
     }
+    if (context->nb_streams > kMostTracks)
+        return kTooManyTracks;
     m_context = std::move(context); // before what it reads through
     m_io = std::move(io);
     m_isFresh = true;

@@ -12,8 +12,9 @@ extern "C" {
 #include <libswscale/swscale.h>
 }
 
+#include "linux/ffmpeg/Words.h"
+
 #include <memory>
-#include <string>
 
 namespace ffmpeg {
 
@@ -42,13 +43,6 @@ inline Owned<AVFrame> newFrame()
 inline Owned<AVPacket> newPacket()
 {
     return Owned<AVPacket>(av_packet_alloc());
-}
-
-inline std::string textOf(int avError)
-{
-    char text[AV_ERROR_MAX_STRING_SIZE] = {};
-    av_strerror(avError, text, sizeof text);
-    return text;
 }
 
 } // namespace ffmpeg

@@ -1,5 +1,6 @@
 #include "linux/ffmpeg/Movie.h"
 
+#include "linux/ffmpeg/FileMarks.h"
 #include "linux/ffmpeg/VideoDecoder.h"
 
 #include <algorithm>
@@ -29,6 +30,32 @@ bool isSound(const AVStream& stream)
 constexpr std::int64_t kFar = AV_TIME_BASE; ///< a movie that starts later than this is taken to start at 0
 constexpr int kPacketsToOrigin = 64;
 constexpr std::int64_t kRunUp = AV_TIME_BASE / 10;
+
+/// What a writer rounds, or leaves standing behind the last picture, is not cut off.
+constexpr std::int64_t kNoticeable = AV_TIME_BASE / 2;
+constexpr std::int64_t kLittle = 20; ///< a table at the end takes no larger part of a file
+
+/// What a track is that does not come along.
+std::string nameOf(const AVStream& stream)
+{
+    std::string codec = avcodec_get_name(stream.codecpar->codec_id);
+    if (stream.codecpar->codec_tag == MKTAG('t', 'm', 'c', 'd'))
+        return "a time code";
+    if (stream.disposition & AV_DISPOSITION_ATTACHED_PIC)
+        return "a cover";
+    switch (stream.codecpar->codec_type) {
+    case AVMEDIA_TYPE_VIDEO:
+        return "another picture track (" + codec + ")";
+    case AVMEDIA_TYPE_AUDIO:
+        return "sound that cannot be decoded (" + codec + ")";
+    case AVMEDIA_TYPE_SUBTITLE:
+        return "subtitles (" + codec + ")";
+    case AVMEDIA_TYPE_ATTACHMENT:
+        return "an attached file";
+    default:
+        return "data that is neither picture nor sound";
+    }
+}
 
 constexpr double kPicturesASecond = 61;
 constexpr double kSoundPacketsASecond = 102;
@@ -75,11 +102,14 @@ void Movie::describe()
     m_metadata.reset(metadata);
     for (int i = 0; i < m_spare->streamCount(); ++i) {
         const AVStream& stream = m_spare->stream(i);
+        const bool isHeard = isSound(stream) && avcodec_find_decoder(stream.codecpar->codec_id);
+        if (!isHeard && (!isPicture(stream) || m_video))
+            m_otherTracks.push_back(nameOf(stream));
         if (!isPicture(stream) && !isSound(stream))
             continue;
         if (isPicture(stream) && !m_video)
             describeVideo(stream);
-        if (isSound(stream) && avcodec_find_decoder(stream.codecpar->codec_id))
+        if (isHeard)
             m_audioStreams.push_back(i);
         platform::AssetTrack track;
         track.trackID = trackIDOf(stream);
@@ -178,12 +208,21 @@ base::Result<void> Movie::findDuration(const Cancelled& cancelled)
 {
     AVFormatContext& context = m_spare->context();
     std::int64_t length = context.duration; // microseconds
+    const std::int64_t announced = announcedSize(*m_file).value_or(0);
     // What the header of a file says that does not start at 0 is sometimes its length, sometimes its end.
-    if (length == AV_NOPTS_VALUE || length <= 0 || (m_origin != 0 && m_spare->seeksByTable())) {
+    if (length == AV_NOPTS_VALUE || length <= 0 || (m_origin != 0 && m_spare->seeksByTable())
+        || announced > m_file->size()) {
         const auto index = packetIndex(cancelled);
         if (!index)
             return Error::make("ffmpeg", AVERROR_EXIT, "it cannot be read to its end");
+        if (m_video && index->packets().empty())
+            return Error::make(
+                "ffmpeg", AVERROR_INVALIDDATA,
+                "it does not say when its pictures are shown, as a bare stream of them; have it put into "
+                "a file that does, MP4 or Matroska for example");
+        const std::int64_t said = length == AV_NOPTS_VALUE ? 0 : length - std::max<std::int64_t>(0, m_origin);
         length = std::max<std::int64_t>(0, index->end().value_or(m_origin) - m_origin);
+        noteCut(announced - m_file->size(), said, length);
     }
     m_duration = MediaTime::make(length, AV_TIME_BASE);
     auto track = m_tracks.begin();
@@ -205,7 +244,8 @@ base::Result<void> Movie::findDuration(const Cancelled& cancelled)
                                           [](const MediaTime& a, const MediaTime& b) { return a < b; });
         const bool known = stream.duration != AV_NOPTS_VALUE && stream.duration > 0;
         track->timeRange.duration =
-            (known ? ticks(stream.duration) : m_duration - track->timeRange.start).convertedTo(timescale());
+            (known && !m_durationBeforeCut ? ticks(stream.duration) : m_duration - track->timeRange.start)
+                .convertedTo(timescale());
         if (known && longest < track->timeRange.end())
             longest = track->timeRange.end();
         ++track;
@@ -214,6 +254,28 @@ base::Result<void> Movie::findDuration(const Cancelled& cancelled)
     const double rounding = std::abs(longest.seconds() - m_duration.seconds());
     m_duration = rounding < 0.002 ? longest : m_duration.convertedTo(timescale());
     return {};
+}
+
+/// `missing` are bytes; `said` and `length` microseconds. Where a file is too short, the library does not always believe
+/// its header, and gives a guess.
+void Movie::noteCut(std::int64_t missing, std::int64_t said, std::int64_t length)
+{
+    if (missing <= 0)
+        return;
+    if (said > length + kNoticeable)
+        m_durationBeforeCut = MediaTime::make(said, AV_TIME_BASE);
+    else if (missing > m_file->size() / kLittle)
+        m_durationBeforeCut = MediaTime::indefinite();
+}
+
+std::optional<std::string> Movie::whatIsMissing() const
+{
+    if (!m_durationBeforeCut)
+        return std::nullopt;
+    const std::string of =
+        m_durationBeforeCut->isNumeric() ? "of " + lengthInWords(m_durationBeforeCut->seconds()) + " " : "";
+    return "“" + m_file->name() + "” was cut off: " + of + "only the first " + lengthInWords(m_duration.seconds())
+           + " are there.";
 }
 
 void Movie::findLikelyPackets()

@@ -12,6 +12,7 @@
 #include <memory>
 #include <mutex>
 #include <optional>
+#include <string>
 #include <vector>
 
 namespace ffmpeg {
@@ -25,6 +26,11 @@ public:
     const std::shared_ptr<OpenFile>& file() const { return m_file; }
     const std::vector<platform::AssetTrack>& tracks() const { return m_tracks; }
     base::MediaTime duration() const { return m_duration; }
+    /// How long it was, as its header says, before its file was cut off; indefinite when that is not known, and
+    /// nothing when it is whole as far as one can see.
+    const std::optional<base::MediaTime>& durationBeforeCut() const { return m_durationBeforeCut; }
+    /// The same in a sentence, which names the file.
+    std::optional<std::string> whatIsMissing() const;
     /// Ticks a second of all times that are told.
     std::int32_t timescale() const { return m_video ? m_video->timescale : kSoundTimescale; }
     /// Nothing when there is only sound.
@@ -33,6 +39,8 @@ public:
     static int trackIDOf(const AVStream& stream) { return stream.id > 0 ? stream.id : stream.index + 1; }
     /// Streams whose sound can be decoded.
     const std::vector<int>& audioStreams() const { return m_audioStreams; }
+    /// What else there is, which is neither played nor exported: "subtitles (ass)".
+    const std::vector<std::string>& otherTracks() const { return m_otherTracks; }
     /// Where the movie begins, in microseconds of the file's own time.
     std::int64_t origin() const { return m_origin; }
     /// What the file says of itself as a whole; null when it says nothing.
@@ -57,13 +65,16 @@ private:
     void describeVideo(const AVStream& stream);
     void findOrigin(std::int64_t firstPts, const Cancelled& cancelled);
     base::Result<void> findDuration(const Cancelled& cancelled);
+    void noteCut(std::int64_t missing, std::int64_t said, std::int64_t length);
     void findLikelyPackets();
 
     std::shared_ptr<OpenFile> m_file;
     std::vector<platform::AssetTrack> m_tracks;
     base::MediaTime m_duration;
+    std::optional<base::MediaTime> m_durationBeforeCut;
     std::optional<VideoTrack> m_video;
     std::vector<int> m_audioStreams;
+    std::vector<std::string> m_otherTracks;
     std::int64_t m_origin = 0;
     Owned<AVDictionary> m_metadata;
     std::int64_t m_likelyPackets = 0;

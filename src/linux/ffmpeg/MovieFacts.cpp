@@ -50,7 +50,8 @@ base::Result<std::vector<Entry>> entriesOf(const Movie& movie, Demuxer& demuxer,
     std::vector<Entry> entries;
     AVStream& stream = demuxer.stream(movie.video()->stream);
     const int count = avformat_index_get_entries_count(&stream);
-    if (demuxer.isMov() && count > 0 && count >= stream.nb_frames && stream.nb_frames > 0) {
+    if (demuxer.isMov() && !movie.durationBeforeCut() && count > 0 && count >= stream.nb_frames
+        && stream.nb_frames > 0) {
         for (int i = 0; i < count; ++i) {
             const AVIndexEntry* each = avformat_index_get_entry(&stream, i);
             entries.push_back({each->timestamp, each->size, (each->flags & AVINDEX_KEYFRAME) != 0,
@@ -164,6 +165,9 @@ base::Result<MovieFacts> MovieFacts::of(const Movie& movie, const Cancelled& can
     MovieFacts facts;
     facts.container = containerOf(demuxer);
     facts.duration = movie.duration().isNumeric() ? movie.duration().seconds() : 0;
+    facts.isCutOff = movie.durationBeforeCut().has_value();
+    if (facts.isCutOff && movie.durationBeforeCut()->isNumeric())
+        facts.durationBeforeCut = movie.durationBeforeCut()->seconds();
     facts.bytes = movie.file()->size();
     if (facts.duration > 0)
         facts.bitRate = std::llround(static_cast<double>(facts.bytes) * 8 / facts.duration);

@@ -45,8 +45,10 @@ struct OtherFacts {
 };
 
 struct MovieFacts {
-    std::string container; ///< "MP4", "Matroska / WebM"
-    double duration = 0;   ///< seconds
+    std::string container;        ///< "MP4", "Matroska / WebM"
+    double duration = 0;          ///< seconds
+    bool isCutOff = false;        ///< its file lacks the rest
+    double durationBeforeCut = 0; ///< seconds that its header then tells of; 0 when unknown
     std::int64_t bytes = 0;
     std::int64_t bitRate = 0;            ///< of all, bits a second
     std::optional<PictureFacts> picture; ///< of the track that is shown

@@ -140,6 +140,21 @@ TEST_F(Opening, WhatIsNoMovieFailsInWordsThatNameTheFile)
     expectFailure("/dev/null");
 }
 
+TEST_F(Opening, WhatIsNoMovieFailsInPlainWords)
+{
+    const auto words = [&](const char* name) {
+        EXPECT_EQ(open(movie(name)), Status::Failed) << name;
+        return item->error() ? item->error()->description() : "";
+    };
+    EXPECT_EQ(words("not-a-movie.mp4"),
+              "“not-a-movie.mp4” is not a movie that can be opened: it is damaged, or of a kind "
+              "that is not known here.");
+    EXPECT_NE(words("no-moov.mp4").find("its index is missing"), std::string::npos);
+    EXPECT_NE(words("many-tracks.mp4").find("it has more than 64 tracks"), std::string::npos);
+    EXPECT_NE(words("bare.h264").find("it does not say when its pictures are shown"), std::string::npos);
+    EXPECT_EQ(open(movie("others.mkv")), Status::ReadyToPlay);
+}
+
 TEST_F(Opening, APipeDoesNotHoldAnybodyUp)
 {
     const std::string path = testing::TempDir() + "a-pipe.mp4";

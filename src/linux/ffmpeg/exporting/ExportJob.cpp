@@ -90,6 +90,10 @@ public:
                                          packets, seconds, m_job.cancelled, m_job.progress});
         if (!written)
             return written.error();
+        for (const TrackSummary& each : written.value())
+            if (each.packets == 0)
+                log(std::string(each.type == AVMEDIA_TYPE_VIDEO ? "The picture track" : "A sound track") + " of “"
+                    + movie.file()->name() + "” is left out: there is nothing of it in the range.");
         m_file.sendToDisk(); // while it is checked
         return checkOutput(m_file, written.value(), m_job.cancelled);
     }
@@ -108,6 +112,14 @@ base::ErrorRef named(const Movie& movie, const base::ErrorRef& error)
         return error;
     return Error::make(error->domain(), error->code(),
                        "“" + movie.file()->name() + "” cannot be exported: " + error->description() + ".");
+}
+
+std::string whatStays(const Movie& movie)
+{
+    std::string names;
+    for (const std::string& each : movie.otherTracks())
+        names += (names.empty() ? "" : ", ") + each;
+    return "Of “" + movie.file()->name() + "” does not come along: " + names + ".";
 }
 
 /// Whoever reads takes the first place that cannot be read for the movie's end, and knows nothing of bytes that became
@@ -131,12 +143,16 @@ base::ErrorRef whyNotWhole(const OpenFile& file, int failedReadsBefore)
 Result<void> ExportJob::run() const
 {
     const int failedReads = movie->file()->failedReads();
+    if (const auto missing = movie->whatIsMissing())
+        log->message(*missing);
     const auto found = rangeIn(*movie, range);
     if (!found)
         return found.error();
     const auto file = OutputFile::create(output, movie->file());
     if (!file)
         return file.error();
+    if (!movie->otherTracks().empty())
+        log->message(whatStays(*movie));
     Attempt attempt(*this, found.value(), *file.value());
     VideoMode video = movie->video() ? VideoMode::Copy : VideoMode::Encode;
     SoundMode sound = SoundMode::Copy;

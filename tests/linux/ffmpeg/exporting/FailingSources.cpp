@@ -118,7 +118,7 @@ TEST_P(AFailingSource, MayGetAnotherNameAndBeRemovedMeanwhile)
 
 INSTANTIATE_TEST_SUITE_P(, AFailingSource,
                          testing::Values("heavy.mp4", "heavy.mkv", "heavy.ts", "heavy.nut", "heavy.avi", "heavy.flv",
-                                         "heavy-fragmented.mp4"),
+                                         "heavy.asf", "heavy-fragmented.mp4"),
                          [](const auto& each) {
                              std::string name = each.param;
                              std::replace_if(

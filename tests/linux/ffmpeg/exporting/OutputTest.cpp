@@ -238,6 +238,40 @@ TEST_F(AnOutput, HasRoomForItsIndexAlsoWhereMorePacketsComeThanThought)
     EXPECT_LT(bytes.size(), std::filesystem::file_size(exportMovie("h264-b.mp4")) + 2000);
 }
 
+class NothingAtAll final : public ffmpeg::TrackSource {
+public:
+    base::Result<void> describe(AVStream& output) override
+    {
+        output.codecpar->codec_type = AVMEDIA_TYPE_AUDIO;
+        output.codecpar->codec_id = AV_CODEC_ID_MP3;
+        output.codecpar->sample_rate = 48000;
+        av_channel_layout_default(&output.codecpar->ch_layout, 2);
+        output.time_base = {1, 48000};
+        return {};
+    }
+    base::Result<bool> next(AVPacket& /*none*/) override { return false; }
+};
+
+TEST_F(AnOutput, MayLackATrackThatHasNothingInTheRange)
+{
+    ASSERT_EQ(open(exportMovie("h264.mp4")), Status::ReadyToPlay);
+    const auto source = std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie();
+    const auto cancelled = std::make_shared<std::atomic<bool>>(false);
+    std::vector<std::unique_ptr<ffmpeg::TrackSource>> tracks;
+    tracks.push_back(std::make_unique<NothingAtAll>());
+    tracks.push_back(ffmpeg::openVideoSource(source, {at(0), at(3)}, ffmpeg::VideoMode::Copy, cancelled, {}).value());
+    auto file = ffmpeg::OutputFile::create(output()).value();
+    const auto written =
+        ffmpeg::writeMovie({*file, tracks, nullptr, source->timescale(), 1000, 3, cancelled, {}}).value();
+    const auto checked = ffmpeg::checkOutput(*file, written, cancelled);
+    EXPECT_TRUE(checked) << checked.error()->description();
+    auto wanted = written;
+    wanted.push_back(written.back());
+    const auto wrong = ffmpeg::checkOutput(*file, wanted, cancelled);
+    ASSERT_FALSE(wrong);
+    EXPECT_THAT(wrong.error()->description(), HasSubstr("not all of its tracks are in it"));
+}
+
 TEST_F(AnOutput, WhoseSoundIsWrongIsNoReasonToEncodeItsPictures)
 {
     ASSERT_EQ(open(exportMovie("sound-late.mp4")), Status::ReadyToPlay);

@@ -297,7 +297,7 @@ TEST_F(AnExport, SaysWhatIsMissingOfATruncatedMovie)
     ASSERT_EQ(cut(movie("truncated.mp4"), output(), std::nullopt), ExportStatus::Completed) << errorText();
     bool isSaid = false;
     for (const std::string& line : log.texts(base::MemoryLog::Line::Kind::Message))
-        isSaid = isSaid || line.find("“truncated.mp4” ends before its index does") != std::string::npos;
+        isSaid = isSaid || line.find("“truncated.mp4” was cut off: of 4.0 s only the first") != std::string::npos;
     EXPECT_TRUE(isSaid);
     EXPECT_GT(DecodedMovie(output()).all().size(), 30U);
 }

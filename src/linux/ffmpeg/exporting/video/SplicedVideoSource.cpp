@@ -341,7 +341,7 @@ Result<void> SplicedVideoSource::endCopying(bool isExpected)
     const AVIndexEntry* last =
         m_packets->isMov() ? avformat_index_get_entry(&stream, avformat_index_get_entries_count(&stream) - 1) : nullptr;
     const bool isCut = !isExpected || (!m_plan.copyTo && !m_plan.copiesToHidden && last && last->timestamp > m_lastDts);
-    if (isCut && m_log)
+    if (isCut && m_log && !m_packets->movie().durationBeforeCut()) // which is told already
         m_log("“" + m_packets->movie().file()->name() + "” ends before its index does: pictures are missing.");
     return beginStretch(isExpected && !m_plan.tail.empty() ? State::Tail : State::Ended);
 }

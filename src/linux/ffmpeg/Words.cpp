@@ -1,0 +1,64 @@
+#include "linux/ffmpeg/Words.h"
+
+#include "linux/ffmpeg/Libraries.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <system_error>
+
+namespace ffmpeg {
+
+std::string textOf(int avError)
+{
+    switch (avError) {
+    case AVERROR_INVALIDDATA:
+        return "it is damaged, or of a kind that is not known here";
+    case AVERROR_EOF:
+        return "it ends too early";
+    case AVERROR_EXIT:
+        return "it is no longer wanted";
+    case AVERROR_DECODER_NOT_FOUND:
+        return "there is no decoder for it here";
+    case AVERROR_ENCODER_NOT_FOUND:
+        return "there is no encoder for it here; install one with the libraries of FFmpeg";
+    case AVERROR_PATCHWELCOME:
+    case AVERROR(ENOSYS):
+        return "this variety of it is not known here";
+    case AVERROR_STREAM_NOT_FOUND:
+        return "a track is missing";
+    case AVERROR(EINVAL):
+        return "it contradicts itself";
+    case AVERROR(ERANGE):
+        return "it has numbers that are out of all bounds";
+    case AVERROR(ENOMEM):
+        return "there is not enough memory";
+    case AVERROR(ENOSPC):
+        return "the disk is full";
+    case AVERROR(EDQUOT):
+        return "your share of the disk is used up";
+    case AVERROR(EIO):
+        return "the disk, or the way to it, fails";
+    default:
+        break;
+    }
+    // The libraries' own codes are far below those of the system.
+    constexpr int kMostErrno = 4095;
+    if (avError < 0 && avError >= -kMostErrno)
+        return std::generic_category().message(AVUNERROR(avError));
+    return "something unexpected happened (" + std::to_string(avError) + ")";
+}
+
+std::string lengthInWords(double seconds)
+{
+    char text[32];
+    const auto whole = static_cast<long long>(seconds);
+    if (whole < 60)
+        std::snprintf(text, sizeof text, "%.1f s", seconds);
+    else if (whole < 3600)
+        std::snprintf(text, sizeof text, "%lld:%02lld", whole / 60, whole % 60);
+    else
+        std::snprintf(text, sizeof text, "%lld:%02lld:%02lld", whole / 3600, whole / 60 % 60, whole % 60);
+    return text;
+}
+
+} // namespace ffmpeg
