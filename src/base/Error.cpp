@@ -6,10 +6,17 @@
 
 namespace base {
 
-namespace {
+Error::Error(std::string domain, std::int64_t code, UserInfo userInfo)
+    : m_domain(std::move(domain)), m_code(code), m_userInfo(std::move(userInfo))
+{
+}
 
-/// What an error number comes to for somebody who uses a computer and does not program it.
-std::string wordsFor(int number)
+ErrorRef Error::make(std::string domain, std::int64_t code, std::string description)
+{
+    return std::make_shared<const Error>(std::move(domain), code, UserInfo{{kDescriptionKey, std::move(description)}});
+}
+
+std::string Error::meaningOf(int number)
 {
     switch (number) {
     case EACCES:
@@ -21,7 +28,7 @@ std::string wordsFor(int number)
     case ECANCELED:
         return "it was given up";
     case EDQUOT:
-        return "there is no room left in your share of the disk";
+        return "your share of the disk is used up";
     case EEXIST:
         return "there is such a file already";
     case EFBIG:
@@ -44,7 +51,7 @@ std::string wordsFor(int number)
     case ENOMEM:
         return "there is not enough memory";
     case ENOSPC:
-        return "there is no room left on the disk";
+        return "the disk is full";
     case ENOTDIR:
         return "a part of its path is no directory";
     case EOPNOTSUPP:
@@ -61,21 +68,9 @@ std::string wordsFor(int number)
     }
 }
 
-} // namespace
-
-Error::Error(std::string domain, std::int64_t code, UserInfo userInfo)
-    : m_domain(std::move(domain)), m_code(code), m_userInfo(std::move(userInfo))
-{
-}
-
-ErrorRef Error::make(std::string domain, std::int64_t code, std::string description)
-{
-    return std::make_shared<const Error>(std::move(domain), code, UserInfo{{kDescriptionKey, std::move(description)}});
-}
-
 ErrorRef Error::fromErrno(int number, const std::string& doing)
 {
-    return make(kPosixErrorDomain, number, doing + ": " + wordsFor(number));
+    return make(kPosixErrorDomain, number, doing + ": " + meaningOf(number));
 }
 
 std::string Error::description() const

@@ -30,6 +30,10 @@ public:
     /// goes on with what that number means, in plain words.
     static ErrorRef fromErrno(int number, const std::string& doing);
 
+    /// What an error number comes to for somebody who uses a computer and does not program it; begins in lower case and
+    /// has no full stop.
+    static std::string meaningOf(int number);
+
     const std::string& domain() const { return m_domain; }
     std::int64_t code() const { return m_code; }
     const UserInfo& userInfo() const { return m_userInfo; }

@@ -47,7 +47,8 @@ std::string nameOf(const AVStream& stream)
     case AVMEDIA_TYPE_VIDEO:
         return "another picture track (" + codec + ")";
     case AVMEDIA_TYPE_AUDIO:
-        return "sound that cannot be decoded (" + codec + ")";
+        return "sound that cannot be decoded"
+               + (stream.codecpar->codec_id == AV_CODEC_ID_NONE ? "" : " (" + codec + ")");
     case AVMEDIA_TYPE_SUBTITLE:
         return "subtitles (" + codec + ")";
     case AVMEDIA_TYPE_ATTACHMENT:

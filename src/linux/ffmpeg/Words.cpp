@@ -1,10 +1,10 @@
 #include "linux/ffmpeg/Words.h"
 
+#include "base/Error.h"
 #include "linux/ffmpeg/Libraries.h"
 
 #include <cerrno>
 #include <cstdio>
-#include <system_error>
 
 namespace ffmpeg {
 
@@ -30,21 +30,13 @@ std::string textOf(int avError)
         return "it contradicts itself";
     case AVERROR(ERANGE):
         return "it has numbers that are out of all bounds";
-    case AVERROR(ENOMEM):
-        return "there is not enough memory";
-    case AVERROR(ENOSPC):
-        return "the disk is full";
-    case AVERROR(EDQUOT):
-        return "your share of the disk is used up";
-    case AVERROR(EIO):
-        return "the disk, or the way to it, fails";
     default:
         break;
     }
     // The libraries' own codes are far below those of the system.
     constexpr int kMostErrno = 4095;
     if (avError < 0 && avError >= -kMostErrno)
-        return std::generic_category().message(AVUNERROR(avError));
+        return base::Error::meaningOf(AVUNERROR(avError));
     return "something unexpected happened (" + std::to_string(avError) + ")";
 }
 

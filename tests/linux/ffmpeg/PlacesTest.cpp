@@ -106,7 +106,7 @@ class PlacesIn : public Places, public testing::WithParamInterface<const char*> 
 
 INSTANTIATE_TEST_SUITE_P(ContainersOfEveryKind, PlacesIn,
                          testing::Values("h264.avi", "mpeg4.avi", "wmv.asf", "h264.flv", "mpeg2.mpg", "h264.nut",
-                                         "theora.ogv", "h264-b.ts", "vp8-one-group.webm", "vp8-live.webm",
+                                         "theora.ogv", "h264.ts", "vp8-one-group.webm", "vp8-live.webm",
                                          "h264-one-group.mkv", "h264-live.mkv", "h264-live-one-group.mkv",
                                          "many-bytes.mkv", "sound.mkv", "sound-fragmented.mp4"),
                          [](const auto& about) {
@@ -147,8 +147,6 @@ TEST_P(PlacesIn, HaveTheirThumbnailWhereverOneComesFrom)
 TEST_P(PlacesIn, HaveTheirSoundWhereverOneComesFrom)
 {
     ASSERT_NO_FATAL_FAILURE(use(GetParam()));
-    if (opened->audioStreams().empty())
-        GTEST_SKIP() << "it has no sound";
     const auto from = std::move(SoundMixer::open(opened, cancelled)).value();
     const auto all = mix(*from, 3);
     for (const int frame : {96000, 24000, 110001, 60000, 0, 130000, 1}) {

@@ -199,7 +199,7 @@ TEST_P(AFullDisk, LeavesNothingHalfDone)
     tests::whileRefusing(refused, [&] { outcome = save(); });
     expectFailure(outcome, ENOSPC);
     EXPECT_THAT(outcome.text(), HasSubstr("cannot save " + source.native() + " in the library " + videos.native()));
-    EXPECT_THAT(outcome.text(), HasSubstr("there is no room left on the disk; make room there"));
+    EXPECT_THAT(outcome.text(), HasSubstr("the disk is full; make room there"));
 }
 
 TEST_P(AFullDisk, LeavesNothingHalfDoneWhenSomeIsWritten)

@@ -94,10 +94,33 @@ TEST_F(Leftovers, AreNamedInOneLine)
     EXPECT_EQ(log.texts(base::MemoryLog::Line::Kind::Message).size(), 1U) << "there are none";
 }
 
+TEST_F(Leftovers, OfSoundThatNobodyCanDecodeAreNamedOnceInACutAndInAMix)
+{
+    const std::string source = output("source.mkv");
+    std::string bytes = bytesOf(exportMovie("sound.mkv"));
+    const std::size_t codec = bytes.rfind("A_AAC");
+    ASSERT_NE(codec, std::string::npos);
+    std::ofstream(source, std::ios::binary) << bytes.replace(codec, 5, "A_XYZ");
+    ASSERT_EQ(open(source), Status::ReadyToPlay);
+    platform::AudioMix mix;
+    for (const auto& track : asset->tracks())
+        if (track.type == platform::MediaType::Audio)
+            mix.inputs.push_back({track.trackID});
+    ASSERT_FALSE(mix.inputs.empty());
+    std::vector<std::string> lines;
+    for (const auto& each : {std::optional<platform::AudioMix>(), std::optional(mix)}) {
+        const auto session = sessionFor(source, output(each ? "mix.mp4" : "cut.mp4"), std::nullopt);
+        session->setAudioMix(each);
+        ASSERT_EQ(run(session), ExportStatus::Completed) << errorText();
+        lines.emplace_back("Of “source.mkv” does not come along: sound that cannot be decoded.");
+        EXPECT_EQ(log.texts(base::MemoryLog::Line::Kind::Message), lines);
+    }
+}
+
 TEST(Words, AreNoneOfTheLibrary)
 {
     EXPECT_EQ(ffmpeg::textOf(AVERROR_INVALIDDATA), "it is damaged, or of a kind that is not known here");
-    EXPECT_EQ(ffmpeg::textOf(AVERROR(EACCES)), "Permission denied");
+    EXPECT_EQ(ffmpeg::textOf(AVERROR(EACCES)), "that is not allowed");
     EXPECT_EQ(ffmpeg::textOf(AVERROR_PROTOCOL_NOT_FOUND).find("something unexpected happened ("), 0U);
     EXPECT_EQ(ffmpeg::lengthInWords(2.04), "2.0 s");
     EXPECT_EQ(ffmpeg::lengthInWords(22 * 60 + 12.9), "22:12");

@@ -126,7 +126,8 @@ TEST_F(AnOutput, LeavesNothingOfAFileThatMayNotGrowFurther)
     const auto result = runJob(exportMovie("h264-sparse.mp4"), std::nullopt);
     setrlimit(RLIMIT_FSIZE, &before);
     ASSERT_FALSE(result);
-    EXPECT_THAT(result.error()->description(), HasSubstr("“out.mp4” cannot be written: File too large"));
+    EXPECT_THAT(result.error()->description(),
+                HasSubstr("“out.mp4” cannot be written: the disk takes no file that large"));
     EXPECT_TRUE(files().empty());
 }
 

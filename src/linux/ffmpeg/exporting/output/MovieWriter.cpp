@@ -120,7 +120,7 @@ private:
     {
         if (error == AVERROR_EXIT)
             return Error::make("ffmpeg", error, "it is no longer wanted");
-        const std::string why = error == AVERROR(ENOSPC) ? "the disk is full" : textOf(error);
+        const std::string why = textOf(error);
         return Error::make("ffmpeg", error, "“" + m_job.file.name() + "” cannot be written: " + why + ".");
     }
 

@@ -67,7 +67,6 @@ private:
     };
 
     std::vector<Track> soundTracks() const;
-    void tellOfUnknown() const;
     std::unique_ptr<TrackPackets> packetsOf(const Track& track) const;
     std::unique_ptr<TrackSource> sourceOf(const Track& track, std::size_t tracks) const;
     std::unique_ptr<TrackSource> encoded(const Track& track, std::size_t tracks, bool keepsLossless) const;
@@ -95,19 +94,6 @@ std::vector<Opening::Track> Opening::soundTracks() const
     for (const int stream : m_movie->audioStreams())
         tracks.push_back({stream, tracks.size() + 1});
     return tracks;
-}
-
-/// Of tracks that are not even tried.
-void Opening::tellOfUnknown() const
-{
-    const auto& tracks = m_movie->tracks();
-    const auto sounds = std::count_if(tracks.begin(), tracks.end(), [](const platform::AssetTrack& track) {
-        return track.type == platform::MediaType::Audio;
-    });
-    if (const auto unknown = sounds - std::ssize(m_movie->audioStreams()); unknown > 0)
-        m_log((unknown == 1 ? "A sound track" : std::to_string(unknown) + " sound tracks") + std::string(" of “")
-              + m_movie->file()->name() + (unknown == 1 ? "” is left out: it" : "” are left out: they")
-              + " cannot be decoded.");
 }
 
 std::unique_ptr<TrackPackets> Opening::packetsOf(const Track& track) const
@@ -202,7 +188,6 @@ std::unique_ptr<TrackSource> Opening::sourceOf(const Track& track, std::size_t t
 base::Result<Sources> Opening::allTracks()
 {
     Sources sources;
-    tellOfUnknown();
     const auto tracks = soundTracks();
     for (const Track& track : tracks) {
         auto source = sourceOf(track, tracks.size());
@@ -227,16 +212,26 @@ std::vector<Opening::Reader> Opening::readersOf(const platform::AudioMix& mix) c
     for (const Track& track : soundTracks())
         if (auto packets = packetsOf(track))
             all.push_back({track, std::move(packets)});
+    const auto& tracks = m_movie->tracks();
     std::vector<Reader> wanted;
     for (const platform::AudioMixInput& input : mix.inputs) {
-        const auto found = std::find_if(all.begin(), all.end(), [&](const Reader& each) {
+        const auto hasItsID = [&](const Reader& each) {
             return each.packets && Movie::trackIDOf(each.packets->stream()) == input.trackID;
-        });
-        if (found != all.end())
-            wanted.push_back(std::move(*found));
-        else if (!isSet(m_cancelled))
+        };
+        const auto tellOfInput = [&](const std::string& why) {
             m_log("Track " + std::to_string(input.trackID) + " of “" + m_movie->file()->name()
-                  + "” is left out of the mix: it is no sound that can be read, or it is in it already.");
+                  + "” is left out of the mix: " + why + ".");
+        };
+        if (std::any_of(wanted.begin(), wanted.end(), hasItsID)) {
+            tellOfInput("it is in it already");
+        } else if (const auto found = std::find_if(all.begin(), all.end(), hasItsID); found != all.end()) {
+            wanted.push_back(std::move(*found));
+        } else if (std::none_of(tracks.begin(), tracks.end(), [&](const platform::AssetTrack& track) {
+                       return track.type == platform::MediaType::Audio && track.trackID == input.trackID;
+                   })) {
+            // Of sound that cannot be read another line tells.
+            tellOfInput("there is no such sound track");
+        }
     }
     return wanted;
 }
