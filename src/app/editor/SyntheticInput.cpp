@@ -14,9 +14,11 @@ namespace {
 
 const QPointingDevice* finger()
 {
-    static const QPointingDevice device("Script", 1, QInputDevice::DeviceType::TouchScreen,
-                                        QPointingDevice::PointerType::Finger, QInputDevice::Capability::Position, 1, 0);
-    return &device;
+    // The application's: what outlives it would look for a list of devices that is gone.
+    static const auto* const device =
+        new QPointingDevice("Script", 1, QInputDevice::DeviceType::TouchScreen, QPointingDevice::PointerType::Finger,
+                            QInputDevice::Capability::Position, 1, 0, {}, {}, QCoreApplication::instance());
+    return device;
 }
 
 void touch(QQuickWindow& window, QEvent::Type type, QEventPoint::State state, base::Point at)
