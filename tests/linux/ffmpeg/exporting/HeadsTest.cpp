@@ -67,8 +67,8 @@ protected:
 TEST_F(Heads, OfVp9HoldNoiseInEveryFormat)
 {
     for (const AVPixelFormat format :
-         {AV_PIX_FMT_YUV420P, AV_PIX_FMT_YUV422P, AV_PIX_FMT_YUV440P, AV_PIX_FMT_YUV444P, AV_PIX_FMT_GBRP,
-          AV_PIX_FMT_YUV420P12, AV_PIX_FMT_YUV422P10, AV_PIX_FMT_YUV444P12, AV_PIX_FMT_GBRP10})
+         {AV_PIX_FMT_YUV420P, AV_PIX_FMT_YUV422P, AV_PIX_FMT_YUV444P, AV_PIX_FMT_GBRP, AV_PIX_FMT_YUV420P12,
+          AV_PIX_FMT_YUV422P10, AV_PIX_FMT_YUV444P12, AV_PIX_FMT_GBRP10})
         EXPECT_EQ(encode(AV_CODEC_ID_VP9, format, 640, 360), 2) << av_get_pix_fmt_name(format);
     // So wide that there is more than one column of tiles in any case.
     EXPECT_EQ(encode(AV_CODEC_ID_VP9, AV_PIX_FMT_YUV444P, 4160, 128), 2);

@@ -77,8 +77,9 @@ INSTANTIATE_TEST_SUITE_P(
         Kind{"h264-422.mp4", true, 42}, Kind{"h264-full-range.mp4", true, 43}, Kind{"hevc-422.mp4", true, 44},
         Kind{"h264-fields.mp4", true, 45}, Kind{"h264-fields-apart.mp4", false, 46}, Kind{"h264-odd.mp4", true, 47},
         Kind{"vp9-odd.webm", true, 48}, Kind{"h264-recorded.mkv", true, 49}, Kind{"h264-recorded-one.mkv", false, 50},
-        Kind{"av1.ivf", true, 51}, Kind{"vp9-422-10bit.mkv", true, 47}, Kind{"sound-no-header.mp4", true, 52},
-        Kind{"sound-doubled.mkv", true, 53}, Kind{"opus-fragmented.mp4", true, 54}),
+        Kind{"av1.ivf", true, 51}, Kind{"vp9-422-10bit.mkv", true, 47}, Kind{"vp9-440.webm", false, 58},
+        Kind{"sound-no-header.mp4", true, 52}, Kind{"sound-doubled.mkv", true, 53},
+        Kind{"opus-fragmented.mp4", true, 54}),
     nameOf);
 
 INSTANTIATE_TEST_SUITE_P(InOtherContainers, RandomCuts,

@@ -145,8 +145,10 @@ Result<void> checkOutput(const OutputFile& file, const std::vector<TrackSummary>
     if (!again)
         return again.error();
     auto opened = Demuxer::open(again.value(), cancelled);
-    if (!opened)
+    if (!opened && cancelled && *cancelled)
         return opened.error();
+    if (!opened)
+        return wrong("it cannot be opened");
     Demuxer& demuxer = *opened.value();
     if (demuxer.streamCount() != static_cast<int>(written.size()))
         return wrong("not all of its tracks are in it");

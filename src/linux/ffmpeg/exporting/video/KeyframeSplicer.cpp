@@ -37,6 +37,10 @@ base::Result<std::unique_ptr<Splicer>> KeyframeSplicer::make(const AVStream& str
     splicer->m_format = static_cast<AVPixelFormat>(picture.format);
     splicer->m_width = picture.width;
     splicer->m_height = picture.height;
+    // The header of VP9 in MP4 has a number for this, but the muxer does not know it, and leaves the header empty.
+    if (splicer->m_format == AV_PIX_FMT_YUV440P || splicer->m_format == AV_PIX_FMT_YUV440P10
+        || splicer->m_format == AV_PIX_FMT_YUV440P12)
+        return cannotCopy("MP4 does not hold VP9 whose colours are halved in height alone");
     if (splicer->m_isAv1) {
         const ByteView extradata = extradataOf(*stream.codecpar);
         const std::size_t start = !extradata.empty() && (extradata[0] & kAv1Marker) ? kAv1ConfigurationBytes : 0;
