@@ -78,6 +78,11 @@ void FFmpegAsset::finish(base::Result<std::shared_ptr<Movie>> movie)
         then();
 }
 
+std::string FFmpegAsset::whatIsMissing() const
+{
+    return m_movie ? m_movie->whatIsMissing("This recording").value_or("") : "";
+}
+
 void FFmpegAsset::whenLoaded(std::function<void()> then)
 {
     if (!m_movie && !m_error) {

@@ -269,14 +269,13 @@ void Movie::noteCut(std::int64_t missing, std::int64_t said, std::int64_t length
         m_durationBeforeCut = MediaTime::indefinite();
 }
 
-std::optional<std::string> Movie::whatIsMissing() const
+std::optional<std::string> Movie::whatIsMissing(const std::string& subject) const
 {
     if (!m_durationBeforeCut)
         return std::nullopt;
     const std::string of =
         m_durationBeforeCut->isNumeric() ? "of " + lengthInWords(m_durationBeforeCut->seconds()) + " " : "";
-    return "“" + m_file->name() + "” was cut off: " + of + "only the first " + lengthInWords(m_duration.seconds())
-           + " are there.";
+    return subject + " was cut off: " + of + "only the first " + lengthInWords(m_duration.seconds()) + " are there.";
 }
 
 void Movie::findLikelyPackets()

@@ -12,6 +12,7 @@
 #include <functional>
 #include <memory>
 #include <optional>
+#include <string>
 #include <vector>
 
 namespace platform {
@@ -40,6 +41,8 @@ public:
     /// In the file's order; empty until known.
     virtual std::vector<AssetTrack> tracks() const = 0;
     std::vector<AssetTrack> tracksWithMediaType(MediaType type) const;
+    /// What the user should know of a movie that was cut off, in a sentence; empty when it is whole, or not known yet.
+    virtual std::string whatIsMissing() const { return {}; }
     /// Calls `then` on the main queue, not before this returns, when the above is known or the error is.
     /// Not when the asset goes first.
     virtual void whenLoaded(std::function<void()> then) = 0;

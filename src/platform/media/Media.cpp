@@ -84,6 +84,14 @@ std::string PlayerLayer::failureText() const
     return m_item->error() ? m_item->error()->description() : "This movie cannot be played.";
 }
 
+std::string PlayerLayer::noticeText() const
+{
+    if (!m_item || m_item->status() != PlayerItem::Status::ReadyToPlay || !m_item->asset())
+        return {};
+    const bool isAtStart = !m_player->isPlaying() && m_player->currentTime().seconds() == 0;
+    return isAtStart ? m_item->asset()->whatIsMissing() : std::string();
+}
+
 base::Rect PlayerLayer::videoRect(base::Rect bounds) const
 {
     const VideoFrameRef frame = currentFrame();

@@ -22,6 +22,8 @@ public:
     VideoFrameRef currentFrame() const { return m_player ? m_player->currentFrame() : nullptr; }
     /// What to tell the user in place of a picture: why the item cannot be played. Empty while there is nothing to tell.
     std::string failureText() const;
+    /// What to tell the user over the first picture: that the movie was cut off. Empty elsewhere, and while it plays.
+    std::string noticeText() const;
     /// Where the picture stands inside `bounds`; empty without a picture.
     base::Rect videoRect(base::Rect bounds) const;
 

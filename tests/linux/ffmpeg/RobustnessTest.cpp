@@ -65,7 +65,11 @@ protected:
 
 TEST_F(Robustness, ATruncatedMovieShowsWhatIsThere)
 {
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    EXPECT_EQ(asset->whatIsMissing(), "");
     ASSERT_EQ(open(movie("truncated.mp4")), Status::ReadyToPlay);
+    EXPECT_TRUE(asset->whatIsMissing().starts_with("This recording was cut off: of 4.0 s only the first "))
+        << asset->whatIsMissing();
     EXPECT_EQ(numberAt(at(1)), 30);
     const int last = numberAt(at(3.9));
     EXPECT_GT(last, 40);

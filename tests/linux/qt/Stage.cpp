@@ -104,9 +104,10 @@ std::shared_ptr<platform::View> Stage::addColor(base::Rect frame, platform::Colo
     return view;
 }
 
-std::shared_ptr<FakePlayer> Stage::addPlayer(base::Rect frame, platform::VideoFrameRef picture)
+std::shared_ptr<FakePlayer> Stage::addPlayer(base::Rect frame, platform::VideoFrameRef picture,
+                                             std::shared_ptr<FakePlayerItem> item)
 {
-    auto player = std::make_shared<FakePlayer>(mainQueue, center, std::make_shared<FakePlayerItem>(nullptr));
+    auto player = std::make_shared<FakePlayer>(mainQueue, center, std::move(item));
     const auto layer = platform::PlayerLayer::withPlayer(player);
     layer->setFrame(frame);
     window->addSublayer(layer);

@@ -109,7 +109,9 @@ protected:
     }
     std::shared_ptr<platform::View> addColor(base::Rect frame, platform::Color color);
     /// A player whose picture fills `frame`, with its proportions kept.
-    std::shared_ptr<FakePlayer> addPlayer(base::Rect frame, platform::VideoFrameRef picture);
+    std::shared_ptr<FakePlayer>
+    addPlayer(base::Rect frame, platform::VideoFrameRef picture,
+              std::shared_ptr<FakePlayerItem> item = std::make_shared<FakePlayerItem>(nullptr));
 
     /// Delivers what waits: events, tasks, pictures.
     void settle();

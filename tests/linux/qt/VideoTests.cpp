@@ -1,7 +1,9 @@
 // A player's picture on the screen.
 #include "Stage.h"
 
+#include <algorithm>
 #include <functional>
+#include <numeric>
 
 namespace tests {
 
@@ -70,6 +72,37 @@ TEST_F(Video, AMovieThatCannotBePlayedSaysWhyWhereItsPictureWouldBe)
     std::dynamic_pointer_cast<FakePlayerItem>(player->currentItem())
         ->fail(base::Error::make("test", 1, "“holiday.mp4” is not a movie that can be opened."));
     EXPECT_GT(lightPixels(), 200);
+}
+
+TEST_F(Video, AMovieThatWasCutOffSaysSoOverItsFirstPictureBelowTheBar)
+{
+    constexpr std::uint32_t kWhite = 0xffffffff;
+    constexpr int kAbove = 80; // the window is low: the place of the bar is out of sight
+    const base::Rect frame = base::Rect::make(0, -kAbove, 200, 300);
+    const auto white = std::make_shared<FakeVideoFrame>(base::MediaTime::zero(), base::Size{200, 300}, kWhite);
+    const auto item = std::make_shared<FakePlayerItem>(std::make_shared<FakeAsset>(mainQueue, std::nullopt));
+    const auto player = addPlayer(frame, white, item);
+    const auto darkRows = [this] {
+        const QImage screen = look();
+        std::vector<int> rows;
+        std::vector<int> xs(static_cast<std::size_t>(std::min(200, screen.width())));
+        std::iota(xs.begin(), xs.end(), 0);
+        for (int y = 0; y < screen.height(); ++y)
+            if (std::any_of(xs.begin(), xs.end(), [&](int x) { return screen.pixelColor(x, y).lightness() < 100; }))
+                rows.push_back(y);
+        return rows;
+    };
+    EXPECT_THAT(darkRows(), ::testing::IsEmpty());
+    FakeMovie movie = FakeMovie::lasting(10);
+    movie.missing = "It was cut off.";
+    item->becomeReady(movie);
+    const auto plate = darkRows();
+    ASSERT_GT(plate.size(), 20U);
+    EXPECT_GE(plate.front(), 86 - kAbove) << "the upper bar covers it";
+    EXPECT_LT(plate.back(), 99) << "it ends in sight";
+    player->play();
+    player->show(white);
+    EXPECT_THAT(darkRows(), ::testing::IsEmpty());
 }
 
 TEST_F(Video, APictureIsConvertedOnceForItsSize)

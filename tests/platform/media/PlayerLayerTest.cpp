@@ -61,6 +61,25 @@ TEST_F(Layers, TellWhyAMovieCannotBePlayedAndAskToBeDrawnThen)
     EXPECT_GE(drawings, 1);
 }
 
+TEST_F(Layers, TellThatAMovieWasCutOffWhereItBeginsAndRests)
+{
+    auto movie = tests::FakeMovie::lasting(10);
+    movie.missing = "This recording was cut off.";
+    const auto player = playerOf(movie);
+    const auto layer = PlayerLayer::withPlayer(player);
+    mainQueue.drain();
+    EXPECT_EQ(layer->noticeText(), "This recording was cut off.");
+    player->play();
+    EXPECT_EQ(layer->noticeText(), "");
+    player->pause();
+    player->seekToTime(base::MediaTime::fromSeconds(3, 600));
+    mainQueue.drain();
+    EXPECT_EQ(layer->noticeText(), "");
+    layer->setPlayer(playerOf(tests::FakeMovie::lasting(5)));
+    mainQueue.drain();
+    EXPECT_EQ(layer->noticeText(), "") << "this one is whole";
+}
+
 TEST_F(Layers, LetGoOfAFormerPlayer)
 {
     const auto former = playerOf(tests::FakeMovie::lasting(10));

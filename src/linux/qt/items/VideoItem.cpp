@@ -20,6 +20,13 @@ constexpr double kWordsMargin = 24;
 constexpr double kWordsSize = 15;
 const QColor kWordsColor(255, 255, 255, 222);
 
+// What is said over a picture, in points: on a plate below the upper bar, which is 85 high where it is highest.
+constexpr double kNoticeTop = 97;
+constexpr double kNoticeSize = 13;
+constexpr double kNoticePadding = 10;
+constexpr double kNoticeRounding = 10;
+const QColor kPlateColor(0, 0, 0, 190); // white is readable on it also where the picture is white
+
 } // namespace
 
 void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
@@ -37,7 +44,8 @@ void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
     // A picture that rests is worth converting again when it was converted in haste.
     const bool good = m_frame == frame && m_picture.size() == size && m_quality >= quality;
     const QString words = frame ? QString() : QString::fromStdString(layer.failureText());
-    if (good && m_pictureRect == rect && m_shownSize == shownSize() && m_words == words)
+    const QString notice = frame ? QString::fromStdString(layer.noticeText()) : QString();
+    if (good && m_pictureRect == rect && m_shownSize == shownSize() && m_words == words && m_notice == notice)
         return;
     if (!good) {
         m_frame = frame;
@@ -48,10 +56,30 @@ void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
     m_pictureRect = m_picture.isNull() ? QRectF() : rect;
     m_shownSize = shownSize();
     m_words = words;
+    m_notice = notice;
     std::vector<Sprite> sprites{{ownRect(), Qt::black, {}, false}, {m_pictureRect, {}, m_picture, false}};
     if (!words.isEmpty())
         sprites.push_back(paintedSprite(ownRect(), stage().scale, [&](QPainter& painter) { drawWords(painter); }));
+    if (!notice.isEmpty())
+        sprites.push_back(paintedSprite(ownRect(), stage().scale, [&](QPainter& painter) { drawNotice(painter); }));
     setSprites(std::move(sprites));
+}
+
+void VideoItem::drawNotice(QPainter& painter) const
+{
+    constexpr int kLines = Qt::AlignHCenter | Qt::AlignTop | Qt::TextWordWrap;
+    const double width = std::min(kWordsWidth, ownRect().width() - 2 * (kWordsMargin + kNoticePadding));
+    QRectF column(0, kNoticeTop + kNoticePadding, std::max(0.0, width), ownRect().height());
+    column.moveLeft(ownRect().center().x() - column.width() / 2);
+    painter.setFont(systemFont(kNoticeSize));
+    const QRectF text = painter.boundingRect(column, kLines, m_notice);
+    painter.setRenderHint(QPainter::Antialiasing);
+    painter.setPen(Qt::NoPen);
+    painter.setBrush(kPlateColor);
+    painter.drawRoundedRect(text.adjusted(-kNoticePadding, -kNoticePadding, kNoticePadding, kNoticePadding),
+                            kNoticeRounding, kNoticeRounding);
+    painter.setPen(Qt::white);
+    painter.drawText(text, kLines, m_notice);
 }
 
 void VideoItem::drawWords(QPainter& painter) const

@@ -29,6 +29,7 @@ private:
     bool convert(const platform::VideoFrame& frame, QSize size, platform::VideoFrame::Quality quality);
     QImage& freeBuffer(QSize size);
     void drawWords(QPainter& painter) const;
+    void drawNotice(QPainter& painter) const;
 
     std::weak_ptr<platform::PlayerLayer> m_layer;
     platform::VideoFrameRef m_frame; ///< of the picture
@@ -36,7 +37,8 @@ private:
     QImage m_picture;
     QRectF m_pictureRect;
     QSizeF m_shownSize;
-    QString m_words; ///< what is said in place of a picture
+    QString m_words;  ///< what is said in place of a picture
+    QString m_notice; ///< what is said over it
     /// The scene still reads the last picture while the next one is converted.
     std::array<QImage, 3> m_buffers;
 };
