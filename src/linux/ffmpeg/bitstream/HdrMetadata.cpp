@@ -69,14 +69,18 @@ Bytes HdrMetadata::av1Units() const
 {
     constexpr std::uint8_t kMetadataWithSize = 5 << 3 | 2;
     Bytes units;
+    const auto begin = [&](std::uint8_t size, std::uint8_t kind) {
+        for (const std::uint8_t each : {kMetadataWithSize, size, kind})
+            units.push_back(each);
+    };
     if (light) {
-        units.insert(units.end(), {kMetadataWithSize, 1 + 4 + 1, 1});
+        begin(1 + 4 + 1, 1);
         put(units, *light);
         units.push_back(0x80);
     }
     if (display) {
         constexpr double kChromaticities = 1 << 16;
-        units.insert(units.end(), {kMetadataWithSize, 1 + 24 + 1, 2});
+        begin(1 + 24 + 1, 2);
         for (const auto& primary : display->display_primaries)
             for (const AVRational each : primary)
                 put(units, each, kChromaticities, 2);

@@ -161,7 +161,7 @@ base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDept
     request.options.insert({{"preset", kPreset}, {"a53cc", "0"}});
     // Only what is without loss itself can stand beside what may be: see h264::Sps.
     if (sps.bypassesTransform)
-        request.options["qp"] = "0";
+        request.options.emplace("qp", "0");
     else
         request.scale = kQuality;
     // Left to itself the preset makes a baseline stream, and decoders in hardware do not like the profile to change.
