@@ -1,5 +1,6 @@
 // Files that are no movies, or no longer: refused in one line, or shown as far as they go. Never a crash, never a loss.
 #include "end_to_end/Machine.h"
+#include "support/CaseName.h"
 #include "support/WithoutPrivileges.h"
 
 #include <gmock/gmock.h>
@@ -150,4 +151,4 @@ TEST_P(BrokenMovie, OpensInAnEditorThatStaysUsable)
 INSTANTIATE_TEST_SUITE_P(EndToEnd, BrokenMovie,
                          testing::Values("audio-only.m4a", "truncated.mp4", "corrupt.mp4", "one-frame.mp4",
                                          "size-change.ts"),
-                         [](const auto& broken) { return testName(broken.param); });
+                         [](const auto& broken) { return caseName(broken.param); });

@@ -2,6 +2,7 @@
 // the right colours.
 #include "end_to_end/Machine.h"
 #include "end_to_end/Screenshot.h"
+#include "support/CaseName.h"
 
 #include <gmock/gmock.h>
 
@@ -91,7 +92,7 @@ INSTANTIATE_TEST_SUITE_P(EndToEnd, TheFirstPicture,
                                          Shown{"rotated-clockwise.mp4", {640, 360, Turn::Clockwise}, 30, 0},
                                          Shown{"vfr.mkv", {640, 360}, 1000, 0}, Shown{"vp9.webm", {640, 360}, 30, 0, 8},
                                          Shown{"start-offset.mp4", {640, 360}, 30, 1.5}),
-                         [](const auto& shown) { return testName(shown.param.movie); });
+                         [](const auto& shown) { return caseName(shown.param.movie); });
 
 TEST(TheScreen, ShowsTheColoursThatWereRecorded)
 {

@@ -1,7 +1,5 @@
 #include "end_to_end/Machine.h"
 
-#include <algorithm>
-#include <cctype>
 #include <fcntl.h>
 #include <sstream>
 #include <sys/stat.h>
@@ -150,13 +148,6 @@ std::string Machine::remains() const
             if (isAbout(entry.path().filename(), "clipsa"))
                 text += entry.path().native() + "\n";
     return text;
-}
-
-std::string testName(std::string file)
-{
-    std::replace_if(
-        file.begin(), file.end(), [](unsigned char letter) { return std::isalnum(letter) == 0; }, '_');
-    return file;
 }
 
 } // namespace tests

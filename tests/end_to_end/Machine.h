@@ -55,7 +55,4 @@ private:
     std::map<std::string, std::string> m_environment;
 };
 
-/// A file's name as GoogleTest can have it in a test's.
-std::string testName(std::string file);
-
 } // namespace tests

@@ -2,6 +2,7 @@
 // tools/make-pictures makes.
 #include "end_to_end/Machine.h"
 #include "end_to_end/Screenshot.h"
+#include "support/CaseName.h"
 
 #include <gmock/gmock.h>
 
@@ -47,7 +48,7 @@ INSTANTIATE_TEST_SUITE_P(EndToEnd, Picture,
                          testing::Values("phone", "phone-landscape", "phone-without-home-button", "phone-dark",
                                          "phone-trim", "phone-dark-trim", "pad", "pad-without-home-button", "pad-flat",
                                          "pad-dark", "pad-trim"),
-                         [](const auto& picture) { return testName(picture.param); });
+                         [](const auto& picture) { return caseName(picture.param); });
 
 TEST(TurningAPhone, ToItsSideAndBackShowsWhatWasThere)
 {

@@ -1,8 +1,8 @@
 #include "linux/ffmpeg/FFmpegImageGenerator.h"
 #include "linux/ffmpeg/VideoSource.h"
+#include "support/CaseName.h"
 #include "support/EngineTest.h"
 
-#include <algorithm>
 #include <map>
 #include <mutex>
 #include <vector>
@@ -37,12 +37,7 @@ INSTANTIATE_TEST_SUITE_P(OfManyKinds, EdgesOfGroups,
                          testing::Values("refs-recorder.mp4", "refs-strict.mp4", "refs-deep.mp4", "refs-temporal.mp4",
                                          "refs-open.mp4", "refs-forward.mp4", "refs-hevc.mp4", "refs-hevc-open.mp4",
                                          "refs-vp9.webm", "refs-av1.mp4"),
-                         [](const auto& about) {
-                             std::string name = about.param;
-                             std::replace(name.begin(), name.end(), '-', '_');
-                             std::replace(name.begin(), name.end(), '.', '_');
-                             return name;
-                         });
+                         [](const auto& about) { return tests::caseName(about.param); });
 
 TEST_P(EdgesOfGroups, AreFoundByThePlayerFromAnywhere)
 {

@@ -1,4 +1,5 @@
 #include "linux/ffmpeg/images/PictureWalk.h"
+#include "support/CaseName.h"
 #include "support/EngineTest.h"
 
 #include <algorithm>
@@ -73,12 +74,8 @@ protected:
 constexpr const char* kMovies[] = {"refs-recorder.mp4",  "refs-strict.mp4", "refs-deep.mp4",    "refs-temporal.mp4",
                                    "refs-slices.mp4",    "refs-open.mp4",   "refs-forward.mp4", "refs-hevc.mp4",
                                    "refs-hevc-open.mp4", "refs-vp9.webm",   "refs-av1.mp4"};
-INSTANTIATE_TEST_SUITE_P(OfManyKinds, Walks, testing::ValuesIn(kMovies), [](const auto& about) {
-    std::string name = about.param;
-    std::replace_if(
-        name.begin(), name.end(), [](char c) { return !std::isalnum(static_cast<unsigned char>(c)); }, '_');
-    return name;
-});
+INSTANTIATE_TEST_SUITE_P(OfManyKinds, Walks, testing::ValuesIn(kMovies),
+                         [](const auto& about) { return tests::caseName(about.param); });
 
 TEST_P(Walks, ToSinglePicturesGiveThemBitForBit)
 {

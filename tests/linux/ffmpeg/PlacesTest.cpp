@@ -3,6 +3,7 @@
 #include "linux/ffmpeg/VideoSource.h"
 #include "linux/ffmpeg/exporting/sound/TrackPackets.h"
 #include "linux/ffmpeg/images/PictureWalk.h"
+#include "support/CaseName.h"
 #include "support/EngineTest.h"
 
 #include <algorithm>
@@ -109,12 +110,7 @@ INSTANTIATE_TEST_SUITE_P(ContainersOfEveryKind, PlacesIn,
                                          "theora.ogv", "h264.ts", "vp8-one-group.webm", "vp8-live.webm",
                                          "h264-one-group.mkv", "h264-live.mkv", "h264-live-one-group.mkv",
                                          "many-bytes.mkv", "sound.mkv", "sound-fragmented.mp4"),
-                         [](const auto& about) {
-                             std::string name = about.param;
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
-                         });
+                         [](const auto& about) { return tests::caseName(about.param); });
 
 TEST_P(PlacesIn, HaveTheirPictureInThePlayerWhereverOneComesFrom)
 {

@@ -2,6 +2,7 @@
 #include "linux/ffmpeg/FileMarks.h"
 #include "linux/ffmpeg/exporting/ExportTest.h"
 #include "linux/ffmpeg/exporting/sound/DecodedSound.h"
+#include "support/CaseName.h"
 
 #include <gmock/gmock.h>
 
@@ -76,11 +77,7 @@ TEST_P(ACutOffMovie, IsWholeWhereOnlyTheLastBytesAreMissing)
 
 INSTANTIATE_TEST_SUITE_P(, ACutOffMovie,
                          testing::Values("heavy.mkv", "heavy.avi", "heavy.flv", "heavy.asf", "vp8.webm"),
-                         [](const auto& each) {
-                             std::string name = each.param;
-                             std::replace(name.begin(), name.end(), '.', '_');
-                             return name;
-                         });
+                         [](const auto& each) { return caseName(each.param); });
 
 class Leftovers : public ExportTest {};
 

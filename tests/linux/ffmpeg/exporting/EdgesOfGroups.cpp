@@ -1,5 +1,6 @@
 // Cuts a few pictures before and behind a keyframe: every phase of what is reordered around it.
 #include "linux/ffmpeg/exporting/CutsTest.h"
+#include "support/CaseName.h"
 
 namespace tests {
 namespace {
@@ -44,10 +45,7 @@ INSTANTIATE_TEST_SUITE_P(, EdgesOfGroups,
                                          Groups{"hevc-open.mp4", 30, 60, 60, 2},
                                          Groups{"hevc-leading.mp4", 20, 40, 40, 3}),
                          [](const auto& each) {
-                             std::string name = each.param.file + ("_" + std::to_string(each.param.joint));
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
+                             return caseName(each.param.file + ("_" + std::to_string(each.param.joint)));
                          });
 
 } // namespace

@@ -1,5 +1,6 @@
 // Movies whose files cannot be read to the end, or become others meanwhile: what was made of them is not the movie.
 #include "linux/ffmpeg/exporting/ExportTest.h"
+#include "support/CaseName.h"
 
 #include <gmock/gmock.h>
 
@@ -119,12 +120,7 @@ TEST_P(AFailingSource, MayGetAnotherNameAndBeRemovedMeanwhile)
 INSTANTIATE_TEST_SUITE_P(, AFailingSource,
                          testing::Values("heavy.mp4", "heavy.mkv", "heavy.ts", "heavy.nut", "heavy.avi", "heavy.flv",
                                          "heavy.asf", "heavy-fragmented.mp4"),
-                         [](const auto& each) {
-                             std::string name = each.param;
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
-                         });
+                         [](const auto& each) { return caseName(each.param); });
 
 } // namespace
 } // namespace tests

@@ -3,6 +3,7 @@
 #include "linux/ffmpeg/bitstream/HevcHeaders.h"
 #include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/CutsTest.h"
+#include "support/CaseName.h"
 
 #include <gmock/gmock.h>
 
@@ -38,12 +39,7 @@ TEST_P(LosslessRecordings, AreCutWithoutLoss)
 INSTANTIATE_TEST_SUITE_P(, LosslessRecordings,
                          testing::Values("h264-lossless.mp4", "h264-lossless-444.mp4", "h264-lossless-10bit.mp4",
                                          "hevc-lossless.mp4"),
-                         [](const auto& each) {
-                             std::string name = each.param;
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
-                         });
+                         [](const auto& each) { return caseName(each.param); });
 
 TEST_F(JoinedHeaders, OfH264SayTheSameOfHowPicturesAreUsed)
 {

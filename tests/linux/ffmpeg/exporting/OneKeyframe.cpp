@@ -1,5 +1,6 @@
 // Movies as recorders of screens write them: behind one keyframe, or without a table.
 #include "linux/ffmpeg/exporting/CutsTest.h"
+#include "support/CaseName.h"
 
 namespace tests {
 namespace {
@@ -9,12 +10,7 @@ class AsRecorded : public CutsTest, public testing::WithParamInterface<const cha
 INSTANTIATE_TEST_SUITE_P(, AsRecorded,
                          testing::Values("vp8-one-group.webm", "vp8-live.webm", "h264-one-group.mkv", "h264-live.mkv",
                                          "h264-live-one-group.mkv"),
-                         [](const auto& each) {
-                             std::string name = each.param;
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
-                         });
+                         [](const auto& each) { return caseName(each.param); });
 
 TEST_P(AsRecorded, AMovieIsCutFromItsStart)
 {

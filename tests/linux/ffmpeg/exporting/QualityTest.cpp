@@ -1,5 +1,6 @@
 // What pictures cost that are encoded beside copied ones.
 #include "linux/ffmpeg/exporting/CutsTest.h"
+#include "support/CaseName.h"
 
 namespace tests {
 namespace {
@@ -41,12 +42,7 @@ TEST_P(EncodedHeads, CostNoMoreThanTheirSourcesDeserve)
 
 INSTANTIATE_TEST_SUITE_P(, EncodedHeads,
                          testing::Values("h264-coarse.mp4", "hevc-coarse.mp4", "vp9-coarse.webm", "av1-coarse.mp4"),
-                         [](const auto& each) {
-                             std::string name = each.param;
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
-                         });
+                         [](const auto& each) { return caseName(each.param); });
 
 } // namespace
 } // namespace tests

@@ -1,5 +1,6 @@
 // Random ranges of movies of every kind, each output decoded and compared with its source picture by picture.
 #include "linux/ffmpeg/exporting/CutsTest.h"
+#include "support/CaseName.h"
 
 #include <random>
 
@@ -49,14 +50,6 @@ TEST_P(RandomCuts, HaveExactlyTheirPictures)
         }
 }
 
-std::string nameOf(const testing::TestParamInfo<Kind>& each)
-{
-    std::string name = each.param.file;
-    std::replace_if(
-        name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-    return name;
-}
-
 INSTANTIATE_TEST_SUITE_P(
     , RandomCuts,
     testing::Values(
@@ -80,7 +73,7 @@ INSTANTIATE_TEST_SUITE_P(
         Kind{"av1.ivf", true, 51}, Kind{"vp9-422-10bit.mkv", true, 47}, Kind{"vp9-440.webm", false, 58},
         Kind{"sound-no-header.mp4", true, 52}, Kind{"sound-doubled.mkv", true, 53},
         Kind{"opus-fragmented.mp4", true, 54}),
-    nameOf);
+    [](const auto& each) { return caseName(each.param.file); });
 
 INSTANTIATE_TEST_SUITE_P(InOtherContainers, RandomCuts,
                          testing::Values(Kind{"h264.avi", true, 101}, Kind{"mpeg4.avi", false, 102},
@@ -89,7 +82,7 @@ INSTANTIATE_TEST_SUITE_P(InOtherContainers, RandomCuts,
                                          Kind{"theora.ogv", false, 107}, Kind{"vp8-one-group.webm", false, 108},
                                          Kind{"vp8-live.webm", false, 109}, Kind{"h264-one-group.mkv", false, 110},
                                          Kind{"h264-live.mkv", true, 111}, Kind{"h264-live-one-group.mkv", false, 112}),
-                         nameOf);
+                         [](const auto& each) { return caseName(each.param.file); });
 
 } // namespace
 } // namespace tests

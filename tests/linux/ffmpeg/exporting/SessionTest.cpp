@@ -1,6 +1,7 @@
 // What whoever exports sees: status, errors, ranges, what is kept.
 #include "linux/ffmpeg/exporting/ExportTest.h"
 #include "linux/ffmpeg/exporting/sound/DecodedSound.h"
+#include "support/CaseName.h"
 
 #include <gmock/gmock.h>
 
@@ -285,12 +286,7 @@ INSTANTIATE_TEST_SUITE_P(, BadMovies,
                          testing::Values("empty.mp4", "not-a-movie.mp4", "no-moov.mp4", "truncated.mp4", "corrupt.mp4",
                                          "audio-only.m4a", "one-frame.mp4", "size-change.ts", "edit-list.mp4",
                                          "start-offset.mp4", "vfr.mkv", "non-square.mp4", "does-not-exist.mp4"),
-                         [](const auto& each) {
-                             std::string name = each.param;
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
-                         });
+                         [](const auto& each) { return caseName(each.param); });
 
 TEST_F(AnExport, SaysWhatIsMissingOfATruncatedMovie)
 {

@@ -1,5 +1,6 @@
 // Movies that are exported from their beginning to their end: nothing is cut, so nothing need be encoded again.
 #include "linux/ffmpeg/exporting/CutsTest.h"
+#include "support/CaseName.h"
 
 namespace tests {
 namespace {
@@ -19,12 +20,7 @@ INSTANTIATE_TEST_SUITE_P(, WholeMovies,
                                          "h264-in-band.mp4", "hevc-b.mkv", "hevc-open.mp4", "vp9.webm",
                                          "vp9-hidden.webm", "av1-hidden.mkv", "av1.ivf", "h264-odd.mp4", "vp9-odd.webm",
                                          "h264-recorded.mkv", "h264-recorded-one.mkv", "h264.avi"),
-                         [](const auto& each) {
-                             std::string name = each.param;
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
-                         });
+                         [](const auto& each) { return caseName(each.param); });
 
 class Bursts : public CutsTest {};
 
@@ -76,12 +72,7 @@ INSTANTIATE_TEST_SUITE_P(, InterruptedMovies,
                          // One picture is left out, and 20 of its group follow it; in three parts two groups are whole.
                          testing::Values(Edited{"h264-edits.mp4", 128}, Edited{"h264-edits-b.mp4", 48},
                                          Edited{"h264-edits-back.mp4", 130}),
-                         [](const auto& each) {
-                             std::string name = each.param.file;
-                             std::replace_if(
-                                 name.begin(), name.end(), [](char c) { return c == '-' || c == '.'; }, '_');
-                             return name;
-                         });
+                         [](const auto& each) { return caseName(each.param.file); });
 
 } // namespace
 } // namespace tests

@@ -1,4 +1,5 @@
 // A track that is encoded in pieces, on all cores, is the same as one that is encoded from its start to its end.
+#include "DecodedSound.h"
 #include "SoundFiles.h"
 
 #include "linux/ffmpeg/exporting/sound/ChunkedEncoder.h"

@@ -1,3 +1,5 @@
+#include "DecodedSound.h"
+#include "ExportedSound.h"
 #include "SoundFiles.h"
 
 #include "linux/ffmpeg/exporting/sound/Limiter.h"

@@ -1,5 +1,7 @@
 #include "SoundFiles.h"
 
+#include "SoundOutput.h"
+
 #include "linux/ffmpeg/exporting/sound/AacFrame.h"
 
 extern "C" {
@@ -19,25 +21,6 @@ namespace tests {
 using namespace ffmpeg;
 
 namespace {
-
-struct ClosingOutput {
-    void operator()(AVFormatContext* context) const
-    {
-        if (context->pb)
-            avio_closep(&context->pb);
-        avformat_free_context(context);
-    }
-};
-using Output = std::unique_ptr<AVFormatContext, ClosingOutput>;
-
-Output newOutput(const std::string& path)
-{
-    AVFormatContext* context = nullptr;
-    EXPECT_GE(avformat_alloc_output_context2(&context, nullptr, nullptr, path.c_str()), 0) << path;
-    Output output(context);
-    EXPECT_GE(avio_open(&context->pb, path.c_str(), AVIO_FLAG_WRITE), 0) << path;
-    return output;
-}
 
 Owned<AVCodecContext> newEncoder(const SoundTrackSpec& spec)
 {
@@ -301,113 +284,6 @@ void makeSineWindowedFile(const std::string& path, const SoundTrackSpec& spec)
     std::vector<EncodedSound> tracks;
     tracks.push_back(std::move(both));
     writeTracks(path, {spec}, std::move(tracks));
-}
-
-platform::AudioMix mixOfAll(const std::string& path)
-{
-    auto file = OpenFile::open(path);
-    const auto opened = Movie::open(std::move(file).value(), nullptr);
-    platform::AudioMix mix;
-    for (const auto& track : opened.value()->tracks())
-        if (track.type == platform::MediaType::Audio)
-            mix.inputs.push_back({track.trackID});
-    return mix;
-}
-
-ExportedSound exportSound(const std::string& from, const std::string& into, double start, double to,
-                          const std::optional<platform::AudioMix>& mix)
-{
-    ExportedSound result;
-    auto file = OpenFile::open(from);
-    if (!file) {
-        result.error = file.error()->description();
-        return result;
-    }
-    const auto opened = Movie::open(std::move(file).value(), nullptr);
-    if (!opened) {
-        result.error = opened.error()->description();
-        return result;
-    }
-    const ExportRange range{base::MediaTime::fromSeconds(start, 90000),
-                            to < 0 ? opened.value()->duration() : base::MediaTime::fromSeconds(to, 90000)};
-    auto sources = openSoundSources(opened.value(), range, mix, SoundMode::Copy, nullptr,
-                                    [&](const std::string& line) { result.log.push_back(line); });
-    if (!sources) {
-        result.error = sources.error()->description();
-        return result;
-    }
-    result.tracks = sources.value().size();
-    if (sources.value().empty())
-        return result;
-    const auto output = newOutput(into);
-    std::vector<AVRational> timeBases;
-    for (const auto& source : sources.value()) {
-        AVStream* stream = avformat_new_stream(output.get(), nullptr);
-        const auto described = source->describe(*stream);
-        EXPECT_TRUE(described);
-        timeBases.push_back(stream->time_base);
-    }
-    AVDictionary* options = nullptr;
-    av_dict_set(&options, "avoid_negative_ts", "disabled", 0);
-    av_dict_set(&options, "movie_timescale", "90000", 0);
-    output->strict_std_compliance = FF_COMPLIANCE_EXPERIMENTAL; // for FLAC
-    const int begun = avformat_write_header(output.get(), &options);
-    av_dict_free(&options);
-    EXPECT_GE(begun, 0);
-    if (begun < 0)
-        return result;
-    const auto packet = newPacket();
-    for (std::size_t i = 0; i < sources.value().size(); ++i) {
-        std::int64_t last = INT64_MIN;
-        for (;;) {
-            const auto more = sources.value()[i]->next(*packet);
-            if (!more) {
-                result.error = more.error()->description();
-                break;
-            }
-            if (!more.value())
-                break;
-            EXPECT_GT(packet->dts, last) << "decode times must grow";
-            EXPECT_GT(packet->duration, 0);
-            last = packet->dts;
-            packet->stream_index = static_cast<int>(i);
-            av_packet_rescale_ts(packet.get(), timeBases[i], output->streams[i]->time_base);
-            EXPECT_GE(av_write_frame(output.get(), packet.get()), 0);
-        }
-    }
-    EXPECT_GE(av_write_trailer(output.get()), 0);
-    return result;
-}
-
-Signal speechLike(double level)
-{
-    return [=](double seconds, int channel) {
-        const double pi = std::numbers::pi;
-        double sum = 0;
-        for (int i = 1; i <= 5; ++i) {
-            const double frequency = 180.0 * i + 37.0 * channel;
-            // Each partial wanders and breathes in its own time.
-            sum += std::sin(2 * pi * frequency * seconds + 9 * std::sin(2 * pi * (0.31 + 0.13 * i) * seconds) * i)
-                   * (0.6 + 0.4 * std::sin(2 * pi * (1.7 + 0.6 * i) * seconds)) / i;
-        }
-        return level * sum / 2;
-    };
-}
-
-Signal humming(double level)
-{
-    return [=](double seconds, int channel) {
-        double sum = 0;
-        for (int i = 1; i <= 5; ++i)
-            sum += std::sin(2 * std::numbers::pi * (170.0 * i + 31.0 * channel) * seconds
-                            + 3 * std::sin(2 * std::numbers::pi * (0.11 + 0.03 * i) * seconds) * i)
-                   / i;
-        // With a little of each frequency, as there is in any room; nor does it begin at once.
-        auto noise = static_cast<std::uint32_t>(std::llround(seconds * 192000) * 2 + channel) * 2654435761u;
-        noise = (noise ^ noise >> 15) * 2246822519u;
-        sum += 0.01 * (static_cast<double>(noise ^ noise >> 13) / 2147483648.0 - 1);
-        return level * std::min(1.0, seconds / 0.5) * sum / 2;
-    };
 }
 
 } // namespace tests
