@@ -19,6 +19,7 @@ bool Mirror::commit()
 {
     ++m_stage.statistics.commits;
     m_stage.painted.clear();
+    m_messages.clear();
     m_animating = false;
     m_showsVideo = false;
     m_now = m_clock.now();
@@ -131,6 +132,8 @@ QRectF Mirror::visitLayer(const std::shared_ptr<platform::Layer>& layer, const A
     const bool visible = above.alpha > 0;
     item->setShown(false, 1, above.inGroup);
     item->refresh(*playerLayer, visible);
+    if (!item->message().isEmpty())
+        m_messages.push_back(item);
     if (visible) {
         m_stage.painted.push_back({item->windowRect(), Qt::black, nullptr});
         m_stage.painted.push_back({item->windowRect(), {}, item});

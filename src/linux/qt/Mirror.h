@@ -11,6 +11,7 @@
 
 #include <memory>
 #include <unordered_map>
+#include <vector>
 
 namespace qtui {
 
@@ -26,6 +27,8 @@ public:
     /// Null when the view is not in the tree.
     ViewItem* itemFor(const platform::View& view) const;
     std::size_t itemCount() const { return m_peers.size(); }
+    /// The videos that said something at the last commit, those behind first.
+    const std::vector<VideoItem*>& messages() const { return m_messages; }
     /// Whether a picture of a video could be seen at the last commit.
     bool showsVideo() const { return m_showsVideo; }
 
@@ -59,6 +62,7 @@ private:
     const base::Clock& m_clock;
     std::unordered_map<const void*, Peer> m_peers;
     std::vector<ViewItem*> m_created; ///< in the commit that is running
+    std::vector<VideoItem*> m_messages;
     FocusRing m_focusRing;
     base::Instant m_now{0};
     bool m_animating = false;

@@ -154,6 +154,105 @@ TEST_F(Accessible, WhatCannotBeSeenIsNotThere)
     EXPECT_EQ(root()->child(0)->childCount(), 0);
 }
 
+class SaidOfAVideo : public Stage {
+protected:
+    SaidOfAVideo()
+    {
+        add<platform::Toolbar>(base::Rect::make(0, 0, 200, 44));
+        movie.missing = "It was cut off.";
+    }
+
+    QAccessibleInterface* root() { return QAccessible::queryAccessibleInterface(&presenter->quickWindow()); }
+    std::shared_ptr<FakePlayer> addVideo(base::Rect frame)
+    {
+        item = std::make_shared<FakePlayerItem>(std::make_shared<FakeAsset>(mainQueue, std::nullopt));
+        return addPlayer(frame, white, item);
+    }
+    void showNow()
+    {
+        settle();
+        presenter->commit();
+    }
+    /// What is told with the next picture: each event with the name of what it is of.
+    std::vector<std::pair<QAccessible::Event, QString>> told()
+    {
+        showNow();
+        events.clear();
+        announcer.announce(dynamic_cast<qtui::StageWindow&>(presenter->quickWindow()));
+        return events;
+    }
+
+    using Event = std::pair<QAccessible::Event, QString>;
+    std::vector<Event> events;
+    qtui::Announcer announcer{[this](QAccessibleEvent* event) {
+        events.emplace_back(event->type(), event->accessibleInterface()->text(QAccessible::Name));
+    }};
+    FakeMovie movie = FakeMovie::lasting(10);
+    std::shared_ptr<FakePlayerItem> item;
+    platform::VideoFrameRef white =
+        std::make_shared<FakeVideoFrame>(base::MediaTime::zero(), base::Size{200, 100}, 0xffffffff);
+};
+
+TEST_F(SaidOfAVideo, IsAMessageOfTheWindowBeforeItsViews)
+{
+    addVideo(base::Rect::make(0, 0, 200, 100));
+    showNow();
+    ASSERT_EQ(root()->childCount(), 1) << "a picture says nothing";
+    item->becomeReady(movie);
+    showNow();
+    ASSERT_EQ(root()->childCount(), 2);
+    QAccessibleInterface* message = root()->child(0);
+    EXPECT_EQ(message->role(), QAccessible::AlertMessage);
+    EXPECT_EQ(message->text(QAccessible::Name), "It was cut off.");
+    EXPECT_EQ(message->parent(), root());
+    EXPECT_EQ(message->rect().size(), QSize(200, 100));
+    EXPECT_FALSE(message->state().invisible);
+    EXPECT_EQ(root()->indexOfChild(message), 0);
+    EXPECT_EQ(root()->child(1)->role(), QAccessible::ToolBar);
+    EXPECT_EQ(root()->child(2), nullptr);
+    const QPoint origin = presenter->quickWindow().position();
+    EXPECT_EQ(root()->childAt(origin.x() + 5, origin.y() + 5), root()->child(1)) << "which is in front";
+    EXPECT_EQ(root()->childAt(origin.x() + 5, origin.y() + 80), message);
+}
+
+TEST_F(SaidOfAVideo, IsWhyItCannotBePlayedToo)
+{
+    const auto broken = std::make_shared<FakePlayerItem>(nullptr);
+    addPlayer(base::Rect::make(0, 0, 200, 100), nullptr, broken);
+    broken->fail(base::Error::make("fake", -1, "It is damaged."));
+    showNow();
+    ASSERT_EQ(root()->childCount(), 2);
+    EXPECT_EQ(root()->child(0)->text(QAccessible::Name), "It is damaged.");
+}
+
+TEST_F(SaidOfAVideo, IsToldOnceAndGoesWhenItPlays)
+{
+    const auto player = addVideo(base::Rect::make(0, 0, 200, 100));
+    EXPECT_TRUE(told().empty());
+    item->becomeReady(movie);
+    EXPECT_EQ(told(), (std::vector<Event>{{QAccessible::ObjectShow, "It was cut off."},
+                                          {QAccessible::Alert, "It was cut off."}}));
+    EXPECT_TRUE(told().empty()) << "once";
+    player->play();
+    player->show(white);
+    EXPECT_EQ(told(), (std::vector<Event>{{QAccessible::ObjectHide, ""}}));
+    EXPECT_EQ(root()->childCount(), 1);
+    player->pause();
+    player->show(white);
+    EXPECT_EQ(told().size(), 2U);
+}
+
+TEST_F(SaidOfAVideo, IsNotThereWhileTheVideoIsOutOfSight)
+{
+    addVideo(base::Rect::make(0, 0, 200, 100));
+    item->becomeReady(movie);
+    showNow();
+    ASSERT_EQ(root()->childCount(), 2);
+    window->setAlpha(0);
+    showNow();
+    EXPECT_EQ(root()->childCount(), 1);
+}
+
 } // namespace
 
 } // namespace tests

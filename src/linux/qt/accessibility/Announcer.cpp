@@ -3,8 +3,7 @@
 #include "linux/qt/StageWindow.h"
 #include "linux/qt/accessibility/ViewAccessible.h"
 
-#include <QAccessible>
-
+#include <algorithm>
 #include <utility>
 
 namespace qtui {
@@ -28,6 +27,39 @@ Announcer::Announcer(std::function<void(QAccessibleEvent*)> tell)
 }
 
 void Announcer::announce(StageWindow& window)
+{
+    announceMessages(window);
+    announceFocus(window);
+}
+
+void Announcer::announceMessages(StageWindow& window)
+{
+    std::vector<Message> now;
+    for (VideoItem* item : window.mirror().messages())
+        now.push_back({item, item->message()});
+    const std::vector<Message> before = std::exchange(m_messages, now);
+    const auto find = [](const std::vector<Message>& all, const Message& wanted) {
+        return std::find_if(all.begin(), all.end(), [&](const Message& each) { return each.item == wanted.item; });
+    };
+    for (const Message& each : before)
+        if (each.item && find(now, each) == now.end())
+            tellOf(*each.item, QAccessible::ObjectHide);
+    for (const Message& each : now) {
+        const auto former = find(before, each);
+        if (former != before.end() && former->text == each.text)
+            continue;
+        tellOf(*each.item, former == before.end() ? QAccessible::ObjectShow : QAccessible::NameChanged);
+        tellOf(*each.item, QAccessible::Alert);
+    }
+}
+
+void Announcer::tellOf(QObject& item, QAccessible::Event kind) const
+{
+    QAccessibleEvent event(&item, kind);
+    m_tell(&event);
+}
+
+void Announcer::announceFocus(StageWindow& window)
 {
     const auto focused = window.views().focusedView();
     const auto previous = std::exchange(m_focused, focused);

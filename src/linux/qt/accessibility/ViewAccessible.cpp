@@ -2,6 +2,7 @@
 
 #include "linux/qt/Mirror.h"
 #include "linux/qt/StageWindow.h"
+#include "linux/qt/accessibility/MessageAccessible.h"
 #include "linux/qt/accessibility/WorkAccessible.h"
 #include "linux/qt/items/WorkLine.h"
 
@@ -221,18 +222,25 @@ public:
     QAccessibleInterface* parent() const override { return QAccessible::queryAccessibleInterface(qApp); }
     QAccessibleInterface* child(int index) const override
     {
-        const auto below = accessibleChildren(m_window.views());
-        const int count = static_cast<int>(below.size());
-        if (index == count && m_window.workLine().isUnderWay())
-            return QAccessible::queryAccessibleInterface(&m_window.workLine());
-        if (index < 0 || index >= count)
+        if (index < 0)
             return nullptr;
-        return interfaceFor(m_window, *below[static_cast<std::size_t>(index)]);
+        auto at = static_cast<std::size_t>(index);
+        const auto& messages = m_window.mirror().messages();
+        if (at < messages.size())
+            return QAccessible::queryAccessibleInterface(messages[at]);
+        at -= messages.size();
+        const auto below = accessibleChildren(m_window.views());
+        if (at < below.size())
+            return interfaceFor(m_window, *below[at]);
+        return at == below.size() && m_window.workLine().isUnderWay()
+                   ? QAccessible::queryAccessibleInterface(&m_window.workLine())
+                   : nullptr;
     }
-    /// Behind the views comes what is under way, if anything is.
+    /// First comes what videos say, which are drawn behind the views; last what is under way, if anything is.
     int childCount() const override
     {
-        return static_cast<int>(accessibleChildren(m_window.views()).size()) + m_window.workLine().isUnderWay();
+        return static_cast<int>(m_window.mirror().messages().size() + accessibleChildren(m_window.views()).size())
+               + m_window.workLine().isUnderWay();
     }
     int indexOfChild(const QAccessibleInterface* child) const override { return indexOf(*this, child); }
     QAccessibleInterface* childAt(int x, int y) const override { return deepestAt(*this, x, y); }
@@ -266,6 +274,8 @@ QAccessibleInterface* makeInterface(const QString&, QObject* object)
         return new WindowAccessible(*window);
     if (auto* item = dynamic_cast<ViewItem*>(object))
         return new ViewAccessible(*item);
+    if (auto* video = dynamic_cast<VideoItem*>(object))
+        return makeMessageAccessible(*video);
     if (auto* line = dynamic_cast<WorkLine*>(object))
         return makeWorkAccessible(*line);
     return nullptr;

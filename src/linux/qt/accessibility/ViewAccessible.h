@@ -5,11 +5,14 @@
 
 #include "platform/views/View.h"
 
+#include <QAccessible>
+#include <QPointer>
+#include <QQuickItem>
+#include <QString>
+
 #include <functional>
 #include <memory>
 #include <vector>
-
-class QAccessibleEvent;
 
 namespace qtui {
 
@@ -31,9 +34,19 @@ public:
     void announce(StageWindow& window);
 
 private:
+    struct Message {
+        QPointer<QQuickItem> item;
+        QString text;
+    };
+
+    void announceFocus(StageWindow& window);
+    void announceMessages(StageWindow& window);
+    void tellOf(QObject& item, QAccessible::Event kind) const;
+
     std::function<void(QAccessibleEvent*)> m_tell;
     std::weak_ptr<platform::View> m_focused;
     double m_number = 0; ///< of the focused view, where it has one
+    std::vector<Message> m_messages;
 };
 
 /// Tell who listens that an item has come, or is about to go. Nothing when nobody listens.

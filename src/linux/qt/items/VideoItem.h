@@ -20,6 +20,8 @@ public:
     /// Fetches the player's picture when it is another one. Nothing is converted while nobody can see it.
     void refresh(platform::PlayerLayer& layer, bool visible);
 
+    /// What is said over the picture or in its place, where it can be seen; else empty.
+    QString message() const { return !m_isSeen ? QString() : m_words.isEmpty() ? m_notice : m_words; }
     /// As it was last converted; null until there was one.
     const QImage& picture() const { return m_picture; }
     /// Where it stands, in window coordinates.
@@ -37,6 +39,7 @@ private:
     QImage m_picture;
     QRectF m_pictureRect;
     QSizeF m_shownSize;
+    bool m_isSeen = false;
     QString m_words;  ///< what is said in place of a picture
     QString m_notice; ///< what is said over it
     /// The scene still reads the last picture while the next one is converted.
