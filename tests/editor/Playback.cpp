@@ -5,7 +5,20 @@ using platform::PlayerItem;
 
 namespace {
 
-class Playback : public EditorTest {};
+class Playback : public EditorTest {
+protected:
+    /// Playing from here goes on to the end of the movie, which shows bars and start again.
+    void expectTheEndShowsTheBarsAndTheStart()
+    {
+        editor->playAction();
+        EXPECT_TRUE(editor->isUIHidden());
+        player().advance(20);
+        settle();
+        EXPECT_FALSE(player().isPlaying());
+        EXPECT_FALSE(editor->isUIHidden());
+        EXPECT_EQ(player().currentTime(), MediaTime::zero());
+    }
+};
 
 } // namespace
 
@@ -166,14 +179,8 @@ TEST_F(Playback, AFormerEndStaysAttachedAndKeepsPausing)
 TEST_F(Playback, TheEndOfTheMovieShowsTheBarsPlayAndTheStart)
 {
     open();
-    editor->playAction();
-    EXPECT_TRUE(editor->isUIHidden());
-    player().advance(20);
-    settle();
-    EXPECT_FALSE(player().isPlaying());
-    EXPECT_FALSE(editor->isUIHidden());
+    expectTheEndShowsTheBarsAndTheStart();
     EXPECT_EQ(bottom(), (Items{editor->shareButton(), editor->flexSpace(), editor->playButton(), editor->flexSpace()}));
-    EXPECT_EQ(player().currentTime(), MediaTime::zero());
     EXPECT_EQ(editor->avTrimmer()->value(), 0);
 }
 
@@ -182,13 +189,7 @@ TEST_F(Playback, ATrimThatEndsWithTheMovieShowsTheBarsPlayAndTheStartToo)
     open();
     trimFrom(5, editor->getPlayerDuration());
     for (int run = 0; run < 2; ++run) {
-        editor->playAction();
-        EXPECT_TRUE(editor->isUIHidden());
-        player().advance(20);
-        settle();
-        EXPECT_FALSE(player().isPlaying());
-        EXPECT_FALSE(editor->isUIHidden());
-        EXPECT_EQ(player().currentTime(), MediaTime::zero());
+        expectTheEndShowsTheBarsAndTheStart();
         EXPECT_TRUE(editor->isTrimming());
     }
 }
