@@ -1,5 +1,7 @@
 #include "linux/ffmpeg/CubebOutput.h"
 
+#include "linux/ffmpeg/DevicePlace.h"
+
 #include <cubeb/cubeb.h>
 
 #include <algorithm>
@@ -13,14 +15,10 @@ namespace ffmpeg {
 
 namespace {
 
-using SteadyClock = std::chrono::steady_clock;
-
-/// Silence that a device is given first: servers and amplifiers swallow the first 10 to 20 ms of what they begin with.
-constexpr std::int64_t kLeadIn = kSampleRate / 25;
-/// Between two places that a device tells; longer ones are those of a device that stands still.
-constexpr std::int64_t kLongestStep = kSampleRate / 40;
-/// A device that asks for samples, and has not told where it is for so long, never will.
-constexpr std::chrono::milliseconds kLongestSilence{500};
+base::Instant now()
+{
+    return std::chrono::steady_clock::now().time_since_epoch();
+}
 
 struct Context {
     cubeb* handle = nullptr;
@@ -67,25 +65,8 @@ public:
         std::uint64_t place = 0;
         // Without the lock: the device has one of its own, and holds it while it wants data.
         const bool isKnown = cubeb_stream_get_position(m_stream, &place) == CUBEB_OK;
-        const auto now = SteadyClock::now();
         const std::lock_guard lock(m_mutex);
-        const auto framesFrom = [&](SteadyClock::time_point from) {
-            return static_cast<std::int64_t>(std::chrono::duration<double>(now - from).count() * kSampleRate);
-        };
-        if (m_failedAt)
-            // A device that has died is not waited for: pictures go on in silence.
-            return m_heard = std::max(m_heard, m_heardAtFailure + framesFrom(*m_failedAt));
-        if (isKnown && static_cast<std::int64_t>(place) > m_place) {
-            m_place = static_cast<std::int64_t>(place);
-            m_placedAt = now;
-        }
-        std::int64_t heard = m_place;
-        if (m_place > 0)
-            heard += std::min(framesFrom(m_placedAt), kLongestStep); // some tell it in steps
-        else if (m_askedAt && now - *m_askedAt > kLongestSilence)
-            heard = m_before + framesFrom(m_latestAt) - kFramesAhead; // it never tells
-        m_heard = std::max(m_heard, std::min(heard, m_given) - kLeadIn);
-        return m_heard;
+        return m_place.heard(isKnown ? std::optional(static_cast<std::int64_t>(place)) : std::nullopt, now());
     }
 
 private:
@@ -94,14 +75,11 @@ private:
         auto& me = *static_cast<CubebOutput*>(self);
         auto* samples = static_cast<float*>(output);
         // Only this thread changes what was given.
-        const std::int64_t silent = std::clamp<std::int64_t>(kLeadIn - me.m_given, 0, frames);
+        const std::int64_t silent = std::clamp<std::int64_t>(DevicePlace::kLeadIn - me.m_place.given(), 0, frames);
         std::fill_n(samples, 2 * silent, 0.0f);
         me.m_fill(samples + 2 * silent, static_cast<std::size_t>(frames - silent));
         const std::lock_guard lock(me.m_mutex);
-        me.m_latestAt = SteadyClock::now();
-        me.m_askedAt = me.m_askedAt.value_or(me.m_latestAt);
-        me.m_before = me.m_given;
-        me.m_given += frames;
+        me.m_place.give(frames, now());
         return frames;
     }
     static void stateChanged(cubeb_stream*, void* self, cubeb_state state)
@@ -110,8 +88,7 @@ private:
             return;
         auto& me = *static_cast<CubebOutput*>(self);
         const std::lock_guard lock(me.m_mutex);
-        me.m_heardAtFailure = me.m_heard;
-        me.m_failedAt = me.m_failedAt.value_or(SteadyClock::now());
+        me.m_place.fail(now());
     }
 
     std::shared_ptr<Context> m_context;
@@ -119,15 +96,7 @@ private:
     cubeb_stream* m_stream = nullptr;
 
     mutable std::mutex m_mutex;
-    std::optional<SteadyClock::time_point> m_askedAt; ///< first
-    SteadyClock::time_point m_latestAt{};             ///< that it asked
-    std::int64_t m_before = 0;                        ///< given before that
-    std::int64_t m_given = 0;
-    mutable std::int64_t m_place = 0; ///< where the device says it is; 0 until it does
-    mutable SteadyClock::time_point m_placedAt{};
-    std::optional<SteadyClock::time_point> m_failedAt;
-    std::int64_t m_heardAtFailure = 0;
-    mutable std::int64_t m_heard = 0;
+    mutable DevicePlace m_place;
 };
 
 } // namespace
