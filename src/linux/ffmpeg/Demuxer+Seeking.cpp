@@ -4,6 +4,7 @@
 #include "linux/ffmpeg/PacketIndex.h"
 
 #include <algorithm>
+#include <array>
 #include <limits>
 #include <utility>
 
@@ -13,6 +14,10 @@ namespace {
 
 /// The time of an entry of Matroska's table that lies behind all others.
 constexpr std::int64_t kBehindAll = std::numeric_limits<std::int64_t>::max() / 2;
+
+/// Bytes. In some streams what follows a place begins with the rest of a picture, and is taken for one with the next:
+/// so far before it another one begins.
+constexpr std::int64_t kBefore = 128 << 10;
 
 std::int64_t timeOf(const AVPacket& packet)
 {
@@ -70,14 +75,28 @@ bool Demuxer::seekToByte(std::int64_t position)
 
 bool Demuxer::seekTo(int stream, const PacketEntry& packet)
 {
-    for (const Way way : {m_way, m_way == Way::ByPlace ? Way::ByTime : Way::ByPlace}) {
-        const bool went = way == Way::ByPlace ? seekToByte(packet.position) : seek(stream, packet.pts);
-        if (went && readUpTo(stream, packet)) {
+    std::array ways{Way::ByPlace, Way::BeforePlace, Way::ByTime};
+    std::iter_swap(ways.begin(), std::find(ways.begin(), ways.end(), m_way));
+    for (const Way way : ways) {
+        if (go(way, stream, packet) && readUpTo(stream, packet)) {
             m_way = way;
             return true;
         }
     }
     return startOver() && readUpTo(stream, packet);
+}
+
+bool Demuxer::go(Way way, int stream, const PacketEntry& packet)
+{
+    switch (way) {
+    case Way::ByPlace:
+        return seekToByte(packet.position);
+    case Way::BeforePlace:
+        return packet.position > 0 && seekToByte(std::max<std::int64_t>(0, packet.position - kBefore));
+    case Way::ByTime:
+        return seek(stream, packet.pts);
+    }
+    return false;
 }
 
 bool Demuxer::readUpTo(int stream, const PacketEntry& wanted)
@@ -108,12 +127,16 @@ bool Demuxer::seekToStart(int stream)
 bool Demuxer::startOver()
 {
     leave();
+    const std::int64_t position = m_position;
+    const bool hasLooked = m_hasLookedAtPackets;
     Owned<AVIOContext> io = std::move(m_io);
     Owned<AVFormatContext> before = std::move(m_context); // ends before what it reads through
     if (const int error = begin(); error < 0) {
         m_lost = m_readError != 0 ? m_readError : error; // it stands where nobody wants to read
         m_context = std::move(before);
         m_io = std::move(io);
+        m_position = position; // where its buffer ends
+        m_hasLookedAtPackets = hasLooked;
         return false;
     }
     if (isMatroska())
@@ -137,8 +160,16 @@ void Demuxer::keepTable(AVFormatContext& before)
 
 bool Demuxer::findsKeyframes(int stream)
 {
-    // Of Matroska whoever has not read a packet knows what its table says, and nothing else.
-    return isMov() || (isMatroska() && m_isFresh && seek(stream, 0));
+    if (!isMatroska() || !m_isFresh)
+        return isMov();
+    const std::int64_t lookedTo = m_hasLookedAtPackets ? avio_tell(m_context->pb) : 0;
+    if (!seek(stream, 0))
+        return false;
+    // Of Matroska whoever has not read a packet knows what its table says, and nothing else; who has looked at some knows
+    // their keyframes too. The last entry is ours.
+    AVStream& about = this->stream(stream);
+    const AVIndexEntry* last = avformat_index_get_entry(&about, avformat_index_get_entries_count(&about) - 2);
+    return last && last->pos >= lookedTo;
 }
 
 } // namespace ffmpeg

@@ -46,7 +46,7 @@ public:
     bool seek(int stream, std::int64_t timestamp);
     /// The same for sound, to `moment` in microseconds of the file's own time; `pictures` is the picture stream, or -1.
     bool seekSound(int sound, int pictures, std::int64_t moment);
-    /// What is read next of `stream` is this packet, with the times that it has for who reads the file from its start.
+    /// What is read next of `stream` is this packet, with the time that it has for who reads the file from its start.
     /// No other stream may be selected. False when it is not found; the reader stands anywhere then.
     bool seekTo(int stream, const PacketEntry& packet);
     /// To the first packet of all.
@@ -64,13 +64,14 @@ public:
 private:
     Demuxer(std::shared_ptr<OpenFile> file, Cancelled cancelled);
 
-    enum class Way { ByPlace, ByTime };
+    enum class Way { ByPlace, BeforePlace, ByTime };
 
     int begin();
     void leave();
     bool startOver();
     void keepTable(AVFormatContext& before);
     bool seekToByte(std::int64_t position);
+    bool go(Way way, int stream, const PacketEntry& packet);
     bool readUpTo(int stream, const PacketEntry& wanted);
 
     static int readBytes(void* self, std::uint8_t* into, int count);

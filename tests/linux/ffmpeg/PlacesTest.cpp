@@ -5,6 +5,7 @@
 #include "linux/ffmpeg/images/PictureWalk.h"
 #include "support/CaseName.h"
 #include "support/EngineTest.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <algorithm>
 #include <cmath>
@@ -52,10 +53,37 @@ protected:
         takeAll();
         return all;
     }
-    static std::vector<Shown> shuffled(std::vector<Shown> all)
+    template <typename Item> static std::vector<Item> shuffled(std::vector<Item> all)
     {
         std::shuffle(all.begin(), all.end(), std::mt19937(7));
         all.resize(std::min<std::size_t>(all.size(), 24));
+        return all;
+    }
+    /// What tells one packet from the others, with its times.
+    struct Read {
+        std::int64_t pts, dts, position;
+        std::vector<std::uint8_t> bytes;
+        /// Where pictures are reordered, some formats do not know at once when they are decoded.
+        bool operator==(const Read& other) const
+        {
+            const bool isTimed = dts != AV_NOPTS_VALUE && other.dts != AV_NOPTS_VALUE;
+            return pts == other.pts && (dts == other.dts || !isTimed) && position == other.position
+                   && bytes == other.bytes;
+        }
+    };
+    std::unique_ptr<ffmpeg::Demuxer> picturesOnly() const
+    {
+        auto demuxer = std::move(ffmpeg::Demuxer::open(opened->file(), cancelled)).value();
+        demuxer->select({opened->video()->stream});
+        return demuxer;
+    }
+    /// What comes next, as many as there are.
+    static std::vector<Read> read(ffmpeg::Demuxer& demuxer, std::size_t atMost)
+    {
+        std::vector<Read> all;
+        const auto packet = ffmpeg::newPacket();
+        while (all.size() < atMost && demuxer.read(*packet) == 0)
+            all.push_back({packet->pts, packet->dts, packet->pos, {packet->data, packet->data + packet->size}});
         return all;
     }
     static std::vector<float> mix(SoundMixer& from, double seconds)
@@ -155,6 +183,42 @@ TEST_P(PlacesIn, HaveTheirSoundWhereverOneComesFrom)
     }
 }
 
+TEST_P(PlacesIn, HaveThePacketsThatComeThereFromTheStart)
+{
+    ASSERT_NO_FATAL_FAILURE(use(GetParam()));
+    const auto all = read(*picturesOnly(), 1000);
+    const auto index = opened->packetIndex(cancelled);
+    ASSERT_EQ(all.size(), index->packets().size());
+    const auto demuxer = picturesOnly();
+    for (const auto& wanted : shuffled(index->packets())) {
+        const auto isWanted = [&](const Read& each) {
+            return each.position == wanted.position && (each.pts == wanted.pts || each.dts == wanted.pts)
+                   && each.bytes.size() == std::size_t(wanted.size);
+        };
+        const auto from = std::find_if(all.begin(), all.end(), isWanted);
+        ASSERT_NE(from, all.end());
+        ASSERT_TRUE(demuxer->seekTo(opened->video()->stream, wanted)) << wanted.pts;
+        const auto some = read(*demuxer, 20);
+        ASSERT_EQ(some.size(), std::min<std::size_t>(20, std::size_t(all.end() - from)));
+        EXPECT_TRUE(std::equal(some.begin(), some.end(), from)) << wanted.pts;
+    }
+}
+
+TEST_P(PlacesIn, AreGoneToWithoutComingFromTheStart)
+{
+    ASSERT_NO_FATAL_FAILURE(use(GetParam()));
+    auto keyframes = opened->packetIndex(cancelled)->packets();
+    std::erase_if(keyframes, [](const auto& each) { return !each.isKey; });
+    const auto demuxer = picturesOnly();
+    const std::int64_t before = bytesRead();
+    for (const auto& wanted : shuffled(keyframes))
+        EXPECT_TRUE(demuxer->seekTo(opened->video()->stream, wanted));
+    // A program stream has no marks where its pictures begin, which is found out from one before.
+    const std::int64_t size = opened->file()->size();
+    const std::int64_t most = std::string(GetParam()) == "mpeg2.mpg" ? size : std::max<std::int64_t>(size / 2, 80'000);
+    EXPECT_LT(bytesRead() - before, std::int64_t(keyframes.size()) * most);
+}
+
 TEST_F(Places, InAMovieWithATableAreFoundWithoutReadingOnToItsEnd)
 {
     ASSERT_NO_FATAL_FAILURE(use("many-bytes.mkv"));
@@ -192,7 +256,7 @@ TEST_F(Places, AtAPicturesPlaceHaveSoundThatBeginsShortlyBefore)
 
 TEST_F(Places, AreFoundByATableOnlyWhereThereIsOne)
 {
-    for (const auto* name : {"vp8-one-group.webm", "vp8-live.webm", "h264-live.mkv"}) {
+    for (const auto* name : {"vp8-one-group.webm", "vp8-live.webm", "h264-live.mkv", "h264-recorded.mkv"}) {
         ASSERT_NO_FATAL_FAILURE(use(name));
         EXPECT_FALSE(opened->hasTable(cancelled)) << name;
     }
@@ -200,6 +264,24 @@ TEST_F(Places, AreFoundByATableOnlyWhereThereIsOne)
         ASSERT_NO_FATAL_FAILURE(use(name));
         EXPECT_TRUE(opened->hasTable(cancelled)) << name;
     }
+}
+
+TEST_F(Places, AreStillFoundWhereStartingOverFailedForAMoment)
+{
+    ASSERT_NO_FATAL_FAILURE(use("h264.ts"));
+    const auto all = read(*picturesOnly(), 1000);
+    const auto index = opened->packetIndex(cancelled);
+    const auto demuxer = picturesOnly();
+    ASSERT_EQ(read(*demuxer, 1000).size(), all.size());
+    tests::whileRefusing({{SYS_pread64, EIO}}, [&] {
+        EXPECT_FALSE(demuxer->seekToStart(0));
+        EXPECT_EQ(read(*demuxer, 1).size(), 0U) << "it stands nowhere";
+    });
+    const std::int64_t last = std::prev(all.end(), 15)->pts;
+    ASSERT_TRUE(demuxer->seekTo(opened->video()->stream, *index->keyframeAt(last)));
+    const auto rest = read(*demuxer, 1000);
+    ASSERT_LT(rest.size(), 40U);
+    EXPECT_TRUE(std::equal(rest.begin(), rest.end(), all.end() - std::ssize(rest)));
 }
 
 TEST_F(Places, AtTheStartCostAReaderThatWasNeverMovedNothing)
