@@ -4,6 +4,7 @@
 #include <array>
 #include <bit>
 #include <functional>
+#include <iterator>
 #include <string_view>
 #include <vector>
 
@@ -16,6 +17,7 @@ using namespace std::string_view_literals;
 constexpr std::size_t kHead = 4096;
 /// A fragmented file has thousands of boxes, and an index of none of them to miss.
 constexpr int kMostBoxes = 64;
+constexpr int kMostParts = 4096; ///< of AVI, of a gigabyte each
 constexpr std::int64_t kLargest = std::int64_t(1) << 56;
 
 /// The first bytes of the file.
@@ -90,11 +92,37 @@ std::optional<std::int64_t> sizeOfMatroska(const Head& head)
     return segment ? std::optional(static_cast<std::int64_t>(at) + *segment) : std::nullopt;
 }
 
-/// The property of the whole file (ASF, 3.2): an id of its own, then the size.
+/// Of AVI, and of all its parts where it has several because one would be too long (OpenDML).
+std::optional<std::int64_t> sizeOfRiff(const OpenFile& file)
+{
+    const std::int64_t size = file.size();
+    std::optional<std::int64_t> end;
+    std::int64_t at = 0;
+    for (int parts = 0; parts < kMostParts && at < size; ++parts) {
+        std::array<std::uint8_t, 8> header{};
+        if (file.read(at, header.data(), header.size()) < std::ssize(header)
+            || !std::equal(header.begin(), header.begin() + 4, "RIFF"))
+            break;
+        std::uint32_t length = 0;
+        for (std::size_t i = header.size(); i-- > 4;)
+            length = length << 8 | header.at(i);
+        if (length == 0 || length == 0xFFFFFFFF)
+            break;
+        at += std::int64_t{8} + length;
+        end = at;
+        at += length % 2;
+    }
+    return end;
+}
+
+/// The property of the whole file (ASF, 3.2): an id of its own, then the size, which does not count where it was sent as
+/// it was made.
 std::optional<std::int64_t> sizeOfAsf(const Head& head)
 {
     const auto at = head.find("\xA1\xDC\xAB\x8C\x47\xA9\xCF\x11\x8E\xE4\x00\xC0\x0C\x20\x53\x65"sv);
-    return at ? plausible(head.littleEndian(*at + 40, 8)) : std::nullopt;
+    if (!at || head.littleEndian(*at + 88, 4) & 1)
+        return std::nullopt;
+    return plausible(head.littleEndian(*at + 40, 8));
 }
 
 /// FLV has none of its own, but most writers tell in the metadata.
@@ -113,6 +141,11 @@ bool isMp4(const Head& head)
     constexpr std::array kFirst = {"ftyp"sv, "moov"sv, "mdat"sv, "free"sv, "skip"sv, "wide"sv, "pnot"sv};
     return std::any_of(kFirst.begin(), kFirst.end(), [&](std::string_view each) { return head.has(each, 4); });
 }
+
+/// What a movie consists of: ISO 14496-12 and QuickTime.
+constexpr std::array kBoxes = {"ftyp"sv, "styp"sv, "moov"sv, "mdat"sv, "moof"sv, "mfra"sv,
+                               "free"sv, "skip"sv, "wide"sv, "uuid"sv, "meta"sv, "udta"sv,
+                               "sidx"sv, "ssix"sv, "prft"sv, "emsg"sv, "pdin"sv, "pnot"sv};
 
 /// Tells the name and the end of each box of an MP4 file, until `take` wants no more.
 void walkBoxes(const OpenFile& file, const std::function<bool(std::string_view, std::int64_t)>& take)
@@ -149,10 +182,8 @@ std::optional<std::int64_t> announcedSize(const OpenFile& file)
     const Head head(file);
     if (head.has("\x1A\x45\xDF\xA3"sv, 0))
         return sizeOfMatroska(head);
-    if (head.has("RIFF"sv, 0)) {
-        const std::uint64_t size = head.littleEndian(4, 4);
-        return size != 0 && size != 0xFFFFFFFF ? std::optional(static_cast<std::int64_t>(size) + 8) : std::nullopt;
-    }
+    if (head.has("RIFF"sv, 0))
+        return sizeOfRiff(file);
     if (head.has("\x30\x26\xB2\x75\x8E\x66\xCF\x11"sv, 0))
         return sizeOfAsf(head);
     if (head.has("FLV"sv, 0))
@@ -160,9 +191,12 @@ std::optional<std::int64_t> announcedSize(const OpenFile& file)
     if (!isMp4(head))
         return std::nullopt;
     std::optional<std::int64_t> end;
-    walkBoxes(file, [&](std::string_view, std::int64_t boxEnd) {
-        end = boxEnd;
-        return true;
+    walkBoxes(file, [&](std::string_view name, std::int64_t boxEnd) {
+        // What some devices put behind a movie is no box, and its first letters no length.
+        const bool isBox = std::find(kBoxes.begin(), kBoxes.end(), name) != kBoxes.end();
+        if (isBox)
+            end = boxEnd;
+        return isBox;
     });
     return end;
 }
