@@ -159,9 +159,12 @@ base::Result<void> Movie::decodeFirstFrame(const Cancelled& cancelled)
         if (!m_firstFrame)
             m_firstFrame = decoder.value()->receive();
     }
-    if (!m_firstFrame)
-        return error == AVERROR_EXIT ? Error::make("ffmpeg", error, "it is no longer wanted")
-                                     : Error::make("ffmpeg", AVERROR_INVALIDDATA, "it holds no picture");
+    if (!m_firstFrame) {
+        const int why = m_spare->readError() != 0 ? m_spare->readError() : error;
+        const bool isItsFault = why == 0 || why == AVERROR_EOF || why == AVERROR_INVALIDDATA;
+        return isItsFault ? Error::make("ffmpeg", AVERROR_INVALIDDATA, "it holds no picture")
+                          : Error::make("ffmpeg", why, textOf(why));
+    }
 
     AVStream& about = m_spare->stream(stream);
     auto* picture = const_cast<AVFrame*>(&m_firstFrame->picture()); // only read; FFmpeg's signature lacks the const

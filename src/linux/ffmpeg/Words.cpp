@@ -3,6 +3,7 @@
 #include "base/Error.h"
 #include "linux/ffmpeg/Libraries.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 
@@ -43,8 +44,10 @@ std::string textOf(int avError)
 std::string lengthInWords(double seconds)
 {
     char text[32];
-    const auto whole = static_cast<long long>(seconds);
-    if (whole < 60)
+    const auto whole = std::max(60LL, static_cast<long long>(seconds));
+    if (seconds < 0.1)
+        std::snprintf(text, sizeof text, "%.2f s", seconds);
+    else if (seconds < 59.95) // which is not "60.0 s"
         std::snprintf(text, sizeof text, "%.1f s", seconds);
     else if (whole < 3600)
         std::snprintf(text, sizeof text, "%lld:%02lld", whole / 60, whole % 60);

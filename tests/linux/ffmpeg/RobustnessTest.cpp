@@ -1,4 +1,6 @@
+#include "linux/ffmpeg/FFmpegAsset.h"
 #include "support/EngineTest.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <filesystem>
 #include <fstream>
@@ -76,6 +78,31 @@ TEST_F(Robustness, ATruncatedMovieShowsWhatIsThere)
     EXPECT_LT(last, 80);
     EXPECT_EQ(numberAt(at(1)), 30);
     use(movie("truncated.mp4"));
+}
+
+TEST_F(Robustness, AMovieWithSomethingBehindItIsWhole)
+{
+    const std::string longer = testing::TempDir() + "with-junk.mp4";
+    std::ofstream(longer, std::ios::binary) << bytesOf(movie("clock.mp4")) << "AAAAjunk that a device put there";
+    ASSERT_EQ(open(longer), Status::ReadyToPlay);
+    EXPECT_EQ(asset->whatIsMissing(), "");
+    EXPECT_EQ(asset->duration().seconds(), 4);
+    std::filesystem::remove(longer);
+}
+
+TEST_F(Robustness, ADiskThatFailsAtTheFirstPictureIsWhatIsToldOf)
+{
+    ASSERT_EQ(open(movie("clock.mp4")), Status::ReadyToPlay);
+    const auto opened = std::dynamic_pointer_cast<ffmpeg::FFmpegAsset>(asset)->movie();
+    const auto cancelled = std::make_shared<std::atomic<bool>>(false);
+    const auto first = static_cast<std::uint32_t>(opened->packetIndex(cancelled)->packets().front().position);
+    std::string words;
+    tests::whileRefusing({{SYS_pread64, EIO, 3, first, true}}, [&] {
+        auto file = std::move(ffmpeg::OpenFile::open(movie("clock.mp4"))).value();
+        const auto result = ffmpeg::Movie::open(std::move(file), cancelled);
+        words = result ? "it opens" : result.error()->description();
+    });
+    EXPECT_EQ(words, "“clock.mp4” is not a movie that can be opened: the disk or the network has an error.");
 }
 
 TEST_F(Robustness, ATruncatedMoviePlaysToTheEndOfWhatIsThere)

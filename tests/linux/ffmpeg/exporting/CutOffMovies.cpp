@@ -114,15 +114,5 @@ TEST_F(Leftovers, OfSoundThatNobodyCanDecodeAreNamedOnceInACutAndInAMix)
     }
 }
 
-TEST(Words, AreNoneOfTheLibrary)
-{
-    EXPECT_EQ(ffmpeg::textOf(AVERROR_INVALIDDATA), "it is damaged, or of a kind that is not known here");
-    EXPECT_EQ(ffmpeg::textOf(AVERROR(EACCES)), "that is not allowed");
-    EXPECT_EQ(ffmpeg::textOf(AVERROR_PROTOCOL_NOT_FOUND).find("something unexpected happened ("), 0U);
-    EXPECT_EQ(ffmpeg::lengthInWords(2.04), "2.0 s");
-    EXPECT_EQ(ffmpeg::lengthInWords(22 * 60 + 12.9), "22:12");
-    EXPECT_EQ(ffmpeg::lengthInWords(3600 + 61), "1:01:01");
-}
-
 } // namespace
 } // namespace tests
