@@ -3,6 +3,7 @@
 #include "linux/ffmpeg/ToneMap.h"
 
 #include <algorithm>
+#include <array>
 #include <vector>
 
 namespace ffmpeg {
@@ -36,8 +37,8 @@ Plain plainFormat(const AVFrame& picture)
 
 int matrixOf(const AVFrame& picture)
 {
-    if (picture.format == AV_PIX_FMT_PAL8)
-        return SWS_CS_ITU601; // the scaler turns palettes into brightness and colour by no other
+    if (isOfPalette(static_cast<AVPixelFormat>(picture.format)))
+        return SWS_CS_ITU601;
     switch (picture.colorspace) {
     case AVCOL_SPC_BT709:
         return SWS_CS_ITU709;
@@ -125,6 +126,13 @@ bool hasAlpha(const AVFrame& picture)
 }
 
 } // namespace
+
+bool isOfPalette(AVPixelFormat format)
+{
+    constexpr std::array kFormats{AV_PIX_FMT_PAL8, AV_PIX_FMT_RGB8, AV_PIX_FMT_BGR8, AV_PIX_FMT_RGB4_BYTE,
+                                  AV_PIX_FMT_BGR4_BYTE};
+    return std::find(kFormats.begin(), kFormats.end(), format) != kFormats.end();
+}
 
 DecodedFrame::DecodedFrame(Owned<AVFrame> picture, std::int64_t pts, base::MediaTime time, Orientation orientation,
                            AVRational codedAspect)

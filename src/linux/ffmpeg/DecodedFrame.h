@@ -10,6 +10,9 @@
 
 namespace ffmpeg {
 
+/// Whether the scaler has tables of its own for the format, which know no matrix but that of standard definition.
+bool isOfPalette(AVPixelFormat format);
+
 class DecodedFrame final : public platform::VideoFrame {
 public:
     /// `codedAspect` is the pixels' aspect where the picture itself does not say one.

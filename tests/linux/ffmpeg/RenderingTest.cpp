@@ -1,5 +1,9 @@
 #include "support/EngineTest.h"
 
+extern "C" {
+#include <libavutil/mastering_display_metadata.h>
+}
+
 #include <array>
 
 namespace {
@@ -158,6 +162,81 @@ TEST(HighDynamicRange, LooksTheSameInAReducedPicture)
     const auto b = shown(*small, Quality::Exact);
     for (std::size_t c = 0; c < 3; ++c)
         EXPECT_NEAR(a[c], b[c], 5);
+}
+
+TEST(HighDynamicRange, GoesUpToThePeakThatTheMovieTellsOf)
+{
+    const auto grey = [](int peak, bool isOfDisplay) {
+        // 400 candelas.
+        auto frame = ffmpeg::Owned<AVFrame>(av_frame_clone(&picture(AVCOL_TRC_SMPTE2084, 636, 512, 512)->picture()));
+        if (isOfDisplay)
+            *av_mastering_display_metadata_create_side_data(frame.get()) = {{}, {}, {0, 1}, {peak, 1}, 0, peak > 0};
+        else
+            av_content_light_metadata_create_side_data(frame.get())->MaxCLL = static_cast<unsigned>(peak);
+        const ffmpeg::DecodedFrame made(std::move(frame), 0, base::MediaTime::make(0, 30), ffmpeg::Orientation{},
+                                        {1, 1});
+        return shown(made, Quality::Exact)[1];
+    };
+    for (const bool isOfDisplay : {false, true}) {
+        const int usual = grey(0, isOfDisplay);
+        EXPECT_EQ(grey(1000, isOfDisplay), usual);
+        EXPECT_LT(grey(4000, isOfDisplay), usual - 2) << "there is brighter";
+        EXPECT_GT(usual, 235);
+        EXPECT_EQ(grey(400, isOfDisplay), 255);
+        EXPECT_EQ(grey(1, isOfDisplay), 255) << "which cannot be";
+    }
+}
+
+TEST(HighDynamicRange, InThePrimariesOfTheScreenIsNotMadeMoreColourful)
+{
+    const auto colour = [](AVColorPrimaries primaries) {
+        auto frame = ffmpeg::Owned<AVFrame>(av_frame_clone(&picture(AVCOL_TRC_SMPTE2084, 400, 470, 560)->picture()));
+        frame->color_primaries = primaries;
+        const ffmpeg::DecodedFrame made(std::move(frame), 0, base::MediaTime::make(0, 30), ffmpeg::Orientation{},
+                                        {1, 1});
+        return shown(made, Quality::Exact);
+    };
+    const auto wide = colour(AVCOL_PRI_BT2020);
+    EXPECT_EQ(colour(AVCOL_PRI_UNSPECIFIED), wide);
+    const auto usual = colour(AVCOL_PRI_BT709);
+    EXPECT_LT(usual[0], wide[0] - 5);
+    EXPECT_GT(usual[2], wide[2] + 5);
+}
+
+TEST(HighDynamicRange, WithoutAMatrixHasItsUsualOne)
+{
+    const auto tagged = picture(AVCOL_TRC_ARIB_STD_B67, 400, 470, 560);
+    auto frame = ffmpeg::Owned<AVFrame>(av_frame_clone(&tagged->picture()));
+    frame->colorspace = AVCOL_SPC_UNSPECIFIED;
+    const ffmpeg::DecodedFrame untagged(std::move(frame), 0, base::MediaTime::make(0, 30), ffmpeg::Orientation{},
+                                        {1, 1});
+    EXPECT_EQ(shown(untagged, Quality::Exact), shown(*tagged, Quality::Exact));
+}
+
+TEST(Palettes, KeepTheirColoursAtEverySize)
+{
+    constexpr std::array<int, 3> kGreen{0, 182, 0};
+    for (const AVPixelFormat format : {AV_PIX_FMT_PAL8, AV_PIX_FMT_RGB8}) {
+        auto frame = ffmpeg::newFrame();
+        frame->format = format;
+        frame->width = 1280;
+        frame->height = 720; // high definition has another matrix
+        ASSERT_GE(av_frame_get_buffer(frame.get(), 0), 0);
+        const bool hasPalette = format == AV_PIX_FMT_PAL8;
+        constexpr std::uint8_t kGreenOfRgb8 = 5 << 2;
+        for (int y = 0; y < frame->height; ++y)
+            std::fill_n(frame->data[0] + y * frame->linesize[0], frame->width, hasPalette ? 7 : kGreenOfRgb8);
+        if (hasPalette)
+            reinterpret_cast<std::uint32_t*>(frame->data[1])[7] = 0xff00b600;
+        const auto full = std::make_shared<ffmpeg::DecodedFrame>(std::move(frame), 0, base::MediaTime::make(0, 30),
+                                                                 ffmpeg::Orientation{}, AVRational{1, 1});
+        for (const auto& each :
+             {std::shared_ptr<const ffmpeg::DecodedFrame>(full), ffmpeg::DecodedFrame::reduced(full, 320)}) {
+            const auto colour = shown(*each, Quality::Exact);
+            for (std::size_t c = 0; c < 3; ++c)
+                EXPECT_NEAR(colour[c], kGreen[c], 3) << av_get_pix_fmt_name(format) << " channel " << c;
+        }
+    }
 }
 
 } // namespace

@@ -1,5 +1,7 @@
 #include "linux/ffmpeg/exporting/video/PictureScaler.h"
 
+#include "linux/ffmpeg/DecodedFrame.h"
+
 #include <algorithm>
 #include <array>
 #include <cstdint>
@@ -11,14 +13,6 @@ namespace {
 base::ErrorRef noMemory()
 {
     return base::Error::make("ffmpeg", AVERROR(ENOMEM), "there is not enough memory");
-}
-
-/// The scaler has tables of its own for these, which know no matrix but that of standard definition.
-bool isOfPalette(AVPixelFormat format)
-{
-    constexpr std::array kFormats{AV_PIX_FMT_PAL8, AV_PIX_FMT_RGB8, AV_PIX_FMT_BGR8, AV_PIX_FMT_RGB4_BYTE,
-                                  AV_PIX_FMT_BGR4_BYTE};
-    return std::find(kFormats.begin(), kFormats.end(), format) != kFormats.end();
 }
 
 /// The same picture without a palette.
