@@ -21,7 +21,8 @@ public:
     virtual void console(std::string_view text) = 0;
 };
 
-/// Writes lines to a stream, what a terminal would obey made harmless, errors marked; `<3>` and `<6>` prefixes when the reader is the journal.
+/// Writes lines to a stream, what a terminal would obey made harmless, errors marked; `<3>` and `<6>` prefixes when the
+/// reader is the journal.
 class StreamLog final : public Log {
 public:
     enum class Style { Plain, Journal };

@@ -272,8 +272,8 @@ std::shared_ptr<VKVideoEditorViewController> EditorProgram::editor() const
 
 void EditorProgram::closeRequested()
 {
-    // As the close button: the host is told what was done, and then closes us. Before the recording is there nothing has
-    // been done, not even looked at.
+    // As the close button: the host is told what was done, and then closes us. Before the recording is there nothing
+    // has been done, not even looked at.
     if (const auto current = editor(); current && !m_waiting)
         current->doneAction();
     else
@@ -333,8 +333,8 @@ photos::LibraryOptions EditorProgram::libraryOptions()
         return movieThumbnail(m_mainQueue, m_media, path, side);
     };
     options.published = [this](const std::string& path) { m_report.add({dbus::MovieNote::Kind::Saved, path, {}}); };
-    // A save ends the editor, whose end empties the store: what could not be saved must be elsewhere by then. Beside the
-    // store there is always a way, as it needs no room there.
+    // A save ends the editor, whose end empties the store: what could not be saved must be elsewhere by then. Beside
+    // the store there is always a way, as it needs no room there.
     options.unsavedDirectories = {options.directories.unsaved,
                                   std::filesystem::path(m_options.deviceRoot).parent_path().parent_path() / "unsaved"};
     options.unsaved = [this](const base::ErrorRef& why, const base::Result<std::string>& kept) {

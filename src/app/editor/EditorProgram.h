@@ -1,7 +1,8 @@
 /// The editor process: makes the platform on Linux, starts the extension in it, and ends with its host. GUI thread.
 ///
-/// From a connection to a host it takes the payload; the extension appears once that has been loaded. When the host closes the connection, or dies, the extension disappears and run() returns; a save that is
-/// under way then is finished first, without a window.
+/// From a connection to a host it takes the payload; the extension appears once that has been loaded, and its movie has
+/// been opened. What is no movie is refused. When the host closes the connection, or dies, the extension disappears and
+/// run() returns; a save that is under way then is finished first, without a window.
 #pragma once
 
 #include "app/editor/EditorOptions.h"

@@ -7,8 +7,8 @@
 ///   wait hidden|shown      until the chrome has faded out or in
 ///   wait thumbnails        until the strip has all its pictures
 ///   wait trimming|trimmed  until trim mode is on; until it is off and the movie then shown is ready
-///   wait frame [SECONDS]   until the picture of the present time is on the screen (the one that does not change any more,
-///                          where the recording stands still), or that of SECONDS or a later one
+///   wait frame [SECONDS]   until the picture of the present time is on the screen (the one that does not change any
+///                          more, where the recording stands still), or that of SECONDS or a later one
 ///   tap NAME  |  tap X Y   touch a control by its accessible name, or a place in points
 ///   drag X1 Y1 X2 Y2       touch, move in small steps, lift
 ///   drag NAME DX           the same from a control's middle, DX points to the right

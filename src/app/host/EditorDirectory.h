@@ -35,8 +35,9 @@ public:
     std::string movieDirectory() const { return deviceRoot() + "/Velkor"; }
     /// For an attachment that was not given by its path; not there at first.
     std::string attachmentDirectory() const { return m_path + "/attachment"; }
-    /// A path for a socket that nobody else reaches: in the directory, or, where that is too long, in the user's runtime
-    /// directory, or else in a directory of its own among the temporary files. What it makes goes with the directory.
+    /// A path for a socket that nobody else reaches: in the directory, or, where that is too long, in the user's
+    /// runtime directory, or else in a directory of its own among the temporary files, which is made now. All of it goes
+    /// with the directory. Once.
     base::Result<std::string> socketPath() const;
     /// Whoever inherits it keeps the directory alive.
     int lock() const { return m_lock.get(); }

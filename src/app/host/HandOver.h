@@ -16,9 +16,8 @@ enum class HandOverWay { HardLink, Reflink, Copy };
 using CopyProgress = std::function<bool(std::uint64_t copied, std::uint64_t total)>;
 
 /// The first way that works of hard link, reflink and copy, starting with `first`: makes `directory`/`name`, which must
-/// not exist. Reads through `source` without moving its position; never writes to it. The modification date and the
-/// permissions go along.
-/// After an error or a stop (ECANCELED) there is no such file.
+/// not exist. Reads through `source` without moving its position; never writes to it. The modification date goes along,
+/// and so do the permissions where the file system has them. After an error or a stop (ECANCELED) there is no such file.
 base::Result<HandOverWay> handOver(int source, const std::string& directory, const std::string& name,
                                    const CopyProgress& goOn = {}, HandOverWay first = HandOverWay::HardLink);
 

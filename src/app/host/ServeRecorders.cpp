@@ -30,8 +30,8 @@ std::string failureOf(const EditorOutcome& outcome)
     return outcome.closed ? "the editor was closed" : outcome.words();
 }
 
-/// First its request is made ready on a thread of its own, because a recorder's files may lie on a slow disk; then it is
-/// a session.
+/// First its request is made ready on a thread of its own, because a recorder's files may lie on a slow disk; then it
+/// is a session.
 class RecordersEditor final : public dbus::RecorderService::Editor {
 public:
     RecordersEditor(dbus::EditRequest request, dbus::RecorderService::EditorEvents events) : m_events(std::move(events))

@@ -1,6 +1,6 @@
 /// What an editor tells its host about movies, whenever it comes to it: also when the connection has been closed since,
-/// when the disk is full, or just before a crash. It is kept in memory that both processes have
-/// open; the editor adds to it, on any thread, and the host reads it.
+/// when the disk is full, or just before a crash. It is kept in memory that both processes have open; the editor adds
+/// to it, on any thread, and the host reads it.
 #pragma once
 
 #include "base/Result.h"

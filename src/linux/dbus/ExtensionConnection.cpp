@@ -40,40 +40,32 @@ struct ExtensionConnection::Shared {
     std::function<void()> sent;
     bool hasEnded = false;
 
-    /// With the mutex held. Any thread; the handler runs as the other one does.
-    static void tellSent(const std::shared_ptr<Shared>& shared)
+    /// With the mutex held. Any thread; `take` gives the handler, on the main queue, unless the connection was destroyed.
+    static void callLater(const std::shared_ptr<Shared>& shared, std::function<void()> (*take)(Shared&))
     {
-        shared->mainQueue.post([weak = std::weak_ptr(shared)] {
+        shared->mainQueue.post([weak = std::weak_ptr(shared), take] {
             const auto self = weak.lock();
             if (!self)
                 return;
             std::function<void()> handler;
             {
                 const std::lock_guard lock(self->mutex);
-                handler = self->sent;
+                handler = take(*self);
             }
             if (handler)
                 handler();
         });
     }
 
-    /// With the mutex held. Any thread; the handler runs on the main queue, and not when the connection was destroyed.
+    static void tellSent(const std::shared_ptr<Shared>& shared)
+    {
+        callLater(shared, [](Shared& self) { return self.sent; });
+    }
+
     static void tellIfEnded(const std::shared_ptr<Shared>& shared)
     {
-        if (!shared->hasEnded || !shared->disconnected)
-            return;
-        shared->mainQueue.post([weak = std::weak_ptr(shared)] {
-            const auto self = weak.lock();
-            if (!self)
-                return;
-            std::function<void()> handler;
-            {
-                const std::lock_guard lock(self->mutex);
-                handler = std::exchange(self->disconnected, {});
-            }
-            if (handler)
-                handler();
-        });
+        if (shared->hasEnded && shared->disconnected)
+            callLater(shared, [](Shared& self) { return std::exchange(self.disconnected, {}); });
     }
 };
 

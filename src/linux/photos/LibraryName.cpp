@@ -55,7 +55,8 @@ std::string extensionOf(std::string_view path)
     return "." + extension;
 }
 
-/// Recorders call their files like "Screencast from 2026-11-21 15-04-05", "2026-11-21_15-04-05" or "rec-20261121-150405".
+/// Recorders call their files like "Screencast from 2026-11-21 15-04-05", "2026-11-21_15-04-05" or
+/// "rec-20261121-150405".
 std::string withoutDate(std::string_view appName)
 {
     static GRegex* const date =

@@ -17,8 +17,8 @@ struct LibraryName {
     std::string numbered(int number) const;
 };
 
-/// After the app and the date, in local time, which replaces a date that the app's name ends with, as that of a recorder's
-/// file does; with the extension of `path`, or that of MPEG-4 when it has none.
+/// After the app and the date, in local time, which replaces a date that the app's name ends with, as that of a
+/// recorder's file does; with the extension of `path`, or that of MPEG-4 when it has none.
 LibraryName libraryName(std::string_view appName, base::Date date, std::string_view path);
 
 /// `text` without what some file system, shell or file manager takes amiss; never empty, and short enough to get more

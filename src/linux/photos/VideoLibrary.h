@@ -47,8 +47,8 @@ struct LibraryOptions {
     std::function<void(const std::string& path)> published;
     /// Asked while a movie is copied: false ends the transaction with ECANCELED.
     std::function<bool()> goOn = {};
-    /// Where a movie is kept that could not be put into the library, the better place first: whoever asked for the change
-    /// may remove it right after the completion. None: it is not kept.
+    /// Where a movie is kept that could not be put into the library, the better place first: whoever asked for the
+    /// change may remove it right after the completion. None: it is not kept.
     std::vector<std::string> unsavedDirectories = {};
     /// Told before the completion why a movie is not in the library, and where it is kept, or why it is not.
     std::function<void(const base::ErrorRef& why, const base::Result<std::string>& kept)> unsaved = {};

@@ -1,0 +1,61 @@
+// What file managers ask of the service: to open files, without an answer about how that ends.
+#include "Recorders.h"
+
+#include <gmock/gmock.h>
+
+using testing::ElementsAre;
+using testing::HasSubstr;
+
+namespace {
+
+TEST_F(Recorders, AFileManagerOpensSeveralFiles)
+{
+    serve();
+    Caller caller;
+    const QStringList uris = {QStringLiteral("file:///tmp/a%20b.mp4"), QStringLiteral("file:///c.webm")};
+    const QVariantMap data = {{QStringLiteral("desktop-startup-id"), QStringLiteral("id")}};
+    EXPECT_EQ(caller.call("org.freedesktop.Application", "Open", {uris, data}).type(), QDBusMessage::ReplyMessage);
+
+    ASSERT_EQ(m_editors.size(), 2U);
+    EXPECT_EQ(m_editors[0]->request.moviePath, "/tmp/a b.mp4");
+    EXPECT_EQ(m_editors[1]->request.moviePath, "/c.webm");
+    EXPECT_THAT(m_editors[1]->request.environment,
+                ElementsAre(std::pair<std::string, std::string>("DESKTOP_STARTUP_ID", "id")));
+    caller.leave();
+    caller.bus = QDBusConnection(QStringLiteral("none"));
+    Caller next;
+    edit(next); // behind the news of the one who left
+    EXPECT_FALSE(m_editors[0]->askedToGo) << "nobody in particular asked for this editor";
+}
+
+TEST_F(Recorders, AFileManagerIsAnsweredOnceWhenAllOfItsFilesHaveBeenLookedAt)
+{
+    serve();
+    Caller caller;
+    m_isSlow = true;
+    const auto notAMovie = base::Error::make(dbus::kBadInputDomain, 1, "b.mp4 is empty");
+    for (const std::size_t bad : {0U, 1U}) {
+        const std::size_t first = m_editors.size();
+        const QStringList uris = {QStringLiteral("file:///a.mp4"), QStringLiteral("file:///b.mp4")};
+        QDBusPendingCallWatcher reply(caller.start("org.freedesktop.Application", "Open", {uris, QVariantMap{}}));
+        ASSERT_TRUE(tests::pumpUntil([&] { return m_editors.size() == first + 2; }));
+        m_editors[first]->events.started(bad == 0 ? base::Result<void>(notAMovie) : base::Result<void>());
+        Caller next;
+        next.call("org.freedesktop.Application", "Activate", {QVariantMap{}}); // behind an answer, if there was one
+        EXPECT_FALSE(reply.isFinished());
+        m_editors[first + 1]->events.started(bad == 1 ? base::Result<void>(notAMovie) : base::Result<void>());
+        ASSERT_TRUE(tests::pumpUntil([&] { return reply.isFinished(); }));
+        EXPECT_EQ(reply.error().name().toStdString(), "org.clipsa.Error.BadInput") << "file " << bad;
+        EXPECT_EQ(reply.error().message().toStdString(), "b.mp4 is empty");
+    }
+}
+
+TEST_F(Recorders, ActivatingWithoutAFileIsRefusedInWords)
+{
+    serve();
+    Caller caller;
+    EXPECT_THAT(caller.call("org.freedesktop.Application", "Activate", {QVariantMap{}}).errorMessage().toStdString(),
+                HasSubstr("give it a recording"));
+}
+
+} // namespace
