@@ -145,14 +145,13 @@ base::Result<std::vector<std::string>> VideoLibrary::Transaction::commit()
     return names;
 }
 
-std::vector<base::Result<std::string>> VideoLibrary::Transaction::keepUnsaved(const base::ErrorRef& why) const
+std::vector<base::Result<std::string>> VideoLibrary::Transaction::keepUnsaved() const
 {
     std::vector<base::Result<std::string>> kept;
     for (const Source& source : m_sources)
         kept.push_back(photos::keepUnsaved(source.file.get(), source.name, m_options.unsavedDirectories));
-    // One that could not even be opened.
-    if (m_error)
-        kept.emplace_back(why);
+    if (m_error) // one could not even be opened
+        kept.emplace_back(base::Error::make(m_error->domain(), m_error->code(), "there is nothing that could be kept"));
     return kept;
 }
 

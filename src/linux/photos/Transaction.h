@@ -21,9 +21,8 @@ public:
 
     /// Gives the paths of the new files. Once, after the change block.
     base::Result<std::vector<std::string>> commit();
-    /// After a commit() that failed with `why`: keeps each movie where the options say; gives the paths, or why one is
-    /// nowhere.
-    std::vector<base::Result<std::string>> keepUnsaved(const base::ErrorRef& why) const;
+    /// After a commit() that failed: keeps each movie where the options say; gives the paths, or why one is nowhere.
+    std::vector<base::Result<std::string>> keepUnsaved() const;
 
 private:
     struct Source {

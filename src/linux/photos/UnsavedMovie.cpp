@@ -27,15 +27,15 @@ base::Result<std::string> link(int movie, const LibraryName& name, const Library
     }
 }
 
-base::Result<std::string> copy(int movie, const LibraryName& name, const LibraryDirectory& directory)
+base::Result<std::string> copy(int movie, const struct stat& status, const LibraryName& name,
+                               const LibraryDirectory& directory)
 {
-    struct stat status = {};
-    if (::fstat(movie, &status) != 0)
-        return base::Error::fromErrno(errno, "looking at it");
     posix::sweepNewFiles(directory.descriptor());
     auto file = posix::NewFile::make(directory.descriptor());
     if (!file)
         return file.error();
+    if (const int number = file.value().keepAsPrivateAs(status.st_mode); number != 0)
+        return base::Error::fromErrno(number, "copying it");
     const int to = file.value().descriptor();
     if (!posix::shareContents(movie, to))
         if (const int number = posix::copyContents(movie, to, static_cast<std::uint64_t>(status.st_size), {});
@@ -51,11 +51,15 @@ base::Result<std::string> keepIn(const std::string& path, int movie, const Libra
     const auto directory = LibraryDirectory::open(path);
     if (!directory)
         return directory.error();
-    auto kept = link(movie, name, directory.value());
-    if (kept)
-        posix::flush(movie); // as a copy is brought to the disk; its end is as good as it gets
-    else
-        kept = copy(movie, name, directory.value());
+    struct stat status = {};
+    if (::fstat(movie, &status) != 0)
+        return base::Error::fromErrno(errno, "looking at it");
+    // Who has the file by another name, as a recorder has whose recording could not even be mixed, may write over it.
+    const bool isOthersToo = status.st_nlink > 1;
+    auto kept = isOthersToo ? copy(movie, status, name, directory.value()) : link(movie, name, directory.value());
+    if (!kept)
+        kept = isOthersToo ? link(movie, name, directory.value()) : copy(movie, status, name, directory.value());
+    posix::flush(movie); // as a copy is brought to the disk; its end is as good as it gets
     if (!kept)
         return base::Error::make(kept.error()->domain(), kept.error()->code(),
                                  "cannot keep it in " + path + ": " + kept.error()->description());

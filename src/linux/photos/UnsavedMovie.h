@@ -10,7 +10,8 @@
 namespace photos {
 
 /// Gives the open movie a second name in the first of the directories that takes it, or a copy there where that is not
-/// possible; replaces nothing. A directory is made when it is missing. Gives the path, or the first directory's error.
+/// possible; a file that has other names already is rather copied, if there is room. Replaces nothing. A directory is
+/// made when it is missing. Gives the path, or the first directory's error.
 base::Result<std::string> keepUnsaved(int movie, const LibraryName& name, const std::vector<std::string>& directories);
 
 } // namespace photos

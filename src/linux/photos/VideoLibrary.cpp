@@ -59,7 +59,7 @@ void VideoLibrary::keepUnsaved(const Transaction& transaction, const base::Error
 {
     if (m_options.unsavedDirectories.empty())
         return;
-    for (const auto& kept : transaction.keepUnsaved(why))
+    for (const auto& kept : transaction.keepUnsaved())
         if (m_options.unsaved)
             m_options.unsaved(why, kept);
 }

@@ -3,6 +3,7 @@
 
 #include "linux/photos/LibraryFixture.h"
 #include "linux/posix/FileDescriptor.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <fcntl.h>
 #include <fstream>
@@ -24,12 +25,14 @@ protected:
     const fs::path second = home.path() / "cache/unsaved";
     std::vector<std::string> kept;
     std::vector<std::string> refusals;
+    std::vector<std::string> reasons;
 
     photos::LibraryOptions keeping()
     {
         photos::LibraryOptions made = options();
         made.unsavedDirectories = {first, second};
-        made.unsaved = [this](const base::ErrorRef&, const base::Result<std::string>& path) {
+        made.unsaved = [this](const base::ErrorRef& why, const base::Result<std::string>& path) {
+            reasons.push_back(why->description());
             if (path)
                 kept.push_back(path.value());
             else
@@ -88,6 +91,36 @@ TEST_F(UnsavedMovie, WithoutANameLeftIsCopiedWithItsDate)
     EXPECT_THAT(namesIn(first), SizeIs(1));
 }
 
+TEST_F(UnsavedMovie, ThatTheRecorderHasTooIsKeptAsACopy)
+{
+    const fs::path recorders = home.path() / "recording.mp4";
+    fs::create_hard_link(source, recorders);
+    saveKeeping();
+    ASSERT_THAT(kept, ElementsAre((first / name).native()));
+    std::ofstream(recorders) << "the next recording";
+    EXPECT_TRUE(holds(kept.front(), bytes)) << "the recorder wrote over it";
+}
+
+TEST_F(UnsavedMovie, ThatTheRecorderHasTooIsAnotherNameWhereThereIsNoRoom)
+{
+    fs::create_hard_link(source, home.path() / "recording.mp4");
+    whileRefusing({noReflinks(), {SYS_copy_file_range, ENOSPC}}, [&] { saveKeeping(); });
+    ASSERT_THAT(kept, ElementsAre((first / name).native()));
+    EXPECT_TRUE(fs::equivalent(kept.front(), source));
+    EXPECT_THAT(namesIn(first), SizeIs(1));
+}
+
+TEST_F(UnsavedMovie, IsAsPrivateAsItWas)
+{
+    ASSERT_EQ(::chmod(source.c_str(), 0600), 0);
+    saveKeeping();
+    fs::create_hard_link(source, home.path() / "recording.mp4");
+    saveKeeping();
+    ASSERT_THAT(kept, SizeIs(2));
+    for (const auto& each : kept)
+        EXPECT_EQ(fs::status(each).permissions(), fs::perms(0600)) << each;
+}
+
 TEST_F(UnsavedMovie, IsKeptOnlyWhereThatWasAskedFor)
 {
     save();
@@ -107,7 +140,8 @@ TEST_F(UnsavedMovie, ThatIsNotThereIsSaidToBeNowhere)
 {
     save(base::Url::fromPath(home.path() / "gone.mp4"), keeping());
     EXPECT_THAT(kept, IsEmpty());
-    EXPECT_THAT(refusals, ElementsAre(HasSubstr("gone.mp4")));
+    EXPECT_THAT(refusals, ElementsAre("there is nothing that could be kept"));
+    EXPECT_THAT(reasons, ElementsAre(HasSubstr("gone.mp4"))) << "it is said once which, and why";
 }
 
 } // namespace tests
