@@ -49,14 +49,17 @@ base::Result<runtime::Value> deliverMovie(const FileDelivery& delivery, const Co
 
 void deliverFiles(const FileDelivery& delivery, const DeliveryEvents& events, DetachedWork::Client& client)
 {
+    const CopyProgress progress = progressFor(events, client); // one for both: to the user it is one wait
     // The attachment first: the movie is the last that the editor waits for.
     if (delivery.attachmentArrived)
-        client.post([arrived = delivery.attachmentArrived,
-                     path = deliverAttachment(delivery, progressFor(events, client))] { arrived->keep(path); });
-    const auto movie = deliverMovie(delivery, progressFor(events, client));
-    client.post([movie, arrived = delivery.movieArrived, failed = events.failed] {
+        client.post([arrived = delivery.attachmentArrived, path = deliverAttachment(delivery, progress)] {
+            arrived->keep(path);
+        });
+    const auto movie = deliverMovie(delivery, progress);
+    const bool isWanted = client.isWaiting(); // else it was stopped, which is no failure
+    client.post([movie, isWanted, arrived = delivery.movieArrived, failed = events.failed] {
         arrived->keep(movie);
-        if (!movie)
+        if (!movie && isWanted)
             failed(movie.error());
     });
 }

@@ -28,8 +28,8 @@ struct FileDelivery {
 };
 
 struct DeliveryEvents {
-    std::function<void(std::uint64_t totalBytes)> copying; ///< for a second; at most once
-    std::function<void(const base::ErrorRef& error)> failed;
+    std::function<void(std::uint64_t totalBytes)> copying;   ///< for a second; at most once
+    std::function<void(const base::ErrorRef& error)> failed; ///< not when it was stopped
 };
 
 /// Keeps the promises and calls the events on the client's thread. Stops when the client does not wait any more.

@@ -60,8 +60,8 @@ base::Result<HandOverWay> handOver(int source, const std::string& directory, con
         way = HandOverWay::Copy;
         error = copyAll(source, target.get(), static_cast<std::uint64_t>(status.st_size), goOn);
     }
-    if (!error && ::fchmod(target.get(), (status.st_mode & ACCESSPERMS) | S_IRUSR | S_IWUSR) != 0)
-        error = base::Error::fromErrno(errno, "cannot set the permissions of " + path);
+    // Some file systems have none. Then it stays the user's alone, which does no harm.
+    static_cast<void>(::fchmod(target.get(), (status.st_mode & ACCESSPERMS) | S_IRUSR | S_IWUSR));
     const timespec times[] = {status.st_atim, status.st_mtim};
     if (!error && ::futimens(target.get(), times) != 0)
         error = base::Error::fromErrno(errno, "cannot date " + path);

@@ -2,6 +2,7 @@
 
 #include "linux/posix/FileDescriptor.h"
 #include "support/PrivateDirectory.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <gmock/gmock.h>
 
@@ -69,6 +70,16 @@ TEST_F(HandingOver, ACopyHasThePermissionsOfTheMovie)
         EXPECT_EQ(statusOf(m_copy).st_mode & ACCESSPERMS, mode);
         std::filesystem::remove(m_copy);
     }
+}
+
+TEST_F(HandingOver, CopiesToWhereFilesHaveNoPermissions)
+{
+    tests::whileRefusing({{SYS_fchmod, EPERM}}, [&] {
+        const auto way = handOver(host::HandOverWay::Copy);
+        ASSERT_TRUE(way) << way.error()->description();
+    });
+    EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
+    EXPECT_EQ(statusOf(m_copy).st_mtim.tv_sec, kDate.tv_sec);
 }
 
 TEST_F(HandingOver, GivesASecondNameWithinAFileSystem)
