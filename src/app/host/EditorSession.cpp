@@ -77,23 +77,23 @@ base::Result<void> EditorSession::State::start()
     const auto socket = directory.socketPath();
     if (!socket)
         return socket.error();
-    auto listening =
-        dbus::HostConnection::listen(socket.value(), payloadItems(request, movie, attachment),
-                                     {.editorConnected = {},
-                                      .finished =
-                                          [this](std::vector<std::string> activityTypes) {
-                                              outcome.activityTypes = std::move(activityTypes);
-                                              tellNotes();
-                                              // Later, because closing destroys what calls us.
-                                              QMetaObject::invokeMethod(this, &State::close, Qt::QueuedConnection);
-                                              if (handlers.finished)
-                                                  handlers.finished(*outcome.activityTypes);
-                                          },
-                                      .disconnected =
-                                          [this] {
-                                              if (processEnd)
-                                                  QMetaObject::invokeMethod(this, &State::end, Qt::QueuedConnection);
-                                          }});
+    auto listening = dbus::HostConnection::listen(
+        socket.value(), payloadItems(request, movie, attachment),
+        {.editorConnected = {},
+         .finished =
+             [this](std::vector<std::string> activityTypes) {
+                 outcome.activityTypes = std::move(activityTypes);
+                 tellNotes();
+                 // Later, because closing destroys what calls us.
+                 QMetaObject::invokeMethod(this, &State::close, Qt::QueuedConnection);
+                 if (handlers.finished)
+                     handlers.finished(*outcome.activityTypes);
+             },
+         .disconnected =
+             [this] {
+                 // Its process should go too, but something can hold it up.
+                 QMetaObject::invokeMethod(this, processEnd ? &State::end : &State::close, Qt::QueuedConnection);
+             }});
     if (!listening)
         return listening.error();
     connection = std::move(listening).value();

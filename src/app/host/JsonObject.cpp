@@ -69,6 +69,13 @@ JsonObject& JsonObject::addList(std::string_view name, const std::vector<std::st
     return addRaw(name, "[" + list + "]");
 }
 
+JsonObject& JsonObject::addTexts(std::string_view name, std::vector<std::string> texts)
+{
+    for (std::string& text : texts)
+        text = quoted(text);
+    return addList(name, texts);
+}
+
 JsonObject& JsonObject::addRaw(std::string_view name, std::string_view value)
 {
     m_members += m_members.empty() ? "" : ",";

@@ -22,6 +22,7 @@ public:
     JsonObject& addFlag(std::string_view name, bool flag) { return addRaw(name, flag ? "true" : "false"); }
     /// `objects` are the texts of others.
     JsonObject& addList(std::string_view name, const std::vector<std::string>& objects);
+    JsonObject& addTexts(std::string_view name, std::vector<std::string> texts);
 
     std::string text() const { return "{" + m_members + "}"; }
 

@@ -2,14 +2,12 @@
 
 #include "app/host/EditorDirectory.h"
 #include "app/host/EditorSession.h"
+#include "app/host/JsonObject.h"
 #include "app/host/PrepareRequest.h"
 #include "app/host/Streams.h"
 #include "app/host/TerminationSignals.h"
 
 #include <QCoreApplication>
-#include <QJsonArray>
-#include <QJsonDocument>
-#include <QJsonObject>
 
 #include <cstdio>
 #include <utility>
@@ -25,14 +23,6 @@ void printLines(const std::vector<std::string>& activityTypes)
     std::fflush(stdout);
 }
 
-QJsonArray arrayOf(const std::vector<std::string>& texts)
-{
-    QJsonArray array;
-    for (const std::string& text : texts)
-        array.append(QString::fromStdString(text));
-    return array;
-}
-
 /// What became of the movies that the user saved, by where they are.
 struct SavedMovies {
     std::vector<std::string> saved;
@@ -42,11 +32,10 @@ struct SavedMovies {
 
 void printObject(const std::vector<std::string>& activityTypes, const SavedMovies& movies, const std::string& movie)
 {
-    const QJsonObject object{{QStringLiteral("activityTypes"), arrayOf(activityTypes)},
-                             {QStringLiteral("movie"), QString::fromStdString(movie)},
-                             {QStringLiteral("saved"), arrayOf(movies.saved)},
-                             {QStringLiteral("unsaved"), arrayOf(movies.unsaved)}};
-    std::printf("%s\n", QJsonDocument(object).toJson(QJsonDocument::Compact).constData());
+    JsonObject object;
+    object.addTexts("activityTypes", activityTypes).add("movie", movie);
+    object.addTexts("saved", movies.saved).addTexts("unsaved", movies.unsaved);
+    std::printf("%s\n", object.text().c_str());
     std::fflush(stdout);
 }
 

@@ -1,6 +1,7 @@
 // An editor without a window, for tests of hosts: loads its payload, writes down what it got, and does what FAKE_EDITOR
 // says, in order, words separated by spaces:
-//   report=FILE        writes the payload's texts there, one "title=value" a line, then arguments; FILE appears complete
+//   report=FILE        writes the payload's texts there, one "title=value" a line, then arguments; FILE appears
+//                      complete
 //   say=TEXT           prints TEXT
 //   finish=A,B         tells the host that the user has finished, with these activity types ("finish=" with none)
 //   exit=N   crash     ends at once
@@ -10,6 +11,7 @@
 //   saved=FILE unsaved=FILE   reports a movie that was saved, or could not be
 //   refuse             reports that what was handed over is no movie
 //   busy               has something to finish from now on
+//   leave              closes the connection
 //   hang               stays, whatever the host does; only SIGKILL helps
 
 #include "linux/dbus/BusyMark.h"
@@ -25,6 +27,7 @@
 #include <cstdlib>
 #include <fstream>
 #include <future>
+#include <optional>
 #include <sstream>
 #include <string>
 #include <unistd.h>
@@ -110,16 +113,16 @@ int main(int argc, char* argv[])
 {
     const QCoreApplication application(argc, argv);
     Loop loop;
-    dbus::ExtensionConnection connection(loop.queue());
-    connection.setHostInterface(
+    std::optional<dbus::ExtensionConnection> connection(std::in_place, loop.queue());
+    connection->setHostInterface(
         {"VKVideoEditorExtensionHostProtocol", {runtime::Selector("extensionDidFinishWithActivityTypes:")}});
-    if (const auto connected = connection.connect(argument(argc, argv, "--connect")); !connected) {
+    if (const auto connected = connection->connect(argument(argc, argv, "--connect")); !connected) {
         std::fprintf(stderr, "fake editor: %s\n", connected.error()->description().c_str());
         return 70;
     }
     bool disconnected = false;
-    connection.setDisconnectedHandler([&] { disconnected = true; });
-    const auto items = connection.inputItems();
+    connection->setDisconnectedHandler([&] { disconnected = true; });
+    const auto items = connection->inputItems();
     if (!items)
         return 71;
 
@@ -136,7 +139,7 @@ int main(int argc, char* argv[])
         payload += std::string("argument=") + argv[i] + "\n";
     payload += "movie file=" + movie + "\n";
 
-    const auto proxy = connection.remoteObjectProxyWithErrorHandler(
+    const auto proxy = connection->remoteObjectProxyWithErrorHandler(
         [](const base::ErrorRef& error) { std::fprintf(stderr, "fake editor: %s\n", error->description().c_str()); });
     // Never destroyed: it stays busy until the kernel ends it, as sanitizers take their time on the way out.
     static auto& busy = *new dbus::BusyMark(argument(argc, argv, "--device-root"));
@@ -160,7 +163,7 @@ int main(int argc, char* argv[])
         } else if (word == "remove-movie") {
             ::unlink(movie.c_str());
         } else if (word == "exit") {
-            connection.flush();
+            connection->flush();
             std::_Exit(std::atoi(value.c_str()));
         } else if (word == "crash") {
             std::abort();
@@ -172,6 +175,8 @@ int main(int argc, char* argv[])
             report.add({dbus::MovieNote::Kind::Refused, "", "it is no movie"});
         } else if (word == "busy") {
             busy.set();
+        } else if (word == "leave") {
+            connection.reset();
         } else if (word == "hang") {
             std::signal(SIGTERM, SIG_IGN);
             for (;;)

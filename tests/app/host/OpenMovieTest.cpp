@@ -154,6 +154,15 @@ TEST_F(OpeningAMovie, TheObjectSaysWhatWasSavedAlsoBehindAClosedWindow)
     EXPECT_THAT(clipsa->output(), HasSubstr("\"saved\":[\"/videos/a.mp4\"],\"unsaved\":[\"/data/b.mp4\"]}\n"));
 }
 
+TEST_F(OpeningAMovie, TheObjectHasNothingThatATerminalWouldObey)
+{
+    m_movie = std::filesystem::canonical(m_directory.write("\"red\u009B31m\u007F\n.mp4", "moving pictures"));
+    const auto clipsa = start("finish=a\u009B2J wait", {"--json"});
+    EXPECT_EQ(clipsa->wait(), 0) << clipsa->errors();
+    EXPECT_THAT(clipsa->output(), HasSubstr("{\"activityTypes\":[\"a\\u009b2J\"],\"movie\":\""));
+    EXPECT_THAT(clipsa->output(), HasSubstr("/\\\"red\\u009b31m\\u007f\\u000a.mp4\",\"saved\":[],"));
+}
+
 TEST_F(OpeningAMovie, PrintsNothingWhenNothingWasDone)
 {
     const auto clipsa = start("finish= wait");
@@ -335,6 +344,18 @@ TEST_F(OpeningAMovie, AnEditorThatDoesNotGoIsMadeToGo)
     EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
     EXPECT_EQ(outcome->end.signal, SIGKILL);
     EXPECT_THAT(outcome->activityTypes, testing::Optional(ElementsAre("save")));
+    session.reset();
+    EXPECT_THAT(directories(), IsEmpty());
+}
+
+TEST_F(OpeningAMovie, AnEditorThatHasLeftWithoutAWordAndDoesNotEndIsMadeToGo)
+{
+    std::optional<host::EditorOutcome> outcome;
+    auto session = startImpatiently("leave hang", outcome);
+    EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
+    EXPECT_EQ(outcome->end.signal, SIGKILL);
+    EXPECT_EQ(outcome->activityTypes, std::nullopt);
+    EXPECT_FALSE(outcome->closed);
     session.reset();
     EXPECT_THAT(directories(), IsEmpty());
 }
