@@ -205,7 +205,9 @@ void EditorProgram::showNotice(const std::string& words)
 void EditorProgram::openMovie()
 {
     const auto current = editor();
-    const auto asset = current ? current->avAsset() : nullptr;
+    if (!current)
+        return; // a value that is needed could not be loaded: the host is about to close us
+    const auto asset = current->avAsset();
     if (!asset || !asset->url()) {
         show();
         return;

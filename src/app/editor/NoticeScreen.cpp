@@ -2,6 +2,7 @@
 
 #include "platform/views/Color.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <sstream>
 #include <utility>
@@ -23,6 +24,12 @@ constexpr platform::Color kWordsColor{1, 1, 1, 1};
 constexpr double kBarHeight = 60;
 constexpr double kBarHeightWithoutHomeButton = 85;
 
+std::size_t lettersIn(const std::string& text)
+{
+    return static_cast<std::size_t>(std::count_if(
+        text.begin(), text.end(), [](char byte) { return (static_cast<unsigned char>(byte) & 0xC0) != 0x80; }));
+}
+
 std::vector<std::string> linesOf(const std::string& words)
 {
     std::vector<std::string> lines;
@@ -31,7 +38,7 @@ std::vector<std::string> linesOf(const std::string& words)
         lines.emplace_back();
         std::istringstream stream(paragraph);
         for (std::string word; stream >> word;) {
-            if (!lines.back().empty() && lines.back().size() + 1 + word.size() > kLettersInALine)
+            if (!lines.back().empty() && lettersIn(lines.back()) + 1 + lettersIn(word) > kLettersInALine)
                 lines.emplace_back();
             lines.back() += (lines.back().empty() ? "" : " ") + word;
         }

@@ -5,12 +5,14 @@
 #include "support/EventLoop.h"
 #include "support/Paths.h"
 #include "support/PrivateDirectory.h"
+#include "support/Program.h"
+#include "support/RefusedSystemCalls.h"
+
+#include <QImage>
 
 #include <gmock/gmock.h>
 
 using testing::ElementsAre;
-using testing::Eq;
-using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::Optional;
 
@@ -48,23 +50,37 @@ protected:
         host::ProcessStart editor{
             tests::program("clipsa-editor"),
             {"--connect", m_connection->address(), "--device-root", m_place->deviceRoot(), "--device", "phone"},
-            {{"CLIPSA_SCRIPT", m_directory.write("script", script)},
-             {"CLIPSA_REPORT", m_directory.path() / "report"},
-             {"CLIPSA_PICTURES", m_directory.path()},
-             {"HOME", m_directory.path()}},
+            {},
             m_place->lock()};
+        for (const auto& variable : scripted(script))
+            editor.environment.push_back(variable);
         editor.arguments.insert(editor.arguments.end(), options.begin(), options.end());
         auto process = host::EditorProcess::start(editor, [this](host::ProcessEnd end) { m_end = end; });
         ASSERT_TRUE(process) << process.error()->description();
         m_process = std::move(process).value();
     }
 
+    /// The environment of an editor to which this is done.
+    tests::Program::Variables scripted(const std::string& script)
+    {
+        return {{"CLIPSA_SCRIPT", m_directory.write("script", script)},
+                {"CLIPSA_REPORT", m_directory.path() / "report"},
+                {"CLIPSA_PICTURES", m_directory.path()},
+                {"XDG_CACHE_HOME", m_directory.path() / "cache"},
+                {"HOME", m_directory.path()}};
+    }
+
     void handOver(const char* source = "clock.mp4")
     {
         const auto movie = std::filesystem::path(m_place->movieDirectory()) / "clock.mp4";
         std::filesystem::copy_file(tests::movie(source), movie);
+        std::filesystem::last_write_time(movie, {}); // the title tells it
         for (const auto& answer : m_waiting)
             answer(runtime::Value(host::kDeviceMovieDirectory + std::string("clock.mp4")));
+    }
+    QImage picture(const char* name) const
+    {
+        return QImage(QString::fromStdString(m_directory.path() / name)).convertToFormat(QImage::Format_RGB32);
     }
     std::string report() const { return tests::PrivateDirectory::read(m_directory.path() / "report"); }
     /// Once the script has got so far.
@@ -98,8 +114,7 @@ TEST_F(ASlowHandOver, IsWaitedForInAWindowWithoutSave)
         print waiting
         wait picture
         print {title} {duration} {size} {layout}
-        picture arrived.png
-        tap Cancel)");
+        close)");
     ASSERT_TRUE(pumpUntilReported("waiting"));
     EXPECT_EQ(m_finished, std::nullopt);
     handOver();
@@ -107,6 +122,38 @@ TEST_F(ASlowHandOver, IsWaitedForInAWindowWithoutSave)
     EXPECT_EQ(report(), "waiting\nRacer 4.000 640x360 phone\n");
     EXPECT_THAT(m_finished, Optional(IsEmpty())) << "what was not done was told";
     EXPECT_EQ(m_end->exitStatus, 0);
+}
+
+TEST_F(ASlowHandOver, ShowsInTheEndWhatAQuickOneShows)
+{
+    const std::string rest = "wait picture\nwait ready\nwait frame 0\nwait thumbnails\npicture ";
+    start(rest + "quick.png\nkey escape");
+    ASSERT_TRUE(tests::pumpUntil([&] { return !m_waiting.empty(); }));
+    handOver();
+    ASSERT_TRUE(pumpUntilEnd());
+    m_end.reset();
+    m_waiting.clear();
+    start("wait waiting\npause 300\npicture waiting.png\nprint waiting\n" + rest + "slow.png\nkey escape");
+    ASSERT_TRUE(pumpUntilReported("waiting"));
+    handOver();
+    ASSERT_TRUE(pumpUntilEnd());
+    EXPECT_THAT(m_finished, Optional(IsEmpty())) << "the editor has the keys";
+    const QImage waiting = picture("waiting.png");
+    int moving = 0;
+    for (int x = 0; x < waiting.width(); ++x)
+        moving += waiting.pixel(x, 0) != waiting.pixel(x, 20) ? 1 : 0;
+    EXPECT_GT(moving, 0) << "the line of what is under way, at the edge of the bar";
+    EXPECT_FALSE(picture("quick.png").isNull());
+    EXPECT_TRUE(picture("slow.png") == picture("quick.png"));
+}
+
+TEST_F(ASlowHandOver, FillsAWindowThatWasTurnedMeanwhile)
+{
+    start("wait waiting\nsize 844 390\nprint waiting\nwait picture\nwait ready\ntap 805 37"); // Save
+    ASSERT_TRUE(pumpUntilReported("waiting"));
+    handOver();
+    ASSERT_TRUE(pumpUntilEnd());
+    EXPECT_THAT(m_finished, Optional(ElementsAre("SaveToCameraRoll")));
 }
 
 TEST_F(ASlowHandOver, CanBeClosedAndNothingIsTold)
@@ -128,6 +175,7 @@ TEST_F(ASlowHandOver, OfWhatIsNoMovieIsExplainedWhereNobodyElseWill)
         wait waiting
         print waiting
         tap There is no movie in this file.
+        print explained
         picture refused.png
         tap Cancel)",
           {"--explain"});
@@ -136,6 +184,31 @@ TEST_F(ASlowHandOver, OfWhatIsNoMovieIsExplainedWhereNobodyElseWill)
     ASSERT_TRUE(pumpUntilEnd());
     EXPECT_EQ(m_end->exitStatus, 0);
     EXPECT_EQ(m_finished, std::nullopt);
+    EXPECT_EQ(report(), "waiting\nexplained\n");
+}
+
+TEST_F(ASlowHandOver, OfAMovieThatTakesLongToOpenIsWaitedForToo)
+{
+    std::unique_ptr<tests::Program> clipsa;
+    posix::FileDescriptor heldUp;
+    std::thread([&] {
+        // The movie's packets; the dynamic loader's own reads are shorter.
+        heldUp = posix::FileDescriptor(tests::holdUpSystemCalls({{SYS_pread64, tests::kHeldUp, 2, 0xFFFFFC00}}));
+        clipsa = std::make_unique<tests::Program>(
+            std::vector<std::string>{tests::program("clipsa"), "open", tests::movie("clock.mp4"), "--device", "phone"},
+            scripted("wait waiting\ntap Waiting for the recording…\nprint waiting"));
+    }).join();
+    EXPECT_TRUE(pumpUntilReported("waiting"));
+}
+
+TEST_F(ASlowHandOver, ThatFailsShowsNoEditorOfNothing)
+{
+    start("wait waiting\ntap Cancel");
+    ASSERT_TRUE(tests::pumpUntil([&] { return !m_waiting.empty(); }));
+    m_waiting.front()(base::Error::make("posix", 28, "the disk is full"));
+    ASSERT_TRUE(pumpUntilEnd());
+    EXPECT_EQ(m_end->exitStatus, 0);
+    EXPECT_EQ(m_finished, std::nullopt) << "a recorder would take it for a look at the movie";
 }
 
 TEST_F(ASlowHandOver, ThatEndsInNothingEndsTheEditor)
