@@ -24,8 +24,7 @@ def completed(activity_types):
     global status
     for activity_type in activity_types:
         print(activity_type)
-    status = save_status
-    loop.quit()
+    status = 0
 
 
 def save_failed(path, message):
@@ -36,7 +35,13 @@ def save_failed(path, message):
 
 
 def failed(message):
+    global status
     print(message, file=sys.stderr)
+    status = 1
+
+
+def ended():
+    # Only now it is known what became of a save that was under way when the user finished.
     loop.quit()
 
 
@@ -44,6 +49,7 @@ def service_left(owner):
     # Clipsa itself has gone, and with it the session.
     if not owner and loop.is_running():
         failed("Clipsa ended unexpectedly")
+        loop.quit()
 
 
 if len(sys.argv) not in (2, 3):
@@ -60,6 +66,7 @@ try:
     bus.add_signal_receiver(completed, "Completed", SESSION)
     bus.add_signal_receiver(save_failed, "SaveFailed", SESSION)
     bus.add_signal_receiver(failed, "Failed", SESSION)
+    bus.add_signal_receiver(ended, "Ended", SESSION)
     recorder = dbus.Interface(bus.get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"), "org.clipsa.Recorder1")
     with open(movie, "rb") as file:
         # A slow disk or network delays the answer, which is worth waiting for.
@@ -72,4 +79,4 @@ except dbus.DBusException as error:
     sys.exit(error.get_dbus_message())
 except KeyboardInterrupt:
     sys.exit(130)  # the editor closes with our connection
-sys.exit(status)
+sys.exit(status or save_status)

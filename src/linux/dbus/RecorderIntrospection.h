@@ -29,6 +29,7 @@ inline constexpr const char* kSessionIntrospection = R"XML(
     <signal name="SaveFailed"><arg type="s" name="path"/><arg type="s" name="message"/></signal>
     <signal name="Completed"><arg type="as" name="activityTypes"/></signal>
     <signal name="Failed"><arg type="s" name="message"/></signal>
+    <signal name="Ended"/>
   </interface>
 )XML";
 

@@ -230,6 +230,7 @@ private:
         events.ended = [this, number](const std::string& failure) {
             if (!failure.empty())
                 tell(number, QStringLiteral("Failed"), {toQt(failure)});
+            tell(number, QStringLiteral("Ended"), {});
             forgetLater(number);
         };
         m_idle.stop();

@@ -176,6 +176,15 @@ TEST_F(Service, TheExampleInPythonSaysWhereAMovieIsKeptThatWasNotSaved)
                                         HasSubstr("); it is kept as /data/unsaved/race.mp4\n")));
 }
 
+TEST_F(Service, TheExampleInPythonWaitsForASaveThatTheUserDidNotWaitFor)
+{
+    startBus("finish=save wait unsaved=/data/unsaved/race.mp4");
+    tests::Program example({kPython, tests::sourceFile("docs/examples/record_and_edit.py"), m_movie}, {});
+    EXPECT_EQ(example.wait(), 1);
+    EXPECT_EQ(example.output(), "save\n");
+    EXPECT_THAT(example.errors(), HasSubstr("it is kept as /data/unsaved/race.mp4\n"));
+}
+
 TEST_F(Service, TheExampleInPythonSaysWhatItNeeds)
 {
     const std::string example = tests::sourceFile("docs/examples/record_and_edit.py");

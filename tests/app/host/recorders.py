@@ -25,6 +25,9 @@ class Recorder:
     def __init__(self):
         self.bus = BusConnection(ADDRESS)
         self.signals = []
+        self.ended = []
+        self.bus.add_signal_receiver(lambda path: self.ended.append(path), "Ended", "org.clipsa.RecorderSession1",
+                                     path_keyword="path")
         for member in ("Saved", "SaveFailed", "Completed", "Failed"):
             self.bus.add_signal_receiver(self.arrived, member, "org.clipsa.RecorderSession1", path_keyword="path",
                                          member_keyword="member")
@@ -60,10 +63,11 @@ def until(predicate):
 
 
 def saves():
-    """What was saved when the user finished is told before that, the rest behind it."""
+    """What was saved when the user finished is told before that, the rest behind it, and then that it was all."""
     recorder = Recorder()
     session = recorder.edit()
-    until(lambda: len(recorder.signals) == 3)
+    until(lambda: recorder.ended)
+    assert recorder.ended == [session], recorder.ended
     assert recorder.signals == [(session, "Saved", "/videos/a.mp4"), (session, "Completed", ["save", "save"]),
                                 (session, "SaveFailed", "/data/b.mp4", "the disk is full")], recorder.signals
 
@@ -84,8 +88,10 @@ def failed():
     session = asker.edit()
     until(lambda: asker.signals)
     assert asker.signals == [(session, "Failed", "the editor ended early, with exit status 9")], asker.signals
+    until(lambda: asker.ended)
+    assert asker.ended == [session], asker.ended
     bystander.round_trip()
-    assert bystander.signals == []
+    assert bystander.signals == [] and bystander.ended == []
 
 
 def vanish():

@@ -117,6 +117,21 @@ TEST_F(Connection, AHostThatClosesInAnswerIsNoFailure)
     EXPECT_EQ(m_hostDisconnects, 0) << "the host was told of what it did itself";
 }
 
+TEST_F(Connection, EveryMessageIsToldToHaveBeenSentWhetherTheHostTakesItOrNot)
+{
+    connect({});
+    int sent = 0;
+    m_extension->setSentHandler([&] { ++sent; });
+    for (int i = 0; i < 2; ++i)
+        proxy()->send(kFinish, {runtime::toValue(std::vector<std::string>{"x"})});
+    EXPECT_EQ(sent, 0) << "told on the main queue";
+    m_mainQueue.drain();
+    EXPECT_EQ(sent, 2);
+    proxy()->send(runtime::Selector("somethingElse"), {});
+    m_mainQueue.drain();
+    EXPECT_EQ(sent, 2) << "it was none of the host's";
+}
+
 TEST_F(Connection, TheEndIsToldToAHandlerThatComesLate)
 {
     connect({});

@@ -1,8 +1,10 @@
-// What became of saved notes, as an editor tells it and its host reads it.
+// What became of movies, as an editor tells it and its host reads it.
 #include "linux/dbus/EditorReport.h"
 
 #include <gmock/gmock.h>
 
+#include <fcntl.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 using testing::IsEmpty;
@@ -48,9 +50,48 @@ TEST_F(AnEditorsReport, CountsNoHalfEntry)
     EXPECT_THAT(host.notes(), SizeIs(1));
 }
 
+TEST_F(AnEditorsReport, EndsATextWhereAZeroByteWouldEndIt)
+{
+    editor.add({Kind::Saved, std::string("/videos/a\0.mp4", 14), ""});
+    editor.add({Kind::Unsaved, "/videos/b.mp4", ""});
+    const auto notes = host.notes();
+    ASSERT_THAT(notes, SizeIs(2));
+    EXPECT_EQ(notes[0].path, "/videos/a");
+    EXPECT_EQ(notes[1].path, "/videos/b.mp4");
+}
+
+TEST_F(AnEditorsReport, IsReadToItsEnd)
+{
+    for (int i = 0; i < 1000; ++i)
+        editor.add({Kind::Saved, "/videos/" + std::to_string(i) + ".mp4", ""});
+    const auto notes = host.notes();
+    ASSERT_THAT(notes, SizeIs(1000));
+    EXPECT_EQ(notes.back().path, "/videos/999.mp4");
+}
+
+TEST_F(AnEditorsReport, MayTellWhatThisHostDoesNotKnow)
+{
+    ASSERT_EQ(::write(editor.descriptor(), "shared\0/a\0", 11), 11);
+    editor.add({Kind::Saved, "/videos/a.mp4", ""});
+    const auto notes = host.notes();
+    ASSERT_THAT(notes, SizeIs(1));
+    EXPECT_EQ(notes[0].path, "/videos/a.mp4");
+}
+
 TEST_F(AnEditorsReport, MovesAsideForTheNumbersThatEditorsInherit)
 {
-    EXPECT_GT(host.descriptor(), dbus::kEditorReportDescriptor);
+    // In a process of its own, where these numbers are free.
+    const pid_t child = ::fork();
+    if (child == 0) {
+        for (int number = 3; number < 16; ++number)
+            ::close(number);
+        const auto report = dbus::EditorReport::make();
+        ::_exit(report && report.value().descriptor() > dbus::kEditorReportDescriptor ? 0 : 1);
+    }
+    int status = -1;
+    ASSERT_EQ(::waitpid(child, &status, 0), child);
+    EXPECT_EQ(status, 0);
+    EXPECT_TRUE(::fcntl(host.descriptor(), F_GETFD) & FD_CLOEXEC) << "others inherit it as well";
 }
 
 } // namespace
