@@ -63,11 +63,10 @@ protected:
     /// The environment of an editor to which this is done.
     tests::Program::Variables scripted(const std::string& script)
     {
-        return {{"CLIPSA_SCRIPT", m_directory.write("script", script)},
-                {"CLIPSA_REPORT", m_directory.path() / "report"},
-                {"CLIPSA_PICTURES", m_directory.path()},
-                {"XDG_CACHE_HOME", m_directory.path() / "cache"},
-                {"HOME", m_directory.path()}};
+        return {
+            {"CLIPSA_EDITOR", tests::program("clipsa-editor")}, {"CLIPSA_SCRIPT", m_directory.write("script", script)},
+            {"CLIPSA_REPORT", m_directory.path() / "report"},   {"CLIPSA_PICTURES", m_directory.path()},
+            {"XDG_CACHE_HOME", m_directory.path() / "cache"},   {"HOME", m_directory.path()}};
     }
 
     void handOver(const char* source = "clock.mp4")
