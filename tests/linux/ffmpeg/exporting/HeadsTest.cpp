@@ -1,4 +1,5 @@
 // What is encoded to stand before copied pictures, at the quality and in the formats that exporting asks for.
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/ExportTest.h"
 #include "linux/ffmpeg/exporting/video/Splicer.h"
 
@@ -43,6 +44,8 @@ protected:
         const std::unique_ptr<AVFormatContext, Closing> context(avformat_alloc_context());
         AVStream& stream = *avformat_new_stream(context.get(), nullptr);
         stream.codecpar->codec_id = codec;
+        if (codec == AV_CODEC_ID_AV1)
+            ffmpeg::setExtradata(*stream.codecpar, ffmpeg::Bytes{0x0A, 0}); // any header
         const auto picture = noise(format, width, height);
         const auto splicer = ffmpeg::Splicer::make(stream, *picture);
         if (!splicer)
@@ -72,6 +75,14 @@ TEST_F(Heads, OfVp9HoldNoiseInEveryFormat)
         EXPECT_EQ(encode(AV_CODEC_ID_VP9, format, 640, 360), 2) << av_get_pix_fmt_name(format);
     // So wide that there is more than one column of tiles in any case.
     EXPECT_EQ(encode(AV_CODEC_ID_VP9, AV_PIX_FMT_YUV444P, 4160, 128), 2);
+}
+
+// The encoder writes where nothing is.
+TEST_F(Heads, OfAv1WithoutColoursAreNotEncoded)
+{
+    EXPECT_EQ(encode(AV_CODEC_ID_AV1, AV_PIX_FMT_GRAY8, 320, 180), -1);
+    EXPECT_EQ(encode(AV_CODEC_ID_AV1, AV_PIX_FMT_GRAY10, 320, 180), -1);
+    EXPECT_EQ(encode(AV_CODEC_ID_AV1, AV_PIX_FMT_YUV444P, 320, 180), 2);
 }
 
 } // namespace

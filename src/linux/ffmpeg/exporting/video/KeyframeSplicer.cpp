@@ -79,6 +79,9 @@ base::Result<void> KeyframeSplicer::prepare(EncoderRequest& request, int /*reord
 {
     // No picture before its time.
     if (m_isAv1) {
+        // At this speed the encoder writes where nothing is when there are no colours.
+        if (av_pix_fmt_desc_get(m_format)->nb_components == 1)
+            return cannotCopy("no AV1 without colours can be encoded");
         request.encoder = "libaom-av1";
         request.scale = kAv1Quality;
         request.options = {{"usage", "realtime"}, {"cpu-used", "7"}, {"lag-in-frames", "0"}, {"row-mt", "1"}};
