@@ -12,6 +12,7 @@
 #include <random>
 #include <system_error>
 #include <unistd.h>
+#include <utility>
 
 namespace host {
 
@@ -29,10 +30,15 @@ base::ErrorRef isThereAlready(const ExportOrder& order)
     return refused(order.output + " is there already; give --force to replace it");
 }
 
-/// With what can be done about it.
-base::ErrorRef explained(const base::ErrorRef& failure, const ExportOrder& order)
+/// With what can be done about it. `written` may stand in for the output.
+base::ErrorRef explained(base::ErrorRef failure, const ExportOrder& order, const fs::path& written)
 {
     std::string words = failure->description();
+    const std::string name = written.filename().native();
+    if (const std::size_t at = words.find(name); at != std::string::npos) {
+        words.replace(at, name.size(), fs::path(order.output).filename().native());
+        failure = base::Error::make(failure->domain(), failure->code(), words);
+    }
     if (words.ends_with('.'))
         words.pop_back();
     switch (std::abs(failure->code())) { // the engine's numbers of the system's errors are negative
@@ -93,7 +99,7 @@ base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
     order.setUp(*session, *asset.value());
     ProgressBar progress(order.doing);
     if (base::ErrorRef failure = tool.runExport(*session, [&] { progress.show(session->progress()); }))
-        return explained(failure, order);
+        return explained(std::move(failure), order, written);
     if (order.force) {
         fs::rename(written, output, error);
         if (error) {

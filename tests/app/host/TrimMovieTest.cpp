@@ -153,6 +153,16 @@ TEST_F(Trim, SaysWhatToDoWhenTheDiskIsFull)
     EXPECT_THAT(namesIn(directory.path()), IsEmpty());
 }
 
+TEST_F(Trim, NamesTheFileThatItWasToReplaceWhenTheDiskIsFull)
+{
+    std::ofstream(out) << "mine";
+    tests::whileRefusing({{SYS_pwrite64, ENOSPC}}, [&] {
+        EXPECT_EQ(run({"trim", movie("clock.mp4"), "--to", "2", "-o", out, "--force"}), 1);
+    });
+    EXPECT_THAT(errors, HasSubstr("“out.mp4” cannot be written: the disk is full; make room there"));
+    EXPECT_THAT(namesIn(directory.path()), ElementsAre("out.mp4"));
+}
+
 TEST_F(Trim, SaysWhatIsWrongWithTheDirectory)
 {
     EXPECT_EQ(run({"trim", movie("clock.mp4"), "-o", directory.path() / "none/out.mp4"}), 2);
