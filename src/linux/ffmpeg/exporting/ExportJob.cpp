@@ -10,6 +10,8 @@
 #include <algorithm>
 #include <cmath>
 #include <future>
+#include <mutex>
+#include <set>
 #include <utility>
 
 namespace ffmpeg {
@@ -63,7 +65,7 @@ public:
     Result<void> run(VideoMode mode, SoundMode soundMode)
     {
         const Movie& movie = *m_job.movie;
-        const TellLog log = [this](const std::string& line) { m_job.log->message(line); };
+        const TellLog log = [this](const std::string& line) { tellOnce(line); };
         // The sound is looked at meanwhile. When the pictures cannot be copied it is as good for the next attempt.
         if (!m_sounds.valid())
             m_sounds = std::async(std::launch::async, openSoundSources, m_job.movie, m_range, m_job.mix, soundMode,
@@ -99,9 +101,19 @@ public:
     }
 
 private:
+    /// The next attempt finds again what this one says.
+    void tellOnce(const std::string& line)
+    {
+        const std::lock_guard lock(m_mutex);
+        if (m_told.insert(line).second)
+            m_job.log->message(line);
+    }
+
     const ExportJob& m_job;
     const ExportRange& m_range;
     OutputFile& m_file;
+    std::mutex m_mutex;
+    std::set<std::string> m_told;
     std::future<Result<std::vector<std::unique_ptr<TrackSource>>>> m_sounds;
 };
 
