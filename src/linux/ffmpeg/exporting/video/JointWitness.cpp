@@ -97,9 +97,9 @@ Result<JointSide> JointWitness::sideOf(const Stretch& stretch, const Group& grou
     if (!looks)
         return looks.error();
     side.looks = std::move(looks).value();
-    const std::size_t given = std::min(stretch.given.size(), side.looks.size());
+    const std::size_t given = &group == &stretch.first ? std::min(stretch.given.size(), packets.size()) : 0;
     for (std::size_t i = 0; i < given; ++i)
-        if (!areAlike(stretch.given[i], side.looks[i]))
+        if (i >= side.looks.size() || !areAlike(stretch.given[i], side.looks[i]))
             return cannotCopy("what is encoded does not look like what it is made of");
     return side;
 }
