@@ -165,7 +165,7 @@ Reach wider(Reach a, const Reach& b)
 {
     a.isBeyondPicture = a.isBeyondPicture || b.isBeyondPicture;
     for (std::size_t i = 0; i < 2; ++i)
-        a.bounds[i] = a.bounds[i] == 0 || b.bounds[i] == 0 ? 0 : std::min(a.bounds[i], b.bounds[i]);
+        a.bounds[i] = std::min(a.bounds[i], b.bounds[i]);
     for (std::size_t i = 2; i < 4; ++i)
         a.bounds[i] = std::max(a.bounds[i], b.bounds[i]);
     return a;
@@ -286,6 +286,16 @@ bool isOfField(ByteView nal, const Sps& sps)
     in.ue();
     in.skip((sps.hasSeparatePlanes ? 2 : 0) + sps.frameNumBits);
     return in.bit() != 0;
+}
+
+std::uint32_t picturesUntilRefreshed(ByteView info)
+{
+    constexpr std::uint32_t kRecoveryPoint = 6;
+    const Bytes payload = withoutEmulation(info);
+    for (const InfoMessage& each : messagesIn(ByteView(payload).subspan(1)))
+        if (each.type == kRecoveryPoint)
+            return BitReader(each.payload).ue();
+    return 0;
 }
 
 bool Configuration::hasStartCodes(ByteView extradata)

@@ -10,8 +10,10 @@ namespace ffmpeg::hevc {
 namespace {
 
 constexpr int kHeaderBits = 16;
-constexpr int kProfileBits = 96;       ///< of a stream without layers in time
-constexpr std::size_t kBeginning = 64; ///< bytes that are enough for the numbers
+constexpr int kProfileBits = 96; ///< of a stream without layers in time, with its level
+constexpr int kLevelBits = 8;
+constexpr std::uint32_t kMostLayers = 6; ///< beside the lowest
+constexpr std::size_t kBeginning = 64;   ///< bytes that are enough for the numbers
 
 bool isIrap(Unit unit)
 {
@@ -32,6 +34,19 @@ Bytes beginningOf(ByteView nal)
     return withoutEmulation(nal.first(std::min(nal.size(), kBeginning)));
 }
 
+/// Profiles and levels of the layers below the highest.
+void skipLayers(BitReader& in, std::uint32_t layers)
+{
+    if (layers == 0)
+        return;
+    int bits = 0;
+    for (std::uint32_t i = 0; i < layers; ++i) {
+        bits += in.bit() ? kProfileBits - kLevelBits : 0;
+        bits += in.bit() ? kLevelBits : 0;
+    }
+    in.skip(2 * static_cast<int>(kMostLayers + 2 - layers) + bits);
+}
+
 } // namespace
 
 std::uint32_t idOfVps(ByteView nal)
@@ -49,9 +64,11 @@ std::optional<Sps> parseSps(ByteView nal)
     Sps sps;
     in.skip(kHeaderBits);
     sps.vps = in.bits(4);
-    if (in.bits(3) != 0)
+    sps.layers = in.bits(3);
+    if (sps.layers > kMostLayers)
         return std::nullopt;
     in.skip(1 + kProfileBits);
+    skipLayers(in, sps.layers);
     sps.id = in.ue();
     sps.chromaFormat = in.ue();
     if (sps.chromaFormat == 3)
@@ -64,10 +81,11 @@ std::optional<Sps> parseSps(ByteView nal)
     sps.lumaDepth = in.ue() + 8;
     sps.chromaDepth = in.ue() + 8;
     in.ue();
-    in.skip(1);
+    const bool isSaidOfEach = in.bit() != 0;
     sps.bufferingBit = in.position();
-    for (std::uint32_t* each : {&sps.buffering.pictures, &sps.buffering.reordered, &sps.buffering.latency})
-        *each = in.ue();
+    for (std::uint32_t i = isSaidOfEach ? 0 : sps.layers; i <= sps.layers; ++i)
+        for (std::uint32_t* each : {&sps.buffering.pictures, &sps.buffering.reordered, &sps.buffering.latency})
+            *each = in.ue();
     if (in.isBeyond() || sps.id > 15)
         return std::nullopt;
     return sps;
@@ -90,7 +108,7 @@ std::optional<Bytes> withBuffering(ByteView nal, const Sps& source)
     const auto own = parseSps(nal);
     const Bytes payload = withoutEmulation(nal);
     const std::size_t end = endOf(payload);
-    if (!own || own->bufferingBit > end)
+    if (!own || own->layers > 0 || own->bufferingBit > end)
         return std::nullopt;
     BitWriter out;
     out.copy(payload, 0, own->bufferingBit);
@@ -159,7 +177,7 @@ std::optional<Bytes> renumbered(ByteView set, const Ids& ids)
         out.bits(ids.vps, 4);
         break;
     case Unit::Sps: {
-        if (!parseSps(set))
+        if (const auto sps = parseSps(set); !sps || sps->layers > 0)
             return std::nullopt;
         in.skip(4);
         out.bits(ids.vps, 4);
@@ -224,20 +242,10 @@ bool saysHdr(ByteView nal)
     if (unitOf(nal) != Unit::PrefixInfo)
         return false;
     const Bytes payload = withoutEmulation(nal);
-    std::size_t at = kHeaderBits / 8;
-    const auto number = [&] { // of bytes that are added up as long as they are full
-        std::uint32_t sum = 0;
-        while (at < payload.size() && payload[at] == 0xFF)
-            sum += payload[at++];
-        return at < payload.size() ? sum + payload[at++] : sum;
-    };
-    while (at + 2 < payload.size()) {
-        const std::uint32_t type = number();
-        if (type == kMasteringDisplay || type == kContentLight)
-            return true;
-        at += number();
-    }
-    return false;
+    const auto messages = messagesIn(ByteView(payload).subspan(kHeaderBits / 8));
+    return std::any_of(messages.begin(), messages.end(), [](const InfoMessage& each) {
+        return each.type == kMasteringDisplay || each.type == kContentLight;
+    });
 }
 
 std::optional<Configuration> Configuration::parse(ByteView extradata)

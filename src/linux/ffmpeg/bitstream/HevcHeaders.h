@@ -48,7 +48,7 @@ struct Ids {
     std::uint32_t pps = 0;
 };
 
-/// A sequence parameter set, of a stream without layers in time.
+/// A sequence parameter set.
 ///
 /// Two streams are joined under one header by giving each sets of its own. Another set becomes active only where a group
 /// begins that needs nothing before it, and decoders derive all anew from it: coding tools, block sizes, scaling lists,
@@ -63,6 +63,7 @@ struct Ids {
 struct Sps {
     std::uint32_t id = 0;
     std::uint32_t vps = 0;
+    std::uint32_t layers = 0; ///< in time, beside the lowest
     std::uint32_t chromaFormat = 1;
     bool hasSeparatePlanes = false;
     std::uint32_t width = 0; ///< as coded
@@ -75,16 +76,16 @@ struct Sps {
         std::uint32_t reordered = 0;
         std::uint32_t latency = 0; ///< one more than are shown later at most than what is decoded behind them; 0: any
     };
-    Buffering buffering;
-    std::size_t bufferingBit = 0; ///< its position
+    Buffering buffering;          ///< of all layers together
+    std::size_t bufferingBit = 0; ///< its position, without layers
 };
 
 std::uint32_t idOfVps(ByteView nal);
-/// Nothing when it is damaged, or has layers in time.
+/// Nothing when it is damaged.
 std::optional<Sps> parseSps(ByteView nal);
 /// Whether pictures of both look alike to whoever shows them.
 bool canFollow(const Sps& a, const Sps& b);
-/// The same set, for a stream whose pictures are kept and reordered at least like those of `source`.
+/// The same set, which has no layers, for a stream whose pictures are kept and reordered at least like those of `source`.
 std::optional<Bytes> withBuffering(ByteView nal, const Sps& source);
 /// Whether blocks may be kept as they are, without loss.
 bool allowsLossless(ByteView pps);
@@ -93,7 +94,7 @@ Ids idsOfPps(ByteView nal);
 /// The picture set that a slice refers to.
 std::uint32_t ppsOfSlice(ByteView nal);
 
-/// A set with other numbers: its own, and those of what it refers to. Nothing when that cannot be done.
+/// A set without layers with other numbers: its own, and those of what it refers to. Nothing when that cannot be done.
 std::optional<Bytes> renumbered(ByteView set, const Ids& ids);
 /// A slice that referred to picture set 0. Nothing when it refers to another.
 std::optional<Bytes> renumberedSlice(ByteView slice, std::uint32_t pps);

@@ -93,6 +93,30 @@ std::optional<std::vector<ByteView>> unitsOfHeader(ByteView header, std::size_t&
     return units;
 }
 
+std::vector<InfoMessage> messagesIn(ByteView bytes)
+{
+    std::vector<InfoMessage> messages;
+    const auto number = [&] { // of bytes that are added up as long as they are full
+        std::uint32_t sum = 0;
+        std::uint8_t byte = 0xFF;
+        while (byte == 0xFF && !bytes.empty()) {
+            byte = bytes.front();
+            sum += byte;
+            bytes = bytes.subspan(1);
+        }
+        return sum;
+    };
+    while (bytes.size() > 2) { // the unit's end takes one
+        const std::uint32_t type = number();
+        const std::uint32_t size = number();
+        if (size > bytes.size())
+            break;
+        messages.push_back({type, bytes.first(size)});
+        bytes = bytes.subspan(size);
+    }
+    return messages;
+}
+
 bool setExtradata(AVCodecParameters& parameters, ByteView bytes)
 {
     av_freep(&parameters.extradata);

@@ -4,6 +4,7 @@
 #include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/ExportTest.h"
 #include "linux/ffmpeg/exporting/video/HiddenPictures.h"
+#include "linux/ffmpeg/exporting/video/Splicer.h"
 
 #include <random>
 
@@ -83,6 +84,134 @@ TEST_F(Headers, OfH264SayHowLargeItsPicturesAre)
         EXPECT_EQ(sps->width, 320) << name;
         EXPECT_EQ(sps->height, 180) << name;
     }
+}
+
+TEST_F(Headers, OfH264AreUsedLikeThoseBesideThem)
+{
+    constexpr std::size_t kProfile = 1;
+    constexpr std::size_t kConstraints = 2;
+    const ffmpeg::Bytes set = h264::Configuration::parse(headerOf("h264-b.mp4"))->sps.front();
+    ffmpeg::Bytes other = set;
+    other[kProfile] = 122;
+    other[kConstraints] = 0x30;
+    ffmpeg::Bytes own = set;
+    own[kConstraints] = 0x50;
+    const auto restriction = *h264::parseSps(set)->restriction;
+    const auto made = h264::parseSps(h264::inUseLike(own, other, restriction).value());
+    EXPECT_EQ(made->profile, 122) << "a decoder is chosen once";
+    EXPECT_EQ(made->constraints, 0x10) << "what is true of both";
+    EXPECT_EQ(h264::parseSps(h264::inUseLike(other, own, restriction).value())->profile, 122);
+
+    // How far motion goes, at most, and the least compression.
+    const auto withReach = [&](std::uint32_t compression, std::uint32_t motion) {
+        const ffmpeg::Bytes payload = ffmpeg::withoutEmulation(set);
+        ffmpeg::BitWriter out;
+        out.copy(payload, 0, h264::parseSps(set)->restrictionBit);
+        out.bits(0b10, 2); // a restriction; nothing beyond the picture
+        for (const std::uint32_t each : {compression, compression, motion, motion, 2U, 4U})
+            out.ue(each);
+        out.finish();
+        return ffmpeg::withEmulation(out.bytes());
+    };
+    const auto inUse = [&](const ffmpeg::Bytes& a, const ffmpeg::Bytes& b) {
+        return h264::inUseLike(a, b, {2, 4}).value();
+    };
+    EXPECT_EQ(inUse(withReach(2, 9), withReach(4, 11)), withReach(2, 11));
+    EXPECT_EQ(inUse(withReach(4, 11), withReach(2, 9)), withReach(2, 11));
+    EXPECT_EQ(inUse(withReach(4, 11), withReach(0, 9)), withReach(0, 11)) << "0 is no bound";
+}
+
+TEST_F(Headers, OfH264AreJoinedOnlyWhereTheyAgreeInWhatDecodersKeep)
+{
+    const h264::Sps set = *h264::parseSps(h264::Configuration::parse(headerOf("h264-b.mp4"))->sps.front());
+    const auto follows = [&](auto change) {
+        h264::Sps other = set;
+        change(other);
+        EXPECT_EQ(h264::canFollow(set, other), h264::canFollow(other, set));
+        return h264::canFollow(set, other);
+    };
+    EXPECT_TRUE(follows([](h264::Sps& other) {
+        other.id = 3;
+        other.frameNumBits = 9;
+        other.orderType = 2;
+        other.orderBits = 9;
+        other.hasFrameNumGaps = true;
+    }));
+    EXPECT_FALSE(follows([](h264::Sps& other) { other.chromaFormat = 3; }));
+    EXPECT_FALSE(follows([](h264::Sps& other) { other.lumaDepth = 10; }));
+    EXPECT_FALSE(follows([](h264::Sps& other) { other.chromaDepth = 10; }));
+    EXPECT_FALSE(follows([](h264::Sps& other) { other.hasSeparatePlanes = true; }));
+    EXPECT_FALSE(follows([](h264::Sps& other) { other.bypassesTransform = true; }));
+    EXPECT_FALSE(follows([](h264::Sps& other) { other.isProgressive = false; }));
+    EXPECT_FALSE(follows([](h264::Sps& other) { other.macroblocksWide *= 2; }));
+    EXPECT_FALSE(follows([](h264::Sps& other) { other.macroblocks *= 2; }));
+    for (std::size_t side = 0; side < 4; ++side)
+        EXPECT_FALSE(follows([side](h264::Sps& other) { ++other.cropping[side]; })) << side;
+}
+
+TEST_F(Headers, OfHevcAreJoinedOnlyWherePicturesLookAlike)
+{
+    hevc::Sps set;
+    const auto header = hevc::Configuration::parse(headerOf("hevc.mp4")).value();
+    for (const ffmpeg::Bytes& each : header.sets)
+        if (hevc::unitOf(each) == hevc::Unit::Sps)
+            set = *hevc::parseSps(each);
+    ASSERT_EQ(set.width, 320U);
+    const auto follows = [&](auto change) {
+        hevc::Sps other = set;
+        change(other);
+        return hevc::canFollow(set, other);
+    };
+    EXPECT_TRUE(follows([](hevc::Sps& other) { other.height += 8, other.window[3] += 4; })) << "another block size";
+    EXPECT_FALSE(follows([](hevc::Sps& other) { other.height += 8; }));
+    EXPECT_FALSE(follows([](hevc::Sps& other) { other.width += 8; }));
+    EXPECT_FALSE(follows([](hevc::Sps& other) { other.window[0] += 4, other.window[1] -= 4; }));
+    EXPECT_FALSE(follows([](hevc::Sps& other) { other.window[2] += 4, other.window[3] -= 4; }));
+    EXPECT_FALSE(follows([](hevc::Sps& other) { other.chromaFormat = 0; }));
+    EXPECT_FALSE(follows([](hevc::Sps& other) { other.hasSeparatePlanes = true; }));
+    EXPECT_FALSE(follows([](hevc::Sps& other) { other.lumaDepth = 10; }));
+    EXPECT_FALSE(follows([](hevc::Sps& other) { other.chromaDepth = 10; }));
+}
+
+TEST_F(Headers, OfHevcSayHowManyPicturesAllLayersKeep)
+{
+    const auto bufferingOf = [&](const char* name) {
+        const auto header = hevc::Configuration::parse(headerOf(name)).value();
+        for (const ffmpeg::Bytes& each : header.sets)
+            if (hevc::unitOf(each) == hevc::Unit::Sps)
+                return hevc::parseSps(each).value();
+        return hevc::Sps();
+    };
+    const hevc::Sps plain = bufferingOf("hevc.mp4");
+    const hevc::Sps layered = bufferingOf("hevc-layers.mp4");
+    EXPECT_EQ(plain.layers, 0U);
+    EXPECT_EQ(layered.layers, 1U);
+    EXPECT_EQ(layered.width, 320U);
+    EXPECT_TRUE(hevc::canFollow(plain, layered));
+    EXPECT_GT(layered.buffering.reordered, 0U);
+    EXPECT_GT(layered.buffering.pictures, layered.buffering.reordered);
+}
+
+TEST_F(Headers, OfAv1StandBeforeEachKeyframeThatIsCopied)
+{
+    DecodedMovie file(exportMovie("av1.mp4"));
+    const auto packet = ffmpeg::newPacket();
+    ASSERT_GE(av_read_frame(&file.context(), packet.get()), 0);
+    const ffmpeg::ByteView whole = ffmpeg::payloadOf(*packet);
+    const std::size_t header = ffmpeg::picturesOfAv1(whole).bytesToHeader;
+    ASSERT_GT(header, 0U);
+    const ffmpeg::Bytes bare(whole.begin() + std::ptrdiff_t(header), whole.end());
+    av_packet_unref(packet.get());
+    ASSERT_EQ(av_new_packet(packet.get(), int(bare.size())), 0);
+    std::copy(bare.begin(), bare.end(), packet->data);
+    packet->flags = AV_PKT_FLAG_KEY;
+    auto picture = ffmpeg::newFrame();
+    picture->format = AV_PIX_FMT_YUV420P;
+    const auto splicer = ffmpeg::Splicer::make(file.stream(), *picture).value();
+    ASSERT_TRUE(splicer->adoptCopied(*packet));
+    const auto pictures = ffmpeg::picturesOfAv1(ffmpeg::payloadOf(*packet));
+    EXPECT_TRUE(pictures.hasHeader && pictures.startsGroup);
+    EXPECT_EQ(std::size_t(packet->size), bare.size() + pictures.bytesToHeader);
 }
 
 TEST_F(Headers, ThatAreDamagedAreRefused)
@@ -209,6 +338,16 @@ TEST(NalUnits, EndBeforeZerosThatBelongToNobody)
     ASSERT_EQ(ffmpeg::unitsBetweenStartCodes(codes).size(), 2U);
     for (const ffmpeg::ByteView unit : ffmpeg::unitsBetweenStartCodes(codes))
         EXPECT_EQ(unit.size(), 2U);
+}
+
+TEST(H264Information, SaysHowLongPicturesAreNotWholeYet)
+{
+    // A recovery point of 29, then one of 0; another message before the former.
+    EXPECT_EQ(h264::picturesUntilRefreshed(ffmpeg::Bytes{0x06, 0x06, 0x02, 0x0F, 0x40, 0x80}), 29U);
+    EXPECT_EQ(h264::picturesUntilRefreshed(ffmpeg::Bytes{0x06, 0x06, 0x01, 0xC4, 0x80}), 0U);
+    EXPECT_EQ(h264::picturesUntilRefreshed(ffmpeg::Bytes{0x06, 0x01, 0x01, 0x44, 0x06, 0x02, 0x0F, 0x40, 0x80}), 29U);
+    for (const ffmpeg::Bytes& damaged : {ffmpeg::Bytes{0x06}, {0x06, 0xFF}, {0x06, 0x06, 0xFF, 0xFF, 0x01, 0x02}})
+        EXPECT_EQ(h264::picturesUntilRefreshed(damaged), 0U);
 }
 
 TEST(HevcHeaders, TheFirstPictureOfAnOpenGroupBecomesABeginning)

@@ -43,8 +43,9 @@ INSTANTIATE_TEST_SUITE_P(, LosslessRecordings,
 
 TEST_F(JoinedHeaders, OfH264SayTheSameOfHowPicturesAreUsed)
 {
-    for (const char* name : {"h264.mp4", "h264-b.mp4", "h264-b.ts", "h264-444.mp4", "h264-10bit.mp4",
-                             "h264-interlaced.mp4", "h264-full-range.mp4", "h264-baseline.mp4", "h264-lossless.mp4"}) {
+    for (const char* name :
+         {"h264.mp4", "h264-b.mp4", "h264-b.ts", "h264-444.mp4", "h264-10bit.mp4", "h264-interlaced.mp4",
+          "h264-mixed.mp4", "h264-full-range.mp4", "h264-baseline.mp4", "h264-lossless.mp4"}) {
         SCOPED_TRACE(name);
         ASSERT_EQ(cut(exportMovie(name), output(), fromTo(0.5, 2.5)), ExportStatus::Completed) << errorText();
         const auto header = h264::Configuration::parse(headerOf(output()));

@@ -5,7 +5,7 @@
 namespace tests {
 namespace {
 
-class EncodedHeads : public CutsTest, public testing::WithParamInterface<const char*> {
+class HeadsOfOneSource : public CutsTest {
 protected:
     /// Bytes of the packets that are shown from one time up to another.
     static std::int64_t bytesOfPackets(const std::string& path, double from, double to)
@@ -21,6 +21,8 @@ protected:
         return bytes;
     }
 };
+
+class EncodedHeads : public HeadsOfOneSource, public testing::WithParamInterface<const char*> {};
 
 TEST_P(EncodedHeads, CostNoMoreThanTheirSourcesDeserve)
 {
@@ -38,6 +40,16 @@ TEST_P(EncodedHeads, CostNoMoreThanTheirSourcesDeserve)
     EXPECT_GT(worst, 36);
     RecordProperty("bytes_per_mille", int(is * 1000 / was));
     RecordProperty("worst_centibels", int(worst * 10));
+}
+
+TEST_F(HeadsOfOneSource, CostTheSameWhateverItsClock)
+{
+    std::vector<std::int64_t> sizes;
+    for (const char* name : {"h264-coarse.mp4", "h264-coarse-ticks.mp4"}) {
+        ASSERT_EQ(cut(exportMovie(name), output(name), fromTo(0.4, 2)), ExportStatus::Completed) << errorText();
+        sizes.push_back(bytesOfPackets(output(name), 0, 0.6));
+    }
+    EXPECT_NEAR(double(sizes[1]), double(sizes[0]), 0.02 * double(sizes[0]));
 }
 
 INSTANTIATE_TEST_SUITE_P(, EncodedHeads,

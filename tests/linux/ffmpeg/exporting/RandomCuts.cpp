@@ -72,7 +72,7 @@ INSTANTIATE_TEST_SUITE_P(
         Kind{"vp9-odd.webm", true, 48}, Kind{"h264-recorded.mkv", true, 49}, Kind{"h264-recorded-one.mkv", false, 50},
         Kind{"av1.ivf", true, 51}, Kind{"vp9-422-10bit.mkv", true, 47}, Kind{"vp9-440.webm", false, 58},
         Kind{"sound-no-header.mp4", true, 52}, Kind{"sound-doubled.mkv", true, 53},
-        Kind{"opus-fragmented.mp4", true, 54}),
+        Kind{"opus-fragmented.mp4", true, 54}, Kind{"hevc-layers.mp4", true, 55}),
     [](const auto& each) { return caseName(each.param.file); });
 
 INSTANTIATE_TEST_SUITE_P(InOtherContainers, RandomCuts,

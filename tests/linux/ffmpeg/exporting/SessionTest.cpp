@@ -218,6 +218,41 @@ TEST_F(AnExport, OfAMovieThatBeginsSmallHasItsLargestSize)
     }
 }
 
+TEST_F(AnExport, HasNoLargerSizeThanThePicturesInItsRange)
+{
+    ASSERT_EQ(cut(exportMovie("vp8-growing.webm"), output(), fromTo(0, 0.4)), ExportStatus::Completed) << errorText();
+    EXPECT_EQ(DecodedMovie(output()).stream().codecpar->width, 160);
+    EXPECT_EQ(DecodedMovie(output()).stream().codecpar->height, 90);
+}
+
+TEST_F(AnExport, SaysOnceWhatItFindsAgainWhenItBeginsAnew)
+{
+    const auto session = sessionFor(exportMovie("h264-changing.mp4"), output(), std::nullopt);
+    platform::AudioMix mix;
+    mix.inputs.push_back({99});
+    session->setAudioMix(mix);
+    ASSERT_EQ(run(session), ExportStatus::Completed) << errorText();
+    EXPECT_TRUE(saysEncodedAsAWhole());
+    const auto lines = log.texts(base::MemoryLog::Line::Kind::Message);
+    EXPECT_EQ(std::count_if(lines.begin(), lines.end(),
+                            [](const std::string& line) { return line.starts_with("Track 99 of"); }),
+              1);
+}
+
+// A keyframe there is only where a refresh begins, and the pictures behind it are not whole yet.
+TEST_F(AnExport, OfPicturesThatAreRefreshedPartByPartHasAllOfThem)
+{
+    for (const auto& [start, end] : {std::pair(1.05, 1.4), {1.5, 1.9}, {1.95, 2.2}, {3.9, 4.0}}) {
+        ASSERT_EQ(cut(exportMovie("h264-refresh.mp4"), output(), fromTo(start, end)), ExportStatus::Completed);
+        const auto source = DecodedMovie(exportMovie("h264-refresh.mp4")).all();
+        for (const DecodedPicture& each : DecodedMovie(output()).all()) {
+            ASSERT_GE(each.number, 0);
+            EXPECT_GT(likeness(each, source[std::size_t(each.number)]), 40) << each.number;
+        }
+        std::filesystem::remove(output());
+    }
+}
+
 TEST_F(AnExport, KeepsHowThePictureIsTurned)
 {
     ASSERT_EQ(cut(exportMovie("h264-rotated.mp4"), output(), fromTo(1.1, 3)), ExportStatus::Completed);

@@ -17,9 +17,9 @@ TEST_P(WholeMovies, KeepEachPictureBitForBit)
 
 INSTANTIATE_TEST_SUITE_P(, WholeMovies,
                          testing::Values("h264-b.mp4", "h264-b.mkv", "h264-b.ts", "h264-open.mp4", "h264-vfr.mkv",
-                                         "h264-in-band.mp4", "hevc-b.mkv", "hevc-open.mp4", "vp9.webm",
-                                         "vp9-hidden.webm", "av1-hidden.mkv", "av1.ivf", "h264-odd.mp4", "vp9-odd.webm",
-                                         "h264-recorded.mkv", "h264-recorded-one.mkv", "h264.avi"),
+                                         "h264-in-band.mp4", "hevc-b.mkv", "hevc-open.mp4", "hevc-layers.mp4",
+                                         "vp9.webm", "vp9-hidden.webm", "av1-hidden.mkv", "av1.ivf", "h264-odd.mp4",
+                                         "vp9-odd.webm", "h264-recorded.mkv", "h264-recorded-one.mkv", "h264.avi"),
                          [](const auto& each) { return caseName(each.param); });
 
 class Bursts : public CutsTest {};

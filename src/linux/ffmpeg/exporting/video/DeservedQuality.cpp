@@ -47,7 +47,8 @@ Sample sampleAt(PicturePackets& packets, std::int64_t outTick)
 }
 
 /// What the encoder makes of it in bytes; nothing when it fails.
-std::int64_t encodedBytes(const Sample& sample, const EncoderRequest& request, Splicer& splicer)
+std::int64_t encodedBytes(const PicturePackets& packets, const Sample& sample, const EncoderRequest& request,
+                          Splicer& splicer)
 {
     const auto encoder = PictureEncoder::open(request);
     if (!encoder)
@@ -63,9 +64,10 @@ std::int64_t encodedBytes(const Sample& sample, const EncoderRequest& request, S
         const AVFrame& coded = picture->picture();
         if (coded.width != request.width || coded.height != request.height || coded.format != request.format)
             return 0;
-        if (picture->pts() <= last || !encoder.value()->encode(coded, picture->pts(), 0))
+        const std::int64_t pts = packets.outTick(picture->pts()); // encoders go by how long pictures last
+        if (pts <= last || !encoder.value()->encode(coded, pts, packets.outTicks(coded.pkt_duration)))
             continue;
-        last = picture->pts();
+        last = pts;
         take();
     }
     if (!encoder.value()->finish())
@@ -83,7 +85,7 @@ int deservedQuality(PicturePackets& packets, std::int64_t outTick, EncoderReques
     request.options["crf"] = std::to_string(scale.trial);
     if (sample.bytes <= std::int64_t(request.width) * request.height / kPixelsAByte)
         return scale.trial;
-    const std::int64_t tried = encodedBytes(sample, request, splicer);
+    const std::int64_t tried = encodedBytes(packets, sample, request, splicer);
     if (tried <= 0)
         return scale.finest;
     const double tooMuch = static_cast<double>(tried) / static_cast<double>(sample.bytes) / kMoreThanSource;

@@ -48,7 +48,7 @@ base::Result<std::unique_ptr<Splicer>> HevcSplicer::make(const AVStream& stream,
         return cannotCopy("its parameter sets are neither in the file's header nor in the first packet");
     for (const Bytes& set : header->sets)
         if (hevc::unitOf(set) == Unit::Sps && !hevc::parseSps(set))
-            return cannotCopy("a parameter set is damaged, or has layers");
+            return cannotCopy("a parameter set is damaged");
     std::unique_ptr<HevcSplicer> splicer(new HevcSplicer);
     splicer->m_header = std::move(*header);
     if (const auto hdr = HdrMetadata::of(stream, picture); !hdr.isEmpty())

@@ -1,5 +1,6 @@
 #include "linux/ffmpeg/exporting/video/PicturePackets.h"
 
+#include "linux/ffmpeg/bitstream/NalUnits.h"
 #include "linux/ffmpeg/exporting/CannotCopy.h"
 
 #include <algorithm>
@@ -20,6 +21,8 @@ PicturePackets::PicturePackets(std::shared_ptr<const Movie> movie, std::unique_p
       m_peeked(newPacket())
 {
     m_demuxer->select({track().stream});
+    if (stream().codecpar->codec_id == AV_CODEC_ID_H264)
+        m_h264 = h264::Configuration::parse(extradataOf(*stream().codecpar));
 }
 
 base::Result<std::unique_ptr<PicturePackets>> PicturePackets::open(std::shared_ptr<const Movie> movie,
@@ -44,19 +47,68 @@ void PicturePackets::seek(std::int64_t outTick)
         // Formats without a table find their way only from the start; nor is there anything before it to skip.
         m_startsMovie = !m_demuxer->seeksByTable() || outTick <= 0 || target < track().origin - second
                         || !m_demuxer->seek(track().stream, target);
-        if (m_startsMovie)
-            m_demuxer->seekToStart(track().stream);
-        do {
-            m_hasPeeked = readFile(*m_peeked) == 0;
-        } while (m_hasPeeked && !m_startsMovie && !(m_peeked->flags & AV_PKT_FLAG_KEY));
+        peek();
         // Before what an edit list hides there may be pictures of the same times that it shows.
         const bool isEarly = m_hasPeeked && m_peeked->pts != AV_NOPTS_VALUE && !(m_peeked->flags & AV_PKT_FLAG_DISCARD)
                              && this->outTick(m_peeked->pts) <= outTick;
-        if (m_startsMovie || isEarly || m_demuxer->isCancelled())
+        if (m_startsMovie || m_demuxer->isCancelled())
             return;
+        const std::uint32_t until = isEarly ? picturesUntilRefreshed() : 0;
+        if (isEarly && until == 0)
+            return;
+        if (isEarly && isRefreshed(until, outTick) && m_demuxer->seek(track().stream, target)) {
+            peek();
+            return;
+        }
         // The table's times are those of decoding, and a file that is cut has a table that is not.
         back = back ? back * 2 : second;
     }
+}
+
+void PicturePackets::peek()
+{
+    if (m_startsMovie)
+        m_demuxer->seekToStart(track().stream);
+    do {
+        m_hasPeeked = readFile(*m_peeked) == 0;
+    } while (m_hasPeeked && !m_startsMovie && !(m_peeked->flags & AV_PKT_FLAG_KEY));
+}
+
+std::vector<ByteView> PicturePackets::unitsIn(const AVPacket& packet) const
+{
+    if (!m_h264)
+        return {};
+    if (h264::Configuration::hasStartCodes(extradataOf(*m_demuxer->stream(track().stream).codecpar)))
+        return unitsBetweenStartCodes(payloadOf(packet));
+    return unitsBehindLengths(payloadOf(packet), m_h264->lengthSize).value_or(std::vector<ByteView>{});
+}
+
+/// By the keyframe that was peeked.
+std::uint32_t PicturePackets::picturesUntilRefreshed() const
+{
+    std::uint32_t until = 0;
+    for (const ByteView nal : unitsIn(*m_peeked))
+        if (h264::unitOf(nal) == h264::Unit::Info)
+            until = std::max(until, h264::picturesUntilRefreshed(nal));
+    return until;
+}
+
+/// Whether so many pictures behind the one that was peeked there is one that is not shown later; reads them.
+bool PicturePackets::isRefreshed(std::uint32_t until, std::int64_t outTick)
+{
+    const auto isReference = [](ByteView nal) {
+        constexpr std::uint8_t kImportance = 0x60;
+        const h264::Unit unit = h264::unitOf(nal);
+        return (unit == h264::Unit::Slice || unit == h264::Unit::SliceA || unit == h264::Unit::Idr)
+               && (nal[0] & kImportance);
+    };
+    while (readFile(*m_packet) == 0) {
+        const auto units = unitsIn(*m_packet);
+        if (std::none_of(units.begin(), units.end(), isReference) || --until > 0)
+            continue;
+        return m_packet->pts != AV_NOPTS_VALUE && this->outTick(m_packet->pts) <= outTick;
+    }
+    return false;
 }
 
 int PicturePackets::read(AVPacket& packet)

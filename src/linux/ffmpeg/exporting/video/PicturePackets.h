@@ -6,6 +6,7 @@
 #pragma once
 
 #include "linux/ffmpeg/Movie.h"
+#include "linux/ffmpeg/bitstream/H264Headers.h"
 #include "linux/ffmpeg/exporting/video/Splicer.h"
 #include "linux/ffmpeg/exporting/video/VideoPlan.h"
 
@@ -38,7 +39,8 @@ public:
     /// AVI and ASF tell only when packets are decoded. From now on they are shown then.
     void setShowsInOrder() { m_showsInOrder = true; }
 
-    /// What is read next is a keyframe shown at or before this tick of the output, or the first packet of all.
+    /// What is read next is a keyframe shown at or before this tick of the output, or the first packet of all: whoever
+    /// decodes from there has all that is shown from this tick on as it should be.
     void seek(std::int64_t outTick);
     /// As Demuxer::read.
     int read(AVPacket& packet);
@@ -56,6 +58,10 @@ public:
 private:
     PicturePackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer);
 
+    void peek();
+    std::vector<ByteView> unitsIn(const AVPacket& packet) const;
+    std::uint32_t picturesUntilRefreshed() const;
+    bool isRefreshed(std::uint32_t until, std::int64_t outTick);
     int readFile(AVPacket& packet);
     int readAsItIs(AVPacket& packet);
     int gatherOneTime();
@@ -64,6 +70,7 @@ private:
     std::shared_ptr<const Movie> m_movie;
     std::unique_ptr<Demuxer> m_demuxer;
     std::int64_t m_scale;
+    std::optional<h264::Configuration> m_h264; ///< nothing when it is another codec
     Owned<AVPacket> m_packet;
     Owned<AVPacket> m_peeked;
     bool m_hasPeeked = false;

@@ -22,7 +22,8 @@ public:
     {
     }
 
-    /// The picture itself where it fits already, extended by the odd row or column that it lacks; else scaled to the whole width or height, black beside it.
+    /// The picture itself where it fits already, extended by the odd row or column that it lacks; else scaled to the whole
+    /// width or height, black beside it.
     base::Result<Owned<AVFrame>> fit(const AVFrame& picture);
 
 private:
