@@ -239,6 +239,16 @@ TEST_F(Trim, ReplacesNothingButTheFileItself)
     EXPECT_NEAR(probe(out)["duration"].toDouble(), 1, 0.05);
 }
 
+TEST_F(Trim, WritesWhatTakesAFilesPlaceUnderANameThatNobodyElseHas)
+{
+    std::ofstream(out) << "mine";
+    tests::whileRefusing({{SYS_rename, EPERM}, {SYS_renameat, EPERM}, {SYS_unlink, EPERM}, {SYS_unlinkat, EPERM}}, [&] {
+        for (int i = 0; i < 2; ++i)
+            EXPECT_EQ(run({"trim", movie("clock.mp4"), "--to", "1", "-o", out, "--force"}), 1);
+    });
+    EXPECT_EQ(namesIn(directory.path()).size(), 3U) << "the file, and two that could not be removed";
+}
+
 TEST_F(Trim, TwoThatMakeOneFileAtOnceDoNotDisturbEachOther)
 {
     for (const bool force : {true, false}) {

@@ -72,6 +72,19 @@ TEST_F(AnOutput, IsWholeWhereAFileWithoutANameGetsNone)
     }
 }
 
+TEST_F(AnOutput, IsAsPrivateAsItsSourceHoweverItIsMade)
+{
+    const std::string source = output("source.mp4");
+    std::filesystem::copy_file(exportMovie("h264.mp4"), source);
+    std::filesystem::permissions(source, std::filesystem::perms(0600));
+    for (const auto& calls : {std::vector<RefusedSystemCall>{}, {{SYS_linkat, EPERM}}, {noUnnamedFiles()}}) {
+        const auto result = runJobRefusing(calls, source, fromTo(1, 2));
+        ASSERT_TRUE(result) << result.error()->description();
+        EXPECT_EQ(std::filesystem::status(output()).permissions(), std::filesystem::perms(0600));
+        std::filesystem::remove(output());
+    }
+}
+
 TEST_F(AnOutput, SweepsWhatKilledExportsHaveLeftBesideIt)
 {
     std::ofstream(output(".clipsa-12-3.part")) << "half";
