@@ -273,10 +273,8 @@ TEST_F(Places, AreStillFoundWhereStartingOverFailedForAMoment)
     const auto index = opened->packetIndex(cancelled);
     const auto demuxer = picturesOnly();
     ASSERT_EQ(read(*demuxer, 1000).size(), all.size());
-    tests::whileRefusing({{SYS_pread64, EIO}}, [&] {
-        EXPECT_FALSE(demuxer->seekToStart(0));
-        EXPECT_EQ(read(*demuxer, 1).size(), 0U) << "it stands nowhere";
-    });
+    tests::whileRefusing({{SYS_pread64, EIO}}, [&] { EXPECT_FALSE(demuxer->seekToStart(0)); });
+    EXPECT_EQ(read(*demuxer, 1).size(), 0U) << "it stands nowhere";
     const std::int64_t last = std::prev(all.end(), 15)->pts;
     ASSERT_TRUE(demuxer->seekTo(opened->video()->stream, *index->keyframeAt(last)));
     const auto rest = read(*demuxer, 1000);
