@@ -44,6 +44,16 @@ TEST_P(Facts, AreToldOfEveryKindOfMovie)
     }
 }
 
+TEST(MovieFacts, OfAMovieWithAHeaderAreAlsoWhatOnlyItsPacketsTell)
+{
+    const auto cancelled = std::make_shared<std::atomic<bool>>(false);
+    const auto movie =
+        ffmpeg::Movie::open(std::move(ffmpeg::OpenFile::open(tests::movie("vp9.webm"))).value(), cancelled);
+    const auto facts = ffmpeg::MovieFacts::of(*movie.value(), cancelled);
+    ASSERT_TRUE(facts);
+    EXPECT_EQ(facts.value().picture->profile, "Profile 0");
+}
+
 INSTANTIATE_TEST_SUITE_P(
     , Facts,
     // What is copied ends with the pictures that others need.

@@ -272,7 +272,7 @@ TEST_F(Places, AreStillFoundWhereStartingOverFailedForAMoment)
     const auto all = read(*picturesOnly(), 1000);
     const auto index = opened->packetIndex(cancelled);
     const auto demuxer = picturesOnly();
-    ASSERT_EQ(read(*demuxer, 1000).size(), all.size());
+    ASSERT_EQ(read(*demuxer, 2).size(), 2U);
     tests::whileRefusing({{SYS_pread64, EIO}}, [&] { EXPECT_FALSE(demuxer->seekToStart(0)); });
     EXPECT_EQ(read(*demuxer, 1).size(), 0U) << "it stands nowhere";
     const std::int64_t last = std::prev(all.end(), 15)->pts;
@@ -280,6 +280,54 @@ TEST_F(Places, AreStillFoundWhereStartingOverFailedForAMoment)
     const auto rest = read(*demuxer, 1000);
     ASSERT_LT(rest.size(), 40U);
     EXPECT_TRUE(std::equal(rest.begin(), rest.end(), all.end() - std::ssize(rest)));
+}
+
+TEST_F(Places, ThatWereReadOfAMovieWithoutATableAreKnownFromThenOn)
+{
+    ASSERT_NO_FATAL_FAILURE(use("vp8-live.webm"));
+    const auto demuxer = picturesOnly();
+    const auto all = read(*demuxer, 1000);
+    ASSERT_TRUE(demuxer->seekToStart(0));
+    EXPECT_EQ(read(*demuxer, 1).front(), all.front());
+    ASSERT_TRUE(demuxer->seek(0, all[65].pts));
+    EXPECT_EQ(read(*demuxer, 1).front(), all[60]);
+}
+
+TEST_F(Places, InAMovieWithoutATableAreFoundWithoutReadingAllBeforeThem)
+{
+    ASSERT_NO_FATAL_FAILURE(use("mpeg4.avi"));
+    const std::int64_t most = opened->file()->size() * 2 / 5;
+    const auto& packets = opened->packetIndex(cancelled)->packets();
+    const auto source = std::move(VideoSource::open(opened, cancelled, 1)).value();
+    const auto walk = std::move(ffmpeg::PictureWalk::open(opened, cancelled)).value();
+    for (const std::size_t picture : {110, 80, 95}) {
+        const std::int64_t tick = packets[picture].pts;
+        const std::int64_t before = bytesRead();
+        ASSERT_TRUE(source->at(tick, VideoSource::Want::Full, [] { return false; }));
+        const std::int64_t between = bytesRead();
+        EXPECT_LT(between - before, most) << "the picture " << picture;
+        ASSERT_TRUE(walk->at(tick, ffmpeg::PictureWalk::Then::Rest));
+        EXPECT_LT(bytesRead() - between, most) << "the thumbnail " << picture;
+    }
+}
+
+TEST_F(Places, AtTheStartAreShownBeforeAllOthersAreKnown)
+{
+    ASSERT_NO_FATAL_FAILURE(use("mpeg4.avi"));
+    const auto source = std::move(VideoSource::open(opened, cancelled, 1)).value();
+    const std::int64_t before = bytesRead();
+    ASSERT_TRUE(source->at(opened->firstFrame()->pts(), VideoSource::Want::Full, [] { return false; }));
+    EXPECT_LT(bytesRead() - before, opened->file()->size() / 2);
+}
+
+TEST_F(Places, AtTheStartAreThoseAlsoOfAReaderThatHasOnlyGoneElsewhere)
+{
+    ASSERT_NO_FATAL_FAILURE(use("many-bytes.mkv"));
+    const auto first = read(*picturesOnly(), 1);
+    const auto demuxer = picturesOnly();
+    ASSERT_TRUE(demuxer->seek(0, 3000));
+    ASSERT_TRUE(demuxer->seekToStart(0));
+    EXPECT_EQ(read(*demuxer, 1), first);
 }
 
 TEST_F(Places, AtTheStartCostAReaderThatWasNeverMovedNothing)

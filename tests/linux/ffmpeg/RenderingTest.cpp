@@ -155,7 +155,7 @@ TEST(HighDynamicRange, KeepsTheColoursOfTheScreen)
 
 TEST(HighDynamicRange, LooksTheSameInAReducedPicture)
 {
-    const auto full = picture(AVCOL_TRC_SMPTE2084, 500, 480, 540);
+    const auto full = picture(AVCOL_TRC_SMPTE2084, 420, 460, 600);
     const auto small = ffmpeg::DecodedFrame::reduced(full, 32);
     ASSERT_TRUE(small && small->isReduced());
     const auto a = shown(*full, Quality::Exact);
