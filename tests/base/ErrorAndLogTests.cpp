@@ -63,7 +63,7 @@ std::string written(base::StreamLog::Style style, bool verbose)
     base::StreamLog log(stream, style, verbose);
     log.message("happened");
     log.error("failed");
-    log.console("detail");
+    log.console("detail of \x1b[31m");
     std::fclose(stream);
     std::string result(text, size);
     std::free(text);
@@ -72,7 +72,7 @@ std::string written(base::StreamLog::Style style, bool verbose)
 
 TEST(LogTests, AQuietLogTellsErrorsAndDetailsOnly)
 {
-    EXPECT_EQ(written(base::StreamLog::Style::Plain, false), "error: clipsa: failed\nclipsa: detail\n");
+    EXPECT_EQ(written(base::StreamLog::Style::Plain, false), "error: clipsa: failed\nclipsa: detail of ?[31m\n");
 }
 
 TEST(LogTests, AVerboseLogTellsWhatHappensToo)
@@ -83,7 +83,7 @@ TEST(LogTests, AVerboseLogTellsWhatHappensToo)
 TEST(LogTests, TheJournalGetsLevels)
 {
     EXPECT_EQ(written(base::StreamLog::Style::Journal, false),
-              "<6>clipsa: happened\n<3>clipsa: failed\n<5>clipsa: detail\n");
+              "<6>clipsa: happened\n<3>clipsa: failed\n<5>clipsa: detail of ?[31m\n");
 }
 
 TEST(LogTests, TheMemoryKeepsLinesInOrderAndByKind)

@@ -9,7 +9,9 @@ TEST(Text, PrintsNothingThatATerminalWouldObey)
     EXPECT_EQ(base::printable("Träumerei 日本 😀"), "Träumerei 日本 😀");
     EXPECT_EQ(base::printable("red \x1b[31m, bell \a, line\nline\r\t"), "red ?[31m, bell ?, line?line??");
     EXPECT_EQ(base::printable("\u007F\u0085\u009B2J\u00A0"), "???2J\u00A0");
-    EXPECT_EQ(base::printable("gpj\u202Egnp\u2066 \u2028"), "gpj?gnp? ?");
+    EXPECT_EQ(base::printable("gpj\u202Egnp\u2066 \u2028\u2029"), "gpj?gnp? ??");
+    EXPECT_EQ(base::printable("\u202A\u202B\u202C\u202D\u2067\u2068\u2069"), "???????");
+    EXPECT_EQ(base::printable("\u2027\u202F\u2065\u206A\U0001202E"), "\u2027\u202F\u2065\u206A\U0001202E");
     EXPECT_EQ(base::printable("caf\xE9 \xF0\x9F"), "caf? ??");
     EXPECT_EQ(base::printable(std::string_view("a\0b", 3)), "a?b");
 }
@@ -21,7 +23,12 @@ TEST(Text, KnowsWhereACharacterEnds)
     EXPECT_EQ(base::characterLength("日"), 3U);
     EXPECT_EQ(base::characterLength("😀"), 4U);
     EXPECT_EQ(base::characterLength("\xC0\x80"), 0U) << "longer than needed";
+    EXPECT_EQ(base::characterLength("\xE0\x9F\xBF"), 0U) << "longer than needed";
+    EXPECT_EQ(base::characterLength("\xF0\x8F\xBF\xBF"), 0U) << "longer than needed";
+    EXPECT_EQ(base::characterLength("\xED\x9F\xBF"), 3U);
     EXPECT_EQ(base::characterLength("\xED\xA0\x80"), 0U) << "half a pair";
+    EXPECT_EQ(base::characterLength("\xF4\x8F\xBF\xBF"), 4U) << "the last one";
+    EXPECT_EQ(base::characterLength("\xF4\x90\x80\x80"), 0U) << "beyond the last one";
     EXPECT_EQ(base::characterLength("\xE6\x97"), 0U) << "cut off";
 }
 

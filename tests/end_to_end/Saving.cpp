@@ -224,6 +224,29 @@ TEST_F(Save, ThatFailsLosesNoCutAlsoWhenTheUserHasClosedMeanwhile)
     EXPECT_EQ(numbersIn(unsaved().front()), numbers(30, 119));
 }
 
+TEST_F(Save, IsToldWithItsPlace)
+{
+    setScript("tap Save");
+    const auto end = m_machine.open(m_movie, {"--json"});
+    ASSERT_THAT(saved(), SizeIs(1));
+    EXPECT_THAT(end.out, HasSubstr("\"saved\":[\"" + saved().front().native() + "\"],\"unsaved\":[]"));
+}
+
+TEST_F(Save, ThatFailsIsKeptBesideTheStoreWhereTheUsersDataCannotBeWritten)
+{
+    std::ofstream(library()) << "not a directory";
+    m_machine.write("home/.local", "not a directory");
+    setScript("tap Save");
+    const auto end = open();
+    EXPECT_EQ(end.exitStatus, 1);
+    const auto beside = m_machine.home().parent_path() / "cache/clipsa/unsaved";
+    ASSERT_THAT(filesIn(beside), SizeIs(1));
+    EXPECT_THAT(end.err, HasSubstr("it is kept as " + filesIn(beside).front().native()));
+    EXPECT_EQ(numbersIn(filesIn(beside).front()), numbers(0, 119));
+    EXPECT_THAT(m_machine.editorDirectories(), ElementsAre(beside)) << "what sweeps the store leaves it alone";
+    std::filesystem::remove_all(beside);
+}
+
 TEST_F(Save, ADamagedMovieIsSavedToo)
 {
     const auto movie = m_machine.movie("corrupt.mp4");
