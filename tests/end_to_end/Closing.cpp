@@ -65,6 +65,15 @@ TEST_F(Closing, InJsonTheListOfActivitiesIsEmptyToo)
     EXPECT_EQ(end.out, "{\"activityTypes\":[],\"movie\":\"" + movie.native() + "\",\"saved\":[],\"unsaved\":[]}\n");
 }
 
+TEST_F(Closing, OnRequestTheEditorSaysWhatItDoes)
+{
+    m_machine.setScript(kClose);
+    const auto end = m_machine.open(m_machine.movie("clock.mp4"), {"--verbose"});
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_THAT(end.err, HasSubstr("clipsa: VKVideoEditorExtensionViewController -setupChildViewControllers\n"));
+    EXPECT_THAT(end.out, IsEmpty());
+}
+
 TEST_F(Closing, TheEscapeKeyClosesToo)
 {
     m_machine.setScript("wait ready\nkey escape");

@@ -1,13 +1,18 @@
 // What the commands do when nobody can take their results, and when they are told to end while a file holds them up.
+#include "app/host/Streams.h"
 #include "app/host/ClipsaProgram.h"
 #include "linux/posix/FileDescriptor.h"
 #include "support/RefusedSystemCalls.h"
 
 #include <gmock/gmock.h>
 
+#include <cstdio>
+#include <fcntl.h>
 #include <poll.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <thread>
+#include <unistd.h>
 
 namespace {
 
@@ -53,6 +58,44 @@ TEST_F(Streams, NoFileTakesThePlaceOfAClosedStream)
 {
     EXPECT_EQ(runInShell("trim \"$1\" --to 1 -o \"$2\" <&- >&- 2>&-"), 0);
     EXPECT_NEAR(probe(out)["duration"].toDouble(), 1, 0.05);
+}
+
+/// What `body` gives in a process of its own, where nothing else is open.
+template <typename Body> int inAnotherProcess(Body body)
+{
+    const pid_t child = ::fork();
+    if (child == 0) {
+        ::close_range(STDIN_FILENO, ~0U, 0);
+        ::_exit(body());
+    }
+    int status = -1;
+    EXPECT_EQ(::waitpid(child, &status, 0), child);
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+TEST_F(Streams, StandForTheMissingOnes)
+{
+    EXPECT_EQ(inAnotherProcess([] {
+                  host::keepStandardStreams();
+                  const bool areOpen = ::fcntl(STDIN_FILENO, F_GETFD) >= 0 && ::fcntl(STDERR_FILENO, F_GETFD) >= 0;
+                  return areOpen ? ::open("/dev/null", O_RDONLY) : -1;
+              }),
+              3)
+        << "the first number for other files";
+}
+
+TEST_F(Streams, ThatCannotBeWrittenDoNotHideWhatElseWentWrong)
+{
+    const auto statusWithOutput = [](int status) {
+        return inAnotherProcess([status] {
+            host::keepStandardStreams();
+            std::fputs("text", stdout);
+            return host::finishOutput(status);
+        });
+    };
+    EXPECT_EQ(statusWithOutput(0), 1);
+    EXPECT_EQ(statusWithOutput(3), 3);
+    EXPECT_EQ(statusWithOutput(130), 130);
 }
 
 TEST_F(Streams, NothingOfANameReachesTheTerminalAsACommand)
