@@ -44,7 +44,7 @@ TEST(TheNameOfATemporaryMovie, KeepsTheLettersOfAnAppName)
 TEST(TheNameOfATemporaryMovie, HasNothingThatNoFileNameMayHave)
 {
     EXPECT_EQ(support::trimmedMovieName("AC/DC"), "AC\u2044DC_");
-    EXPECT_EQ(support::trimmedMovieName(std::string("a\0b\nc", 5)), "a b c_");
+    EXPECT_EQ(support::trimmedMovieName(std::string("a\0b\nc\x7F", 6)), "a b c _");
     EXPECT_EQ(support::trimmedMovieName(".."), ".._");
     EXPECT_EQ(support::trimmedMovieName(""), "_");
 }

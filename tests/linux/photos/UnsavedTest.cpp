@@ -57,9 +57,12 @@ TEST_F(UnsavedMovie, IsAnotherNameOfTheSameFile)
 
 TEST_F(UnsavedMovie, TakesThePlaceOfNone)
 {
+    home.write(".local/share/clipsa/unsaved/" + name, "somebody's");
     saveKeeping();
-    saveKeeping();
-    EXPECT_THAT(kept, ElementsAre((first / name).native(), (first / "Tux Racer 2026-11-21 15-04-05 (2).mp4").native()));
+    saveKeeping(); // as a copy, because the file has another name now
+    EXPECT_THAT(kept, ElementsAre((first / "Tux Racer 2026-11-21 15-04-05 (2).mp4").native(),
+                                  (first / "Tux Racer 2026-11-21 15-04-05 (3).mp4").native()));
+    EXPECT_TRUE(holds(first / name, "somebody's"));
 }
 
 TEST_F(UnsavedMovie, IsKeptBesideTheStoreWhereTheUsersDataCannotBeWritten)
