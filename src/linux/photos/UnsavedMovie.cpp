@@ -20,8 +20,10 @@ base::Result<std::string> link(int movie, const LibraryName& name, const Library
     const std::string open = "/proc/self/fd/" + std::to_string(movie);
     for (int number = 1;; ++number) {
         std::string candidate = name.numbered(number);
-        if (::linkat(AT_FDCWD, open.c_str(), directory.descriptor(), candidate.c_str(), AT_SYMLINK_FOLLOW) == 0)
+        if (::linkat(AT_FDCWD, open.c_str(), directory.descriptor(), candidate.c_str(), AT_SYMLINK_FOLLOW) == 0) {
+            posix::flush(movie); // as a copy is brought to the disk; its end is as good as it gets
             return candidate;
+        }
         if (errno != EEXIST)
             return base::Error::fromErrno(errno, "naming it " + candidate);
     }
@@ -59,7 +61,6 @@ base::Result<std::string> keepIn(const std::string& path, int movie, const Libra
     auto kept = isOthersToo ? copy(movie, status, name, directory.value()) : link(movie, name, directory.value());
     if (!kept)
         kept = isOthersToo ? link(movie, name, directory.value()) : copy(movie, status, name, directory.value());
-    posix::flush(movie); // as a copy is brought to the disk; its end is as good as it gets
     if (!kept)
         return base::Error::make(kept.error()->domain(), kept.error()->code(),
                                  "cannot keep it in " + path + ": " + kept.error()->description());

@@ -198,6 +198,8 @@ TEST_F(ASlowHandOver, OfAMovieThatTakesLongToOpenIsWaitedForToo)
             scripted("wait waiting\ntap Waiting for the recording…\nprint waiting"));
     }).join();
     EXPECT_TRUE(pumpUntilReported("waiting"));
+    heldUp = posix::FileDescriptor();
+    clipsa->wait();
 }
 
 TEST_F(ASlowHandOver, ThatFailsShowsNoEditorOfNothing)
