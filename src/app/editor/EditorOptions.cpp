@@ -43,7 +43,7 @@ base::Result<EditorOptions> EditorOptions::parse(const std::vector<std::string>&
             std::int32_t number = 0;
             const auto [end, error] = std::from_chars(value.data(), value.data() + value.size(), number);
             if (error != std::errc() || end != value.data() + value.size())
-                return usage(name + " is a number, not \"" + value + "\"");
+                return usage("a number is needed for " + name + ", not \"" + value + "\"");
             (name == "--report" ? options.report : options.graphicsQuality) = number;
         } else {
             return usage("there is no option \"" + name + "\"");
