@@ -291,10 +291,13 @@ bool isOfField(ByteView nal, const Sps& sps)
 std::uint32_t picturesUntilRefreshed(ByteView info)
 {
     constexpr std::uint32_t kRecoveryPoint = 6;
+    constexpr std::uint32_t kMostFrameNums = 1 << 16; // it says no larger number than these have
     const Bytes payload = withoutEmulation(info);
     for (const InfoMessage& each : messagesIn(ByteView(payload).subspan(1)))
-        if (each.type == kRecoveryPoint)
-            return BitReader(each.payload).ue();
+        if (each.type == kRecoveryPoint) {
+            const std::uint32_t count = BitReader(each.payload).ue();
+            return count < kMostFrameNums ? count : 0;
+        }
     return 0;
 }
 

@@ -340,13 +340,51 @@ TEST(NalUnits, EndBeforeZerosThatBelongToNobody)
         EXPECT_EQ(unit.size(), 2U);
 }
 
+TEST(HevcHeaders, SayItOfEachLayerOrOfAll)
+{
+    for (const bool isSaidOfEach : {false, true}) {
+        ffmpeg::BitWriter out;
+        const auto zeros = [&](int count) {
+            for (; count > 0; --count)
+                out.bit(0);
+        };
+        out.bits(0x4201, 16);
+        out.bits(0b0000'001'1, 8); // one layer more
+        zeros(96);
+        out.bits(0b11, 2); // which has a profile and a level of its own
+        zeros(14 + 88 + 8);
+        for (const std::uint32_t each : {2U, 1U, 320U, 180U})
+            out.ue(each);
+        out.bit(0);
+        for (const std::uint32_t each : {0U, 0U, 4U})
+            out.ue(each);
+        out.bit(isSaidOfEach);
+        if (isSaidOfEach)
+            for (const std::uint32_t each : {1U, 0U, 0U})
+                out.ue(each);
+        for (const std::uint32_t each : {4U, 2U, 5U})
+            out.ue(each);
+        out.finish();
+        const auto sps = hevc::parseSps(ffmpeg::withEmulation(out.bytes()));
+        ASSERT_TRUE(sps);
+        EXPECT_EQ(sps->id, 2U);
+        EXPECT_EQ(sps->width, 320U);
+        EXPECT_EQ(sps->buffering.pictures, 4U);
+        EXPECT_EQ(sps->buffering.reordered, 2U);
+        EXPECT_EQ(sps->buffering.latency, 5U);
+    }
+}
+
 TEST(H264Information, SaysHowLongPicturesAreNotWholeYet)
 {
     // A recovery point of 29, then one of 0; another message before the former.
     EXPECT_EQ(h264::picturesUntilRefreshed(ffmpeg::Bytes{0x06, 0x06, 0x02, 0x0F, 0x40, 0x80}), 29U);
     EXPECT_EQ(h264::picturesUntilRefreshed(ffmpeg::Bytes{0x06, 0x06, 0x01, 0xC4, 0x80}), 0U);
     EXPECT_EQ(h264::picturesUntilRefreshed(ffmpeg::Bytes{0x06, 0x01, 0x01, 0x44, 0x06, 0x02, 0x0F, 0x40, 0x80}), 29U);
-    for (const ffmpeg::Bytes& damaged : {ffmpeg::Bytes{0x06}, {0x06, 0xFF}, {0x06, 0x06, 0xFF, 0xFF, 0x01, 0x02}})
+    for (const ffmpeg::Bytes& damaged : {ffmpeg::Bytes{0x06},
+                                         {0x06, 0xFF},
+                                         {0x06, 0x06, 0xFF, 0xFF, 0x01, 0x02},
+                                         {0x06, 0x06, 0x05, 0x00, 0x00, 0x80, 0x01, 0x40, 0x80}})
         EXPECT_EQ(h264::picturesUntilRefreshed(damaged), 0U);
 }
 

@@ -168,6 +168,8 @@ TEST(VideoPlan, FindsWhereAnEditListLeavesOutPicturesOnTheWay)
     EXPECT_THAT(gaps("0J 1 2H 2 3"), ElementsAre(std::pair(2, -1))) << "no joint follows";
     EXPECT_THAT(gaps("0J 1 2H 3H"), IsEmpty()) << "nothing is shown behind it";
     EXPECT_THAT(gaps("0J 2 1 5H 3 4 5 6J 8 7"), ElementsAre(std::pair(3, 6))) << "3 and 4 need what is hidden";
+    EXPECT_THAT(gaps("0J 1 2H 5J 3 4 8J 9"), ElementsAre(std::pair(3, 8)))
+        << "3 and 4 are shown before the first joint";
     EXPECT_FALSE(ffmpeg::findGaps(window("0J 5 6H 4 7J").packets)) << "4 is shown before one that is copied";
 }
 
