@@ -105,7 +105,7 @@ std::uint32_t picturesUntilRefreshed(ByteView info);
 
 /// The header of a stream in MP4, "avcC".
 struct Configuration {
-    int lengthSize = 4;
+    int lengthSize = 4;         ///< also where the sets came between start codes
     bool hasExtensions = false; ///< sets that this does not keep
     std::vector<Bytes> sps;
     std::vector<Bytes> pps;

@@ -218,6 +218,26 @@ TEST_F(AnExport, OfAMovieThatBeginsSmallHasItsLargestSize)
     }
 }
 
+TEST_F(AnExport, SaysWhyMostOfItIsEncoded)
+{
+    ASSERT_EQ(cut(exportMovie("h264-sparse.mp4"), output(), fromTo(5, 11)), ExportStatus::Completed) << errorText();
+    EXPECT_EQ(
+        log.texts(base::MemoryLog::Line::Kind::Message),
+        std::vector<std::string>{"“h264-sparse.mp4” is encoded for the most part: the first group of pictures in the "
+                                 "range begins late."});
+    ASSERT_EQ(cut(exportMovie("h264.mp4"), output("other.mp4"), fromTo(0.5, 4.5)), ExportStatus::Completed);
+    EXPECT_EQ(log.texts(base::MemoryLog::Line::Kind::Message).size(), 1U) << "that is as expected";
+}
+
+TEST_F(AnExport, OfVp9ThatMp4CannotDescribeIsEncoded)
+{
+    ASSERT_EQ(cut(exportMovie("vp9-440.webm"), output(), std::nullopt), ExportStatus::Completed) << errorText();
+    EXPECT_EQ(DecodedMovie(output()).stream().codecpar->codec_id, AV_CODEC_ID_H264);
+    EXPECT_EQ(log.texts(base::MemoryLog::Line::Kind::Message),
+              std::vector<std::string>{"“vp9-440.webm” is encoded as a whole: MP4 does not hold VP9 whose colours are "
+                                       "halved in height alone."});
+}
+
 TEST_F(AnExport, HasNoLargerSizeThanThePicturesInItsRange)
 {
     ASSERT_EQ(cut(exportMovie("vp8-growing.webm"), output(), fromTo(0, 0.4)), ExportStatus::Completed) << errorText();

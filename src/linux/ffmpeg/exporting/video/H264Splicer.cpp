@@ -205,8 +205,6 @@ base::Result<void> H264Splicer::join(const AVCodecContext& encoder)
 base::Result<void> H264Splicer::describe(AVCodecParameters& parameters)
 {
     h264::Configuration all = usedSets();
-    if (m_hasStartCodes)
-        all.lengthSize = 4;
     all.sps.insert(all.sps.end(), m_encoderSps.begin(), m_encoderSps.end());
     all.pps.insert(all.pps.end(), m_encoderPps.begin(), m_encoderPps.end());
     if (!setExtradata(parameters, all.bytes()))
@@ -242,7 +240,7 @@ base::Result<void> H264Splicer::adoptCopied(AVPacket& packet)
         const Unit unit = h264::unitOf(nal);
         return unit == Unit::Sps || unit == Unit::Pps || unit == Unit::Delimiter || unit == Unit::Filler;
     });
-    if (!replacePayload(packet, units, m_hasStartCodes ? 4 : m_header.lengthSize))
+    if (!replacePayload(packet, units, m_header.lengthSize))
         return cannotCopy("a packet is too large");
     return {};
 }
@@ -254,7 +252,7 @@ base::Result<void> H264Splicer::adoptEncoded(AVPacket& packet)
         const Unit unit = h264::unitOf(nal);
         return unit != Unit::Slice && unit != Unit::Idr;
     });
-    if (!replacePayload(packet, units, m_hasStartCodes ? 4 : m_header.lengthSize))
+    if (!replacePayload(packet, units, m_header.lengthSize))
         return cannotCopy("an encoded packet is too large for its header");
     return {};
 }
