@@ -61,6 +61,7 @@ TEST_F(Tour, FailsWhenThereIsNothingToSee)
     const auto end = take(m_machine.movie("not-a-movie.mp4"), {"--output", m_output});
     EXPECT_TRUE(end.inTime);
     EXPECT_EQ(end.exitStatus, 2);
+    EXPECT_THAT(end.out, IsEmpty()) << "a summary of nothing";
     EXPECT_THAT(end.err, Not(IsEmpty()));
     EXPECT_THAT(m_machine.remains(), IsEmpty());
 }
@@ -78,10 +79,13 @@ TEST_F(Tour, GoesThroughMoviesThatAreShortStandStillOrBeginLate)
 
 TEST_F(Tour, SaysThatThereAreNoPicturesToShow)
 {
-    const auto end = take(m_machine.movie("audio-only.m4a"), {"--output", m_output});
+    const auto movie = m_machine.home() / "red\x1b[31m.m4a";
+    std::filesystem::rename(m_machine.movie("audio-only.m4a"), movie);
+    const auto end = take(movie, {"--output", m_output});
     EXPECT_TRUE(end.inTime);
     EXPECT_EQ(end.exitStatus, 3);
     EXPECT_THAT(end.err, HasSubstr("the movie has no pictures to show, only sound"));
+    EXPECT_THAT(end.out, HasSubstr("red?[31m.m4a\n")) << "nothing for the terminal to obey";
     EXPECT_THAT(m_machine.remains(), IsEmpty());
 }
 

@@ -35,13 +35,15 @@ TEST(DetachedWork, IsLeftToItselfAndCallsNobodyOnceItWasDestroyed)
     std::promise<void> posted;
     std::promise<void> destroyed;
     const auto ended = std::make_shared<std::promise<bool>>(); // the thread may outlive this
+    const auto watched = std::make_shared<std::promise<void>>();
     bool called = false;
-    std::optional<host::DetachedWork> work(std::in_place, [&, ended](Client& client) {
+    std::optional<host::DetachedWork> work(std::in_place, [&, ended, watched](Client& client) {
         client.post([&] { called = true; });
         posted.set_value();
         destroyed.get_future().wait();
         client.post([&] { called = true; });
         ended->set_value(client.isWaiting());
+        watched->get_future().wait(); // its client lives on as long
     });
     posted.get_future().wait();
     work.reset(); // does not wait
@@ -49,6 +51,7 @@ TEST(DetachedWork, IsLeftToItselfAndCallsNobodyOnceItWasDestroyed)
     EXPECT_FALSE(ended->get_future().get()) << "it was not told that nobody wants it any more";
     QCoreApplication::processEvents();
     EXPECT_FALSE(called);
+    watched->set_value();
 }
 
 TEST(DetachedWork, IsStillHeardWhenNobodyWantsItAnyMore)
