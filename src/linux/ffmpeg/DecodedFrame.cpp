@@ -222,16 +222,7 @@ FrameRef DecodedFrame::reduced(const FrameRef& frame, int limit)
     if (av_frame_copy_props(to.get(), &from) < 0)
         return nullptr;
     to->color_range = plainFormat(from).fullRange ? AVCOL_RANGE_JPEG : AVCOL_RANGE_MPEG;
-    switch (matrixOf(from)) {
-    case SWS_CS_ITU709:
-        to->colorspace = AVCOL_SPC_BT709;
-        break;
-    case SWS_CS_BT2020:
-        to->colorspace = AVCOL_SPC_BT2020_NCL;
-        break;
-    default:
-        to->colorspace = AVCOL_SPC_SMPTE170M;
-    }
+    to->colorspace = static_cast<AVColorSpace>(matrixOf(from)); // the numbers are those of ISO 23091-2, as the scaler's
     const auto small = std::make_shared<DecodedFrame>(std::move(to), frame->m_pts, frame->m_time, frame->m_orientation,
                                                       frame->m_aspect);
     small->m_displaySize = frame->m_displaySize; // who lays it out must not see the difference

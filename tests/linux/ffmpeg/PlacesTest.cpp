@@ -282,6 +282,25 @@ TEST_F(Places, AreStillFoundWhereStartingOverFailedForAMoment)
     EXPECT_TRUE(std::equal(rest.begin(), rest.end(), all.end() - std::ssize(rest)));
 }
 
+TEST_F(Places, ThatCannotBeReadAreNotTakenForTheEnd)
+{
+    for (const auto* name : {"h264.ts", "h264.avi", "h264.nut", "many-bytes.mkv"}) {
+        ASSERT_NO_FATAL_FAILURE(use(name));
+        const auto demuxer = picturesOnly();
+        const auto first = opened->packetIndex(cancelled)->packets().front();
+        int error = 0;
+        const tests::RefusedSystemCall secondBuffer{SYS_pread64, EIO, 0, 0, false, 3, 64 << 10};
+        tests::whileRefusing({secondBuffer}, [&] {
+            // Opening may have read all of it: from the start again.
+            demuxer->seekTo(opened->video()->stream, first);
+            const auto packet = ffmpeg::newPacket();
+            while ((error = demuxer->read(*packet)) == 0) {}
+        });
+        EXPECT_EQ(error, AVERROR(EIO)) << name;
+        EXPECT_EQ(demuxer->readError(), AVERROR(EIO)) << name;
+    }
+}
+
 TEST_F(Places, ThatWereReadOfAMovieWithoutATableAreKnownFromThenOn)
 {
     ASSERT_NO_FATAL_FAILURE(use("vp8-live.webm"));

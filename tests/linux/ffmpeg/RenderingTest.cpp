@@ -155,7 +155,7 @@ TEST(HighDynamicRange, KeepsTheColoursOfTheScreen)
 
 TEST(HighDynamicRange, LooksTheSameInAReducedPicture)
 {
-    const auto full = picture(AVCOL_TRC_SMPTE2084, 420, 460, 600);
+    const auto full = picture(AVCOL_TRC_SMPTE2084, 500, 480, 540);
     const auto small = ffmpeg::DecodedFrame::reduced(full, 32);
     ASSERT_TRUE(small && small->isReduced());
     const auto a = shown(*full, Quality::Exact);
@@ -211,6 +211,21 @@ TEST(HighDynamicRange, WithoutAMatrixHasItsUsualOne)
     const ffmpeg::DecodedFrame untagged(std::move(frame), 0, base::MediaTime::make(0, 30), ffmpeg::Orientation{},
                                         {1, 1});
     EXPECT_EQ(shown(untagged, Quality::Exact), shown(*tagged, Quality::Exact));
+}
+
+TEST(AReducedPicture, KeepsItsMatrix)
+{
+    for (const AVColorSpace matrix : {AVCOL_SPC_BT709, AVCOL_SPC_SMPTE170M, AVCOL_SPC_BT470BG, AVCOL_SPC_SMPTE240M,
+                                      AVCOL_SPC_FCC, AVCOL_SPC_BT2020_NCL, AVCOL_SPC_UNSPECIFIED}) {
+        auto frame = ffmpeg::Owned<AVFrame>(av_frame_clone(&picture(AVCOL_TRC_BT709, 500, 600, 580)->picture()));
+        frame->colorspace = matrix;
+        const auto full = std::make_shared<ffmpeg::DecodedFrame>(std::move(frame), 0, base::MediaTime::make(0, 30),
+                                                                 ffmpeg::Orientation{}, AVRational{1, 1});
+        const auto a = shown(*full, Quality::Exact);
+        const auto b = shown(*ffmpeg::DecodedFrame::reduced(full, 32), Quality::Exact);
+        for (std::size_t c = 0; c < 3; ++c)
+            EXPECT_NEAR(a[c], b[c], 2) << av_color_space_name(matrix) << " channel " << c;
+    }
 }
 
 TEST(Palettes, KeepTheirColoursAtEverySize)
