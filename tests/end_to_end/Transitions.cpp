@@ -30,5 +30,8 @@ TEST(Turning, AThousandTimesCostsNoMemoryAndNeverMoreTime)
     EXPECT_LT(last, 2 * first) << machine.report().front();
     // Kilobytes. Each turn makes the strip's pictures anew, on threads whose heaps grow by steps and then stay: up to some
     // 16 MB were seen. Keeping the pictures of one turn alone would be 400 MB in the end.
+    // Not where what was freed is kept aside for a while.
+#ifndef __SANITIZE_ADDRESS__
     EXPECT_LT(hot - warm, 40 * 1024) << machine.report().front();
+#endif
 }
