@@ -1,5 +1,6 @@
 #include "linux/dbus/HostConnection.h"
 
+#include "base/SharedValue.h"
 #include "linux/dbus/DisconnectWatch.h"
 #include "linux/dbus/Protocol.h"
 #include "linux/dbus/Wire.h"
@@ -62,7 +63,7 @@ HostAttachment HostAttachment::of(runtime::Value value, std::string type)
 struct HostConnection::State final : QDBusVirtualObject {
     State(const QString& address, std::vector<HostItem> hostItems, Handlers hostHandlers)
         : items(std::move(hostItems)), handlers(std::move(hostHandlers)), server(address), watch([this] {
-              connection.reset();
+              peer->setValue(std::nullopt);
               if (const auto disconnected = std::exchange(handlers.disconnected, {}))
                   disconnected();
           })
@@ -72,16 +73,16 @@ struct HostConnection::State final : QDBusVirtualObject {
 
     ~State() override { close(); }
 
-    void accept(const QDBusConnection& peer)
+    void accept(QDBusConnection connection)
     {
         if (accepted) {
-            QDBusConnection::disconnectFromPeer(peer.name());
+            QDBusConnection::disconnectFromPeer(connection.name());
             return;
         }
         accepted = true;
-        connection = peer;
-        connection->registerVirtualObject(QLatin1String(kHostPath), this);
-        watch.watch(peer);
+        peer->setValue(connection);
+        connection.registerVirtualObject(QLatin1String(kHostPath), this);
+        watch.watch(connection);
         if (handlers.editorConnected)
             handlers.editorConnected();
     }
@@ -90,8 +91,10 @@ struct HostConnection::State final : QDBusVirtualObject {
     {
         accepted = true;
         handlers = {};
+        const auto connection = peer->value();
+        peer->setValue(std::nullopt);
         if (connection)
-            QDBusConnection::disconnectFromPeer(std::exchange(connection, std::nullopt)->name());
+            QDBusConnection::disconnectFromPeer(connection->name());
     }
 
     QString introspect(const QString& path) const override
@@ -99,22 +102,22 @@ struct HostConnection::State final : QDBusVirtualObject {
         return path == QLatin1String(kHostPath) ? QString::fromLatin1(kIntrospection) : QString();
     }
 
-    bool handleMessage(const QDBusMessage& message, const QDBusConnection& peer) override
+    bool handleMessage(const QDBusMessage& message, const QDBusConnection& connection) override
     {
-        if (!connection || message.path() != QLatin1String(kHostPath))
+        if (!peer->value() || message.path() != QLatin1String(kHostPath))
             return false;
         if (message.interface() == QLatin1String(kRuntimeInterface)) {
             if (message.member() == QLatin1String("InputItems") && message.signature().isEmpty())
-                return peer.send(message.createReply(QVariant::fromValue(wireItems())));
+                return connection.send(message.createReply(QVariant::fromValue(wireItems())));
             if (message.member() == QLatin1String("LoadItem") && message.signature() == QLatin1String("uus")) {
-                load(message, peer);
+                load(message, connection);
                 return true;
             }
         }
         if (message.interface() == QLatin1String(kHostInterface) && message.member() == QLatin1String(kFinishMember)
             && message.signature() == QLatin1String("as")) {
             if (message.isReplyRequired())
-                peer.send(message.createReply());
+                connection.send(message.createReply());
             if (const auto finished = std::exchange(handlers.finished, {}))
                 finished(fromQt(message.arguments().constFirst().toStringList()));
             return true;
@@ -134,21 +137,25 @@ struct HostConnection::State final : QDBusVirtualObject {
         return list;
     }
 
-    void load(const QDBusMessage& message, const QDBusConnection& peer)
+    void load(const QDBusMessage& message, const QDBusConnection& connection)
     {
         const auto item = message.arguments().at(0).toUInt();
         const auto attachment = message.arguments().at(1).toUInt();
         if (item >= items.size() || attachment >= items[item].attachments.size()) {
-            peer.send(message.createErrorReply(QDBusError::InvalidArgs, QStringLiteral("there is no such item")));
+            connection.send(message.createErrorReply(QDBusError::InvalidArgs, QStringLiteral("there is no such item")));
             return;
         }
-        // By its name: whoever holds the connection itself keeps it open, and an answer can be long in coming.
+        // Not by the connection's name: Qt gives it to a later one, and takes that away with our server. Nor is it held: it
+        // stays open then, and an answer can be long in coming.
         items[item].attachments[attachment].load(
-            [message, name = peer.name()](const base::Result<runtime::Value>& loaded) {
+            [message, weak = std::weak_ptr(peer)](const base::Result<runtime::Value>& loaded) {
+                const auto held = weak.lock();
+                const auto open = held ? held->value() : std::nullopt;
+                if (!open)
+                    return;
                 const auto value = loaded ? toWire(loaded.value()) : base::Result<QVariant>(loaded.error());
-                QDBusConnection(name).send(
-                    value ? message.createReply(QVariant::fromValue(QDBusVariant(value.value())))
-                          : message.createErrorReply(QDBusError::Failed, toQt(value.error()->description())));
+                open->send(value ? message.createReply(QVariant::fromValue(QDBusVariant(value.value())))
+                                 : message.createErrorReply(QDBusError::Failed, toQt(value.error()->description())));
             });
     }
 
@@ -156,7 +163,9 @@ struct HostConnection::State final : QDBusVirtualObject {
     Handlers handlers;
     QDBusServer server;
     DisconnectWatch watch;
-    std::optional<QDBusConnection> connection;
+    /// To the editor while it is connected; answers can come from other threads, and when all this is gone.
+    const std::shared_ptr<base::SharedValue<std::optional<QDBusConnection>>> peer =
+        std::make_shared<base::SharedValue<std::optional<QDBusConnection>>>();
     bool accepted = false;
 };
 

@@ -210,6 +210,24 @@ TEST_F(Connection, OnlyOneExtensionIsLetIn)
     EXPECT_EQ(m_connects, 1);
 }
 
+TEST_F(Connection, AnswersAlsoWhenTheHostOfAnEarlierOneGoes)
+{
+    // The later connection often lies where the earlier one lay, and is called the same.
+    for (int round = 0; round < 20; ++round) {
+        auto earlier = dbus::HostConnection::listen(m_directory.path() / "earlier", {text("t", "v")}, {});
+        ASSERT_TRUE(earlier) << earlier.error()->description();
+        m_extension = newExtension(earlier.value()->address());
+        fetch();
+        earlier.value()->disconnectEditor();
+        m_extension.reset();
+        connect({text("t", "later")});
+        earlier.value().reset();
+        ASSERT_EQ(load(0).text(), "later") << "in round " << round;
+        m_extension.reset();
+        m_host.reset();
+    }
+}
+
 TEST_F(Connection, AnAddressThatNobodyListensAtIsAnError)
 {
     dbus::ExtensionConnection extension(m_mainQueue);
