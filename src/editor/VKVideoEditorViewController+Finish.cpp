@@ -9,6 +9,7 @@
 
 void VKVideoEditorViewController::doneAction()
 {
+    assertHere();
     if (isShareSheetUp())
         return;
     avPlayer()->pause();
@@ -18,6 +19,7 @@ void VKVideoEditorViewController::doneAction()
 
 void VKVideoEditorViewController::saveAction()
 {
+    assertHere();
     if (isShareSheetUp())
         return;
     m_platform.system.log.message("saveAction");

@@ -47,6 +47,7 @@ void VKVideoEditorViewController::applyLayoutForDevice()
 void VKVideoEditorViewController::viewWillTransitionToSize_withTransitionCoordinator(
     base::Size size, platform::TransitionCoordinator& coordinator)
 {
+    assertHere();
     ViewController::viewWillTransitionToSize_withTransitionCoordinator(size, coordinator);
     coordinator.animateAlongsideTransition(
         [weak = weakSelf<VKVideoEditorViewController>()] {
@@ -63,6 +64,7 @@ void VKVideoEditorViewController::viewWillTransitionToSize_withTransitionCoordin
 
 void VKVideoEditorViewController::applyPhoneUILayout()
 {
+    assertHere();
     playButton()->setImageInsets(kNoInsets);
     pauseButton()->setImageInsets(kNoInsets);
     shareButton()->setImageInsets(kNoInsets);
@@ -84,6 +86,7 @@ void VKVideoEditorViewController::applyPhoneUILayout()
 
 void VKVideoEditorViewController::applyPadUILayout()
 {
+    assertHere();
     playButton()->setImageInsets(kPadPlayInsets);
     pauseButton()->setImageInsets(kPadPlayInsets);
     shareButton()->setImageInsets(kPadShareInsets);
@@ -107,6 +110,7 @@ void VKVideoEditorViewController::applyPadUILayout()
 
 void VKVideoEditorViewController::applyPhoneConstraints()
 {
+    assertHere();
     addStripConstraint(LayoutAttribute::Leading, view(), LayoutAttribute::Leading);
     addStripConstraint(LayoutAttribute::Trailing, view(), LayoutAttribute::Trailing);
     addStripConstraint(LayoutAttribute::Bottom, bottomToolBar(), LayoutAttribute::Top);
@@ -115,6 +119,7 @@ void VKVideoEditorViewController::applyPhoneConstraints()
 
 void VKVideoEditorViewController::applyPadConstraints()
 {
+    assertHere();
     addStripConstraint(LayoutAttribute::Leading, view(), LayoutAttribute::Leading);
     addStripConstraint(LayoutAttribute::Trailing, view(), LayoutAttribute::Trailing);
     addStripConstraint(LayoutAttribute::Bottom, view(), LayoutAttribute::Bottom);

@@ -43,6 +43,7 @@ void VKVideoEditorViewController::addPlayHeadObserver()
 
 void VKVideoEditorViewController::reloadAVLayerWithURL(const std::optional<base::Url>& url)
 {
+    assertHere();
     if (isTrimming())
         if (const auto delegate = avTrimmer()->delegate())
             delegate->movieScrubberDidCancelEditing(*avTrimmer());
@@ -63,6 +64,7 @@ void VKVideoEditorViewController::reloadAVLayerWithURL(const std::optional<base:
 void VKVideoEditorViewController::observeValueForKeyPath_ofObject_change_context(
     std::string_view keyPath, runtime::Object& object, const runtime::KeyValueChange& /*change*/, void* /*context*/)
 {
+    assertHere();
     const auto item = avPlayer()->currentItem();
     if (&object != item.get())
         return;
@@ -81,6 +83,7 @@ void VKVideoEditorViewController::observeValueForKeyPath_ofObject_change_context
 
 void VKVideoEditorViewController::itemDidFinishPlaying(const std::shared_ptr<runtime::Object>& /*notification*/)
 {
+    assertHere();
     pauseAction();
     if (isUIHidden())
         showUI();
@@ -89,6 +92,7 @@ void VKVideoEditorViewController::itemDidFinishPlaying(const std::shared_ptr<run
 
 void VKVideoEditorViewController::playAction()
 {
+    assertHere();
     if (isTrimming()) {
         avPlayer()->seekToTime(mediaTime(editStartTime()));
         // Former boundaries stay attached to the player, and keep pausing it.
@@ -110,6 +114,7 @@ void VKVideoEditorViewController::playAction()
 
 void VKVideoEditorViewController::pauseAction()
 {
+    assertHere();
     avPlayer()->pause();
     layOutBars(playButton());
 }
@@ -127,6 +132,7 @@ void VKVideoEditorViewController::layOutBars(const std::shared_ptr<platform::Bar
 
 void VKVideoEditorViewController::refreshAVRotation()
 {
+    assertHere();
     avPlayerLayer()->setFrame(view()->bounds());
     topToolBar()->setFrame(topToolBarFrame());
     bottomToolBar()->setFrame(bottomToolBarFrame());
@@ -136,6 +142,7 @@ void VKVideoEditorViewController::refreshAVRotation()
 
 double VKVideoEditorViewController::getPlayerDuration() const
 {
+    assertHere();
     const auto item = avPlayer() ? avPlayer()->currentItem() : nullptr;
     if (!item || item->status() != PlayerItem::Status::ReadyToPlay)
         return MediaTime::invalid().seconds();
@@ -149,6 +156,7 @@ MediaTime VKVideoEditorViewController::mediaTime(double seconds) const
 
 void VKVideoEditorViewController::togglePlayback()
 {
+    assertHere();
     if (avPlayer()->isPlaying())
         pauseAction();
     else

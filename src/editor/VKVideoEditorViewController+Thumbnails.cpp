@@ -17,6 +17,7 @@ constexpr std::int32_t kThumbnailTimescale = 1'000'000'000;
 
 base::Size VKVideoEditorViewController::getVideoSize() const
 {
+    assertHere();
     const auto item = avPlayer()->currentItem();
     const auto tracks =
         item ? item->asset()->tracksWithMediaType(platform::MediaType::Video) : std::vector<platform::AssetTrack>{};
@@ -28,12 +29,14 @@ base::Size VKVideoEditorViewController::getVideoSize() const
 
 double VKVideoEditorViewController::movieScrubberThumbnailAspectRatio(MovieScrubber& /*scrubber*/)
 {
+    assertHere();
     const base::Size size = getVideoSize();
     return size.width > 0 && size.height > 0 ? size.width / size.height : 1.0;
 }
 
 base::Size VKVideoEditorViewController::getThumbnailSize() const
 {
+    assertHere();
     const double scale = m_platform.mainScreen.scale();
     const base::Size size = getVideoSize();
     // Without a picture this is not a number, which bounds nothing.
@@ -45,6 +48,7 @@ base::Size VKVideoEditorViewController::getThumbnailSize() const
 void VKVideoEditorViewController::movieScrubber_requestThumbnailImageForTimestamp(MovieScrubber& /*scrubber*/,
                                                                                   double timestamp)
 {
+    assertHere();
     if (!thumbnailGenerator()) {
         const auto item = avPlayer()->currentItem();
         setThumbnailGenerator(m_platform.media.imageGeneratorWithAsset(item ? item->asset() : nullptr));
@@ -72,6 +76,7 @@ void VKVideoEditorViewController::movieScrubber_requestThumbnailImageForTimestam
 
 void VKVideoEditorViewController::setThumbnailFromCacheWithTimeStamp(double timestamp)
 {
+    assertHere();
     handThumbnailOver(m_platform.system.mainQueue, weakSelf<VKVideoEditorViewController>(), timestamp);
 }
 

@@ -17,12 +17,14 @@ constexpr double kArrowStep = 1; // seconds, of an arrow key
 
 void VKVideoEditorViewController::movieScrubberDidBeginEditing(MovieScrubber& /*scrubber*/)
 {
+    assertHere();
     editMode();
     setTrimming(true);
 }
 
 void VKVideoEditorViewController::movieScrubberDidCancelEditing(MovieScrubber& /*scrubber*/)
 {
+    assertHere();
     avTrimmer()->setEditing_animated(false, true);
     previewMode();
     setTrimming(false);
@@ -30,6 +32,7 @@ void VKVideoEditorViewController::movieScrubberDidCancelEditing(MovieScrubber& /
 
 void VKVideoEditorViewController::editMode()
 {
+    assertHere();
     if (isPadMode()) {
         topToolBar()->setItems(
             {cancelTrimButton(), flexSpace(), titleButton(), flexSpace(), playButton(), fixSpace(), trimButton()});
@@ -43,6 +46,7 @@ void VKVideoEditorViewController::editMode()
 
 void VKVideoEditorViewController::previewMode()
 {
+    assertHere();
     const auto close = hasEdit() ? doneButton() : cancelButton();
     if (isPadMode()) {
         topToolBar()->setItems({close, flexSpace(), titleButton(), flexSpace(), playButton(), fixSpace(), shareButton(),
@@ -55,6 +59,7 @@ void VKVideoEditorViewController::previewMode()
 
 void VKVideoEditorViewController::undoAction()
 {
+    assertHere();
     if (isExporting())
         return;
     if (const auto delegate = avTrimmer()->delegate())
@@ -63,6 +68,7 @@ void VKVideoEditorViewController::undoAction()
 
 void VKVideoEditorViewController::movieScrubber_editingStartValueDidChange(MovieScrubber& /*scrubber*/, double seconds)
 {
+    assertHere();
     avPlayer()->pause();
     setEditStartTime(seconds);
     m_platform.system.mainQueue.post([weak = weakSelf<VKVideoEditorViewController>(), seconds] {
@@ -74,6 +80,7 @@ void VKVideoEditorViewController::movieScrubber_editingStartValueDidChange(Movie
 
 void VKVideoEditorViewController::movieScrubber_editingEndValueDidChange(MovieScrubber& /*scrubber*/, double seconds)
 {
+    assertHere();
     avPlayer()->pause();
     setEditEndTime(seconds);
     m_platform.system.mainQueue.post([weak = weakSelf<VKVideoEditorViewController>(), seconds] {
@@ -85,29 +92,34 @@ void VKVideoEditorViewController::movieScrubber_editingEndValueDidChange(MovieSc
 
 void VKVideoEditorViewController::movieScrubberDidBeginScrubbing_withHandle(MovieScrubber& /*scrubber*/, int /*handle*/)
 {
+    assertHere();
     setScrubbing(true);
     pauseAction();
 }
 
 void VKVideoEditorViewController::movieScrubber_valueDidChange(MovieScrubber& /*scrubber*/, double seconds)
 {
+    assertHere();
     avPlayer()->seekToTime(mediaTime(seconds));
 }
 
 void VKVideoEditorViewController::movieScrubberDidEndScrubbing_withHandle(MovieScrubber& /*scrubber*/, int /*handle*/)
 {
+    assertHere();
     avPlayer()->seekToTime(mediaTime(avTrimmer()->value()));
     setScrubbing(false);
 }
 
 double VKVideoEditorViewController::movieScrubberDuration(MovieScrubber& /*scrubber*/)
 {
+    assertHere();
     return getPlayerDuration();
 }
 
 std::vector<double> VKVideoEditorViewController::movieScrubber_evenlySpacedTimestamps_startingAt_endingAt(
     MovieScrubber& /*scrubber*/, std::int32_t count, double start, double end)
 {
+    assertHere();
     if (end == 0.0)
         return {0.0};
     std::vector<double> timestamps;
@@ -126,6 +138,7 @@ std::vector<double> VKVideoEditorViewController::movieScrubber_evenlySpacedTimes
 
 base::Url VKVideoEditorViewController::trimFileURL() const
 {
+    assertHere();
     const std::string name = support::trimmedMovieName(applicationName().value_or(""));
     return support::tempMovieUrl(support::tempMovieStem(VKExtensions::_srTempPath(m_platform.files), name),
                                  m_platform.system.clock.date());
@@ -133,6 +146,7 @@ base::Url VKVideoEditorViewController::trimFileURL() const
 
 void VKVideoEditorViewController::trimVideo()
 {
+    assertHere();
     // After an earlier trim this is the file that the export below reads. It stays readable: the player has it open.
     if (trimFilePath())
         VKExtensions::_srRemoveFile_completion(m_platform.files, *trimFilePath(), {});
@@ -179,48 +193,57 @@ void VKVideoEditorViewController::showTrimmedMovie(const std::optional<base::Url
 
 void VKVideoEditorViewController::seekBackward()
 {
+    assertHere();
     avTrimmer()->scrubTo(avTrimmer()->value() - kArrowStep);
 }
 
 void VKVideoEditorViewController::seekForward()
 {
+    assertHere();
     avTrimmer()->scrubTo(avTrimmer()->value() + kArrowStep);
 }
 
 void VKVideoEditorViewController::stepBackward()
 {
+    assertHere();
     pauseAction();
     avPlayer()->stepByCount(-1);
 }
 
 void VKVideoEditorViewController::stepForward()
 {
+    assertHere();
     pauseAction();
     avPlayer()->stepByCount(1);
 }
 
 void VKVideoEditorViewController::goToStart()
 {
+    assertHere();
     avTrimmer()->scrubTo(0);
 }
 
 void VKVideoEditorViewController::goToEnd()
 {
+    assertHere();
     avTrimmer()->scrubTo(avTrimmer()->duration());
 }
 
 void VKVideoEditorViewController::trimStartHere()
 {
+    assertHere();
     avTrimmer()->moveHandle(platform::ScrubberHandle::Start, avTrimmer()->value());
 }
 
 void VKVideoEditorViewController::trimEndHere()
 {
+    assertHere();
     avTrimmer()->moveHandle(platform::ScrubberHandle::End, avTrimmer()->value());
 }
 
 void VKVideoEditorViewController::confirmTrim()
 {
+    assertHere();
     using Status = platform::ExportSession::Status;
     const auto status = exportSession() ? exportSession()->status() : Status::Unknown;
     const bool isUnderWay = isExporting() && (status == Status::Waiting || status == Status::Exporting);

@@ -120,6 +120,7 @@ const runtime::Class& VKVideoEditorViewController::classObject()
 
 bool VKVideoEditorViewController::deviceHasHomeButton() const
 {
+    assertHere();
     static base::Once<bool> answer;
     return answer.get(
         [this] { return m_platform.device.integerAnswer(platform::kDeviceHomeButtonKey, 0) != kNoHomeButton; });
@@ -127,6 +128,7 @@ bool VKVideoEditorViewController::deviceHasHomeButton() const
 
 int VKVideoEditorViewController::currentOrientation()
 {
+    assertHere();
     const base::Rect bounds = view()->bounds();
     return bounds.width() > bounds.height() ? 1 : 0;
 }
@@ -246,23 +248,27 @@ void VKVideoEditorViewController::makeViewTree()
 
 void VKVideoEditorViewController::viewWillAppear(bool animated)
 {
+    assertHere();
     becomeFirstResponder();
     ViewController::viewWillAppear(animated);
 }
 
 void VKVideoEditorViewController::viewDidAppear(bool animated)
 {
+    assertHere();
     ViewController::viewDidAppear(animated);
 }
 
 void VKVideoEditorViewController::viewWillDisappear(bool animated)
 {
+    assertHere();
     resignFirstResponder();
     ViewController::viewWillDisappear(animated);
 }
 
 void VKVideoEditorViewController::viewDidLayoutSubviews()
 {
+    assertHere();
     ViewController::viewDidLayoutSubviews();
     // Laid out before it is made when the view gets its first frame.
     if (avPlayerLayer())
@@ -271,6 +277,7 @@ void VKVideoEditorViewController::viewDidLayoutSubviews()
 
 void VKVideoEditorViewController::motionEnded_withEvent(MotionSubtype motion, const platform::MotionEvent& event)
 {
+    assertHere();
     if (event.subtype == MotionSubtype::Shake && isTrimming() && !isExporting())
         undoAction();
     ViewController::motionEnded_withEvent(motion, event);
@@ -278,6 +285,7 @@ void VKVideoEditorViewController::motionEnded_withEvent(MotionSubtype motion, co
 
 std::vector<platform::KeyCommand> VKVideoEditorViewController::keyCommands() const
 {
+    assertHere();
     using platform::Key;
     return {
         {Key::Space, 0, false, Selector("togglePlayback"), "Play or pause"},
@@ -296,6 +304,7 @@ std::vector<platform::KeyCommand> VKVideoEditorViewController::keyCommands() con
 
 void VKVideoEditorViewController::leave()
 {
+    assertHere();
     if (isTrimming())
         undoAction();
     else
@@ -306,11 +315,13 @@ void VKVideoEditorViewController::leave()
 
 void VKVideoEditorViewController::handleSingleTap(const std::shared_ptr<runtime::Object>& /*recognizer*/)
 {
+    assertHere();
     configureClipsaUIHidden();
 }
 
 void VKVideoEditorViewController::configureClipsaUIHidden()
 {
+    assertHere();
     if (isUIHidden())
         showUI();
     else
@@ -319,12 +330,14 @@ void VKVideoEditorViewController::configureClipsaUIHidden()
 
 void VKVideoEditorViewController::showUI()
 {
+    assertHere();
     setUIHidden(false);
     fadeChromeTo(1.0);
 }
 
 void VKVideoEditorViewController::hideUI()
 {
+    assertHere();
     setUIHidden(true);
     fadeChromeTo(0.0);
 }

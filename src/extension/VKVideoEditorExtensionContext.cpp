@@ -60,11 +60,13 @@ ConnectionInterface VKVideoEditorExtensionContext::_extensionAuxiliaryHostProtoc
 std::shared_ptr<VKVideoEditorExtensionViewController>
 VKVideoEditorExtensionContext::videoEditorExtensionViewController() const
 {
+    assertHere();
     return std::dynamic_pointer_cast<VKVideoEditorExtensionViewController>(principalObject());
 }
 
 std::shared_ptr<VKVideoEditorExtensionHostProtocol> VKVideoEditorExtensionContext::extensionObjectProxy() const
 {
+    assertHere();
     if (!auxiliaryConnection())
         return nullptr;
     base::Log& log = platform().system.log;

@@ -27,12 +27,14 @@ const runtime::Class& VKVideoEditorExtensionViewController::classObject()
 
 void VKVideoEditorExtensionViewController::viewDidLoad()
 {
+    assertHere();
     ExtensionViewController::viewDidLoad();
     setupChildViewControllers();
 }
 
 void VKVideoEditorExtensionViewController::viewWillAppear(bool animated)
 {
+    assertHere();
     ExtensionViewController::viewWillAppear(animated);
     if (!videoEditorViewController())
         setupVideoEditorController();
@@ -40,6 +42,7 @@ void VKVideoEditorExtensionViewController::viewWillAppear(bool animated)
 
 void VKVideoEditorExtensionViewController::viewDidDisappear(bool animated)
 {
+    assertHere();
     ExtensionViewController::viewDidDisappear(animated);
     extensionContext()->platform().system.log.message("VKVideoEditorExtensionViewController -viewDidDisappear:");
     tearDownChildViewControllers();
@@ -47,6 +50,7 @@ void VKVideoEditorExtensionViewController::viewDidDisappear(bool animated)
 
 void VKVideoEditorExtensionViewController::setupChildViewControllers()
 {
+    assertHere();
     const base::System& system = extensionContext()->platform().system;
     system.log.message("VKVideoEditorExtensionViewController -setupChildViewControllers");
 
@@ -102,6 +106,7 @@ void VKVideoEditorExtensionViewController::inputItemsFromClientWithCompletionHan
 
 void VKVideoEditorExtensionViewController::setupVideoEditorController()
 {
+    assertHere();
     const auto editor =
         VKVideoEditorViewController::initWithBundleIdentifier_URL_applicationName_overrideTintColor_size(
             extensionContext()->platform(), bundleIdentifier(), movieURL(), appName(), overrideTintColor(),
@@ -120,6 +125,7 @@ void VKVideoEditorExtensionViewController::setupVideoEditorController()
 
 void VKVideoEditorExtensionViewController::tearDownChildViewControllers()
 {
+    assertHere();
     if (const auto editor = videoEditorViewController()) {
         editor->willMoveToParentViewController(nullptr);
         editor->view()->removeFromSuperview();
@@ -131,6 +137,7 @@ void VKVideoEditorExtensionViewController::tearDownChildViewControllers()
 void VKVideoEditorExtensionViewController::videoEditor_didFinishWithActivityTypes(
     VKVideoEditorViewController& /*editor*/, const std::shared_ptr<ActivityTypes>& activityTypes)
 {
+    assertHere();
     extensionContext()->platform().system.log.message(
         "VKVideoEditorExtensionViewController -videoEditorViewDidFinishWithActivityTypes:");
     const auto context = std::dynamic_pointer_cast<VKVideoEditorExtensionContext>(extensionContext());

@@ -36,12 +36,14 @@ const runtime::Class& VKFlatVideoOverlayButton::classObject()
 
 void VKFlatVideoOverlayButton::setTarget_action(const std::weak_ptr<runtime::Object>& target, const Selector& action)
 {
+    assertHere();
     setTarget(target);
     setAction(action);
 }
 
 void VKFlatVideoOverlayButton::_handleTap(const std::shared_ptr<runtime::Object>& /*sender*/)
 {
+    assertHere();
     runtime::TargetAction(m_target, m_action).send(shared_from_this());
 }
 

@@ -71,22 +71,26 @@ const runtime::Class& VKHighFidelityVideoOverlayButton::classObject()
 void VKHighFidelityVideoOverlayButton::setTarget_action(const std::weak_ptr<runtime::Object>& target,
                                                         const Selector& action)
 {
+    assertHere();
     setTarget(target);
     setAction(action);
 }
 
 void VKHighFidelityVideoOverlayButton::_playButtonActivate(const std::shared_ptr<runtime::Object>& /*sender*/)
 {
+    assertHere();
     m_button->setAlpha(VKVideoOverlayHighlightedGlyphAlpha);
 }
 
 void VKHighFidelityVideoOverlayButton::_playButtonDeactivate(const std::shared_ptr<runtime::Object>& /*sender*/)
 {
+    assertHere();
     m_button->setAlpha(VKVideoOverlayDefaultGlyphAlpha);
 }
 
 void VKHighFidelityVideoOverlayButton::_playButtonTapped(const std::shared_ptr<runtime::Object>& sender)
 {
+    assertHere();
     _playButtonDeactivate(sender);
     runtime::TargetAction(m_target, m_action).send(shared_from_this());
 }

@@ -2,6 +2,7 @@
 /// by key, and read by the names of its instance variables. Reference counted; observers and targets are weak.
 #pragma once
 
+#include "base/Affinity.h"
 #include "runtime/Class.h"
 #include "runtime/Export.h"
 #include "runtime/Selector.h"
@@ -9,6 +10,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <source_location>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -57,6 +59,12 @@ public:
     template <typename T> std::weak_ptr<T> weakSelf() { return std::dynamic_pointer_cast<T>(weak_from_this().lock()); }
 
 protected:
+    /// First thing in each entry point of what lives on one thread, which is the one that made it.
+    void assertHere(std::source_location where = std::source_location::current()) const
+    {
+        m_affinity.assertHere(where);
+    }
+
     /// Tells the observers of `key`. They may come and go, and release this object, while they are told.
     void didChangeValueForKey(std::string_view key);
 
@@ -68,6 +76,7 @@ private:
         std::uint64_t id; ///< tells entries of one observer for one key apart
     };
 
+    base::Affinity m_affinity;
     std::vector<Observation> m_observations;
     std::uint64_t m_nextObservation = 0;
 };

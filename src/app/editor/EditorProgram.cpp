@@ -131,6 +131,7 @@ EditorProgram::~EditorProgram()
 
 int EditorProgram::run()
 {
+    m_affinity.assertHere();
     markStart("platform");
     if (const auto started = start(); !started) {
         m_log.error(started.error()->description());
@@ -268,6 +269,7 @@ void EditorProgram::openWindow()
 
 std::shared_ptr<VKVideoEditorViewController> EditorProgram::editor() const
 {
+    m_affinity.assertHere();
     const auto principal = std::dynamic_pointer_cast<VKVideoEditorExtensionViewController>(m_extension.principal);
     return principal ? principal->videoEditorViewController() : nullptr;
 }

@@ -8,6 +8,7 @@
 #include "app/editor/EditorOptions.h"
 #include "app/editor/PayloadWatch.h"
 #include "app/editor/WorkWatch.h"
+#include "base/Affinity.h"
 #include "base/SharedValue.h"
 #include "base/WorkList.h"
 #include "linux/dbus/BusyMark.h"
@@ -105,6 +106,7 @@ private:
     bool m_shown = false;
     bool m_leaving = false;
     bool m_pictureSeen = false;
+    base::Affinity m_affinity;
 };
 
 } // namespace app

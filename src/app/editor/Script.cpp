@@ -86,11 +86,13 @@ Script::~Script() = default;
 
 bool Script::beginsWithWaiting() const
 {
+    m_affinity.assertHere();
     return !m_commands.empty() && m_commands.front() == Words{"wait", "waiting"};
 }
 
 void Script::start()
 {
+    m_affinity.assertHere();
     m_started = true;
     next();
 }

@@ -28,6 +28,7 @@
 #pragma once
 
 #include "app/editor/TransitionTrial.h"
+#include "base/Affinity.h"
 #include "base/Clock.h"
 #include "base/Geometry.h"
 #include "platform/media/VideoFrame.h"
@@ -83,6 +84,7 @@ private:
     base::Instant m_waitedSince{};                           ///< …and since when
     std::optional<base::Point> m_finger;                     ///< where it is held
     std::shared_ptr<bool> m_alive = std::make_shared<bool>(true);
+    base::Affinity m_affinity;
 };
 
 } // namespace app

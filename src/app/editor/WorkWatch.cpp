@@ -29,6 +29,7 @@ WorkWatch::WorkWatch(base::MainQueue& mainQueue, base::WorkList& list, Handlers 
 
 WorkWatch::~WorkWatch()
 {
+    m_affinity.assertHere();
     m_list.setChangeHandler({});
     m_link->watch = nullptr;
 }

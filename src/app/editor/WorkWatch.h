@@ -1,6 +1,7 @@
 /// Watches what is under way in the background: tells whoever waits for its end, and shows what lasts. Main queue.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Queue.h"
 #include "base/WorkList.h"
 
@@ -42,6 +43,7 @@ private:
     bool m_working = false;
     bool m_shown = false;
     unsigned m_serial = 0; ///< of the times that work began
+    base::Affinity m_affinity;
 };
 
 } // namespace app

@@ -3,6 +3,7 @@
 /// Lives on a thread with a Qt event loop. Destroying it waits for nothing: what is still under way is left to itself.
 #pragma once
 
+#include "base/Affinity.h"
 #include <atomic>
 #include <functional>
 #include <memory>
@@ -41,6 +42,7 @@ public:
 
 private:
     std::shared_ptr<Client> m_client;
+    base::Affinity m_affinity;
 };
 
 } // namespace host

@@ -163,6 +163,7 @@ base::Result<std::unique_ptr<EditorProcess>> EditorProcess::start(const ProcessS
 
 void EditorProcess::signal(int number)
 {
+    m_affinity.assertHere();
     if (m_state->running)
         ::pidfd_send_signal(m_state->descriptor.get(), number, nullptr, 0);
 }

@@ -2,6 +2,7 @@
 /// runs; the handler is called there.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 
 #include <functional>
@@ -48,6 +49,7 @@ private:
     explicit EditorProcess(std::unique_ptr<State> state);
 
     std::unique_ptr<State> m_state;
+    base::Affinity m_affinity;
 };
 
 /// The editor's program: what CLIPSA_EDITOR names, else `clipsa-editor` beside our own program, in ../libexec/clipsa,

@@ -231,6 +231,7 @@ base::Result<std::unique_ptr<EditorSession>> EditorSession::start(dbus::EditRequ
 
 void EditorSession::close()
 {
+    m_affinity.assertHere();
     m_state->outcome.closed = true;
     m_state->close();
 }

@@ -6,6 +6,7 @@
 
 #include "app/host/EditorProcess.h"
 #include "app/host/HandOver.h"
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/dbus/EditRequest.h"
 #include "linux/dbus/EditorReport.h"
@@ -72,6 +73,7 @@ private:
     explicit EditorSession(std::unique_ptr<State> state);
 
     std::unique_ptr<State> m_state;
+    base::Affinity m_affinity;
 };
 
 } // namespace host

@@ -11,6 +11,7 @@ DisconnectWatch::DisconnectWatch(std::function<void()> ended, QObject* parent)
 
 void DisconnectWatch::watch(QDBusConnection connection)
 {
+    m_affinity.assertHere();
     connection.connect(QString(), QStringLiteral("/org/freedesktop/DBus/Local"),
                        QStringLiteral("org.freedesktop.DBus.Local"), QStringLiteral("Disconnected"), this,
                        SLOT(tell()));

@@ -1,6 +1,7 @@
 /// Tells, once, that a private connection has ended. Lives on the thread that is told; this layer's own business.
 #pragma once
 
+#include "base/Affinity.h"
 #include <QDBusConnection>
 #include <QObject>
 
@@ -22,6 +23,7 @@ private Q_SLOTS:
 
 private:
     std::function<void()> m_ended;
+    base::Affinity m_affinity;
 };
 
 } // namespace dbus

@@ -188,11 +188,13 @@ base::Result<std::unique_ptr<HostConnection>> HostConnection::listen(const std::
 
 std::string HostConnection::address() const
 {
+    m_affinity.assertHere();
     return fromQt(m_state->server.address());
 }
 
 void HostConnection::disconnectEditor()
 {
+    m_affinity.assertHere();
     m_state->close();
 }
 

@@ -4,6 +4,7 @@
 /// Lives on one thread, whose Qt event loop runs; handlers are called there and may destroy the connection.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "platform/hosting/InputItem.h"
 #include "runtime/Value.h"
@@ -63,6 +64,7 @@ private:
     explicit HostConnection(std::unique_ptr<State> state);
 
     std::unique_ptr<State> m_state;
+    base::Affinity m_affinity;
 };
 
 } // namespace dbus

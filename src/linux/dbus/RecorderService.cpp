@@ -368,6 +368,7 @@ base::Result<std::unique_ptr<RecorderService>> RecorderService::start(Launcher l
 
 void RecorderService::close()
 {
+    m_affinity.assertHere();
     m_bus->close();
 }
 

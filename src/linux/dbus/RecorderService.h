@@ -4,6 +4,7 @@
 /// Lives on one thread, whose Qt event loop runs. It does not start editors itself: it is given how to.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/dbus/EditRequest.h"
 #include "linux/dbus/EditorReport.h"
@@ -58,6 +59,7 @@ private:
     explicit RecorderService(std::unique_ptr<Bus> bus);
 
     std::unique_ptr<Bus> m_bus;
+    base::Affinity m_affinity;
 };
 
 } // namespace dbus

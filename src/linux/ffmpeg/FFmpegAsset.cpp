@@ -80,11 +80,13 @@ void FFmpegAsset::finish(base::Result<std::shared_ptr<Movie>> movie)
 
 std::string FFmpegAsset::whatIsMissing() const
 {
+    assertHere();
     return m_movie ? m_movie->whatIsMissing("This recording").value_or("") : "";
 }
 
 void FFmpegAsset::whenLoaded(std::function<void()> then)
 {
+    assertHere();
     if (!m_movie && !m_error) {
         m_waiting.push_back(std::move(then));
         return;
@@ -97,11 +99,13 @@ void FFmpegAsset::whenLoaded(std::function<void()> then)
 
 base::MediaTime FFmpegAsset::duration() const
 {
+    assertHere();
     return m_movie ? m_movie->duration() : base::MediaTime::indefinite();
 }
 
 std::vector<platform::AssetTrack> FFmpegAsset::tracks() const
 {
+    assertHere();
     return m_movie ? m_movie->tracks() : std::vector<platform::AssetTrack>{};
 }
 

@@ -27,6 +27,7 @@ FFmpegImageGenerator::~FFmpegImageGenerator()
 void FFmpegImageGenerator::generateImagesAsynchronouslyForTimes(const std::vector<base::MediaTime>& times,
                                                                 Handler handler)
 {
+    assertHere();
     if (times.empty())
         return;
     const bool isFirst = m_gathered.empty();

@@ -23,24 +23,28 @@ FFmpegMediaFramework::~FFmpegMediaFramework() = default;
 
 std::shared_ptr<platform::Asset> FFmpegMediaFramework::assetWithURL(const std::optional<base::Url>& url)
 {
+    m_affinity.assertHere();
     return FFmpegAsset::make(m_engine, url);
 }
 
 std::shared_ptr<platform::PlayerItem>
 FFmpegMediaFramework::playerItemWithAsset(const std::shared_ptr<platform::Asset>& asset)
 {
+    m_affinity.assertHere();
     return FFmpegPlayerItem::make(ours(asset));
 }
 
 std::shared_ptr<platform::Player>
 FFmpegMediaFramework::playerWithPlayerItem(const std::shared_ptr<platform::PlayerItem>& item)
 {
+    m_affinity.assertHere();
     return FFmpegPlayer::make(m_engine, std::dynamic_pointer_cast<FFmpegPlayerItem>(item));
 }
 
 std::shared_ptr<platform::ImageGenerator>
 FFmpegMediaFramework::imageGeneratorWithAsset(const std::shared_ptr<platform::Asset>& asset)
 {
+    m_affinity.assertHere();
     return FFmpegImageGenerator::make(m_engine, ours(asset));
 }
 
@@ -48,6 +52,7 @@ std::shared_ptr<platform::ExportSession>
 FFmpegMediaFramework::exportSessionWithAsset(const std::shared_ptr<platform::Asset>& asset,
                                              platform::ExportPreset /*preset: there is one*/)
 {
+    m_affinity.assertHere();
     return FFmpegExportSession::make(m_engine, ours(asset));
 }
 

@@ -4,6 +4,7 @@
 /// after its file was removed. Players may outlive the framework.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/System.h"
 #include "base/WorkList.h"
 #include "linux/ffmpeg/AudioOutput.h"
@@ -49,6 +50,7 @@ private:
     std::shared_ptr<FFmpegAsset> ours(const std::shared_ptr<platform::Asset>& asset) const;
 
     std::shared_ptr<Engine> m_engine;
+    base::Affinity m_affinity;
 };
 
 } // namespace ffmpeg

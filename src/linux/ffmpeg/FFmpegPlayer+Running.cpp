@@ -60,6 +60,7 @@ void FFmpegPlayer::picturesArrived(std::uint64_t generation, const FrameRef& fra
 
 bool FFmpegPlayer::hasPictures() const
 {
+    assertHere();
     return !m_pictures || m_pictures->isAhead();
 }
 

@@ -72,6 +72,7 @@ void FFmpegPlayer::movieLoaded()
 
 base::MediaTime FFmpegPlayer::currentTime() const
 {
+    assertHere();
     if (!m_running)
         return m_position;
     const MediaTime elapsed =
@@ -91,6 +92,7 @@ base::MediaTime FFmpegPlayer::clamped(MediaTime time) const
 
 void FFmpegPlayer::play()
 {
+    assertHere();
     if (m_playing)
         return;
     m_playing = true;
@@ -101,6 +103,7 @@ void FFmpegPlayer::play()
 
 void FFmpegPlayer::pause()
 {
+    assertHere();
     if (!m_playing)
         return;
     halt();
@@ -111,6 +114,7 @@ void FFmpegPlayer::pause()
 
 void FFmpegPlayer::seekToTime(MediaTime time)
 {
+    assertHere();
     if (!time.isNumeric())
         return;
     m_steps = 0;
@@ -119,6 +123,7 @@ void FFmpegPlayer::seekToTime(MediaTime time)
 
 void FFmpegPlayer::stepByCount(int frames)
 {
+    assertHere();
     pause();
     m_steps += frames;
     if (m_movie)
@@ -223,6 +228,7 @@ void FFmpegPlayer::setFrame(const FrameRef& frame)
 platform::Player::ObserverToken FFmpegPlayer::addPeriodicTimeObserver(MediaTime interval,
                                                                       std::function<void(MediaTime)> callback)
 {
+    assertHere();
     auto token = m_observers.addPeriodic(interval, std::move(callback));
     if (m_running)
         scheduleTick();
@@ -232,6 +238,7 @@ platform::Player::ObserverToken FFmpegPlayer::addPeriodicTimeObserver(MediaTime 
 platform::Player::ObserverToken FFmpegPlayer::addBoundaryTimeObserver(std::vector<MediaTime> times,
                                                                       std::function<void()> callback)
 {
+    assertHere();
     auto token = m_observers.addBoundary(std::move(times), std::move(callback));
     if (m_running)
         scheduleTick();

@@ -16,6 +16,7 @@ std::shared_ptr<FFmpegPlayerItem> FFmpegPlayerItem::make(std::shared_ptr<FFmpegA
 
 base::MediaTime FFmpegPlayerItem::duration() const
 {
+    assertHere();
     return m_status == Status::ReadyToPlay ? m_asset->duration() : base::MediaTime::indefinite();
 }
 

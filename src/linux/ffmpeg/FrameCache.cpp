@@ -19,6 +19,7 @@ bool isHuge(const DecodedFrame& frame)
 
 void FrameCache::insert(const ShownFrame& shown, std::int64_t focus, Overflow overflow, std::int64_t reach)
 {
+    m_affinity.assertHere();
     const std::int64_t pts = shown.frame->pts();
     if (const auto found = m_entries.find(pts); found != m_entries.end()) {
         if (shown.frame->picture().width < found->second.frame->picture().width)
@@ -60,6 +61,7 @@ std::size_t FrameCache::fullLimit(const DecodedFrame& picture) const
 
 std::optional<ShownFrame> FrameCache::at(std::int64_t tick) const
 {
+    m_affinity.assertHere();
     auto found = m_entries.upper_bound(tick);
     if (found == m_entries.begin())
         return std::nullopt;
@@ -69,6 +71,7 @@ std::optional<ShownFrame> FrameCache::at(std::int64_t tick) const
 
 FrameRef FrameCache::nearest(std::int64_t tick) const
 {
+    m_affinity.assertHere();
     auto found = m_entries.upper_bound(tick);
     if (found == m_entries.begin())
         return found == m_entries.end() ? nullptr : found->second.frame;
@@ -79,6 +82,7 @@ FrameRef FrameCache::nearest(std::int64_t tick) const
 
 std::int64_t FrameCache::capacity(const DecodedFrame& full, Overflow overflow) const
 {
+    m_affinity.assertHere();
     const std::size_t bytes = std::max<std::size_t>(1, full.byteCount());
     const std::size_t step = stepOf(full);
     if (overflow == Overflow::Drop || step == 0)

@@ -1,6 +1,7 @@
 /// Decoded pictures around the playhead, within a bound in bytes. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/DecodedFrame.h"
 
 #include <array>
@@ -62,6 +63,7 @@ private:
     /// How many pictures can be reduced in so many steps: first those that cannot.
     std::array<std::size_t, kReducedSides.size() + 1> m_counts{};
     Entries m_entries;
+    base::Affinity m_affinity = base::Affinity::ofTheFirst();
 };
 
 } // namespace ffmpeg

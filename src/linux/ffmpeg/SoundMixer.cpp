@@ -51,6 +51,7 @@ base::Result<std::unique_ptr<SoundMixer>> SoundMixer::open(const std::shared_ptr
 
 void SoundMixer::seek(std::int64_t frame)
 {
+    m_affinity.assertHere();
     m_position = frame;
     m_ended = false;
     m_gain = 1;
@@ -64,6 +65,7 @@ void SoundMixer::seek(std::int64_t frame)
 
 void SoundMixer::mix(float* into, std::size_t frames)
 {
+    m_affinity.assertHere();
     std::fill(into, into + frames * 2, 0.0f);
     readUntil(m_position + static_cast<std::int64_t>(frames));
     for (const auto& track : m_tracks)

@@ -1,6 +1,7 @@
 /// All sound tracks of a movie, heard at once: each at its own level, their sum kept from clipping. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Demuxer.h"
 #include "linux/ffmpeg/Movie.h"
 #include "linux/ffmpeg/SoundTrack.h"
@@ -36,6 +37,7 @@ private:
     std::int64_t m_position = 0;
     bool m_ended = false;
     float m_gain = 1;
+    base::Affinity m_affinity = base::Affinity::ofTheFirst();
 };
 
 } // namespace ffmpeg

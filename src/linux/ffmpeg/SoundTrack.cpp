@@ -41,6 +41,7 @@ std::unique_ptr<SoundTrack> SoundTrack::open(const AVStream& stream, std::int64_
 
 void SoundTrack::seek(std::int64_t frame)
 {
+    m_affinity.assertHere();
     avcodec_flush_buffers(m_context.get());
     m_resampler.reset();
     m_format = -1;
@@ -56,11 +57,13 @@ std::int64_t SoundTrack::frameAt(std::int64_t pts) const
 
 bool SoundTrack::isTooEarly(const AVPacket& packet) const
 {
+    m_affinity.assertHere();
     return packet.pts != AV_NOPTS_VALUE && frameAt(packet.pts + packet.duration) + kPreroll < m_wanted;
 }
 
 void SoundTrack::decode(const AVPacket& packet)
 {
+    m_affinity.assertHere();
     if (avcodec_send_packet(m_context.get(), &packet) < 0)
         return; // damaged: silence
     while (avcodec_receive_frame(m_context.get(), m_frame.get()) >= 0)
@@ -139,6 +142,7 @@ void SoundTrack::append(std::int64_t at, const float* samples, std::size_t frame
 
 void SoundTrack::addTo(float* into, std::int64_t from, std::size_t frames)
 {
+    m_affinity.assertHere();
     const std::int64_t until = from + static_cast<std::int64_t>(frames);
     const std::int64_t first = std::max(from, m_start);
     const std::int64_t last = std::min(until, end());

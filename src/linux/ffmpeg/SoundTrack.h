@@ -1,6 +1,7 @@
 /// Decodes one sound track to stereo at the playing rate, by places on the movie's time line. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Libraries.h"
 
 #include <cstddef>
@@ -47,6 +48,7 @@ private:
     std::vector<float> m_samples;
     std::vector<float> m_converted;
     bool m_continues = false; ///< the next samples belong right behind the last
+    base::Affinity m_affinity = base::Affinity::ofTheFirst();
 };
 
 } // namespace ffmpeg

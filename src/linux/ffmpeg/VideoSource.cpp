@@ -54,6 +54,7 @@ base::Result<std::unique_ptr<VideoSource>> VideoSource::open(std::shared_ptr<con
 
 std::optional<ShownFrame> VideoSource::at(std::int64_t tick, Want want, const Stopped& stopped, const Glimpse& glimpse)
 {
+    m_affinity.assertHere();
     const std::int64_t before = std::exchange(m_lastTick, tick).value_or(kNever);
     const auto cached = m_cache.at(tick);
     if (cached && (want == Want::Any || !cached->frame->isReduced()))

@@ -5,6 +5,7 @@
 /// as under a finger, all that is passed is cached, so that each group of pictures is decoded once or twice.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Demuxer.h"
 #include "linux/ffmpeg/FrameCache.h"
 #include "linux/ffmpeg/Movie.h"
@@ -88,6 +89,7 @@ private:
     FrameCache::Overflow m_overflow = FrameCache::Overflow::Drop;
     std::int64_t m_skipBefore = kNever;
     std::int64_t m_skippedTo = kNever; ///< up to here pictures can be missing
+    base::Affinity m_affinity = base::Affinity::ofTheFirst();
 };
 
 } // namespace ffmpeg

@@ -1,6 +1,7 @@
 /// Runs the main queue inside Qt's event loop. Made, used and ended on the GUI thread, after the QGuiApplication.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Queue.h"
 
 #include <QObject>
@@ -25,6 +26,7 @@ private:
     base::MainQueue& m_queue;
     QTimer m_timer;
     std::atomic<bool> m_posted = false;
+    base::Affinity m_affinity;
 };
 
 } // namespace qtui

@@ -17,6 +17,7 @@ Mirror::~Mirror() = default;
 
 bool Mirror::commit()
 {
+    m_affinity.assertHere();
     ++m_stage.statistics.commits;
     m_stage.painted.clear();
     m_messages.clear();
@@ -34,6 +35,7 @@ bool Mirror::commit()
 
 ViewItem* Mirror::itemFor(const platform::View& view) const
 {
+    m_affinity.assertHere();
     const auto found = m_peers.find(&view);
     auto* item = found == m_peers.end() ? nullptr : dynamic_cast<ViewItem*>(found->second.item.get());
     return item && item->view().get() == &view ? item : nullptr;

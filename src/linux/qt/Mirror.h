@@ -3,6 +3,7 @@
 /// An item lives as long as its view is in the tree; views are told apart by identity, not by place.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Clock.h"
 #include "linux/qt/items/FocusRing.h"
 #include "linux/qt/items/VideoItem.h"
@@ -67,6 +68,7 @@ private:
     base::Instant m_now{0};
     bool m_animating = false;
     bool m_showsVideo = false;
+    base::Affinity m_affinity;
 };
 
 } // namespace qtui

@@ -45,21 +45,25 @@ Presenter::~Presenter()
 
 void Presenter::setTitle(const std::string& title)
 {
+    m_affinity.assertHere();
     m_quickWindow->setTitle(QString::fromStdString(title));
 }
 
 void Presenter::setCloseHandler(std::function<void()> handler)
 {
+    m_affinity.assertHere();
     m_closeHandler = std::move(handler);
 }
 
 void Presenter::setFirstPictureHandler(std::function<void()> handler)
 {
+    m_affinity.assertHere();
     m_firstPictureHandler = std::move(handler);
 }
 
 void Presenter::setScheme(Scheme scheme)
 {
+    m_affinity.assertHere();
     m_schemeIsFixed = true;
     if (std::exchange(m_stage->theme, Theme::forScheme(scheme)).scheme != scheme)
         redrawAll();
@@ -67,35 +71,41 @@ void Presenter::setScheme(Scheme scheme)
 
 Scheme Presenter::scheme() const
 {
+    m_affinity.assertHere();
     return m_stage->theme.scheme;
 }
 
 void Presenter::setLiveBlur(bool live)
 {
+    m_affinity.assertHere();
     if (std::exchange(m_stage->liveBlur, live) != live)
         redrawAll();
 }
 
 void Presenter::show()
 {
+    m_affinity.assertHere();
     m_quickWindow->show();
     m_window->setVisible(true);
 }
 
 void Presenter::showFullScreen()
 {
+    m_affinity.assertHere();
     m_quickWindow->showFullScreen();
     m_window->setVisible(true);
 }
 
 void Presenter::hide()
 {
+    m_affinity.assertHere();
     m_quickWindow->hide();
     m_window->setVisible(false);
 }
 
 void Presenter::showWork(std::optional<double> progress)
 {
+    m_affinity.assertHere();
     const bool begins = !m_workLine->isUnderWay();
     const auto told = m_workLine->percent();
     m_workLine->begin(progress);
@@ -109,6 +119,7 @@ void Presenter::showWork(std::optional<double> progress)
 
 void Presenter::hideWork()
 {
+    m_affinity.assertHere();
     if (!m_workLine->isUnderWay())
         return;
     m_workLine->end();
@@ -119,6 +130,7 @@ void Presenter::hideWork()
 
 void Presenter::commit()
 {
+    m_affinity.assertHere();
     takeScale();
     if (m_needsCommit || m_animating)
         mirrorTree();
@@ -126,6 +138,7 @@ void Presenter::commit()
 
 QImage Presenter::grab()
 {
+    m_affinity.assertHere();
     commit();
     QImage image = m_quickWindow->grabWindow();
     image.setDevicePixelRatio(1);
@@ -134,16 +147,19 @@ QImage Presenter::grab()
 
 QQuickWindow& Presenter::quickWindow()
 {
+    m_affinity.assertHere();
     return *m_quickWindow;
 }
 
 const Statistics& Presenter::statistics() const
 {
+    m_affinity.assertHere();
     return m_stage->statistics;
 }
 
 const Mirror& Presenter::mirror() const
 {
+    m_affinity.assertHere();
     return *m_mirror;
 }
 

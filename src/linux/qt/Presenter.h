@@ -4,6 +4,7 @@
 /// Whatever changes in the tree is shown with the next picture; when nothing changes, nothing happens.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Clock.h"
 #include "linux/qt/Theme.h"
 #include "platform/views/Window.h"
@@ -91,6 +92,7 @@ private:
     bool m_schemeIsFixed = false;
     bool m_needsCommit = true;
     bool m_animating = false;
+    base::Affinity m_affinity;
 };
 
 } // namespace qtui

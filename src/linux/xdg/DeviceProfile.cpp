@@ -32,6 +32,7 @@ DeviceProfile::DeviceProfile(DeviceValues values, std::function<double()> window
 
 std::optional<InterfaceIdiom> DeviceProfile::userInterfaceIdiom() const
 {
+    m_affinity.assertHere();
     if (m_values.idiom)
         return m_values.idiom;
     const bool isNarrow = m_windowWidth && m_windowWidth() < kNarrowWindowWidth;
@@ -40,6 +41,7 @@ std::optional<InterfaceIdiom> DeviceProfile::userInterfaceIdiom() const
 
 std::int32_t DeviceProfile::integerAnswer(std::string_view key, std::int32_t fallback) const
 {
+    m_affinity.assertHere();
     if (key != platform::kDeviceHomeButtonKey)
         return fallback;
     return m_values.hasHomeButton ? 1 : 2;
@@ -47,6 +49,7 @@ std::int32_t DeviceProfile::integerAnswer(std::string_view key, std::int32_t fal
 
 bool DeviceProfile::booleanAnswer(std::string_view key) const
 {
+    m_affinity.assertHere();
     const auto answer = m_values.booleans.find(key);
     return answer != m_values.booleans.end() && answer->second;
 }

@@ -2,6 +2,7 @@
 /// Main queue only.
 #pragma once
 
+#include "base/Affinity.h"
 #include "platform/device/Device.h"
 
 #include <functional>
@@ -47,6 +48,7 @@ public:
 private:
     const DeviceValues m_values;
     const std::function<double()> m_windowWidth;
+    base::Affinity m_affinity;
 };
 
 } // namespace xdg

@@ -19,6 +19,7 @@ const runtime::Class& ExtensionContext::isa() const
 void ExtensionContext::setUp(const Platform& platform, std::vector<InputItem> inputItems,
                              std::shared_ptr<AuxiliaryConnection> connection)
 {
+    assertHere();
     m_platform = &platform;
     m_inputItems = std::move(inputItems);
     m_connection = std::move(connection);

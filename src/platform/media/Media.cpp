@@ -9,6 +9,7 @@ namespace platform {
 
 std::vector<AssetTrack> Asset::tracksWithMediaType(MediaType type) const
 {
+    assertHere();
     std::vector<AssetTrack> found;
     const auto all = tracks();
     std::copy_if(all.begin(), all.end(), std::back_inserter(found),
@@ -38,6 +39,7 @@ std::shared_ptr<PlayerLayer> PlayerLayer::withPlayer(const std::shared_ptr<Playe
 
 void PlayerLayer::setPlayer(const std::shared_ptr<Player>& player)
 {
+    assertHere();
     if (m_player == player)
         return;
     unfollow();
@@ -79,6 +81,7 @@ void PlayerLayer::observeValueForKeyPath_ofObject_change_context(std::string_vie
 
 std::string PlayerLayer::failureText() const
 {
+    assertHere();
     if (!m_item || m_item->status() != PlayerItem::Status::Failed)
         return {};
     return m_item->error() ? m_item->error()->description() : "This movie cannot be played.";
@@ -86,6 +89,7 @@ std::string PlayerLayer::failureText() const
 
 std::string PlayerLayer::noticeText() const
 {
+    assertHere();
     if (!m_item || m_item->status() != PlayerItem::Status::ReadyToPlay || !m_item->asset())
         return {};
     const bool isAtStart = !m_player->isPlaying() && m_player->currentTime().seconds() == 0;
@@ -94,6 +98,7 @@ std::string PlayerLayer::noticeText() const
 
 base::Rect PlayerLayer::videoRect(base::Rect bounds) const
 {
+    assertHere();
     const VideoFrameRef frame = currentFrame();
     if (!frame || bounds.isEmpty())
         return {};

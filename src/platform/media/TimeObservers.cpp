@@ -15,6 +15,7 @@ TimeObservers::~TimeObservers()
 
 TimeObservers::Token TimeObservers::addPeriodic(MediaTime interval, std::function<void(MediaTime)> callback)
 {
+    m_affinity.assertHere();
     const auto entry = std::make_shared<Entry>();
     entry->interval = interval;
     entry->periodic = std::move(callback);
@@ -24,6 +25,7 @@ TimeObservers::Token TimeObservers::addPeriodic(MediaTime interval, std::functio
 
 TimeObservers::Token TimeObservers::addBoundary(std::vector<MediaTime> times, std::function<void()> callback)
 {
+    m_affinity.assertHere();
     const auto entry = std::make_shared<Entry>();
     entry->times = std::move(times);
     entry->boundary = std::move(callback);
@@ -33,6 +35,7 @@ TimeObservers::Token TimeObservers::addBoundary(std::vector<MediaTime> times, st
 
 void TimeObservers::remove(const Token& token)
 {
+    m_affinity.assertHere();
     const auto found =
         std::find_if(m_entries.begin(), m_entries.end(), [&](const auto& each) { return each == token; });
     if (found == m_entries.end())
@@ -62,6 +65,7 @@ std::optional<MediaTime> TimeObservers::Entry::nextAfter(MediaTime time) const
 
 std::optional<MediaTime> TimeObservers::nextAfter(MediaTime time) const
 {
+    m_affinity.assertHere();
     std::optional<MediaTime> next;
     for (const auto& entry : m_entries) {
         const auto own = entry->nextAfter(time);
@@ -73,6 +77,7 @@ std::optional<MediaTime> TimeObservers::nextAfter(MediaTime time) const
 
 void TimeObservers::played(MediaTime from, MediaTime to)
 {
+    m_affinity.assertHere();
     const auto entries = m_entries; // callbacks add, remove, and may destroy this
     for (const auto& entry : entries) {
         if (!entry->active)
@@ -89,6 +94,7 @@ void TimeObservers::played(MediaTime from, MediaTime to)
 
 void TimeObservers::jumped(MediaTime to)
 {
+    m_affinity.assertHere();
     const auto entries = m_entries;
     for (const auto& entry : entries)
         if (entry->active && entry->periodic)

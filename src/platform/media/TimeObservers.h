@@ -4,6 +4,7 @@
 /// destroy the player, while they are called; none is called after it was removed or this is gone.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/MediaTime.h"
 #include "platform/media/Player.h"
 
@@ -49,6 +50,7 @@ private:
     };
 
     std::vector<std::shared_ptr<Entry>> m_entries;
+    base::Affinity m_affinity;
 };
 
 } // namespace platform

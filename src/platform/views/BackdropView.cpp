@@ -20,6 +20,7 @@ const runtime::Class& BackdropView::isa() const
 
 void BackdropView::updateMaskViewsFor(const std::shared_ptr<View>& view)
 {
+    assertHere();
     if (!view)
         return;
     const auto isGone = [](const std::weak_ptr<View>& each) { return each.expired(); };
@@ -36,6 +37,7 @@ void BackdropView::updateMaskViewsFor(const std::shared_ptr<View>& view)
 
 std::vector<std::shared_ptr<View>> BackdropView::maskViews() const
 {
+    assertHere();
     std::vector<std::shared_ptr<View>> views;
     for (const auto& each : m_maskViews)
         if (auto view = each.lock())

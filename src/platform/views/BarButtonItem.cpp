@@ -88,6 +88,7 @@ std::shared_ptr<BarButtonItem> BarButtonItem::withCustomView(std::shared_ptr<Vie
 
 void BarButtonItem::setWidth(double width)
 {
+    assertHere();
     if (m_width == width)
         return;
     m_width = width;
@@ -97,6 +98,7 @@ void BarButtonItem::setWidth(double width)
 
 void BarButtonItem::setImageInsets(base::EdgeInsets insets)
 {
+    assertHere();
     m_imageInsets = insets;
     if (const auto itsButton = button())
         itsButton->setImageInsets(insets);
@@ -104,6 +106,7 @@ void BarButtonItem::setImageInsets(base::EdgeInsets insets)
 
 std::shared_ptr<View> BarButtonItem::view()
 {
+    assertHere();
     if (m_view || isSpace() || m_kind == Kind::Custom)
         return m_view;
     const Looks looks = looksOf(m_kind);
@@ -125,12 +128,14 @@ std::shared_ptr<View> BarButtonItem::view()
 
 void BarButtonItem::validate()
 {
+    assertHere();
     if (const auto itsButton = button())
         itsButton->setEnabled(m_targetAction.isAnswered());
 }
 
 void BarButtonItem::trigger()
 {
+    assertHere();
     m_targetAction.send(self<runtime::Object>());
 }
 

@@ -34,6 +34,7 @@ const runtime::Class& Button::isa() const
 
 void Button::setImage(ImageRef image, State state)
 {
+    assertHere();
     ImageRef& place = state == State::Normal ? m_normalImage : m_highlightedImage;
     if (place == image)
         return;
@@ -43,16 +44,19 @@ void Button::setImage(ImageRef image, State state)
 
 ImageRef Button::image(State state) const
 {
+    assertHere();
     return state == State::Normal ? m_normalImage : m_highlightedImage;
 }
 
 ImageRef Button::currentImage() const
 {
+    assertHere();
     return isHighlighted() && m_highlightedImage ? m_highlightedImage : m_normalImage;
 }
 
 void Button::setGlyph(std::string name)
 {
+    assertHere();
     if (m_glyph == name)
         return;
     m_glyph = std::move(name);
@@ -61,6 +65,7 @@ void Button::setGlyph(std::string name)
 
 void Button::setImageInsets(base::EdgeInsets insets)
 {
+    assertHere();
     if (m_imageInsets == insets)
         return;
     m_imageInsets = insets;
@@ -69,6 +74,7 @@ void Button::setImageInsets(base::EdgeInsets insets)
 
 void Button::setTitle(std::string title)
 {
+    assertHere();
     if (m_title == title)
         return;
     m_title = std::move(title);
@@ -77,6 +83,7 @@ void Button::setTitle(std::string title)
 
 void Button::setEmphasized(bool emphasized)
 {
+    assertHere();
     if (m_emphasized == emphasized)
         return;
     m_emphasized = emphasized;
@@ -85,6 +92,7 @@ void Button::setEmphasized(bool emphasized)
 
 base::Size Button::sizeThatFits() const
 {
+    assertHere();
     if (m_normalImage)
         return m_normalImage->size();
     if (!m_glyph.empty())
@@ -97,6 +105,7 @@ base::Size Button::sizeThatFits() const
 
 bool Button::activate()
 {
+    assertHere();
     if (!isEnabled())
         return false;
     const auto keepAlive = shared_from_this();
@@ -107,6 +116,7 @@ bool Button::activate()
 
 Accessibility Button::accessibility() const
 {
+    assertHere();
     Accessibility description = View::accessibility();
     description.role = AccessibilityRole::Button;
     if (description.name.empty())

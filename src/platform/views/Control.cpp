@@ -15,11 +15,13 @@ const runtime::Class& Control::isa() const
 
 void Control::addTarget(const std::weak_ptr<runtime::Object>& target, const runtime::Selector& action, unsigned events)
 {
+    assertHere();
     m_registrations.push_back({runtime::TargetAction(target, action), events});
 }
 
 void Control::sendActionsFor(unsigned events)
 {
+    assertHere();
     // A target may take this control away, or add targets to it, while it is told.
     const auto keepAlive = shared_from_this();
     const auto registrations = m_registrations;
@@ -30,6 +32,7 @@ void Control::sendActionsFor(unsigned events)
 
 void Control::setEnabled(bool enabled)
 {
+    assertHere();
     if (m_enabled == enabled)
         return;
     m_enabled = enabled;
@@ -40,6 +43,7 @@ void Control::setEnabled(bool enabled)
 
 void Control::setHighlighted(bool highlighted)
 {
+    assertHere();
     if (m_highlighted == highlighted)
         return;
     m_highlighted = highlighted;
@@ -48,12 +52,14 @@ void Control::setHighlighted(bool highlighted)
 
 std::shared_ptr<View> Control::hitTest(base::Point point)
 {
+    assertHere();
     // A control is one thing to a finger, whatever it is made of.
     return View::hitTest(point) ? self<View>() : nullptr;
 }
 
 void Control::touchBegan(const Touch& touch)
 {
+    assertHere();
     if (!m_enabled || m_trackedTouch)
         return;
     m_trackedTouch = touch.id;
@@ -63,6 +69,7 @@ void Control::touchBegan(const Touch& touch)
 
 void Control::touchMoved(const Touch& touch)
 {
+    assertHere();
     if (m_trackedTouch != touch.id)
         return;
     const bool inside = isInside(touch);
@@ -72,6 +79,7 @@ void Control::touchMoved(const Touch& touch)
 
 void Control::touchEnded(const Touch& touch)
 {
+    assertHere();
     if (m_trackedTouch != touch.id)
         return;
     m_trackedTouch.reset();
@@ -81,6 +89,7 @@ void Control::touchEnded(const Touch& touch)
 
 void Control::touchCancelled(const Touch& touch)
 {
+    assertHere();
     if (m_trackedTouch != touch.id)
         return;
     m_trackedTouch.reset();

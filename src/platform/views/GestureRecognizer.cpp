@@ -34,6 +34,7 @@ const runtime::Class& TapGestureRecognizer::isa() const
 
 void TapGestureRecognizer::touchBegan(const Touch& touch)
 {
+    assertHere();
     ++m_fingers;
     if (m_fingers == 1)
         m_start = touch;
@@ -43,12 +44,14 @@ void TapGestureRecognizer::touchBegan(const Touch& touch)
 
 void TapGestureRecognizer::touchMoved(const Touch& touch)
 {
+    assertHere();
     if (m_start && m_start->id == touch.id && distance(m_start->position, touch.position) > kSlop)
         m_start.reset();
 }
 
 void TapGestureRecognizer::touchEnded(const Touch& touch)
 {
+    assertHere();
     m_fingers = std::max(0, m_fingers - 1);
     touchMoved(touch);
     const bool tapped = m_start && m_start->id == touch.id;
@@ -59,6 +62,7 @@ void TapGestureRecognizer::touchEnded(const Touch& touch)
 
 void TapGestureRecognizer::touchCancelled(const Touch&)
 {
+    assertHere();
     m_fingers = std::max(0, m_fingers - 1);
     m_start.reset();
 }

@@ -17,6 +17,7 @@ const runtime::Class& Label::isa() const
 
 void Label::setText(std::string text)
 {
+    assertHere();
     if (m_text == text)
         return;
     m_text = std::move(text);
@@ -25,6 +26,7 @@ void Label::setText(std::string text)
 
 void Label::setFontSize(double points)
 {
+    assertHere();
     if (m_fontSize == points)
         return;
     m_fontSize = points;
@@ -33,6 +35,7 @@ void Label::setFontSize(double points)
 
 void Label::setTextColor(Color color)
 {
+    assertHere();
     if (m_textColor == color)
         return;
     m_textColor = color;
@@ -41,6 +44,7 @@ void Label::setTextColor(Color color)
 
 void Label::setTextAlignment(TextAlignment alignment)
 {
+    assertHere();
     if (m_alignment == alignment)
         return;
     m_alignment = alignment;
@@ -49,6 +53,7 @@ void Label::setTextAlignment(TextAlignment alignment)
 
 Accessibility Label::accessibility() const
 {
+    assertHere();
     Accessibility description = View::accessibility();
     description.role = AccessibilityRole::Label;
     if (description.name.empty())

@@ -49,6 +49,7 @@ const runtime::Class& MovieScrubber::isa() const
 
 void MovieScrubber::setEdgeInset(double points)
 {
+    assertHere();
     if (m_edgeInset == points)
         return;
     m_edgeInset = points;
@@ -58,6 +59,7 @@ void MovieScrubber::setEdgeInset(double points)
 
 void MovieScrubber::setEditable(bool editable)
 {
+    assertHere();
     if (m_editable == editable)
         return;
     m_editable = editable;
@@ -67,6 +69,7 @@ void MovieScrubber::setEditable(bool editable)
 
 void MovieScrubber::setValue(double seconds)
 {
+    assertHere();
     double value = std::isfinite(seconds) ? std::max(0.0, seconds) : 0;
     if (m_duration > 0)
         value = std::min(value, m_duration);
@@ -78,6 +81,7 @@ void MovieScrubber::setValue(double seconds)
 
 void MovieScrubber::setEditing_animated(bool editing, bool animated)
 {
+    assertHere();
     if (m_editing == editing)
         return;
     m_editing = editing;
@@ -93,6 +97,7 @@ void MovieScrubber::setEditing_animated(bool editing, bool animated)
 
 void MovieScrubber::reloadData()
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     // What is under the finger may be elsewhere afterwards.
     letGo();
@@ -153,6 +158,7 @@ void MovieScrubber::requestThumbnails(bool all)
 
 void MovieScrubber::setThumbnailImage_forTimestamp(ImageRef image, double timestamp)
 {
+    assertHere();
     const auto isOn = [timestamp](const std::vector<double>& timestamps) {
         return std::find(timestamps.begin(), timestamps.end(), timestamp) != timestamps.end();
     };
@@ -166,12 +172,14 @@ void MovieScrubber::setThumbnailImage_forTimestamp(ImageRef image, double timest
 
 base::Rect MovieScrubber::stripRect() const
 {
+    assertHere();
     const double width = std::max(0.0, bounds().width() - 2 * m_edgeInset);
     return base::Rect::make(m_edgeInset, 0, width, bounds().height());
 }
 
 base::Rect MovieScrubber::trackRect() const
 {
+    assertHere();
     const base::Rect strip = stripRect();
     const double grip = m_editable ? std::min(TrimFrameView::kGripWidth, strip.width() / 2) : 0;
     return base::Rect::make(strip.minX() + grip, 0, strip.width() - 2 * grip, strip.height());
@@ -186,6 +194,7 @@ double MovieScrubber::xOf(double seconds) const
 
 double MovieScrubber::playHeadX() const
 {
+    assertHere();
     return xOf(std::min(m_value, m_duration));
 }
 
@@ -201,6 +210,7 @@ double MovieScrubber::secondsAt(double x) const
 
 void MovieScrubber::layoutSubviews()
 {
+    assertHere();
     Control::layoutSubviews();
     makeParts();
     placeParts();
@@ -277,6 +287,7 @@ void MovieScrubber::placePartsAnimated()
 
 Accessibility MovieScrubber::accessibility() const
 {
+    assertHere();
     Accessibility description = Control::accessibility();
     description.role = AccessibilityRole::Slider;
     if (description.name.empty())

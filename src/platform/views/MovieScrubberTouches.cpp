@@ -29,6 +29,7 @@ double distance(double x, double from, double to)
 
 void MovieScrubber::touchBegan(const Touch& touch)
 {
+    assertHere();
     if (!isEnabled() || m_duration <= 0 || m_held != ScrubberHandle::None)
         return;
     const auto keepAlive = shared_from_this();
@@ -67,6 +68,7 @@ ScrubberHandle MovieScrubber::handleAt(double x) const
 
 void MovieScrubber::touchMoved(const Touch& touch)
 {
+    assertHere();
     if (m_draggingTouch != touch.id)
         return;
     const double x = convertFromRoot(touch.position).x;
@@ -82,6 +84,7 @@ void MovieScrubber::touchMoved(const Touch& touch)
 
 void MovieScrubber::touchEnded(const Touch& touch)
 {
+    assertHere();
     if (m_draggingTouch != touch.id)
         return;
     const auto keepAlive = shared_from_this();
@@ -98,6 +101,7 @@ void MovieScrubber::touchEnded(const Touch& touch)
 
 void MovieScrubber::touchCancelled(const Touch& touch)
 {
+    assertHere();
     if (m_draggingTouch != touch.id)
         return;
     if (isTrimHandle(m_held))
@@ -110,6 +114,7 @@ void MovieScrubber::touchCancelled(const Touch& touch)
 
 void MovieScrubber::scrubTo(double seconds)
 {
+    assertHere();
     if (!isEnabled() || m_duration <= 0 || !std::isfinite(seconds) || isTrimHandle(m_held))
         return;
     const auto keepAlive = shared_from_this();
@@ -197,6 +202,7 @@ bool MovieScrubber::beginEditingWith(ScrubberHandle handle)
 
 void MovieScrubber::moveHandle(ScrubberHandle handle, double seconds)
 {
+    assertHere();
     const bool isOtherHeld = m_held != ScrubberHandle::None && m_held != handle;
     if (!isEnabled() || !m_editable || m_duration <= 0 || !std::isfinite(seconds) || isOtherHeld)
         return;

@@ -18,6 +18,7 @@ const runtime::Class& Responder::isa() const
 
 bool Responder::becomeFirstResponder()
 {
+    assertHere();
     const auto itsWindow = window();
     if (!itsWindow || !canBecomeFirstResponder())
         return false;
@@ -27,18 +28,21 @@ bool Responder::becomeFirstResponder()
 
 void Responder::resignFirstResponder()
 {
+    assertHere();
     if (isFirstResponder())
         window()->setFirstResponder(nullptr);
 }
 
 bool Responder::isFirstResponder() const
 {
+    assertHere();
     const auto itsWindow = window();
     return itsWindow && itsWindow->firstResponder().get() == this;
 }
 
 void Responder::motionEnded_withEvent(MotionSubtype motion, const MotionEvent& event)
 {
+    assertHere();
     if (const auto next = nextResponder())
         next->motionEnded_withEvent(motion, event);
 }

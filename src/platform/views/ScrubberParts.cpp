@@ -44,6 +44,7 @@ const runtime::Class& PlayHeadView::isa() const
 
 void PlayHeadView::setHeld(bool held)
 {
+    assertHere();
     if (m_held == held)
         return;
     m_held = held;
@@ -64,6 +65,7 @@ const runtime::Class& TrimFrameView::isa() const
 
 void TrimFrameView::setEditing(bool editing)
 {
+    assertHere();
     if (m_editing == editing)
         return;
     m_editing = editing;
@@ -72,6 +74,7 @@ void TrimFrameView::setEditing(bool editing)
 
 void TrimFrameView::setHeld(ScrubberHandle held)
 {
+    assertHere();
     if (m_held == held)
         return;
     m_held = held;
@@ -97,12 +100,14 @@ std::shared_ptr<MovieScrubber> TrimHandleView::scrubber() const
 
 bool TrimHandleView::canBecomeFocused() const
 {
+    assertHere();
     const auto whole = scrubber();
     return whole && whole->isEnabled();
 }
 
 Accessibility TrimHandleView::accessibility() const
 {
+    assertHere();
     Accessibility description = View::accessibility();
     const auto whole = scrubber();
     if (!whole)
@@ -122,6 +127,7 @@ Accessibility TrimHandleView::accessibility() const
 
 bool TrimHandleView::adjust(int steps)
 {
+    assertHere();
     const Accessibility now = accessibility();
     setNumber(now.number + steps * now.step);
     return true;
@@ -129,6 +135,7 @@ bool TrimHandleView::adjust(int steps)
 
 void TrimHandleView::setNumber(double seconds)
 {
+    assertHere();
     if (const auto whole = scrubber())
         whole->moveHandle(m_handle, seconds);
 }

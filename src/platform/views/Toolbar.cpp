@@ -80,6 +80,7 @@ const runtime::Class& Toolbar::isa() const
 
 void Toolbar::setItems(Items items, bool /*animated*/)
 {
+    assertHere();
     const auto isHere = [this](const std::shared_ptr<BarButtonItem>& item) {
         const auto view = item->view();
         return !view || view->superview().get() == this;
@@ -116,6 +117,7 @@ double Toolbar::wantedWidth(BarButtonItem& item) const
 
 void Toolbar::layoutSubviews()
 {
+    assertHere();
     View::layoutSubviews();
     const double barWidth = bounds().width();
     const double room = barWidth - 2 * kEndMargin;
@@ -176,6 +178,7 @@ void Toolbar::place(const std::shared_ptr<View>& view, double x, double width)
 
 Accessibility Toolbar::accessibility() const
 {
+    assertHere();
     Accessibility description = View::accessibility();
     description.role = AccessibilityRole::Toolbar;
     return description;

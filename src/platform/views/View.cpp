@@ -33,16 +33,19 @@ const runtime::Class& View::isa() const
 
 void View::setCenter(base::Point center)
 {
+    assertHere();
     setFrame({{center.x - m_frame.width() / 2, center.y - m_frame.height() / 2}, m_frame.size});
 }
 
 void View::sizeToFit()
 {
+    assertHere();
     setFrame({m_frame.origin, sizeThatFits()});
 }
 
 base::Point View::convertToRoot(base::Point point) const
 {
+    assertHere();
     const View* view = this;
     for (auto above = superview(); above; above = above->superview()) {
         point.x += view->m_frame.minX();
@@ -54,12 +57,14 @@ base::Point View::convertToRoot(base::Point point) const
 
 base::Point View::convertFromRoot(base::Point point) const
 {
+    assertHere();
     const base::Point origin = convertToRoot({});
     return {point.x - origin.x, point.y - origin.y};
 }
 
 void View::setAlpha(double alpha)
 {
+    assertHere();
     const double clamped = std::clamp(alpha, 0.0, 1.0);
     if (clamped == m_alpha)
         return;
@@ -70,6 +75,7 @@ void View::setAlpha(double alpha)
 
 void View::setHidden(bool hidden)
 {
+    assertHere();
     if (m_hidden == hidden)
         return;
     m_hidden = hidden;
@@ -80,6 +86,7 @@ void View::setHidden(bool hidden)
 
 void View::setBackgroundColor(Color color)
 {
+    assertHere();
     if (m_backgroundColor == color)
         return;
     m_backgroundColor = color;
@@ -88,6 +95,7 @@ void View::setBackgroundColor(Color color)
 
 void View::setClipsToBounds(bool clips)
 {
+    assertHere();
     if (m_clipsToBounds == clips)
         return;
     m_clipsToBounds = clips;
@@ -96,6 +104,7 @@ void View::setClipsToBounds(bool clips)
 
 void View::setTintColor(std::optional<Color> color)
 {
+    assertHere();
     if (m_tintColor == color)
         return;
     m_tintColor = color;
@@ -112,6 +121,7 @@ void View::markTintChanged()
 
 std::optional<Color> View::effectiveTintColor() const
 {
+    assertHere();
     if (m_tintColor)
         return m_tintColor;
     const auto above = superview();
@@ -120,6 +130,7 @@ std::optional<Color> View::effectiveTintColor() const
 
 void View::setBackdropMaskFlags(unsigned flags)
 {
+    assertHere();
     if (m_backdropMaskFlags == flags)
         return;
     m_backdropMaskFlags = flags;
@@ -128,6 +139,7 @@ void View::setBackdropMaskFlags(unsigned flags)
 
 void View::setAccessibilityLabel(std::string label)
 {
+    assertHere();
     if (m_accessibilityLabel == label)
         return;
     m_accessibilityLabel = std::move(label);
@@ -136,6 +148,7 @@ void View::setAccessibilityLabel(std::string label)
 
 Accessibility View::accessibility() const
 {
+    assertHere();
     Accessibility description;
     description.name = m_accessibilityLabel;
     return description;
@@ -143,6 +156,7 @@ Accessibility View::accessibility() const
 
 std::shared_ptr<View> View::hitTest(base::Point point)
 {
+    assertHere();
     if (m_hidden || m_alpha < kLeastAlphaForTouches || !m_userInteractionEnabled || !pointInside(point))
         return nullptr;
     const auto below = subviews();
@@ -156,12 +170,14 @@ std::shared_ptr<View> View::hitTest(base::Point point)
 
 void View::addGestureRecognizer(const std::shared_ptr<GestureRecognizer>& recognizer)
 {
+    assertHere();
     if (std::find(m_recognizers.begin(), m_recognizers.end(), recognizer) == m_recognizers.end())
         m_recognizers.push_back(recognizer);
 }
 
 std::vector<PropertyAnimation> View::takeAnimations()
 {
+    assertHere();
     return std::exchange(m_animations, {});
 }
 

@@ -45,6 +45,7 @@ const runtime::Class& ViewController::isa() const
 
 std::shared_ptr<View> ViewController::view()
 {
+    assertHere();
     if (!m_view) {
         loadView();
         assert(m_view);
@@ -55,6 +56,7 @@ std::shared_ptr<View> ViewController::view()
 
 void ViewController::setView(std::shared_ptr<View> view)
 {
+    assertHere();
     if (m_view)
         m_view->setViewController({});
     m_view = std::move(view);
@@ -64,6 +66,7 @@ void ViewController::setView(std::shared_ptr<View> view)
 
 void ViewController::loadView()
 {
+    assertHere();
     auto view = std::make_shared<View>();
     view->setAutoresizingMask(kFlexibleWidth | kFlexibleHeight);
     setView(std::move(view));
@@ -71,6 +74,7 @@ void ViewController::loadView()
 
 void ViewController::addChildViewController(const std::shared_ptr<ViewController>& child)
 {
+    assertHere();
     assert(child && child.get() != this);
     const auto previous = child->parent();
     if (previous.get() == this)
@@ -84,6 +88,7 @@ void ViewController::addChildViewController(const std::shared_ptr<ViewController
 
 void ViewController::removeFromParentViewController()
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     if (const auto former = parent()) {
         std::erase_if(former->m_children,
@@ -96,6 +101,7 @@ void ViewController::removeFromParentViewController()
 void ViewController::viewWillTransitionToSize_withTransitionCoordinator(base::Size size,
                                                                         TransitionCoordinator& coordinator)
 {
+    assertHere();
     const auto children = m_children;
     for (const auto& child : children)
         child->viewWillTransitionToSize_withTransitionCoordinator(size, coordinator);
@@ -103,6 +109,7 @@ void ViewController::viewWillTransitionToSize_withTransitionCoordinator(base::Si
 
 std::shared_ptr<Responder> ViewController::nextResponder() const
 {
+    assertHere();
     if (m_view)
         if (auto above = m_view->superview())
             return above;
@@ -111,11 +118,13 @@ std::shared_ptr<Responder> ViewController::nextResponder() const
 
 std::shared_ptr<Window> ViewController::window() const
 {
+    assertHere();
     return m_view ? m_view->window() : nullptr;
 }
 
 void ViewController::setAppeared(bool appeared)
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     if (!appeared) {
         std::vector<std::shared_ptr<ViewController>> leaving;
@@ -138,6 +147,7 @@ void ViewController::setAppeared(bool appeared)
 
 void ViewController::beginDisappearing(std::vector<std::shared_ptr<ViewController>>& leaving)
 {
+    assertHere();
     if (!m_appeared)
         return;
     m_appeared = false;

@@ -40,6 +40,7 @@ Span resized(Span span, double oldTotal, double newTotal, bool flexibleBefore, b
 
 void View::setFrame(base::Rect frame)
 {
+    assertHere();
     if (frame == m_frame)
         return;
     const base::Rect old = m_frame;
@@ -77,6 +78,7 @@ base::Rect View::autoresizedFrame(base::Size oldParent, base::Size newParent) co
 
 void View::setTranslatesAutoresizingMaskIntoConstraints(bool translates)
 {
+    assertHere();
     if (m_translatesAutoresizing == translates)
         return;
     m_translatesAutoresizing = translates;
@@ -86,6 +88,7 @@ void View::setTranslatesAutoresizingMaskIntoConstraints(bool translates)
 
 void View::addConstraint(const LayoutConstraint& constraint)
 {
+    assertHere();
     std::erase_if(m_constraints, [&](const LayoutConstraint& kept) { return kept.isDead() || kept == constraint; });
     m_constraints.push_back(constraint);
     setNeedsLayout();
@@ -114,12 +117,14 @@ void View::markConstraintsReferringTo(const View& view)
 
 void View::setNeedsLayout()
 {
+    assertHere();
     m_needsLayout = true;
     noteChange();
 }
 
 void View::layoutIfNeeded()
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     for (int pass = 0; pass < kMaxPasses; ++pass) {
         if (m_needsLayout) {
@@ -139,6 +144,7 @@ void View::layoutIfNeeded()
 
 void View::layoutSubviews()
 {
+    assertHere();
     std::erase_if(m_constraints, [](const LayoutConstraint& constraint) { return constraint.isDead(); });
     if (!m_constraints.empty())
         solveConstraints(*this, m_constraints);

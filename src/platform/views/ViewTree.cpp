@@ -22,6 +22,7 @@ const View* viewOf(const View::Child& child)
 
 std::vector<std::shared_ptr<View>> View::subviews() const
 {
+    assertHere();
     std::vector<std::shared_ptr<View>> views;
     for (const Child& child : m_children)
         if (const auto* view = std::get_if<std::shared_ptr<View>>(&child))
@@ -31,11 +32,13 @@ std::vector<std::shared_ptr<View>> View::subviews() const
 
 void View::addSubview(const std::shared_ptr<View>& view)
 {
+    assertHere();
     placeSubview(view, nullptr);
 }
 
 void View::insertSubview_belowSubview(const std::shared_ptr<View>& view, const std::shared_ptr<View>& sibling)
 {
+    assertHere();
     placeSubview(view, sibling.get());
 }
 
@@ -89,6 +92,7 @@ bool View::reorderSubview(const View& view, const View* below)
 
 void View::addSublayer(const std::shared_ptr<Layer>& layer)
 {
+    assertHere();
     std::erase_if(m_children, [&](const Child& child) {
         const auto* each = std::get_if<std::shared_ptr<Layer>>(&child);
         return each && *each == layer;
@@ -103,6 +107,7 @@ void View::addSublayer(const std::shared_ptr<Layer>& layer)
 
 void View::removeFromSuperview()
 {
+    assertHere();
     const auto above = superview();
     if (!above)
         return;
@@ -134,6 +139,7 @@ void View::detachSubview(View& view)
 
 bool View::isDescendantOf(const View& ancestor) const
 {
+    assertHere();
     if (this == &ancestor)
         return true;
     const auto above = superview();
@@ -142,12 +148,14 @@ bool View::isDescendantOf(const View& ancestor) const
 
 std::shared_ptr<Window> View::window() const
 {
+    assertHere();
     const auto above = superview();
     return above ? above->window() : nullptr;
 }
 
 std::shared_ptr<Responder> View::nextResponder() const
 {
+    assertHere();
     if (auto controller = viewController())
         return controller;
     return superview();
@@ -155,6 +163,7 @@ std::shared_ptr<Responder> View::nextResponder() const
 
 std::shared_ptr<ViewController> View::viewController() const
 {
+    assertHere();
     return m_viewController.lock();
 }
 

@@ -35,6 +35,7 @@ const runtime::Class& Window::isa() const
 
 void Window::setScale(double scale)
 {
+    assertHere();
     if (m_scale == scale)
         return;
     m_scale = scale;
@@ -44,12 +45,14 @@ void Window::setScale(double scale)
 
 std::shared_ptr<Window> Window::window() const
 {
+    assertHere();
     // Empty during construction and destruction.
     return std::static_pointer_cast<Window>(std::const_pointer_cast<runtime::Object>(weak_from_this().lock()));
 }
 
 void Window::setRootViewController(const std::shared_ptr<ViewController>& controller)
 {
+    assertHere();
     if (m_root == controller)
         return;
     const auto keepAlive = shared_from_this();
@@ -63,6 +66,7 @@ void Window::setRootViewController(const std::shared_ptr<ViewController>& contro
 
 void Window::setVisible(bool visible)
 {
+    assertHere();
     if (m_visible == visible)
         return;
     const auto keepAlive = shared_from_this();
@@ -73,6 +77,7 @@ void Window::setVisible(bool visible)
 
 void Window::layoutSubviews()
 {
+    assertHere();
     View::layoutSubviews();
     if (m_root && m_root->isViewLoaded() && m_root->view()->superview().get() == this)
         m_root->view()->setFrame(bounds());
@@ -80,6 +85,7 @@ void Window::layoutSubviews()
 
 void Window::requestSize(base::Size size)
 {
+    assertHere();
     const bool isWaiting = m_requestedSize.has_value();
     m_requestedSize = size;
     if (isWaiting)
@@ -92,6 +98,7 @@ void Window::requestSize(base::Size size)
 
 void Window::transitionToSize(base::Size size)
 {
+    assertHere();
     if (size == bounds().size)
         return;
     const auto keepAlive = shared_from_this();
@@ -112,6 +119,7 @@ void Window::transitionToSize(base::Size size)
 
 void Window::setFirstResponder(const std::shared_ptr<Responder>& responder)
 {
+    assertHere();
     m_firstResponder = responder;
 }
 
@@ -126,6 +134,7 @@ void Window::forgetStrays()
 
 void Window::commit()
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     m_needsCommit = true; // what the layout changes is part of this picture
     layoutIfNeeded();
@@ -134,6 +143,7 @@ void Window::commit()
 
 void Window::noteChange()
 {
+    assertHere();
     if (std::exchange(m_needsCommit, true) || !m_needsCommitHandler)
         return;
     const auto handler = m_needsCommitHandler; // may replace itself

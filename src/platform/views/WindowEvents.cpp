@@ -56,6 +56,7 @@ bool matches(const KeyCommand& command, Key key, char character, bool control)
 
 void Window::touchDown(const Touch& touch)
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     cancelTouch(touch.id);
     const auto hit = hitTest(touch.position);
@@ -75,6 +76,7 @@ void Window::touchDown(const Touch& touch)
 
 void Window::touchMove(const Touch& touch)
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     const auto found = m_touches.find(touch.id);
     if (found == m_touches.end())
@@ -93,6 +95,7 @@ void Window::touchMove(const Touch& touch)
 
 void Window::touchUp(const Touch& touch)
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     const auto found = m_touches.find(touch.id);
     if (found == m_touches.end())
@@ -111,6 +114,7 @@ void Window::touchUp(const Touch& touch)
 
 void Window::touchCancel(const Touch& touch)
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     cancelTouch(touch.id);
 }
@@ -132,6 +136,7 @@ void Window::cancelTouch(int id)
 
 void Window::motion(MotionSubtype subtype)
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     if (const auto responder = firstResponder())
         responder->motionEnded_withEvent(subtype, {subtype});
@@ -139,6 +144,7 @@ void Window::motion(MotionSubtype subtype)
 
 bool Window::keyDown(Key key, char character, bool control)
 {
+    assertHere();
     const auto keepAlive = shared_from_this();
     if (const auto view = focusedView(); view && !control && concernsFocus(key)) {
         const auto reachable = focusableViews();
@@ -157,6 +163,7 @@ bool Window::keyDown(Key key, char character, bool control)
 
 std::shared_ptr<View> Window::focusedView() const
 {
+    assertHere();
     return m_focusedView.lock();
 }
 
@@ -180,6 +187,7 @@ std::vector<std::shared_ptr<View>> Window::focusableViews() const
 
 void Window::moveFocus(bool forward)
 {
+    assertHere();
     const auto views = focusableViews();
     if (views.empty()) {
         clearFocus();
@@ -196,6 +204,7 @@ void Window::moveFocus(bool forward)
 
 void Window::clearFocus()
 {
+    assertHere();
     focus(nullptr);
 }
 

@@ -9,14 +9,32 @@
 #include "support/RefusedSystemCalls.h"
 
 #include <QImage>
+#include <QRect>
 
 #include <gmock/gmock.h>
+
+#include <string>
 
 using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::Optional;
 
 namespace {
+
+/// Of all pixels that differ, in words; empty when none does.
+std::string placeOfDifference(const QImage& one, const QImage& other)
+{
+    if (one.size() != other.size())
+        return "they differ in size";
+    QRect place;
+    for (int y = 0; y < one.height(); ++y)
+        for (int x = 0; x < one.width(); ++x)
+            if (one.pixel(x, y) != other.pixel(x, y))
+                place |= QRect(x, y, 1, 1);
+    return place.isEmpty() ? ""
+                           : std::to_string(place.width()) + " x " + std::to_string(place.height()) + " at "
+                                 + std::to_string(place.x()) + ", " + std::to_string(place.y());
+}
 
 class ASlowHandOver : public ::testing::Test {
 protected:
@@ -143,7 +161,7 @@ TEST_F(ASlowHandOver, ShowsInTheEndWhatAQuickOneShows)
         moving += waiting.pixel(x, 0) != waiting.pixel(x, 20) ? 1 : 0;
     EXPECT_GT(moving, 0) << "the line of what is under way, at the edge of the bar";
     EXPECT_FALSE(picture("quick.png").isNull());
-    EXPECT_TRUE(picture("slow.png") == picture("quick.png"));
+    EXPECT_EQ(placeOfDifference(picture("slow.png"), picture("quick.png")), "");
 }
 
 TEST_F(ASlowHandOver, FillsAWindowThatWasTurnedMeanwhile)

@@ -1,9 +1,9 @@
 // What a few bytes of a file say of how long it was, where the file itself may lack the rest.
 #include "linux/ffmpeg/FileMarks.h"
+#include "support/PrivateDirectory.h"
 
 #include <gtest/gtest.h>
 
-#include <filesystem>
 #include <fstream>
 #include <string>
 
@@ -22,7 +22,6 @@ protected:
     {
         return ffmpeg::announcedSize(*fileOf(bytes));
     }
-    void TearDown() override { std::filesystem::remove(path); }
 
     static std::string box(const std::string& name, std::uint32_t size)
     {
@@ -44,7 +43,8 @@ protected:
     }
     static std::string filledPart(std::uint32_t size) { return part(size) + std::string((size + 1) / 2 * 2, 'x'); }
 
-    std::string path = testing::TempDir() + "marks";
+    tests::PrivateDirectory directory;
+    std::string path = directory.path() / "marks";
 };
 
 TEST_F(FileMarks, OfMp4AreItsBoxes)

@@ -1,4 +1,5 @@
 #include "support/EngineTest.h"
+#include "support/PrivateDirectory.h"
 
 #include <cstdio>
 #include <filesystem>
@@ -157,8 +158,8 @@ TEST_F(Opening, WhatIsNoMovieFailsInPlainWords)
 
 TEST_F(Opening, APipeDoesNotHoldAnybodyUp)
 {
-    const std::string path = testing::TempDir() + "a-pipe.mp4";
-    std::filesystem::remove(path);
+    const tests::PrivateDirectory directory;
+    const std::string path = directory.path() / "a-pipe.mp4";
     ASSERT_EQ(std::system(("mkfifo " + path).c_str()), 0);
     expectFailure(path);
     std::filesystem::remove(path);
@@ -166,7 +167,8 @@ TEST_F(Opening, APipeDoesNotHoldAnybodyUp)
 
 TEST_F(Opening, APlaylistDoesNotReachOtherFiles)
 {
-    const std::string path = testing::TempDir() + "list.mp4";
+    const tests::PrivateDirectory directory;
+    const std::string path = directory.path() / "list.mp4";
     std::ofstream(path) << "#EXTM3U\n#EXT-X-TARGETDURATION:4\n#EXTINF:4,\n"
                         << movie("clock.mp4") << "\n#EXT-X-ENDLIST\n";
     expectFailure(path);
@@ -188,7 +190,8 @@ TEST_F(Opening, NoUrlFails)
 
 TEST_F(Opening, AMovieStaysReadableForAllAssetsOfItsUrlAfterItsFileIsGone)
 {
-    const std::string path = testing::TempDir() + "gone.mp4";
+    const tests::PrivateDirectory directory;
+    const std::string path = directory.path() / "gone.mp4";
     std::filesystem::copy_file(movie("clock.mp4"), path, std::filesystem::copy_options::overwrite_existing);
     ASSERT_EQ(open(path), Status::ReadyToPlay);
     const auto keep = asset;
@@ -200,7 +203,8 @@ TEST_F(Opening, AMovieStaysReadableForAllAssetsOfItsUrlAfterItsFileIsGone)
 
 TEST_F(Opening, AnotherFileAtTheSamePathIsAnotherMovie)
 {
-    const std::string path = testing::TempDir() + "replaced.mp4";
+    const tests::PrivateDirectory directory;
+    const std::string path = directory.path() / "replaced.mp4";
     std::filesystem::copy_file(movie("clock.mp4"), path, std::filesystem::copy_options::overwrite_existing);
     ASSERT_EQ(open(path), Status::ReadyToPlay);
     const auto keep = asset;

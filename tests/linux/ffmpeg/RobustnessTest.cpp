@@ -1,5 +1,6 @@
 #include "linux/ffmpeg/FFmpegAsset.h"
 #include "support/EngineTest.h"
+#include "support/PrivateDirectory.h"
 #include "support/RefusedSystemCalls.h"
 
 #include <filesystem>
@@ -82,7 +83,8 @@ TEST_F(Robustness, ATruncatedMovieShowsWhatIsThere)
 
 TEST_F(Robustness, AMovieWithSomethingBehindItIsWhole)
 {
-    const std::string longer = testing::TempDir() + "with-junk.mp4";
+    const tests::PrivateDirectory directory;
+    const std::string longer = directory.path() / "with-junk.mp4";
     std::ofstream(longer, std::ios::binary) << bytesOf(movie("clock.mp4")) << "AAAAjunk that a device put there";
     ASSERT_EQ(open(longer), Status::ReadyToPlay);
     EXPECT_EQ(asset->whatIsMissing(), "");

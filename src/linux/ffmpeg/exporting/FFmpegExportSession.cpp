@@ -25,12 +25,14 @@ FFmpegExportSession::FFmpegExportSession(std::shared_ptr<Engine> engine, std::sh
 
 void FFmpegExportSession::setOutputURL(std::optional<base::Url> url)
 {
+    assertHere();
     const std::lock_guard lock(m_mutex);
     m_outputURL = std::move(url);
 }
 
 void FFmpegExportSession::exportAsynchronously(std::function<void()> done)
 {
+    assertHere();
     {
         const std::lock_guard lock(m_mutex);
         assert(m_status == Status::Unknown);

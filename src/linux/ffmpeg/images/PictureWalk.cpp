@@ -45,6 +45,7 @@ base::Result<std::unique_ptr<PictureWalk>> PictureWalk::open(std::shared_ptr<con
 
 void PictureWalk::setThreads(int threads)
 {
+    m_affinity.assertHere();
     auto decoder = VideoDecoder::open(m_demuxer->stream(m_track.stream), m_track, threads);
     if (!decoder)
         return;
@@ -55,11 +56,13 @@ void PictureWalk::setThreads(int threads)
 
 std::int64_t PictureWalk::groupOf(std::int64_t tick) const
 {
+    m_affinity.assertHere();
     return keyframeBefore(tick).value_or(kNever);
 }
 
 FrameRef PictureWalk::at(std::int64_t tick, Then then)
 {
+    m_affinity.assertHere();
     if (!goesOnTo(tick))
         seek(tick);
     while (!*m_cancelled) {
@@ -79,6 +82,7 @@ FrameRef PictureWalk::at(std::int64_t tick, Then then)
 
 bool PictureWalk::goesOnTo(std::int64_t tick) const
 {
+    m_affinity.assertHere();
     if (!m_positioned || !m_current || m_current->pts() > tick)
         return false;
     const std::int64_t head = m_next ? m_next->pts() : m_current->pts();

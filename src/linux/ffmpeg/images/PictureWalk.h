@@ -5,6 +5,7 @@
 /// however irregular the times are. It also tells when a picture is the last one before a tick.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Demuxer.h"
 #include "linux/ffmpeg/Movie.h"
 #include "linux/ffmpeg/VideoDecoder.h"
@@ -83,6 +84,7 @@ private:
     std::int64_t m_soughtTick = 0;
     std::int64_t m_stepBack = 0;
     std::int64_t m_decodedCount = 0;
+    base::Affinity m_affinity = base::Affinity::ofTheFirst();
 };
 
 } // namespace ffmpeg

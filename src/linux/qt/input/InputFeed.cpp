@@ -59,6 +59,7 @@ bool repeats(platform::Key key)
 
 bool InputFeed::handle(QEvent& event)
 {
+    m_affinity.assertHere();
     switch (event.type()) {
     case QEvent::TouchBegin:
     case QEvent::TouchUpdate:
@@ -87,6 +88,7 @@ bool InputFeed::handle(QEvent& event)
 
 void InputFeed::cancelTouches()
 {
+    m_affinity.assertHere();
     for (const int id : std::exchange(m_touches, {}))
         m_window.touchCancel({id, {}, m_clock.now()});
 }

@@ -4,6 +4,7 @@
 /// dropped, so nothing arrives twice.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Clock.h"
 #include "platform/views/Window.h"
 
@@ -45,6 +46,7 @@ private:
     const base::Clock& m_clock;
     std::function<void()> m_close;
     std::set<int> m_touches; ///< that are down
+    base::Affinity m_affinity;
 };
 
 } // namespace qtui

@@ -4,6 +4,7 @@ namespace qtui {
 
 void ViewItem::refresh(platform::View& view, bool visible)
 {
+    m_affinity.assertHere();
     setClip(view.clipsToBounds());
     const bool asks = needsDrawing(view, visible);
     if (!asks && m_revision == view.revision() && m_generation == stage().generation && m_drawnSize == shownSize())

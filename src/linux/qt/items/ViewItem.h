@@ -4,6 +4,7 @@
 /// something that it shows has changed.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/qt/animation/Tween.h"
 #include "linux/qt/items/Sprite.h"
 #include "linux/qt/items/Stage.h"
@@ -90,6 +91,7 @@ private:
     std::uint64_t m_revision = 0;
     std::uint64_t m_generation = 0;
     QSizeF m_drawnSize;
+    base::Affinity m_affinity;
 };
 
 /// The peer that fits the kind of view.

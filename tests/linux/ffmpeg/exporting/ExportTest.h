@@ -53,7 +53,17 @@ protected:
         return run(sessionFor(from, to, range));
     }
     /// The work without the session, on this thread.
-    base::Result<void> runJob(const std::string& from, std::optional<Range> range)
+    base::Result<void> runJob(const std::string& from, std::optional<Range> range) { return jobOf(from, range).run(); }
+    base::Result<void> runJobRefusing(const std::vector<RefusedSystemCall>& calls, const std::string& from,
+                                      std::optional<Range> range)
+    {
+        const ffmpeg::ExportJob job = jobOf(from, range);
+        base::Result<void> result;
+        whileRefusing(calls, [&] { result = job.run(); });
+        return result;
+    }
+    /// Opens the movie here; the job can be run on any thread.
+    ffmpeg::ExportJob jobOf(const std::string& from, std::optional<Range> range)
     {
         EXPECT_EQ(open(from), Status::ReadyToPlay);
         ffmpeg::ExportJob job;
@@ -62,15 +72,7 @@ protected:
         job.range = range;
         job.cancelled = std::make_shared<std::atomic<bool>>(false);
         job.log = &log;
-        return job.run();
-    }
-    base::Result<void> runJobRefusing(const std::vector<RefusedSystemCall>& calls, const std::string& from,
-                                      std::optional<Range> range)
-    {
-        EXPECT_EQ(open(from), Status::ReadyToPlay);
-        base::Result<void> result;
-        whileRefusing(calls, [&] { result = runJob(from, range); });
-        return result;
+        return job;
     }
     static std::string bytesOf(const std::string& path)
     {

@@ -107,10 +107,11 @@ TEST_F(AnOutput, NeedsSomewhereToWriteTo)
 TEST_F(AnOutput, SaysWhatCannotBeWrittenIntoADirectoryOfOthers)
 {
     std::filesystem::permissions(directory(), std::filesystem::perms::owner_read | std::filesystem::perms::owner_exec);
+    const ffmpeg::ExportJob job = jobOf(exportMovie("h264.mp4"), fromTo(1, 2));
     base::Result<void> result;
     std::thread([&] {
         const WithoutPrivileges without;
-        result = runJob(exportMovie("h264.mp4"), fromTo(1, 2));
+        result = job.run();
     }).join();
     std::filesystem::permissions(directory(), std::filesystem::perms::owner_all);
     ASSERT_FALSE(result);

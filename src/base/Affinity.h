@@ -1,0 +1,55 @@
+/// The one thread that an object belongs to, checked where its header promises one.
+///
+/// What lives on one thread has an affinity as a member, and asserts it first thing in each entry point. A check that
+/// fails is a mistake of ours: it names the place and both threads, and aborts. Builds with NDEBUG check nothing.
+#pragma once
+
+#include <source_location>
+
+#ifndef NDEBUG
+#include <atomic>
+#include <thread>
+#endif
+
+namespace base {
+
+#ifndef NDEBUG
+
+class Affinity {
+public:
+    /// Belongs to the calling thread.
+    Affinity();
+    /// Belongs to whichever thread asserts first: of what is made by one and used by another.
+    static Affinity ofTheFirst();
+    /// A copy of what belongs to a thread belongs to the thread that copies, and one of what is nobody's yet to nobody.
+    Affinity(const Affinity& other);
+    Affinity& operator=(const Affinity&) { return *this; }
+
+    /// Belongs to the calling thread from now on. For what one thread makes and hands to another, which calls it before
+    /// anything else.
+    void moveHere();
+    /// Belongs to whichever thread asserts next: for what is used by one thread at a time.
+    void release();
+
+    /// Aborts on any thread but its own. Any thread.
+    void assertHere(std::source_location where = std::source_location::current()) const;
+
+private:
+    explicit Affinity(std::thread::id thread) : m_thread(thread) {}
+
+    mutable std::atomic<std::thread::id> m_thread;
+};
+
+#else
+
+class Affinity {
+public:
+    static Affinity ofTheFirst() { return {}; }
+    void moveHere() {}
+    void release() {}
+    void assertHere(std::source_location = {}) const {}
+};
+
+#endif
+
+} // namespace base

@@ -1,0 +1,58 @@
+#include "base/Affinity.h"
+
+#include <gtest/gtest.h>
+
+#include <thread>
+
+namespace {
+
+#ifndef NDEBUG
+
+void elsewhere(const auto& work)
+{
+    std::thread(work).join();
+}
+
+TEST(Affinity, IsToTheThreadThatMadeIt)
+{
+    const base::Affinity affinity;
+    affinity.assertHere();
+    EXPECT_DEATH(elsewhere([&] { affinity.assertHere(); }),
+                 "AffinityTest.cpp:[0-9]+: .* was called on thread .*, but belongs to");
+}
+
+TEST(Affinity, MovesWithTheObject)
+{
+    base::Affinity affinity;
+    elsewhere([&] {
+        affinity.moveHere();
+        affinity.assertHere();
+    });
+    EXPECT_DEATH(affinity.assertHere(), "belongs to thread");
+}
+
+TEST(Affinity, IsToWhoeverAsksFirstOnceItWasReleased)
+{
+    base::Affinity affinity;
+    affinity.release();
+    elsewhere([&] {
+        affinity.assertHere();
+        affinity.assertHere();
+    });
+    EXPECT_DEATH(affinity.assertHere(), "belongs to thread");
+    affinity.release();
+    affinity.assertHere();
+}
+
+TEST(Affinity, OfACopyIsToTheThreadThatCopied)
+{
+    const base::Affinity affinity;
+    elsewhere([&] {
+        const base::Affinity copy = affinity; // NOLINT(performance-unnecessary-copy-initialization)
+        copy.assertHere();
+    });
+}
+
+#endif
+
+} // namespace
