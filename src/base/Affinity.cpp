@@ -15,7 +15,7 @@ Affinity::Affinity(const Affinity& other)
 {
 }
 
-Affinity Affinity::ofTheFirst()
+Affinity Affinity::detached()
 {
     return Affinity(std::thread::id());
 }
@@ -23,11 +23,6 @@ Affinity Affinity::ofTheFirst()
 void Affinity::moveHere()
 {
     m_thread = std::this_thread::get_id();
-}
-
-void Affinity::release()
-{
-    m_thread = std::thread::id();
 }
 
 void Affinity::assertHere(std::source_location where) const

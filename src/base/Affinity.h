@@ -20,7 +20,7 @@ public:
     /// Belongs to the calling thread.
     Affinity();
     /// Belongs to whichever thread asserts first: of what is made by one and used by another.
-    static Affinity ofTheFirst();
+    static Affinity detached();
     /// A copy of what belongs to a thread belongs to the thread that copies, and one of what is nobody's yet to nobody.
     Affinity(const Affinity& other);
     Affinity& operator=(const Affinity&) { return *this; }
@@ -28,8 +28,6 @@ public:
     /// Belongs to the calling thread from now on. For what one thread makes and hands to another, which calls it before
     /// anything else.
     void moveHere();
-    /// Belongs to whichever thread asserts next: for what is used by one thread at a time.
-    void release();
 
     /// Aborts on any thread but its own. Any thread.
     void assertHere(std::source_location where = std::source_location::current()) const;
@@ -44,9 +42,8 @@ private:
 
 class Affinity {
 public:
-    static Affinity ofTheFirst() { return {}; }
+    static Affinity detached() { return {}; }
     void moveHere() {}
-    void release() {}
     void assertHere(std::source_location = {}) const {}
 };
 

@@ -41,6 +41,16 @@ std::size_t characterLength(std::string_view text)
     return length;
 }
 
+std::size_t characterCount(std::string_view text)
+{
+    std::size_t count = 0;
+    for (; !text.empty(); ++count) {
+        const std::size_t length = characterLength(text);
+        text.remove_prefix(length == 0 ? 1 : length);
+    }
+    return count;
+}
+
 std::string printable(std::string_view text)
 {
     std::string line;

@@ -31,17 +31,21 @@ TEST(Affinity, MovesWithTheObject)
     EXPECT_DEATH(affinity.assertHere(), "belongs to thread");
 }
 
-TEST(Affinity, IsToWhoeverAsksFirstOnceItWasReleased)
+TEST(Affinity, ThatIsDetachedIsToWhoeverAsksFirst)
 {
-    base::Affinity affinity;
-    affinity.release();
+    const base::Affinity affinity = base::Affinity::detached();
     elsewhere([&] {
         affinity.assertHere();
         affinity.assertHere();
     });
     EXPECT_DEATH(affinity.assertHere(), "belongs to thread");
-    affinity.release();
-    affinity.assertHere();
+}
+
+TEST(Affinity, OfACopyOfWhatIsDetachedIsDetachedToo)
+{
+    const base::Affinity original = base::Affinity::detached();
+    const base::Affinity copy = original; // NOLINT(performance-unnecessary-copy-initialization)
+    elsewhere([&] { copy.assertHere(); });
 }
 
 TEST(Affinity, OfACopyIsToTheThreadThatCopied)

@@ -16,6 +16,13 @@ TEST(Text, PrintsNothingThatATerminalWouldObey)
     EXPECT_EQ(base::printable(std::string_view("a\0b", 3)), "a?b");
 }
 
+TEST(Text, CountsCharactersAndNotBytes)
+{
+    EXPECT_EQ(base::characterCount(""), 0U);
+    EXPECT_EQ(base::characterCount("Träumerei 日本 😀"), 14U);
+    EXPECT_EQ(base::characterCount("caf\xE9 \xF0\x9F"), 7U) << "each odd byte counts";
+}
+
 TEST(Text, KnowsWhereACharacterEnds)
 {
     EXPECT_EQ(base::characterLength(""), 0U);

@@ -35,8 +35,8 @@ def argumentsOf(command):
     words = words[next(i for i, word in enumerate(words) if re.search(r"(g\+\+|clang\+\+|c\+\+)$", word)) + 1:]
     kept, step = [], iter(words)
     for word in step:
-        if word in ("-o", "-c"):
-            next(step) if word == "-o" else None
+        if word == "-o":
+            next(step)
         elif word in ("-isystem", "-include"):
             kept += [word, next(step)]
         elif word.startswith(("-I", "-D", "-std", "-isystem")):

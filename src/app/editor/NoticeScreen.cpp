@@ -1,8 +1,8 @@
 #include "app/editor/NoticeScreen.h"
 
+#include "base/Text.h"
 #include "platform/views/Color.h"
 
-#include <algorithm>
 #include <cstddef>
 #include <sstream>
 #include <utility>
@@ -24,12 +24,6 @@ constexpr platform::Color kWordsColor{1, 1, 1, 1};
 constexpr double kBarHeight = 60;
 constexpr double kBarHeightWithoutHomeButton = 85;
 
-std::size_t lettersIn(const std::string& text)
-{
-    return static_cast<std::size_t>(std::count_if(
-        text.begin(), text.end(), [](char byte) { return (static_cast<unsigned char>(byte) & 0xC0) != 0x80; }));
-}
-
 std::vector<std::string> linesOf(const std::string& words)
 {
     std::vector<std::string> lines;
@@ -38,7 +32,8 @@ std::vector<std::string> linesOf(const std::string& words)
         lines.emplace_back();
         std::istringstream stream(paragraph);
         for (std::string word; stream >> word;) {
-            if (!lines.back().empty() && lettersIn(lines.back()) + 1 + lettersIn(word) > kLettersInALine)
+            if (!lines.back().empty()
+                && base::characterCount(lines.back()) + 1 + base::characterCount(word) > kLettersInALine)
                 lines.emplace_back();
             lines.back() += (lines.back().empty() ? "" : " ") + word;
         }

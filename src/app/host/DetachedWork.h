@@ -4,6 +4,7 @@
 #pragma once
 
 #include "base/Affinity.h"
+
 #include <atomic>
 #include <functional>
 #include <memory>

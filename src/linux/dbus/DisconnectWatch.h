@@ -2,6 +2,7 @@
 #pragma once
 
 #include "base/Affinity.h"
+
 #include <QDBusConnection>
 #include <QObject>
 

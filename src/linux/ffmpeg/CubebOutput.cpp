@@ -17,7 +17,7 @@ namespace {
 
 base::Instant now()
 {
-    return std::chrono::steady_clock::now().time_since_epoch();
+    return base::SystemClock().now();
 }
 
 struct Context {

@@ -63,7 +63,7 @@ private:
     /// How many pictures can be reduced in so many steps: first those that cannot.
     std::array<std::size_t, kReducedSides.size() + 1> m_counts{};
     Entries m_entries;
-    base::Affinity m_affinity = base::Affinity::ofTheFirst();
+    base::Affinity m_affinity = base::Affinity::detached();
 };
 
 } // namespace ffmpeg

@@ -37,7 +37,7 @@ private:
     std::int64_t m_position = 0;
     bool m_ended = false;
     float m_gain = 1;
-    base::Affinity m_affinity = base::Affinity::ofTheFirst();
+    base::Affinity m_affinity = base::Affinity::detached();
 };
 
 } // namespace ffmpeg

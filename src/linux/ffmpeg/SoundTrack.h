@@ -48,7 +48,7 @@ private:
     std::vector<float> m_samples;
     std::vector<float> m_converted;
     bool m_continues = false; ///< the next samples belong right behind the last
-    base::Affinity m_affinity = base::Affinity::ofTheFirst();
+    base::Affinity m_affinity = base::Affinity::detached();
 };
 
 } // namespace ffmpeg

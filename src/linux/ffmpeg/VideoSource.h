@@ -89,7 +89,7 @@ private:
     FrameCache::Overflow m_overflow = FrameCache::Overflow::Drop;
     std::int64_t m_skipBefore = kNever;
     std::int64_t m_skippedTo = kNever; ///< up to here pictures can be missing
-    base::Affinity m_affinity = base::Affinity::ofTheFirst();
+    base::Affinity m_affinity = base::Affinity::detached();
 };
 
 } // namespace ffmpeg

@@ -293,7 +293,7 @@ std::uint32_t picturesUntilRefreshed(ByteView info)
     constexpr std::uint32_t kRecoveryPoint = 6;
     constexpr std::uint32_t kMostFrameNums = 1 << 16; // it says no larger number than these have
     const Bytes payload = withoutEmulation(info);
-    for (const InfoMessage& each : messagesIn(ByteView(payload).subspan(1)))
+    for (const SeiMessage& each : seiMessagesIn(ByteView(payload).subspan(1)))
         if (each.type == kRecoveryPoint) {
             const std::uint32_t count = BitReader(each.payload).ue();
             return count < kMostFrameNums ? count : 0;

@@ -99,8 +99,9 @@ inline bool isFirstSlice(ByteView nal)
 /// Whether a slice is of one field. `sps` is the sequence set that it refers to.
 bool isOfField(ByteView nal, const Sps& sps);
 
-/// How many pictures that others refer to are decoded behind a keyframe until all that is shown is right, as far as this
-/// unit of information says it: encoders that refresh pictures part by part begin anew nowhere. 0 when it says nothing.
+/// How many pictures that others refer to are decoded behind a keyframe until all that is shown is right, as far as the
+/// recovery point of this SEI unit says it (recovery_frame_cnt, H.264 D.2.8): encoders that refresh pictures part by part
+/// ("intra refresh") begin anew nowhere. 0 when it says nothing.
 std::uint32_t picturesUntilRefreshed(ByteView info);
 
 /// The header of a stream in MP4, "avcC".

@@ -242,8 +242,8 @@ bool saysHdr(ByteView nal)
     if (unitOf(nal) != Unit::PrefixInfo)
         return false;
     const Bytes payload = withoutEmulation(nal);
-    const auto messages = messagesIn(ByteView(payload).subspan(kHeaderBits / 8));
-    return std::any_of(messages.begin(), messages.end(), [](const InfoMessage& each) {
+    const auto messages = seiMessagesIn(ByteView(payload).subspan(kHeaderBits / 8));
+    return std::any_of(messages.begin(), messages.end(), [](const SeiMessage& each) {
         return each.type == kMasteringDisplay || each.type == kContentLight;
     });
 }

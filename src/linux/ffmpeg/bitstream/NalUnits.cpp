@@ -93,9 +93,9 @@ std::optional<std::vector<ByteView>> unitsOfHeader(ByteView header, std::size_t&
     return units;
 }
 
-std::vector<InfoMessage> messagesIn(ByteView bytes)
+std::vector<SeiMessage> seiMessagesIn(ByteView bytes)
 {
-    std::vector<InfoMessage> messages;
+    std::vector<SeiMessage> messages;
     const auto number = [&] { // of bytes that are added up as long as they are full
         std::uint32_t sum = 0;
         std::uint8_t byte = 0xFF;

@@ -19,14 +19,14 @@ std::optional<std::vector<ByteView>> unitsBehindLengths(ByteView data, int lengt
 /// one leads beyond the end.
 std::optional<std::vector<ByteView>> unitsOfHeader(ByteView header, std::size_t& at, int count);
 
-/// One message of a unit of information ("SEI").
-struct InfoMessage {
+/// One message of a unit of supplemental enhancement information (SEI).
+struct SeiMessage {
     std::uint32_t type;
     ByteView payload;
 };
 /// Those of such a unit, behind its header; `bytes` are without what keeps start codes from occurring inside. Up to the
 /// first that leads beyond the end.
-std::vector<InfoMessage> messagesIn(ByteView bytes);
+std::vector<SeiMessage> seiMessagesIn(ByteView bytes);
 
 /// No unit ends with a zero. But some files count in what stood before the next start code when they were made.
 inline ByteView withoutTrailingZeros(ByteView unit)

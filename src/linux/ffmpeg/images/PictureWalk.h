@@ -84,7 +84,7 @@ private:
     std::int64_t m_soughtTick = 0;
     std::int64_t m_stepBack = 0;
     std::int64_t m_decodedCount = 0;
-    base::Affinity m_affinity = base::Affinity::ofTheFirst();
+    base::Affinity m_affinity = base::Affinity::detached();
 };
 
 } // namespace ffmpeg

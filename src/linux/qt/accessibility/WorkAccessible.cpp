@@ -1,6 +1,6 @@
 #include "linux/qt/accessibility/WorkAccessible.h"
 
-#include "linux/qt/StageWindow.h"
+#include "linux/qt/accessibility/ItemAccessible.h"
 #include "linux/qt/items/WorkLine.h"
 
 #include <QAccessible>
@@ -10,23 +10,10 @@ namespace qtui {
 
 namespace {
 
-class WorkAccessible final : public QAccessibleInterface, public QAccessibleValueInterface {
+class WorkAccessible final : public ItemAccessible, public QAccessibleValueInterface {
 public:
-    explicit WorkAccessible(WorkLine& line) : m_line(line) {}
+    explicit WorkAccessible(WorkLine& line) : ItemAccessible(line), m_line(line) {}
 
-    bool isValid() const override { return m_line.window() != nullptr; }
-    QObject* object() const override { return &m_line; }
-    QWindow* window() const override { return m_line.window(); }
-    QAccessibleInterface* parent() const override { return QAccessible::queryAccessibleInterface(window()); }
-    QAccessibleInterface* child(int /*index*/) const override { return nullptr; }
-    int childCount() const override { return 0; }
-    int indexOfChild(const QAccessibleInterface* /*child*/) const override { return -1; }
-    QAccessibleInterface* childAt(int /*x*/, int /*y*/) const override { return nullptr; }
-    QRect rect() const override
-    {
-        const QRect inWindow = m_line.windowRect().toAlignedRect();
-        return window() ? QRect(window()->mapToGlobal(inWindow.topLeft()), inWindow.size()) : inWindow;
-    }
     QString text(QAccessible::Text kind) const override
     {
         if (kind == QAccessible::Name)
@@ -35,7 +22,6 @@ public:
             return QStringLiteral("%1 %").arg(*m_line.percent());
         return {};
     }
-    void setText(QAccessible::Text /*kind*/, const QString& /*text*/) override {}
     QAccessible::Role role() const override { return QAccessible::ProgressBar; }
     QAccessible::State state() const override
     {

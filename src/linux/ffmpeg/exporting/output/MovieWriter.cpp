@@ -120,8 +120,7 @@ private:
     {
         if (error == AVERROR_EXIT)
             return Error::make("ffmpeg", error, "it is no longer wanted");
-        const std::string why = textOf(error);
-        return Error::make("ffmpeg", error, "“" + m_job.file.name() + "” cannot be written: " + why + ".");
+        return Error::make("ffmpeg", error, "“" + m_job.file.name() + "” cannot be written: " + textOf(error) + ".");
     }
 
     Result<void> open()
