@@ -25,6 +25,11 @@ void Affinity::moveHere()
     m_thread = std::this_thread::get_id();
 }
 
+void Affinity::detach()
+{
+    m_thread = std::thread::id();
+}
+
 void Affinity::assertHere(std::source_location where) const
 {
     const auto here = std::this_thread::get_id();
@@ -42,5 +47,11 @@ void Affinity::assertHere(std::source_location where) const
 }
 
 } // namespace base
+
+#else
+
+#include <type_traits>
+
+static_assert(std::is_empty_v<base::Affinity>, "what users run carries none of it");
 
 #endif

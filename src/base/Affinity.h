@@ -28,6 +28,8 @@ public:
     /// Belongs to the calling thread from now on. For what one thread makes and hands to another, which calls it before
     /// anything else.
     void moveHere();
+    /// Belongs to whichever thread asserts next: what its owner calls last before it hands the object to another thread.
+    void detach();
 
     /// Aborts on any thread but its own. Any thread.
     void assertHere(std::source_location where = std::source_location::current()) const;
@@ -44,6 +46,7 @@ class Affinity {
 public:
     static Affinity detached() { return {}; }
     void moveHere() {}
+    void detach() {}
     void assertHere(std::source_location = {}) const {}
 };
 

@@ -41,6 +41,16 @@ TEST(Affinity, ThatIsDetachedIsToWhoeverAsksFirst)
     EXPECT_DEATH(affinity.assertHere(), "belongs to thread");
 }
 
+TEST(Affinity, GoesToTheNextThreadThatItIsDetachedFor)
+{
+    base::Affinity affinity;
+    affinity.detach();
+    elsewhere([&] { affinity.assertHere(); });
+    EXPECT_DEATH(affinity.assertHere(), "belongs to thread");
+    affinity.detach();
+    affinity.assertHere();
+}
+
 TEST(Affinity, OfACopyOfWhatIsDetachedIsDetachedToo)
 {
     const base::Affinity original = base::Affinity::detached();
