@@ -24,6 +24,23 @@ add_library(clipsa-compile INTERFACE)
 target_compile_features(clipsa-compile INTERFACE cxx_std_20)
 target_compile_options(clipsa-compile INTERFACE -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Werror)
 target_compile_definitions(clipsa-compile INTERFACE QT_NO_KEYWORDS)
+
+# Movies come from strangers: what overflows ends the program, and does not become theirs. tests/binaries looks for these
+# in what was linked.
+include(CheckPIESupported)
+check_pie_supported()
+target_compile_definitions(clipsa-compile INTERFACE _GLIBCXX_ASSERTIONS)
+target_compile_options(clipsa-compile INTERFACE -fstack-protector-strong -fstack-clash-protection)
+if(CMAKE_SYSTEM_PROCESSOR MATCHES "x86_64|AMD64|i.86")
+    target_compile_options(clipsa-compile INTERFACE -fcf-protection)
+elseif(CMAKE_SYSTEM_PROCESSOR MATCHES "aarch64|arm64")
+    target_compile_options(clipsa-compile INTERFACE -mbranch-protection=standard) # the same there
+endif()
+if(NOT CLIPSA_SANITIZE) # a sanitizer has to see the plain calls
+    target_compile_options(clipsa-compile INTERFACE -U_FORTIFY_SOURCE -D_FORTIFY_SOURCE=3)
+endif()
+target_link_options(clipsa-compile INTERFACE -Wl,-z,relro,-z,now)
+
 if(CLIPSA_SANITIZE)
     target_compile_options(clipsa-compile INTERFACE -fsanitize=${CLIPSA_SANITIZE} -fno-omit-frame-pointer
                                                     -fno-sanitize-recover=all)
