@@ -30,7 +30,7 @@ void Affinity::detach()
     m_thread = std::thread::id();
 }
 
-void Affinity::assertHere(std::source_location where) const
+void Affinity::assertHere(SourceLocation where) const
 {
     const auto here = std::this_thread::get_id();
     std::thread::id owner = m_thread;

@@ -4,7 +4,8 @@
 /// fails is a mistake of ours: it names the place and both threads, and aborts. Builds with NDEBUG check nothing.
 #pragma once
 
-#include <source_location>
+// The standard's own is not known to clang 14, which clang-tidy is.
+#include <experimental/source_location>
 
 #ifndef NDEBUG
 #include <atomic>
@@ -12,6 +13,8 @@
 #endif
 
 namespace base {
+
+using SourceLocation = std::experimental::source_location;
 
 #ifndef NDEBUG
 
@@ -32,7 +35,7 @@ public:
     void detach();
 
     /// Aborts on any thread but its own. Any thread.
-    void assertHere(std::source_location where = std::source_location::current()) const;
+    void assertHere(SourceLocation where = SourceLocation::current()) const;
 
 private:
     explicit Affinity(std::thread::id thread) : m_thread(thread) {}
@@ -47,7 +50,7 @@ public:
     static Affinity detached() { return {}; }
     void moveHere() {}
     void detach() {}
-    void assertHere(std::source_location = {}) const {}
+    void assertHere(SourceLocation = {}) const {}
 };
 
 #endif

@@ -10,7 +10,6 @@
 
 #include <cstdint>
 #include <memory>
-#include <source_location>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -60,7 +59,7 @@ public:
 
 protected:
     /// First thing in each entry point of what lives on one thread, which is the one that made it.
-    void assertHere(std::source_location where = std::source_location::current()) const
+    void assertHere(base::SourceLocation where = base::SourceLocation::current()) const
     {
         m_affinity.assertHere(where);
     }
