@@ -3,12 +3,14 @@
 What passed is remembered in build/dev/tidy, by the contents of the source, of all of our headers that it includes, and of
 what configures the check: so a second run costs nothing."""
 
+import argparse
 import hashlib
 import json
 import os
 import re
 import subprocess
 import sys
+import time
 from concurrent.futures import ThreadPoolExecutor
 from functools import lru_cache
 
@@ -35,22 +37,36 @@ def headersByObject():
 
 
 @lru_cache(maxsize=None)
-def contents(path):
+def hashOf(path):
+    if not os.path.exists(path):
+        return b""
     with open(path, "rb") as file:
         return hashlib.sha256(file.read()).digest()
+
+
+def contentsOf(stamp):
+    with open(stamp) as file:
+        return file.read()
+
+
+def remember(stamp, digest):
+    if digest is not None:
+        os.makedirs(os.path.dirname(stamp), exist_ok=True)
+        with open(stamp, "w") as file:
+            file.write(digest)
 
 
 def configuration():
     version = subprocess.run(["clang-tidy", "--version"], capture_output=True, check=True).stdout
     files = sorted(os.path.join(at, ".clang-tidy") for at in (TOP, os.path.join(TOP, "tests"), os.path.join(TOP, "benches")))
-    return hashlib.sha256(version + b"".join(contents(each) for each in files if os.path.exists(each)))
+    return hashlib.sha256(version + b"".join(hashOf(each) for each in files))
 
 
 def digestOf(command, headers, base):
     digest = base.copy()
     digest.update(command["command"].encode())
     for each in [command["file"], *headers]:
-        digest.update(each.encode() + contents(each))
+        digest.update(each.encode() + hashOf(each))
     return digest.hexdigest()
 
 
@@ -60,34 +76,42 @@ def findings(source):
     return run.stdout if run.stdout.strip() or run.returncode == 0 else run.stderr
 
 
-def main(sources):
+def main():
+    parser = argparse.ArgumentParser()
+    parser.add_argument("--minutes", type=float, default=float("inf"), help="begin with no source after so long")
+    parser.add_argument("sources", nargs="*")
+    arguments = parser.parse_args()
+    until = time.monotonic() + arguments.minutes * 60
+
     commands, headers, base = commandsBySource(), headersByObject(), configuration()
-    for unknown in (each for each in sources if each not in commands):
+    for unknown in (each for each in arguments.sources if each not in commands):
         print(f"{unknown} is not compiled, so it is left out", file=sys.stderr)
     todo = []
-    for source in (each for each in sources if each in commands):
+    for source in (each for each in arguments.sources if each in commands):
         command = commands[source]
         known = headers.get(command.get("output") or re.search(r" -o (\S+)", command["command"])[1])
         digest = digestOf(command, known, base) if known is not None else None
         stamp = os.path.join(PASSED, source)
-        if digest is None or not os.path.exists(stamp) or open(stamp).read() != digest:
+        if digest is None or not os.path.exists(stamp) or contentsOf(stamp) != digest:
             todo.append((source, stamp, digest))
     if todo:
         print(f"Checking {len(todo)} sources with clang-tidy…", file=sys.stderr, flush=True)
 
-    said = set()
+    said, late = set(), 0
     with ThreadPoolExecutor(os.cpu_count()) as pool:
-        for (source, stamp, digest), text in zip(todo, pool.map(findings, (each[0] for each in todo))):
-            if not text.strip():
-                if digest is not None:
-                    os.makedirs(os.path.dirname(stamp), exist_ok=True)
-                    with open(stamp, "w") as file:
-                        file.write(digest)
-            elif text not in said: # a header's finding is said by each who includes it
+        results = pool.map(lambda each: findings(each[0]) if time.monotonic() < until else None, todo)
+        for (source, stamp, digest), text in zip(todo, results):
+            if text is None:
+                late += 1
+            elif not text.strip():
+                remember(stamp, digest)
+            elif text not in said:  # a header's finding is said by each who includes it
                 said.add(text)
                 print(text.rstrip(), flush=True)
+    if late:
+        print(f"{late} sources were not reached in {arguments.minutes:g} minutes; the next run goes on with them", file=sys.stderr)
     return 1 if said else 0
 
 
 if __name__ == "__main__":
-    sys.exit(main(sys.argv[1:]))
+    sys.exit(main())

@@ -21,7 +21,7 @@ std::int64_t SilentOutput::framesHeard() const
 
 void SilentOutput::loop()
 {
-    std::vector<float> samples(2 * kPart);
+    std::vector<float> samples(2UL * kPart);
     auto next = m_start;
     while (!m_ending) {
         m_fill(samples.data(), kPart);

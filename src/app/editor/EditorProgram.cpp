@@ -4,6 +4,7 @@
 #include "app/editor/NoticeScreen.h"
 #include "app/editor/Script.h"
 #include "app/editor/StartTrace.h"
+#include "base/Environment.h"
 #include "extension/VKVideoEditorExtensionContext.h"
 #include "extension/VKVideoEditorExtensionViewController.h"
 #include "linux/dbus/Chassis.h"
@@ -81,7 +82,8 @@ xdg::MountTable mounts(const EditorOptions& options)
 /// Where messages are kept by the journal they carry its levels.
 base::StreamLog::Style logStyle()
 {
-    return std::getenv("JOURNAL_STREAM") ? base::StreamLog::Style::Journal : base::StreamLog::Style::Plain;
+    return base::environment("JOURNAL_STREAM").empty() ? base::StreamLog::Style::Plain
+                                                       : base::StreamLog::Style::Journal;
 }
 
 } // namespace
@@ -165,7 +167,7 @@ base::Result<void> EditorProgram::start()
         m_pictureSeen = true;
         markStart("first-picture");
     });
-    if (const char* script = std::getenv("CLIPSA_SCRIPT"))
+    if (const std::string script = base::environment("CLIPSA_SCRIPT"); !script.empty())
         m_script = std::make_unique<Script>(*this, script);
 
     // Loads the view, which starts the loads of the payload.

@@ -2,6 +2,7 @@
 
 #include "app/editor/EditorProgram.h"
 #include "app/editor/SyntheticInput.h"
+#include "base/Environment.h"
 #include "editor/VKVideoEditorViewController.h"
 
 #include <QFile>
@@ -296,8 +297,8 @@ bool Script::picture(const Words& words)
     m_program.presenter().commit();
     if (m_program.presenter().isAnimating())
         return false;
-    const char* folder = std::getenv("CLIPSA_PICTURES");
-    const std::string path = (folder ? std::string(folder) + "/" : std::string()) + words.at(1);
+    const std::string folder = base::environment("CLIPSA_PICTURES");
+    const std::string path = (folder.empty() ? folder : folder + "/") + words.at(1);
     if (!m_program.presenter().grab().save(QString::fromStdString(path)))
         fail("cannot write the picture " + path);
     if (words.size() > 2)
@@ -350,8 +351,8 @@ std::string Script::filledIn(std::string line) const
 
 void Script::report(const std::string& line) const
 {
-    const char* path = std::getenv("CLIPSA_REPORT");
-    if (!path) {
+    const std::string path = base::environment("CLIPSA_REPORT");
+    if (path.empty()) {
         std::printf("%s\n", line.c_str());
         std::fflush(stdout);
         return;

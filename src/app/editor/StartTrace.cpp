@@ -1,14 +1,15 @@
 #include "app/editor/StartTrace.h"
 
+#include "base/Environment.h"
+
 #include <cstdio>
-#include <cstdlib>
 #include <ctime>
 
 namespace app {
 
 void markStart(const char* name)
 {
-    static const bool wanted = std::getenv("CLIPSA_TRACE_START"); // NOLINT(concurrency-mt-unsafe): nobody sets it
+    static const bool wanted = !base::environment("CLIPSA_TRACE_START").empty();
     if (!wanted)
         return;
     // Not std::chrono, because others must be able to read the same clock.

@@ -1,5 +1,6 @@
 #include "app/host/EditorDirectory.h"
 
+#include "base/Environment.h"
 #include "linux/dbus/HostConnection.h"
 
 #include <cerrno>
@@ -25,8 +26,8 @@ constexpr time_t kDay = 24 * 60 * 60;
 
 std::string environmentPath(const char* name)
 {
-    const char* value = std::getenv(name); // NOLINT(concurrency-mt-unsafe): nobody sets the environment
-    return value && value[0] == '/' ? value : "";
+    std::string value = base::environment(name);
+    return value.starts_with('/') ? value : "";
 }
 
 /// Where the socket of an editor lies whose directory's path is too long for one.

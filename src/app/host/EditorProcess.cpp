@@ -1,5 +1,6 @@
 #include "app/host/EditorProcess.h"
 
+#include "base/Environment.h"
 #include "linux/dbus/EditorReport.h"
 #include "linux/dbus/ExtensionConnection.h"
 #include "linux/posix/FileDescriptor.h"
@@ -9,7 +10,6 @@
 #include <array>
 #include <cerrno>
 #include <csignal>
-#include <cstdlib>
 #include <cstring>
 #include <fcntl.h>
 #include <filesystem>
@@ -170,18 +170,14 @@ void EditorProcess::signal(int number)
 
 base::Result<std::string> findEditorProgram()
 {
-    const auto variable = [](const char* name) {
-        const char* value = std::getenv(name); // NOLINT(concurrency-mt-unsafe): nobody sets the environment
-        return std::string(value ? value : "");
-    };
     std::vector<std::string> candidates;
-    if (const std::string named = variable("CLIPSA_EDITOR"); !named.empty())
+    if (const std::string named = base::environment("CLIPSA_EDITOR"); !named.empty())
         candidates.push_back(named);
     std::error_code error;
     const std::filesystem::path own = std::filesystem::read_symlink("/proc/self/exe", error).parent_path();
     candidates.push_back(own / "clipsa-editor");
     candidates.push_back(own.parent_path() / "libexec/clipsa/clipsa-editor");
-    std::istringstream path(variable("PATH"));
+    std::istringstream path(base::environment("PATH"));
     for (std::string directory; std::getline(path, directory, ':');)
         if (directory.starts_with('/'))
             candidates.push_back(directory + "/clipsa-editor");

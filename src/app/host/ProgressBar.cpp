@@ -1,9 +1,9 @@
 #include "app/host/ProgressBar.h"
 
+#include "base/Environment.h"
+
 #include <algorithm>
 #include <cmath>
-#include <cstdlib>
-#include <string_view>
 #include <sys/ioctl.h>
 #include <unistd.h>
 #include <utility>
@@ -18,8 +18,7 @@ constexpr int kFrame = 9; ///< " [", "]", " 100 %"
 
 bool isTerminal(std::FILE* stream)
 {
-    const char* kind = std::getenv("TERM"); // NOLINT(concurrency-mt-unsafe): nobody sets the environment
-    return ::isatty(::fileno(stream)) != 0 && !(kind && std::string_view(kind) == "dumb");
+    return ::isatty(::fileno(stream)) != 0 && base::environment("TERM") != "dumb";
 }
 
 int columnsOf(std::FILE* stream)

@@ -2,6 +2,7 @@
 
 #include "app/host/OpenMovie.h"
 #include "app/host/Streams.h"
+#include "base/Environment.h"
 #include "base/Text.h"
 
 #include <cerrno>
@@ -30,9 +31,9 @@ class RuntimeDirectory {
 public:
     RuntimeDirectory()
     {
-        const char* given = std::getenv("XDG_RUNTIME_DIR"); // NOLINT(concurrency-mt-unsafe): nobody sets it
+        const std::string given = base::environment("XDG_RUNTIME_DIR");
         std::error_code error;
-        if (given && fs::is_directory(given, error))
+        if (!given.empty() && fs::is_directory(given, error))
             return;
         std::string path = (fs::temp_directory_path(error) / "clipsa-tour-XXXXXX").native();
         if (::mkdtemp(path.data()))

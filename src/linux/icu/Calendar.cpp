@@ -1,5 +1,7 @@
 #include "linux/icu/Calendar.h"
 
+#include "base/Environment.h"
+
 #include <unicode/simpletz.h>
 #include <unicode/smpdtfmt.h>
 #include <unicode/timezone.h>
@@ -7,7 +9,6 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
-#include <cstdlib>
 #include <ctime>
 #include <mutex>
 #include <utility>
@@ -15,12 +16,6 @@
 namespace intl {
 
 namespace {
-
-std::string processEnvironment(const char* name)
-{
-    const char* value = std::getenv(name);
-    return value ? value : "";
-}
 
 std::unique_ptr<icu::TimeZone> zoneNamed(const std::string& name)
 {
@@ -128,7 +123,7 @@ std::string localeFromPosixName(std::string_view name)
 }
 
 Calendar::Calendar(Environment environment)
-    : m_environment(environment ? std::move(environment) : Environment(processEnvironment))
+    : m_environment(environment ? std::move(environment) : Environment(base::environment))
 {
 }
 
