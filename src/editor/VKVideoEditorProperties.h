@@ -51,7 +51,7 @@ public:
     void setIntroMode(bool introMode) { m_introMode = introMode; }
     /// Toolbars and scrubber are faded out, or on their way there.
     bool isUIHidden() const { return m_uiHidden; }
-    void setUIHidden(bool uiHidden) { m_uiHidden = uiHidden; }
+    void setUiHidden(bool uiHidden) { m_uiHidden = uiHidden; }
     /// The share sheet is on screen.
     bool isShareSheetUp() const { return m_shareSheetUp; }
     void setShareSheetUp(bool shareSheetUp) { m_shareSheetUp = shareSheetUp; }

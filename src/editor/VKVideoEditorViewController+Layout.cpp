@@ -58,8 +58,17 @@ void VKVideoEditorViewController::viewWillTransitionToSize_withTransitionCoordin
             self->bottomToolBar()->setItems({});
             self->refreshAVRotation();
             self->applyLayoutForDevice();
+            self->centreVideoOverlayPlayButton();
         },
         {});
+}
+
+void VKVideoEditorViewController::centreVideoOverlayPlayButton()
+{
+    const auto button = videoOverlayPlayButton()->asView();
+    const base::Size screen = m_platform.mainScreen.bounds().size;
+    const base::Size size = button->frame().size;
+    button->setFrame({{screen.width * 0.5 - size.width * 0.5, screen.height * 0.5 - size.height * 0.5}, size});
 }
 
 void VKVideoEditorViewController::applyPhoneUILayout()

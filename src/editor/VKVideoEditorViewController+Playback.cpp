@@ -2,7 +2,10 @@
 
 #include "editor/VKVideoEditorViewController.h"
 
+#include <algorithm>
+#include <array>
 #include <limits>
+#include <string_view>
 
 using base::MediaTime;
 using platform::PlayerItem;
@@ -11,6 +14,8 @@ namespace {
 
 constexpr double kPlayHeadInterval = 1.0 / 30; // seconds between two moves of the play head
 constexpr std::int32_t kPlayHeadTimescale = 1'000'000'000;
+/// Of the item: what tells that it is ready.
+constexpr std::array<std::string_view, 2> kObservedKeys{PlayerItem::kStatusKey, PlayerItem::kDurationKey};
 
 } // namespace
 
@@ -23,8 +28,14 @@ void VKVideoEditorViewController::buildPlayer()
 
 void VKVideoEditorViewController::observePlayerItem()
 {
-    avPlayer()->currentItem()->addObserver(*this, PlayerItem::kStatusKey);
-    avPlayer()->currentItem()->addObserver(*this, PlayerItem::kDurationKey);
+    for (const std::string_view key : kObservedKeys)
+        avPlayer()->currentItem()->addObserver(*this, std::string(key));
+}
+
+void VKVideoEditorViewController::stopObservingPlayerItem()
+{
+    for (const std::string_view key : kObservedKeys)
+        avPlayer()->currentItem()->removeObserver(*this, key);
 }
 
 void VKVideoEditorViewController::addPlayHeadObserver()
@@ -48,8 +59,7 @@ void VKVideoEditorViewController::reloadAVLayerWithURL(const std::optional<base:
         if (const auto delegate = avTrimmer()->delegate())
             delegate->movieScrubberDidCancelEditing(*avTrimmer());
     setVideoURL(url);
-    avPlayer()->currentItem()->removeObserver(*this, PlayerItem::kStatusKey);
-    avPlayer()->currentItem()->removeObserver(*this, PlayerItem::kDurationKey);
+    stopObservingPlayerItem();
     buildPlayer();
     avPlayer()->setActionAtItemEnd(platform::ActionAtItemEnd::Pause);
     avPlayer()->seekToTime(MediaTime::zero());
@@ -68,7 +78,7 @@ void VKVideoEditorViewController::observeValueForKeyPath_ofObject_change_context
     const auto item = avPlayer()->currentItem();
     if (&object != item.get())
         return;
-    if (keyPath != PlayerItem::kStatusKey && keyPath != PlayerItem::kDurationKey)
+    if (std::find(kObservedKeys.begin(), kObservedKeys.end(), keyPath) == kObservedKeys.end())
         return;
     if (item->status() != PlayerItem::Status::ReadyToPlay || !item->duration().isNumeric() || currentItemLoaded())
         return;

@@ -31,8 +31,6 @@ std::shared_ptr<Label> titleLine(double y, double fontSize, const std::string& t
 {
     auto label = std::make_shared<Label>(base::Rect::make(0, y, kTitleWidth, kTitleLineHeight));
     label->setFontSize(fontSize);
-    label->setBackgroundColor(Color::clear());
-    label->setTextColor(Color::black());
     label->setTextAlignment(platform::TextAlignment::Center);
     label->setText(text);
     return label;
@@ -49,19 +47,14 @@ VKVideoEditorViewController::initWithBundleIdentifier_URL_applicationName_overri
     if (!size.isEmpty())
         editor->view()->setFrame(size);
     editor->setActivityTypes(std::make_shared<ActivityTypes>());
-    editor->setHasEdit(false);
     editor->setHasHomeButton(editor->deviceHasHomeButton());
-    editor->setShareSheetUp(false);
     editor->makeVideoOverlay();
-    editor->setIntroMode(true);
     editor->setOriginalVideoURL(url);
     editor->setVideoURL(std::move(url));
     editor->setApplicationName(std::move(applicationName));
     editor->setBundleIdentifier(std::move(bundleIdentifier));
     editor->makeTitle();
     editor->setTrimFilePath(editor->trimFileURL());
-    editor->setTrimming(false);
-    editor->setExporting(false);
     editor->makePlayerChain();
     editor->makeScrubber();
     editor->addPlayHeadObserver();
@@ -85,8 +78,7 @@ VKVideoEditorViewController::~VKVideoEditorViewController()
 {
     // The boundary token in timeObserver() is left to end with its player.
     avPlayer()->removeTimeObserver(playbackTimeObserver());
-    avPlayer()->currentItem()->removeObserver(*this, platform::PlayerItem::kStatusKey);
-    avPlayer()->currentItem()->removeObserver(*this, platform::PlayerItem::kDurationKey);
+    stopObservingPlayerItem();
     m_platform.notifications.removeObserver(*this);
     VKExtensions::_srDeleteAllTempFiles(m_platform.files);
 }
@@ -141,22 +133,18 @@ void VKVideoEditorViewController::makeVideoOverlay()
     overlay->setAutoresizingMask(platform::kFlexibleWidth | platform::kFlexibleHeight);
     overlay->setAccessibilityLabel("Recording");
     setVideoOverlay(overlay);
-    setUIHidden(false);
     overlay->addGestureRecognizer(
         std::make_shared<platform::TapGestureRecognizer>(weakSelf<runtime::Object>(), Selector("handleSingleTap:")));
 
     const auto play = VKExtensions::_srVideoOverlayButtonWithStyle(m_platform, VKVideoOverlayButton::kStyleAutomatic);
-    const base::Size screen = m_platform.mainScreen.bounds().size;
-    const base::Size size = play->asView()->frame().size;
-    play->asView()->setFrame({{screen.width * 0.5 - size.width * 0.5, screen.height * 0.5 - size.height * 0.5}, size});
     play->setTarget_action(weakSelf<runtime::Object>(), Selector("playAction"));
     setVideoOverlayPlayButton(play);
+    centreVideoOverlayPlayButton();
 }
 
 void VKVideoEditorViewController::makeTitle()
 {
     setTitleLabel(titleLine(0, kTitleFontSize, applicationName().value_or("")));
-    titleLabel()->setClipsToBounds(false);
 
     std::string date;
     if (videoURL())
@@ -175,13 +163,11 @@ void VKVideoEditorViewController::makePlayerChain()
                                          platform::kPlayerItemDidPlayToEndNotification, avPlayerItem());
     setAvPlayerLayer(platform::PlayerLayer::withPlayer(avPlayer()));
     observePlayerItem();
-    setCurrentItemLoaded(false);
 }
 
 void VKVideoEditorViewController::makeScrubber()
 {
     setScrubberContainterView(std::make_shared<BackdropView>(BackdropView::kStyleChrome));
-    scrubberContainterView()->setUserInteractionEnabled(true);
     scrubberContainterView()->setTranslatesAutoresizingMaskIntoConstraints(false);
 
     const auto trimmer = std::make_shared<MovieScrubber>();
@@ -191,7 +177,6 @@ void VKVideoEditorViewController::makeScrubber()
     trimmer->setZoomDelay(kZoomDelay);
     trimmer->setEdgeInset(kScrubberEdgeInset);
     setAvTrimmer(trimmer);
-    setScrubbing(false);
 }
 
 void VKVideoEditorViewController::makeBarItems()
@@ -237,7 +222,7 @@ void VKVideoEditorViewController::makeViewTree()
     view()->addSubview(background);
     view()->addSublayer(avPlayerLayer());
     view()->addSubview(videoOverlay());
-    view()->addSubview(bottomToolBar());
+    // The bottom bar comes and goes with the arrangements.
     view()->addSubview(topToolBar());
     view()->addSubview(scrubberContainterView());
     scrubberContainterView()->addSubview(avTrimmer());
@@ -251,12 +236,6 @@ void VKVideoEditorViewController::viewWillAppear(bool animated)
     assertHere();
     becomeFirstResponder();
     ViewController::viewWillAppear(animated);
-}
-
-void VKVideoEditorViewController::viewDidAppear(bool animated)
-{
-    assertHere();
-    ViewController::viewDidAppear(animated);
 }
 
 void VKVideoEditorViewController::viewWillDisappear(bool animated)
@@ -331,14 +310,14 @@ void VKVideoEditorViewController::configureClipsaUIHidden()
 void VKVideoEditorViewController::showUI()
 {
     assertHere();
-    setUIHidden(false);
+    setUiHidden(false);
     fadeChromeTo(1.0);
 }
 
 void VKVideoEditorViewController::hideUI()
 {
     assertHere();
-    setUIHidden(true);
+    setUiHidden(true);
     fadeChromeTo(0.0);
 }
 

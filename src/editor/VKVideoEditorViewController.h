@@ -53,7 +53,6 @@ public:
 
     // Lifecycle and events.
     void viewWillAppear(bool animated) override;
-    void viewDidAppear(bool animated) override;
     void viewWillDisappear(bool animated) override;
     void viewDidLayoutSubviews() override;
     void viewWillTransitionToSize_withTransitionCoordinator(base::Size size,
@@ -150,10 +149,13 @@ private:
     void makeViewTree();
     void applyLayoutForDevice();
 
+    /// On the main screen, whatever the view's place in it. The screen is our window, which may change its size.
+    void centreVideoOverlayPlayButton();
     base::Rect topToolBarFrame();
     base::Rect bottomToolBarFrame();
     void buildPlayer();
     void observePlayerItem();
+    void stopObservingPlayerItem();
     void addPlayHeadObserver();
     static void saveMixed(const std::shared_ptr<VKVideoEditorViewController>& self,
                           const std::optional<base::Url>& output, const base::ErrorRef& error);

@@ -89,7 +89,38 @@ TEST_F(Construction, TheTitleShowsTheAppWithTheRecordingsDateHangingBelow)
     EXPECT_EQ(date->text(), "MMMM d hh:mm a @ 1234");
     EXPECT_EQ(date->fontSize(), 10);
     EXPECT_EQ(date->frame(), Rect::make(0, 17, 120, 17));
+    EXPECT_EQ(date->textColor(), platform::Color::black());
+    EXPECT_EQ(date->textAlignment(), platform::TextAlignment::Center);
+    for (const auto& line : {title, date})
+        EXPECT_EQ(line->backgroundColor(), platform::Color::clear()) << "the bar shines through";
     EXPECT_EQ(editor->titleButton()->view(), title);
+}
+
+TEST_F(Construction, TheTitleIsMadeAtTheOriginForItsBarToPlace)
+{
+    editor = VKVideoEditorViewController::initWithBundleIdentifier_URL_applicationName(
+        fake->platform, "org.example.Game", base::Url::fromPath(kMovie), "Game");
+    EXPECT_EQ(editor->titleLabel()->frame(), Rect::make(0, 0, 120, 17));
+}
+
+TEST_F(Construction, TheBarsAreAsWideAsTheViewAndAskTheEditor)
+{
+    open();
+    for (const auto& bar : {editor->topToolBar(), editor->bottomToolBar()}) {
+        EXPECT_EQ(bar->delegate(), editor);
+        EXPECT_EQ(bar->autoresizingMask(), unsigned{platform::kFlexibleWidth});
+    }
+    editor->view()->setFrame(Rect::make(0, 0, 500, 720));
+    EXPECT_EQ(editor->topToolBar()->frame().width(), 500);
+    EXPECT_EQ(editor->bottomToolBar()->frame().width(), 500);
+}
+
+TEST_F(Construction, WhatCanBeTouchedHasANameForThoseWhoDoNotSeeIt)
+{
+    open();
+    EXPECT_EQ(editor->videoOverlay()->accessibilityLabel(), "Recording");
+    EXPECT_EQ(editor->topToolBar()->accessibilityLabel(), "Recording");
+    EXPECT_EQ(editor->bottomToolBar()->accessibilityLabel(), "Playback");
 }
 
 TEST_F(Construction, NothingIsCheckedAnEditorWithoutAMovieStillOpensAndCloses)
@@ -191,6 +222,16 @@ TEST_F(Construction, AnyOtherAnswerMeansAHomeButton)
             EXPECT_EQ(editor->bottomToolBar()->frame(), Rect::make(0, 720 - 44, 360, 44));
         });
     }
+}
+
+TEST_F(Construction, ADeviceThatDoesNotKnowIsAskedForNought)
+{
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    IN_A_PROCESS_OF_ITS_OWN({
+        open();
+        EXPECT_EQ(fake->device.fallbacks, (std::vector<std::pair<std::string, std::int32_t>>{
+                                              {std::string(platform::kDeviceHomeButtonKey), 0}}));
+    });
 }
 
 TEST_F(Construction, TheHomeButtonIsAskedForOnceAProcess)

@@ -1,6 +1,8 @@
 #include "EditorFixture.h"
 
-#include <cstdlib>
+#include "overlay/VKFlatVideoOverlayButton.h"
+
+#include <functional>
 
 using base::EdgeInsets;
 using base::Rect;
@@ -132,12 +134,122 @@ TEST_F(Layout, TheScrubberAndTheTapAreaAreAsWideAsTheView)
     EXPECT_EQ(editor->videoOverlay()->frame(), Rect::make(0, 0, 720, 360));
 }
 
-TEST_F(Layout, TheLargePlayButtonStaysInTheMiddleAndTheTitleKeepsItsSize)
+TEST_F(Layout, TheLargePlayButtonStaysInTheMiddleInBothItsLooks)
+{
+    for (const int quality : {100, 10}) {
+        SCOPED_TRACE(quality);
+        makePlatform(tests::FakePlatform::kPhone);
+        fake->device.quality = quality;
+        open();
+        const auto button = editor->videoOverlayPlayButton()->asView();
+        EXPECT_EQ(std::dynamic_pointer_cast<VKFlatVideoOverlayButton>(button) != nullptr, quality == 10);
+        const base::Size size = button->frame().size;
+        for (const base::Size screen : {base::Size{720, 360}, {30, 20}, {1024, 768}, tests::FakePlatform::kPhone}) {
+            turnTo(screen);
+            EXPECT_EQ(button->frame().center(), (base::Point{screen.width / 2, screen.height / 2}));
+            EXPECT_EQ(button->frame().size, size);
+        }
+        TearDown();
+    }
+}
+
+TEST_F(Layout, TheLargePlayButtonIsInTheMiddleOfTheScreenNotOfTheView)
+{
+    editor = VKVideoEditorViewController::initWithBundleIdentifier_URL_applicationName_overrideTintColor_size(
+        fake->platform, {}, base::Url::fromPath(kMovie), {}, {}, Rect::make(0, 0, 200, 300));
+    EXPECT_EQ(editor->videoOverlayPlayButton()->asView()->frame().center(), (base::Point{180, 360}));
+}
+
+TEST_F(Layout, TheTitleKeepsItsSize)
 {
     open();
     turnTo({720, 360});
-    EXPECT_EQ(editor->videoOverlayPlayButton()->asView()->frame().center(), (base::Point{360, 180}));
     EXPECT_EQ(editor->titleLabel()->frame().size, (base::Size{120, 17}));
+}
+
+TEST_F(Layout, TheBackgroundAndThePictureFillTheViewAtOnce)
+{
+    open();
+    editor->view()->setFrame(Rect::make(0, 0, 500, 300));
+    editor->refreshAVRotation();
+    EXPECT_EQ(editor->avPlayerLayer()->frame(), Rect::make(0, 0, 500, 300)) << "before the next layout";
+    EXPECT_EQ(editor->view()->subviews().front()->frame(), Rect::make(0, 0, 500, 300));
+}
+
+TEST_F(Layout, EachArrangementAddsItsFourConstraintsInOrder)
+{
+    using Attribute = platform::LayoutAttribute;
+    open();
+    const auto strip = editor->scrubberContainterView();
+    const auto latest = [&] {
+        const auto& all = editor->view()->constraints();
+        return std::vector<platform::LayoutConstraint>(all.end() - 4, all.end());
+    };
+    const auto expected = [&](const std::shared_ptr<platform::View>& below, Attribute edge) {
+        return std::vector<platform::LayoutConstraint>{
+            {strip, Attribute::Leading, editor->view(), Attribute::Leading, 1, 0},
+            {strip, Attribute::Trailing, editor->view(), Attribute::Trailing, 1, 0},
+            {strip, Attribute::Bottom, below, edge, 1, 0},
+            {strip, Attribute::Height, {}, Attribute::None, 1, 38},
+        };
+    };
+    EXPECT_EQ(latest(), expected(editor->bottomToolBar(), Attribute::Top));
+    editor->applyPadUILayout();
+    EXPECT_EQ(latest(), expected(editor->view(), Attribute::Bottom));
+    editor->applyPhoneUILayout();
+    EXPECT_EQ(latest(), expected(editor->bottomToolBar(), Attribute::Top));
+    EXPECT_EQ(editor->view()->constraints().size(), 5U) << "the pad's stays in force, as the older";
+}
+
+TEST_F(Layout, ThePadsOneBarLeavesTheItemsOfTheOtherAsTheyWere)
+{
+    open();
+    const auto before = bottom();
+    editor->applyPadUILayout();
+    EXPECT_EQ(bottom(), before);
+    turnTo({720, 360});
+    EXPECT_EQ(bottom(), Items{}) << "turning empties both bars first";
+}
+
+TEST_F(Layout, TheGlyphsGoBackWhereTheyWereWhenThePadsBarGoes)
+{
+    open();
+    turnTo({720, 360});
+    turnTo({360, 720});
+    for (const auto& item : {editor->playButton(), editor->pauseButton(), editor->shareButton()})
+        EXPECT_EQ(item->imageInsets(), EdgeInsets{});
+}
+
+TEST_F(Layout, ControllersInsideTheEditorAreToldOfATurnFirst)
+{
+    class Inner final : public platform::ViewController {
+    public:
+        std::function<void()> alongside;
+        void viewWillTransitionToSize_withTransitionCoordinator(base::Size /*size*/,
+                                                                platform::TransitionCoordinator& coordinator) override
+        {
+            coordinator.animateAlongsideTransition(alongside, {});
+        }
+    };
+    open();
+    const auto inner = std::make_shared<Inner>();
+    std::vector<Items> seen;
+    inner->alongside = [&] { seen.push_back(top()); };
+    editor->addChildViewController(inner);
+    const auto before = top();
+    turnTo({720, 360});
+    EXPECT_EQ(seen, (std::vector<Items>{before})) << "before the bars are filled anew";
+}
+
+TEST_F(Layout, AnEditorThatGoesBeforeItsTurnIsNotKeptForIt)
+{
+    open();
+    platform::TransitionCoordinator turn(platform::Window::kTransitionDuration);
+    editor->viewWillTransitionToSize_withTransitionCoordinator({720, 360}, turn);
+    const std::weak_ptr<VKVideoEditorViewController> gone = editor;
+    close();
+    EXPECT_TRUE(gone.expired());
+    turn.runAlongside();
 }
 
 TEST_F(Layout, AThousandTransitionsLeaveNothingBehind)

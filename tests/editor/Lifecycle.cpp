@@ -1,6 +1,14 @@
 #include "EditorFixture.h"
+#include "Story.h"
 
+#include <gmock/gmock.h>
+
+#include <tuple>
+
+using platform::Key;
 using platform::MotionSubtype;
+using testing::ElementsAre;
+using testing::IsEmpty;
 
 namespace {
 
@@ -86,10 +94,18 @@ TEST_F(Lifecycle, AShakeWhileExportingDoesNotUndoButIsPassedOn)
 TEST_F(Lifecycle, AShakeOutsideTrimModeChangesNothingButIsPassedOn)
 {
     open();
-    const auto before = top();
-    fake->window->motion(MotionSubtype::Shake);
-    EXPECT_EQ(top(), before);
-    EXPECT_EQ(container->motions, 1);
+    const auto expectNothingBut = [this](int motions) {
+        Story story(*fake, editor);
+        fake->window->motion(MotionSubtype::Shake);
+        settle();
+        EXPECT_THAT(story.end(), IsEmpty());
+        EXPECT_EQ(container->motions, motions);
+    };
+    expectNothingBut(1); // before the first play, when the lower bar holds no play item
+    editor->movieScrubberDidBeginEditing(*editor->avTrimmer());
+    editor->undoAction();
+    editor->playAction();
+    expectNothingBut(2);
 }
 
 TEST_F(Lifecycle, OtherMotionsAreOnlyPassedOn)
@@ -140,6 +156,35 @@ TEST_F(Lifecycle, AReleasedEditorIsReallyGoneAndObservesNothing)
     EXPECT_EQ(fake->notifications.registrationCount(), 0U);
 }
 
+TEST_F(Lifecycle, AReleasedEditorIsGoneAlsoWhenItsPlayerStillWaitsForTheEndOfATrim)
+{
+    open();
+    trimFrom(2, 5);
+    editor->playAction();
+    const std::weak_ptr<VKVideoEditorViewController> gone = editor;
+    const auto keptPlayer = fake->media.player();
+    close();
+    EXPECT_TRUE(gone.expired());
+    EXPECT_TRUE(keptPlayer->hasObservers()) << "the boundary goes with its player";
+    keptPlayer->advance(4);
+}
+
+TEST_F(Lifecycle, AHandleThatWasMovedDoesNotKeepAnEditor)
+{
+    for (const auto move : {&VKVideoEditorViewController::movieScrubber_editingStartValueDidChange,
+                            &VKVideoEditorViewController::movieScrubber_editingEndValueDidChange}) {
+        makePlatform(tests::FakePlatform::kPhone);
+        open();
+        ((*editor).*move)(*editor->avTrimmer(), 3);
+        const std::weak_ptr<VKVideoEditorViewController> gone = editor;
+        editor.reset();
+        fake->window->setRootViewController(nullptr);
+        container.reset();
+        EXPECT_TRUE(gone.expired());
+        settle();
+    }
+}
+
 TEST_F(Lifecycle, TheCloseItemFinishesWithTheListItselfAndPausesThePlayer)
 {
     open();
@@ -179,11 +224,25 @@ TEST_F(Lifecycle, SpacePlaysAndPauses)
     EXPECT_FALSE(player().isPlaying());
 }
 
-TEST_F(Lifecycle, EveryKeyHasAnActionThatTheEditorAnswers)
+TEST_F(Lifecycle, EveryKeyHasAnActionThatTheEditorAnswersAndATitleForHelp)
 {
     open();
-    for (const platform::KeyCommand& command : editor->keyCommands())
+    std::vector<std::tuple<Key, char, bool, std::string, std::string>> commands;
+    for (const platform::KeyCommand& command : editor->keyCommands()) {
         EXPECT_TRUE(editor->respondsTo(command.action)) << command.action.name();
+        commands.emplace_back(command.key, command.character, command.control, command.action.name(), command.title);
+    }
+    EXPECT_THAT(commands, ElementsAre(std::tuple(Key::Space, '\0', false, "togglePlayback", "Play or pause"),
+                                      std::tuple(Key::Left, '\0', false, "seekBackward", "One second back"),
+                                      std::tuple(Key::Right, '\0', false, "seekForward", "One second forward"),
+                                      std::tuple(Key::Comma, '\0', false, "stepBackward", "One picture back"),
+                                      std::tuple(Key::Period, '\0', false, "stepForward", "One picture forward"),
+                                      std::tuple(Key::Home, '\0', false, "goToStart", "To the start"),
+                                      std::tuple(Key::End, '\0', false, "goToEnd", "To the end"),
+                                      std::tuple(Key::Character, 'i', false, "trimStartHere", "Start the trim here"),
+                                      std::tuple(Key::Character, 'o', false, "trimEndHere", "End the trim here"),
+                                      std::tuple(Key::Return, '\0', false, "confirmTrim", "Trim"),
+                                      std::tuple(Key::Escape, '\0', false, "leave", "Leave trim mode, or close")));
 }
 
 TEST_F(Lifecycle, ArrowsMoveThePlayHeadByASecondAndHomeAndEndToTheEnds)

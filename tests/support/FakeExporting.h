@@ -4,6 +4,7 @@
 #include "platform/media/Asset.h"
 #include "platform/media/ExportSession.h"
 #include "platform/media/ImageGenerator.h"
+#include "support/CallListener.h"
 
 #include <memory>
 #include <optional>
@@ -14,14 +15,20 @@ namespace tests {
 
 class FakeExportSession final : public platform::ExportSession {
 public:
-    explicit FakeExportSession(std::shared_ptr<platform::Asset> theAsset) : asset(std::move(theAsset)) {}
+    explicit FakeExportSession(std::shared_ptr<platform::Asset> theAsset,
+                               CallListenerRef listener = std::make_shared<CallListener>())
+        : asset(std::move(theAsset)), m_listener(std::move(listener))
+    {
+    }
 
-    void setOutputURL(std::optional<base::Url> url) override { m_outputURL = std::move(url); }
-    void setOutputFileType(platform::FileType type) override { fileType = type; }
-    void setTimeRange(std::optional<base::MediaTimeRange> range) override { timeRange = range; }
-    void setAudioMix(std::optional<platform::AudioMix> mix) override { audioMix = std::move(mix); }
+    // As with a real one, what is set after the start comes too late.
+    void setOutputURL(std::optional<base::Url> url) override { set(m_outputURL, std::move(url)); }
+    void setOutputFileType(platform::FileType type) override { set(fileType, type); }
+    void setTimeRange(std::optional<base::MediaTimeRange> range) override { set(timeRange, range); }
+    void setAudioMix(std::optional<platform::AudioMix> mix) override { set(audioMix, std::move(mix)); }
     void exportAsynchronously(std::function<void()> done) override
     {
+        (*m_listener)("export");
         m_status = Status::Waiting; // as a real one does until its asset is loaded
         m_done = std::move(done);
     }
@@ -49,6 +56,13 @@ public:
     bool wasCancelled = false;
 
 private:
+    template <typename T, typename Value> void set(std::optional<T>& place, Value&& value) const
+    {
+        if (m_status == Status::Unknown)
+            place = std::forward<Value>(value);
+    }
+
+    CallListenerRef m_listener;
     std::optional<base::Url> m_outputURL;
     Status m_status = Status::Unknown;
     base::ErrorRef m_error;
@@ -62,7 +76,12 @@ public:
         Handler handler;
     };
 
-    explicit FakeImageGenerator(std::shared_ptr<platform::Asset> theAsset) : asset(std::move(theAsset)) {}
+    explicit FakeImageGenerator(std::shared_ptr<platform::Asset> theAsset,
+                                CallListenerRef listener = std::make_shared<CallListener>())
+        : asset(std::move(theAsset)), m_listener(std::move(listener))
+    {
+    }
+    ~FakeImageGenerator() override { (*m_listener)("generator dropped"); }
 
     void setMaximumSize(base::Size size) override { m_maximumSize = size; }
     base::Size maximumSize() const override { return m_maximumSize; }
@@ -88,6 +107,7 @@ public:
     std::vector<Request> requests; ///< all that came, answered or not
 
 private:
+    CallListenerRef m_listener;
     base::Size m_maximumSize;
 };
 

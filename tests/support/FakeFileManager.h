@@ -12,6 +12,7 @@
 #pragma once
 
 #include "platform/files/FileManager.h"
+#include "support/CallListener.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -30,6 +31,8 @@ public:
 
     /// What was asked of this manager, in order.
     std::vector<std::string> calls;
+    /// Hears of it, too.
+    const CallListenerRef listener = std::make_shared<CallListener>();
     /// Bytes free everywhere.
     std::uint64_t freeSize = 1'000'000'000;
     /// The shared manager, when it shall be another.
@@ -66,7 +69,7 @@ public:
 
     bool fileExists(const std::string& path) override
     {
-        calls.push_back("exists " + path);
+        note("exists " + path);
         std::string at = normalised(path);
         for (int links = 0; links < kMostLinks; ++links) {
             const auto item = find(at);
@@ -81,7 +84,7 @@ public:
 
     base::Result<void> createDirectory(const std::string& path) override
     {
-        calls.push_back("create directory " + path);
+        note("create directory " + path);
         const std::string at = normalised(path);
         if (auto error = scripted(FileOperation::CreateDirectory, at))
             return error;
@@ -95,7 +98,7 @@ public:
 
     base::Result<std::vector<std::string>> contentsOfDirectory(const std::string& path) override
     {
-        calls.push_back("list " + path);
+        note("list " + path);
         const std::string at = normalised(path);
         if (auto error = scripted(FileOperation::List, at))
             return error;
@@ -110,7 +113,7 @@ public:
 
     base::Result<platform::FileAttributes> attributesOfItem(const std::string& path) override
     {
-        calls.push_back("attributes " + path);
+        note("attributes " + path);
         const std::string at = normalised(path);
         if (auto error = scripted(FileOperation::Attributes, at))
             return error;
@@ -122,7 +125,7 @@ public:
 
     base::Result<platform::FileSystemAttributes> attributesOfFileSystem(const std::string& path) override
     {
-        calls.push_back("file system " + path);
+        note("file system " + path);
         const std::string at = normalised(path);
         if (auto error = scripted(FileOperation::FileSystem, at))
             return error;
@@ -133,7 +136,7 @@ public:
 
     base::Result<void> removeItem(const std::string& path) override
     {
-        calls.push_back("remove " + path);
+        note("remove " + path);
         const std::string at = normalised(path);
         if (auto error = scripted(FileOperation::Remove, at))
             return error;
@@ -146,7 +149,7 @@ public:
 
     base::Result<void> moveItem(const std::string& from, const std::string& to) override
     {
-        calls.push_back("move " + from + " to " + to);
+        note("move " + from + " to " + to);
         const std::string source = normalised(from);
         const std::string destination = normalised(to);
         if (auto error = scripted(FileOperation::Move, source))
@@ -186,6 +189,11 @@ private:
         if (result.ends_with('/'))
             result.pop_back();
         return result;
+    }
+    void note(const std::string& call)
+    {
+        calls.push_back(call);
+        (*listener)(call);
     }
     static std::string parentOf(const std::string& path)
     {

@@ -35,6 +35,7 @@ public:
 
     std::shared_ptr<platform::Asset> assetWithURL(const std::optional<base::Url>& url) override
     {
+        (*listener)("asset " + (url ? url->path() : "of nothing"));
         urls.push_back(url);
         const auto asset = std::make_shared<FakeAsset>(m_mainQueue, url);
         m_assets.push_back(asset);
@@ -48,6 +49,7 @@ public:
     }
     std::shared_ptr<platform::PlayerItem> playerItemWithAsset(const std::shared_ptr<platform::Asset>& asset) override
     {
+        (*listener)("item");
         const auto item = std::make_shared<FakePlayerItem>(asset);
         m_items.push_back(item);
         const auto movie = scripted(asset);
@@ -66,8 +68,9 @@ public:
     }
     std::shared_ptr<platform::Player> playerWithPlayerItem(const std::shared_ptr<platform::PlayerItem>& item) override
     {
-        const auto player =
-            std::make_shared<FakePlayer>(m_mainQueue, m_center, std::dynamic_pointer_cast<FakePlayerItem>(item));
+        (*listener)("player");
+        const auto player = std::make_shared<FakePlayer>(m_mainQueue, m_center,
+                                                         std::dynamic_pointer_cast<FakePlayerItem>(item), listener);
         m_players.push_back(player);
         return player;
     }
@@ -75,20 +78,24 @@ public:
     std::shared_ptr<platform::ImageGenerator>
     imageGeneratorWithAsset(const std::shared_ptr<platform::Asset>& asset) override
     {
-        const auto generator = std::make_shared<FakeImageGenerator>(asset);
+        (*listener)("generator");
+        const auto generator = std::make_shared<FakeImageGenerator>(asset, listener);
         m_generators.push_back(generator);
         return generator;
     }
     std::shared_ptr<platform::ExportSession> exportSessionWithAsset(const std::shared_ptr<platform::Asset>& asset,
                                                                     platform::ExportPreset /*preset*/) override
     {
-        const auto session = std::make_shared<FakeExportSession>(asset);
+        (*listener)("session");
+        const auto session = std::make_shared<FakeExportSession>(asset, listener);
         m_sessions.push_back(session);
         return session;
     }
 
     std::map<std::string, FakeMovie> movies;    ///< by path
     std::vector<std::optional<base::Url>> urls; ///< of all assets that were asked for
+    /// Hears of calls of this and of players, sessions and generators.
+    const CallListenerRef listener = std::make_shared<CallListener>();
 
     // The latest of each; null when it is gone.
     std::shared_ptr<FakeAsset> asset() const { return latest(m_assets); }

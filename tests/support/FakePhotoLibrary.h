@@ -3,6 +3,7 @@
 #pragma once
 
 #include "platform/photos/PhotoLibrary.h"
+#include "support/CallListener.h"
 
 #include <cassert>
 #include <cerrno>
@@ -17,6 +18,7 @@ class FakePhotoLibrary final : public platform::PhotoLibrary {
 public:
     void performChanges(ChangeBlock changes, Completion completion) override
     {
+        (*listener)("library");
         m_waiting.push_back({std::move(changes), std::move(completion), nullptr, {}});
         if (runsBlocksAtOnce)
             runBlock();
@@ -40,6 +42,9 @@ public:
 
     bool hasBlock() const { return !m_waiting.empty(); }
     bool isBusy() const { return !m_begun.empty(); }
+
+    /// Hears of each transaction.
+    const CallListenerRef listener = std::make_shared<CallListener>();
 
     bool runsBlocksAtOnce = true;
     /// All that was asked for.

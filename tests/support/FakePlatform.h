@@ -13,6 +13,8 @@
 #include <map>
 #include <memory>
 #include <string>
+#include <utility>
+#include <vector>
 
 namespace tests {
 
@@ -22,10 +24,13 @@ public:
     std::map<std::string, std::int32_t, std::less<>> integers;
     std::map<std::string, bool, std::less<>> booleans;
     std::int32_t quality = 100;
+    /// What callers would take for an answer, by the key that they asked for.
+    mutable std::vector<std::pair<std::string, std::int32_t>> fallbacks;
 
     std::optional<platform::InterfaceIdiom> userInterfaceIdiom() const override { return idiom; }
     std::int32_t integerAnswer(std::string_view key, std::int32_t fallback) const override
     {
+        fallbacks.emplace_back(key, fallback);
         const auto found = integers.find(key);
         return found == integers.end() ? fallback : found->second;
     }

@@ -6,11 +6,14 @@
 #include "platform/media/Player.h"
 #include "platform/media/TimeObservers.h"
 #include "runtime/NotificationCenter.h"
+#include "support/CallListener.h"
 
 #include <algorithm>
 #include <functional>
 #include <memory>
 #include <optional>
+#include <sstream>
+#include <string>
 #include <utility>
 #include <vector>
 
@@ -129,6 +132,12 @@ public:
         m_duration = FakeMovie::lasting(seconds).duration;
         didChangeValueForKey(kDurationKey);
     }
+    /// Tells the observers of "status" only: the duration is known already, or not yet.
+    void learnThatItIsReady()
+    {
+        m_status = Status::ReadyToPlay;
+        didChangeValueForKey(kStatusKey);
+    }
     void fail(base::ErrorRef why = FakeMovie::failing().error)
     {
         m_error = std::move(why);
@@ -161,27 +170,28 @@ public:
         int frames = 0;       ///< of a step
     };
 
-    FakePlayer(base::MainQueue& mainQueue, runtime::NotificationCenter& center, std::shared_ptr<FakePlayerItem> item)
-        : m_mainQueue(mainQueue), m_center(center), m_item(std::move(item))
+    FakePlayer(base::MainQueue& mainQueue, runtime::NotificationCenter& center, std::shared_ptr<FakePlayerItem> item,
+               CallListenerRef listener = std::make_shared<CallListener>())
+        : m_mainQueue(mainQueue), m_center(center), m_item(std::move(item)), m_listener(std::move(listener))
     {
     }
 
     std::shared_ptr<platform::PlayerItem> currentItem() const override { return m_item; }
     void play() override
     {
-        calls.push_back({Call::Kind::Play, {}});
+        note({Call::Kind::Play, {}}, "play");
         m_playing = true;
     }
     void pause() override
     {
-        calls.push_back({Call::Kind::Pause, {}});
+        note({Call::Kind::Pause, {}}, "pause");
         m_playing = false;
     }
     bool isPlaying() const override { return m_playing; }
     base::MediaTime currentTime() const override { return m_item ? m_item->time : base::MediaTime::zero(); }
     void seekToTime(base::MediaTime time) override
     {
-        calls.push_back({Call::Kind::Seek, time});
+        note({Call::Kind::Seek, time}, "seek " + inSeconds(time));
         if (!time.isNumeric() || !m_item)
             return;
         jumpTo(clamped(time));
@@ -189,7 +199,7 @@ public:
     /// There are thirty pictures a second.
     void stepByCount(int frames) override
     {
-        calls.push_back({Call::Kind::Step, {}, frames});
+        note({Call::Kind::Step, {}, frames}, "step " + std::to_string(frames));
         m_playing = false;
         if (!m_item || !m_item->duration().isNumeric())
             return;
@@ -200,24 +210,42 @@ public:
         const std::int64_t shown = std::min(last, now.value * kRate / now.timescale);
         jumpTo(clamped(base::MediaTime::make(std::clamp<std::int64_t>(shown + frames, 0, last), kRate)));
     }
-    void setActionAtItemEnd(platform::ActionAtItemEnd action) override { actionAtItemEnd = action; }
+    void setActionAtItemEnd(platform::ActionAtItemEnd action) override
+    {
+        (*m_listener)("action at end");
+        actionAtItemEnd = action;
+    }
     ObserverToken addPeriodicTimeObserver(base::MediaTime interval,
                                           std::function<void(base::MediaTime)> callback) override
     {
+        (*m_listener)("observe every " + std::to_string(interval.value) + "/" + std::to_string(interval.timescale));
         return m_observers.addPeriodic(interval, std::move(callback));
     }
     ObserverToken addBoundaryTimeObserver(std::vector<base::MediaTime> times, std::function<void()> callback) override
     {
+        std::string call = "observe";
+        for (const base::MediaTime& time : times)
+            call += " " + inSeconds(time);
+        (*m_listener)(call);
         return m_observers.addBoundary(std::move(times), std::move(callback));
     }
-    void removeTimeObserver(const ObserverToken& token) override { m_observers.remove(token); }
+    void removeTimeObserver(const ObserverToken& token) override
+    {
+        (*m_listener)("observe no longer");
+        m_observers.remove(token);
+    }
     platform::VideoFrameRef currentFrame() const override { return m_frame; }
-    void setFrameHandler(std::function<void()> handler) override { m_frameHandler = std::move(handler); }
+    void setFrameHandler(std::function<void()> handler) override
+    {
+        (*m_listener)(handler ? "show" : "show no longer");
+        m_frameHandler = std::move(handler);
+    }
 
     // What a test does and asks.
 
     std::vector<Call> calls;
-    platform::ActionAtItemEnd actionAtItemEnd = platform::ActionAtItemEnd::Pause;
+    /// As it was set. Where it was not, the end pauses.
+    std::optional<platform::ActionAtItemEnd> actionAtItemEnd;
 
     std::vector<base::MediaTime> seeks() const
     {
@@ -264,6 +292,17 @@ public:
     }
 
 private:
+    void note(const Call& call, const std::string& words)
+    {
+        (*m_listener)(words);
+        calls.push_back(call);
+    }
+    static std::string inSeconds(base::MediaTime time)
+    {
+        std::ostringstream text;
+        text << time.seconds();
+        return text.str();
+    }
     void jumpTo(base::MediaTime time)
     {
         m_item->time = time;
@@ -283,7 +322,7 @@ private:
     }
     void reachEnd()
     {
-        if (actionAtItemEnd == platform::ActionAtItemEnd::Pause)
+        if (actionAtItemEnd.value_or(platform::ActionAtItemEnd::Pause) == platform::ActionAtItemEnd::Pause)
             m_playing = false;
         m_center.post(platform::kPlayerItemDidPlayToEndNotification, m_item);
     }
@@ -291,6 +330,7 @@ private:
     base::MainQueue& m_mainQueue;
     runtime::NotificationCenter& m_center;
     std::shared_ptr<FakePlayerItem> m_item;
+    CallListenerRef m_listener;
     platform::TimeObservers m_observers;
     platform::VideoFrameRef m_frame;
     std::function<void()> m_frameHandler;
