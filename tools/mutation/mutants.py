@@ -98,7 +98,8 @@ class Source:
             return None
         match = re.compile(rb"\s*;").match(self.bytes, place[1])
         text = self.textOf(*place)
-        if not match or text.startswith(("static_cast<void>", "assert(")):
+        # What only says which thread we are on is no more than an assertion.
+        if not match or text.startswith(("static_cast<void>", "assert(")) or ".assertHere(" in text:
             return None
         if cursor.kind == CursorKind.BINARY_OPERATOR and not re.search(r"[^=!<>]=[^=]", text):
             return None
@@ -153,6 +154,9 @@ class Source:
             return
         if cursor.kind == CursorKind.CALL_EXPR:
             if not cursor.spelling.startswith("operator") or cursor.spelling[8:] not in OPERATORS:
+                return
+            # Texts are joined, never taken from each other: such a break would only take its line's others along.
+            if re.search(r"basic_string|QString|QStringBuilder|filesystem::path", cursor.type.get_canonical().spelling):
                 return
             sides = [child for child in children if self.rangeOf(child)
                      and self.textOf(*self.rangeOf(child)) != cursor.spelling[8:]]
