@@ -2,6 +2,8 @@
 /// with a deadline. One thread.
 #pragma once
 
+#include "support/Mutation.h"
+
 #include <array>
 #include <cerrno>
 #include <chrono>
@@ -63,7 +65,7 @@ public:
         ::posix_spawn_file_actions_adddup2(&files, out[1], STDOUT_FILENO);
         ::posix_spawn_file_actions_adddup2(&files, err[1], STDERR_FILENO);
         const int error = ::posix_spawnp(&m_process, arguments.front().c_str(), &files, nullptr,
-                                         pointersTo(arguments).data(), pointersTo(environment).data());
+                                         pointersTo(arguments).data(), pointersTo(withMutation(environment)).data());
         ::posix_spawn_file_actions_destroy(&files);
         ::close(out[1]);
         ::close(err[1]);

@@ -8,6 +8,7 @@
 #include <string>
 #include <sys/ptrace.h>
 #include <sys/wait.h>
+#include <utility>
 #include <vector>
 
 namespace tests {
@@ -26,6 +27,7 @@ public:
     TracedPublisher(std::vector<std::string> words, std::vector<std::string> environment)
     {
         words.insert(words.begin(), program("photos-publisher"));
+        environment = withMutation(std::move(environment));
         const auto pointersTo = [](std::vector<std::string>& texts) {
             std::vector<char*> pointers;
             for (std::string& text : texts)

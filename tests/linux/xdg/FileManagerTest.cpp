@@ -1,7 +1,10 @@
 #include "linux/xdg/FileManager.h"
 
+#include "linux/xdg/Modified.h"
 #include "linux/xdg/MoveItem.h"
+#include "support/Names.h"
 #include "support/PrivateDirectory.h"
+#include "support/RefusedSystemCalls.h"
 #include "support/TestSystem.h"
 #include "support/WithoutPrivileges.h"
 
@@ -9,7 +12,6 @@
 
 #include <cerrno>
 #include <fcntl.h>
-#include <optional>
 #include <sys/stat.h>
 #include <sys/statvfs.h>
 #include <unistd.h>
@@ -17,24 +19,8 @@
 namespace {
 
 namespace fs = std::filesystem;
-using testing::IsEmpty;
 using testing::UnorderedElementsAre;
-
-void setModified(const fs::path& path, double seconds)
-{
-    struct timespec times[2] = {};
-    for (struct timespec& time : times)
-        time.tv_sec = static_cast<std::time_t>(seconds);
-    ASSERT_EQ(::utimensat(AT_FDCWD, path.c_str(), times, AT_SYMLINK_NOFOLLOW), 0);
-}
-
-std::vector<std::string> namesIn(const fs::path& directory)
-{
-    std::vector<std::string> names;
-    for (const auto& entry : fs::directory_iterator(directory))
-        names.push_back(entry.path().filename());
-    return names;
-}
+using tests::setModified;
 
 class TheFilesOfThisMachine : public testing::Test {
 protected:
@@ -54,10 +40,32 @@ protected:
 TEST_F(TheFilesOfThisMachine, AreCreatedWhenTheyWereModifiedIfThatWasBeforeTheirBirth)
 {
     const fs::path file = directory.write("a.mp4", "a");
-    setModified(file, 1'500'000'000);
+    setModified(file, 1'500'000'000.25);
     const auto attributes = files.attributesOfItem(file).value();
-    EXPECT_EQ(attributes.creationDate, base::Date{1'500'000'000});
-    EXPECT_EQ(attributes.modificationDate, base::Date{1'500'000'000});
+    EXPECT_EQ(attributes.creationDate, base::Date{1'500'000'000.25});
+    EXPECT_EQ(attributes.modificationDate, base::Date{1'500'000'000.25});
+}
+
+TEST_F(TheFilesOfThisMachine, ArePutIntoDirectoriesThatTheUsersMaskMakesPrivate)
+{
+    const mode_t before = ::umask(0);
+    EXPECT_TRUE(files.createDirectory(directory.path() / "open"));
+    ::umask(077);
+    EXPECT_TRUE(files.createDirectory(directory.path() / "closed"));
+    ::umask(before);
+    EXPECT_EQ(fs::status(directory.path() / "open").permissions(), fs::perms(0777));
+    EXPECT_EQ(fs::status(directory.path() / "closed").permissions(), fs::perms(0700));
+    EXPECT_EQ(files.createDirectory(directory.path() / "open").error()->code(), EEXIST);
+}
+
+TEST_F(TheFilesOfThisMachine, AreFoundWithTheirSizeAndKind)
+{
+    const fs::path file = directory.write("a.mp4", "seven by");
+    EXPECT_TRUE(files.fileExists(file));
+    EXPECT_FALSE(files.fileExists(directory.path() / "b.mp4"));
+    EXPECT_EQ(files.attributesOfItem(file).value().size, 8);
+    EXPECT_FALSE(files.attributesOfItem(file).value().isDirectory);
+    EXPECT_TRUE(files.attributesOfItem(directory.path()).value().isDirectory);
 }
 
 TEST_F(TheFilesOfThisMachine, AreCreatedAtTheirBirthIfTheyWereModifiedLater)
@@ -155,92 +163,16 @@ TEST_F(TheFilesOfThisMachine, HaveTheFreeSpaceThatAUserWithoutPrivilegesCanWrite
                 expected / 10);
 }
 
-/// Two directories on different file systems, where this machine has two.
-class MovingAcrossFileSystems : public testing::Test {
-protected:
-    static constexpr const char* kOtherFileSystem = "/dev/shm";
-
-    tests::TestSystem machine;
-    tests::PrivateDirectory here;
-    std::optional<tests::PrivateDirectory> there;
-    xdg::FileManager files{machine.system, {}};
-
-    void SetUp() override
-    {
-        struct stat mine = {};
-        struct stat other = {};
-        ASSERT_EQ(::stat(here.path().c_str(), &mine), 0);
-        ASSERT_EQ(::stat(kOtherFileSystem, &other), 0) << "these tests need a second file system";
-        ASSERT_NE(mine.st_dev, other.st_dev) << "these tests need a TMPDIR outside " << kOtherFileSystem;
-        there.emplace(kOtherFileSystem);
+TEST_F(TheFilesOfThisMachine, AreNotMovedInAnotherWayWhereMovingFails)
+{
+    const fs::path from = directory.write("a.mp4", "new");
+    for (const int number : {EACCES, ENOSPC, EIO}) {
+        tests::whileRefusing({{SYS_renameat2, number}}, [&] {
+            EXPECT_EQ(files.moveItem(from, directory.path() / "b.mp4").error()->code(), number);
+        });
+        EXPECT_EQ(tests::PrivateDirectory::read(from), "new");
+        EXPECT_FALSE(fs::exists(directory.path() / "b.mp4"));
     }
-};
-
-TEST_F(MovingAcrossFileSystems, KeepsContentsDatesAndPermissions)
-{
-    const std::string contents(300'000, 'm');
-    const fs::path from = here.write("a.mp4", contents);
-    fs::permissions(from, fs::perms::owner_read | fs::perms::group_read);
-    setModified(from, 1'500'000'000);
-    const fs::path to = there->path() / "b.mp4";
-    ASSERT_TRUE(files.moveItem(from, to));
-    EXPECT_EQ(tests::PrivateDirectory::read(to), contents);
-    EXPECT_EQ(files.attributesOfItem(to).value().modificationDate, base::Date{1'500'000'000});
-    EXPECT_EQ(fs::status(to).permissions(), fs::perms::owner_read | fs::perms::group_read);
-    EXPECT_THAT(namesIn(here.path()), IsEmpty());
-    EXPECT_THAT(namesIn(there->path()), UnorderedElementsAre("b.mp4"));
-}
-
-TEST_F(MovingAcrossFileSystems, TakesWholeDirectoriesWithLinksAsLinks)
-{
-    here.write("d/deep/a", "a");
-    fs::create_symlink("deep/a", here.path() / "d/link");
-    fs::permissions(here.path() / "d/deep", fs::perms::owner_read | fs::perms::owner_exec);
-    setModified(here.path() / "d/deep", 1'500'000'000);
-    const auto moved = files.moveItem(here.path() / "d", there->path() / "d");
-    EXPECT_EQ(fs::status(there->path() / "d/deep").permissions(), fs::perms::owner_read | fs::perms::owner_exec);
-    for (const auto* directory : {&here, &*there})
-        if (fs::exists(directory->path() / "d/deep"))
-            fs::permissions(directory->path() / "d/deep", fs::perms::owner_all);
-    EXPECT_EQ(files.attributesOfItem(there->path() / "d/deep").value().modificationDate, base::Date{1'500'000'000});
-    EXPECT_EQ(fs::read_symlink(there->path() / "d/link"), "deep/a");
-    EXPECT_EQ(tests::PrivateDirectory::read(there->path() / "d/link"), "a");
-    // Only the super-user could empty the source, whose directory forbids it; the others keep both.
-    EXPECT_EQ(static_cast<bool>(moved), !fs::exists(here.path() / "d"));
-}
-
-TEST_F(MovingAcrossFileSystems, NeverReplacesAnything)
-{
-    const fs::path from = here.write("a.mp4", "new");
-    const fs::path to = there->write("a.mp4", "old");
-    EXPECT_EQ(files.moveItem(from, to).error()->code(), EEXIST);
-    EXPECT_EQ(tests::PrivateDirectory::read(to), "old");
-    EXPECT_EQ(tests::PrivateDirectory::read(from), "new");
-    EXPECT_THAT(namesIn(there->path()), UnorderedElementsAre("a.mp4"));
-}
-
-TEST_F(MovingAcrossFileSystems, LeavesNothingHalfDone)
-{
-    here.write("d/a", "a");
-    ASSERT_EQ(::mkfifo((here.path() / "d/pipe").c_str(), 0600), 0);
-    EXPECT_EQ(files.moveItem(here.path() / "d", there->path() / "d").error()->code(), EXDEV);
-    EXPECT_THAT(namesIn(there->path()), IsEmpty());
-    EXPECT_THAT(namesIn(here.path() / "d"), UnorderedElementsAre("a", "pipe"));
-}
-
-TEST_F(MovingAcrossFileSystems, FailsWhereThereIsNoSuchDirectory)
-{
-    const fs::path from = here.write("a.mp4", "new");
-    EXPECT_FALSE(files.moveItem(from, there->path() / "no/a.mp4"));
-    EXPECT_EQ(tests::PrivateDirectory::read(from), "new");
-}
-
-TEST_F(MovingAcrossFileSystems, TakesTheLongestNamesThatAFileCanHave)
-{
-    const std::string name(255, 'n');
-    const fs::path from = here.write(name, "a");
-    EXPECT_TRUE(files.moveItem(from, there->path() / name));
-    EXPECT_THAT(namesIn(there->path()), UnorderedElementsAre(name));
 }
 
 } // namespace
