@@ -64,12 +64,12 @@ std::string withoutDate(std::string_view appName)
                     R"([0-2]\d[-_.:]?[0-5]\d(?:[-_.:]?[0-5]\d)?(?:[-_.]\d{1,3})?(?:\s\(\d+\))?\s*$)",
                     G_REGEX_RAW, {}, nullptr);
     const std::string name(appName);
-    GMatchInfo* match = nullptr;
+    GMatchInfo* raw = nullptr;
+    const bool found = g_regex_match(date, name.c_str(), {}, &raw);
+    const std::unique_ptr<GMatchInfo, decltype(&g_match_info_free)> match(raw, &g_match_info_free);
     int start = 0;
-    const bool found =
-        g_regex_match(date, name.c_str(), {}, &match) && g_match_info_fetch_pos(match, 0, &start, nullptr);
-    g_match_info_free(match);
-    return found ? name.substr(0, static_cast<std::size_t>(start)) : name;
+    return found && g_match_info_fetch_pos(raw, 0, &start, nullptr) ? name.substr(0, static_cast<std::size_t>(start))
+                                                                    : name;
 }
 
 } // namespace

@@ -56,7 +56,6 @@ Bytes pngOf(platform::Bitmap bitmap, Texts texts)
         chunk.compression = PNG_TEXT_COMPRESSION_NONE;
         chunk.key = const_cast<char*>(key.c_str()); // it is only read
         chunk.text = text.data();
-        chunk.text_length = text.size();
         chunks.push_back(chunk);
     }
 

@@ -20,10 +20,9 @@ void VideoLibrary::performChanges(ChangeBlock changes, Completion completion)
         [this, changes = std::move(changes), completion = std::move(completion), work = m_works.begin()]() mutable {
             const auto performed = perform(changes, *work);
             completion(static_cast<bool>(performed), performed.error());
-            // What they hold may be all that keeps somebody's window open: the work ends after them.
+            // What they hold may be all that keeps somebody's window open: the work ends after them, with this.
             changes = nullptr;
             completion = nullptr;
-            work.reset();
         });
 }
 

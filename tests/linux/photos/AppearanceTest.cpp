@@ -12,6 +12,8 @@
 
 namespace {
 
+using testing::AllOf;
+using testing::Each;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
@@ -156,12 +158,21 @@ TEST_F(ASavedMovie, IsSavedAllTheSameWithoutAPicture)
 
 TEST_F(ASavedMovie, IsSavedAllTheSameWithAPictureThatIsNone)
 {
-    for (auto wrong : {picture(257, 10), picture(10, 257), platform::Bitmap{10, 10, {1, 2, 3}}, platform::Bitmap{}}) {
+    for (auto wrong : {picture(257, 10), picture(10, 257), platform::Bitmap{10, 10, {1, 2, 3}}, platform::Bitmap{},
+                       platform::Bitmap{0, 10, {}}, platform::Bitmap{10, 0, {}}}) {
         bitmap = wrong;
         EXPECT_TRUE(saveWithPicture().success);
     }
-    EXPECT_THAT(errors(), ElementsAre(HasSubstr("wrong size"), HasSubstr("wrong size"), HasSubstr("wrong size"),
-                                      HasSubstr("wrong size")));
+    EXPECT_THAT(errors(), AllOf(SizeIs(6), Each(HasSubstr("wrong size"))));
+    EXPECT_FALSE(fs::exists(thumbnails));
+}
+
+TEST_F(ASavedMovie, HasAThumbnailOfThePictureHoweverSmall)
+{
+    bitmap = picture(1, 1);
+    EXPECT_TRUE(saveWithPicture().success);
+    EXPECT_THAT(errors(), IsEmpty());
+    EXPECT_TRUE(fs::exists(thumbnail()));
 }
 
 TEST_F(ASavedMovie, IsSavedAllTheSameWhereNoThumbnailAndNoListCanBeWritten)

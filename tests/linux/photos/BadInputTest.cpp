@@ -3,6 +3,7 @@
 
 #include "linux/photos/LibraryFixture.h"
 #include "support/RefusedSystemCalls.h"
+#include "support/SystemCalls.h"
 #include "support/WithoutPrivileges.h"
 
 #include <csignal>
@@ -238,6 +239,21 @@ std::string wayName(const testing::TestParamInfo<std::tuple<bool, int>>& way)
 }
 
 INSTANTIATE_TEST_SUITE_P(Ways, AFullDisk, testing::Combine(testing::Bool(), testing::Range(0, 3)), &wayName);
+
+TEST_F(TheVideoLibraryRefuses, AMovieWhoseNameWouldNotLast)
+{
+    tests::systemCalls().flushing = [](int file) -> std::optional<ssize_t> {
+        struct stat status = {};
+        ::fstat(file, &status);
+        if (!S_ISDIR(status.st_mode))
+            return std::nullopt;
+        errno = EIO;
+        return -1;
+    };
+    const auto outcome = save();
+    tests::systemCalls() = {};
+    expectFailure(outcome, EIO);
+}
 
 TEST_F(TheVideoLibraryRefuses, BothMoviesWhenOnlyOneCanGetItsName)
 {

@@ -43,6 +43,9 @@ TEST(ALibraryName, HasTheExtensionOfTheMovieIfThatIsOne)
 {
     EXPECT_EQ(libraryName("A", kDate, "/a/b.webm").extension, ".webm");
     EXPECT_EQ(libraryName("A", kDate, "/a/b.MKV").extension, ".mkv");
+    EXPECT_EQ(libraryName("A", kDate, "/a/b.mpeg2").extension, ".mpeg2");
+    EXPECT_EQ(libraryName("A", kDate, "/a/b.matroska").extension, ".mp4");
+    EXPECT_EQ(libraryName("A", kDate, "/a/b.mpegts").extension, ".mp4") << "six letters are too many";
     EXPECT_EQ(libraryName("A", kDate, "/a/b").extension, ".mp4");
     EXPECT_EQ(libraryName("A", kDate, "/a.webm/b").extension, ".mp4");
     EXPECT_EQ(libraryName("A", kDate, "/a/.hidden").extension, ".mp4");
@@ -68,6 +71,8 @@ TEST(ALibraryName, KeepsWhatOtherLanguagesNeed)
     EXPECT_EQ(fileNameSafe("Überflieger 2"), "Überflieger 2");
     EXPECT_EQ(fileNameSafe("東方"), "東方");
     EXPECT_EQ(fileNameSafe("می\u200Cخواهم"), "می\u200Cخواهم");
+    EXPECT_EQ(fileNameSafe("👩\u200D💻"), "👩\u200D💻");
+    EXPECT_EQ(fileNameSafe("a\u200Eb\u200Bc"), "abc") << "these have no width, and join nothing";
 }
 
 TEST(ALibraryName, IsThereEvenIfTheAppHasNone)
@@ -88,6 +93,7 @@ TEST(ALibraryName, IsCutBetweenLettersWhenItIsTooLong)
         letters += "ü";
     EXPECT_EQ(fileNameSafe("a" + letters), "a" + letters.substr(0, 94));
     EXPECT_EQ(fileNameSafe(letters), letters.substr(0, 96));
+    EXPECT_EQ(fileNameSafe(std::string(94, 'a') + " bcd"), std::string(94, 'a') + " b") << "all of the room is used";
     EXPECT_EQ(fileNameSafe(std::string(95, 'a') + " bcd"), std::string(95, 'a')) << "no space is left at its end";
     EXPECT_LE(libraryName(letters, kDate, "a.webm").numbered(9999).size(), 143U) << "for encrypted directories";
 }

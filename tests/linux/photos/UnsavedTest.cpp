@@ -4,6 +4,7 @@
 #include "linux/photos/LibraryFixture.h"
 #include "linux/posix/FileDescriptor.h"
 #include "support/RefusedSystemCalls.h"
+#include "support/SystemCalls.h"
 
 #include <fcntl.h>
 #include <fstream>
@@ -33,6 +34,7 @@ protected:
         made.unsavedDirectories = {first, second};
         made.unsaved = [this](const base::ErrorRef& why, const base::Result<std::string>& path) {
             reasons.push_back(why->description());
+            EXPECT_THAT(errors(), testing::Not(IsEmpty())) << "the log has it first";
             if (path)
                 kept.push_back(path.value());
             else
@@ -122,6 +124,39 @@ TEST_F(UnsavedMovie, IsAsPrivateAsItWas)
     ASSERT_THAT(kept, SizeIs(2));
     for (const auto& each : kept)
         EXPECT_EQ(fs::status(each).permissions(), fs::perms(0600)) << each;
+}
+
+TEST_F(UnsavedMovie, IsOnTheDiskBeforeItsNameIs)
+{
+    const fs::path recorders = home.path() / "recording.mp4";
+    for (const bool recorderHasItToo : {false, true}) {
+        if (recorderHasItToo)
+            fs::create_hard_link(source, recorders);
+        std::vector<std::string> flushed;
+        tests::systemCalls().flushing = [&](int file) -> std::optional<ssize_t> {
+            const std::string open = fs::read_symlink("/proc/self/fd/" + std::to_string(file)).native();
+            flushed.push_back(open == source ? "the movie" : open == first ? "its place" : "a copy");
+            return std::nullopt;
+        };
+        saveKeeping();
+        tests::systemCalls() = {};
+        EXPECT_THAT(flushed, ElementsAre(recorderHasItToo ? "a copy" : "the movie", "its place"));
+        fs::remove_all(first);
+    }
+}
+
+TEST_F(UnsavedMovie, IsKeptWhereNamesCannotBeMadeToLast)
+{
+    tests::whileRefusing({{SYS_fsync, EINVAL}}, [&] { saveKeeping(); });
+    EXPECT_THAT(kept, ElementsAre((first / name).native()));
+}
+
+TEST_F(UnsavedMovie, ThatIsCopiedTakesThePlaceOfThoseThatWereNeverFinished)
+{
+    fs::create_hard_link(source, home.path() / "recording.mp4");
+    home.write(".local/share/clipsa/unsaved/.clipsa-1-2.part", "half");
+    saveKeeping();
+    EXPECT_THAT(namesIn(first), ElementsAre(name));
 }
 
 TEST_F(UnsavedMovie, IsKeptOnlyWhereThatWasAskedFor)
