@@ -216,6 +216,8 @@ TEST_F(Saving, AnEditorThatIsLetGoMeanwhileStaysUntilTheLibraryHasTheMovie)
     open();
     save();
     const std::weak_ptr<VKVideoEditorViewController> weak = editor;
+    editor->willMoveToParentViewController(nullptr);
+    editor->view()->removeFromSuperview();
     editor->removeFromParentViewController();
     editor.reset();
     fake->window->setRootViewController(nullptr);

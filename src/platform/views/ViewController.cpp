@@ -76,12 +76,10 @@ void ViewController::addChildViewController(const std::shared_ptr<ViewController
 {
     assertHere();
     assert(child && child.get() != this);
-    const auto previous = child->parent();
-    if (previous.get() == this)
+    if (child->parent().get() == this)
         return;
-    if (previous)
-        child->removeFromParentViewController();
     child->willMoveToParentViewController(this);
+    child->leaveParent();
     m_children.push_back(child);
     child->m_parent = weakSelf<ViewController>();
 }
@@ -90,12 +88,39 @@ void ViewController::removeFromParentViewController()
 {
     assertHere();
     const auto keepAlive = shared_from_this();
-    if (const auto former = parent()) {
-        std::erase_if(former->m_children,
-                      [this](const std::shared_ptr<ViewController>& each) { return each.get() == this; });
-        m_parent.reset();
+    if (parent()) {
+        assert(m_moving && !isViewInParents());
+        leaveParent();
         didMoveToParentViewController(nullptr);
     }
+}
+
+void ViewController::leaveParent()
+{
+    if (const auto former = parent())
+        std::erase_if(former->m_children,
+                      [this](const std::shared_ptr<ViewController>& each) { return each.get() == this; });
+    m_parent.reset();
+}
+
+bool ViewController::isViewInParents() const
+{
+    const auto above = parent();
+    return above && m_view && above->m_view && m_view->isDescendantOf(*above->m_view);
+}
+
+void ViewController::willMoveToParentViewController([[maybe_unused]] ViewController* parent)
+{
+    assertHere();
+    assert(!m_moving && (parent || isViewInParents()));
+    m_moving = true;
+}
+
+void ViewController::didMoveToParentViewController([[maybe_unused]] ViewController* parent)
+{
+    assertHere();
+    assert(m_moving && parent == this->parent().get() && (!parent || isViewInParents()));
+    m_moving = false;
 }
 
 void ViewController::viewWillTransitionToSize_withTransitionCoordinator(base::Size size,

@@ -46,13 +46,16 @@ public:
     bool isViewLoaded() const { return m_view != nullptr; }
     void setView(std::shared_ptr<View> view);
 
-    // Containment.
+    // Containment. A parent adds the child, puts its view among its own and then says that it did move; it says that it
+    // will move to none, takes the view out and then removes the child. Any other order fails an assertion.
     std::shared_ptr<ViewController> parent() const { return m_parent.lock(); }
     const std::vector<std::shared_ptr<ViewController>>& childViewControllers() const { return m_children; }
     void addChildViewController(const std::shared_ptr<ViewController>& child);
     void removeFromParentViewController();
-    virtual void willMoveToParentViewController(ViewController* /*parent*/) {}
-    virtual void didMoveToParentViewController(ViewController* /*parent*/) {}
+    /// Said to the child when it is added; its parent says that it will move to none. An override calls this.
+    virtual void willMoveToParentViewController(ViewController* parent);
+    /// Said to the child when it has been removed; its parent says that it did move. An override calls this.
+    virtual void didMoveToParentViewController(ViewController* parent);
 
     // Lifecycle.
     /// By default a plain view of flexible size.
@@ -79,8 +82,12 @@ public:
     static void endDisappearing(const std::vector<std::shared_ptr<ViewController>>& leaving);
 
 private:
+    bool isViewInParents() const;
+    void leaveParent();
+
     std::shared_ptr<View> m_view;
     std::weak_ptr<ViewController> m_parent;
+    bool m_moving = false; ///< between what it is told before and what after
     std::vector<std::shared_ptr<ViewController>> m_children;
     bool m_appeared = false;
 };

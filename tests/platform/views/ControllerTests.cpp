@@ -78,6 +78,33 @@ TEST_F(Controllers, AChildThatIsTakenOutDisappears)
     EXPECT_EQ(child->parent(), nullptr);
 }
 
+TEST_F(Controllers, AChildThatIsAddedToAnotherLeavesItsFormerParent)
+{
+    const auto other = controller("other");
+    contain(root, child);
+    taken();
+    contain(other, child);
+    EXPECT_THAT(taken(), ElementsAre("child willMove", "other didLoad", "child didMove"));
+    EXPECT_THAT(root->childViewControllers(), IsEmpty());
+    EXPECT_EQ(child->parent(), other);
+}
+
+#ifndef NDEBUG
+TEST_F(Controllers, AChildIsToldBeforeAndAfterAndMovesWithItsView)
+{
+    const auto moved = "m_moving";
+    EXPECT_DEATH(child->didMoveToParentViewController(root.get()), moved) << "it was not added";
+    root->addChildViewController(child);
+    EXPECT_DEATH(child->didMoveToParentViewController(root.get()), moved) << "its view is not there";
+    root->view()->addSubview(child->view());
+    EXPECT_DEATH(child->willMoveToParentViewController(nullptr), moved) << "it has not been told that it moved";
+    child->didMoveToParentViewController(root.get());
+    EXPECT_DEATH(child->removeFromParentViewController(), moved) << "it does not know";
+    child->willMoveToParentViewController(nullptr);
+    EXPECT_DEATH(child->removeFromParentViewController(), moved) << "its view is still there";
+}
+#endif
+
 TEST_F(Controllers, AChildAppearsWithAParentThatIsInNoWindow)
 {
     root->setAppeared(true);

@@ -69,10 +69,12 @@ public:
     void viewDidLayoutSubviews() override { ++layouts; }
     void willMoveToParentViewController(ViewController* parent) override
     {
+        ViewController::willMoveToParentViewController(parent);
         say(parent ? "willMove" : "willMoveToNothing");
     }
     void didMoveToParentViewController(ViewController* parent) override
     {
+        ViewController::didMoveToParentViewController(parent);
         say(parent ? "didMove" : "didMoveToNothing");
     }
     void viewWillTransitionToSize_withTransitionCoordinator(base::Size size,
