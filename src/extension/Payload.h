@@ -3,12 +3,11 @@
 
 #include "base/Url.h"
 #include "platform/views/Color.h"
-#include "runtime/Value.h"
 
 #include <mutex>
 #include <optional>
 #include <string>
-#include <string_view>
+#include <utility>
 
 struct PayloadValues {
     std::optional<std::string> bundleIdentifier;
@@ -31,10 +30,6 @@ public:
         const std::lock_guard lock(m_mutex);
         m_values.*member = std::move(value);
     }
-
-    /// Keeps `item` as the value that `title` names, and gives what there is then. A title that names none, and an item
-    /// of a kind that the value cannot be, change nothing.
-    PayloadValues store(std::string_view title, const runtime::Value& item);
 
 private:
     mutable std::mutex m_mutex;

@@ -1,8 +1,8 @@
 #include "extension/VKVideoEditorExtensionViewController.h"
 
+#include "extension/PayloadCollector.h"
 #include "extension/VKVideoEditorExtensionContext.h"
 
-#include <atomic>
 #include <utility>
 
 const runtime::Class& VKVideoEditorExtensionViewControllerFocusView::classObject()
@@ -77,29 +77,27 @@ void VKVideoEditorExtensionViewController::inputItemsFromClientWithCompletionHan
     log.message("VKVideoEditorExtensionViewController -inputItemsFromClientWithCompletionHandler:");
 
     // Shared by all loads of this call, which outlive it.
-    const auto slots = std::make_shared<Payload>();
-    // Set by a load that completes the required values; no use once the enumeration is over.
-    const auto stop = std::make_shared<std::atomic<bool>>(false);
+    const auto collector =
+        std::make_shared<PayloadCollector>([completion = std::move(completion)](const PayloadValues& values) {
+            completion(values.bundleIdentifier, values.appName, values.movieURL, values.fileAttachmentURL,
+                       values.overrideShareMessage, values.overrideTintColor);
+        });
     for (const platform::InputItem& item : extensionContext()->inputItems()) {
-        if (*stop)
+        // A load that completes the required values ends the enumeration, if that is still going on.
+        if (collector->hasAllRequired())
             break;
         if (item.attachments.empty()
             || !item.attachments.front()->hasItemConformingToTypeIdentifier(platform::kGenericDataType))
             continue;
         item.attachments.front()->loadItemForTypeIdentifier(
-            platform::kGenericDataType, [slots, stop, &log, completion, title = item.attributedTitle](
-                                            const runtime::Value& value, const base::ErrorRef& error) {
+            platform::kGenericDataType,
+            [collector, &log, title = item.attributedTitle](const runtime::Value& value, const base::ErrorRef& error) {
                 if (error) {
                     log.error("Error loading input item for type");
                     log.console(title + ": " + error->description());
                     return;
                 }
-                const PayloadValues values = slots->store(title, value);
-                if (!values.hasAllRequired())
-                    return;
-                completion(values.bundleIdentifier, values.appName, values.movieURL, values.fileAttachmentURL,
-                           values.overrideShareMessage, values.overrideTintColor);
-                *stop = true;
+                collector->collect(title, value);
             });
     }
 }

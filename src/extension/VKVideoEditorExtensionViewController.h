@@ -44,7 +44,8 @@ public:
     void tearDownChildViewControllers();
     /// Builds an editor from what is known by now. A former editor stays where it is.
     void setupVideoEditorController();
-    /// Returns at once. `completion` runs on the threads that load, each time when the three required values are there.
+    /// Returns at once. `completion` runs on the threads that load, whenever a load ends with the three required values
+    /// there: one call after the other, each with newer values than the one before.
     void inputItemsFromClientWithCompletionHandler(InputItemsCompletion completion);
 
     void videoEditor_didFinishWithActivityTypes(VKVideoEditorViewController& editor,

@@ -1,9 +1,21 @@
 // Appearing and disappearing, and what the host is told.
 #include "ExtensionFixture.h"
 
+#include <functional>
+
 namespace {
 
 class Extension : public ExtensionTest {};
+
+/// Tells of each line when it is written.
+class WatchedLog final : public base::Log {
+public:
+    void message(std::string_view text) override { onLine(text); }
+    void error(std::string_view text) override { onLine(text); }
+    void console(std::string_view text) override { onLine(text); }
+
+    std::function<void(std::string_view)> onLine;
+};
 
 } // namespace
 
@@ -66,17 +78,42 @@ TEST_F(Extension, AFailingCallToTheHostIsOnlyLogged)
     start();
     connection->failure = base::Error::make("test", 0x1'0000'0007, "no host");
     context->extensionObjectProxy()->extensionDidFinishWithActivityTypes(std::make_shared<ActivityTypes>());
-    EXPECT_TRUE(fake.machine.log.contains(base::MemoryLog::Line::Kind::Error, "error calling extension - 7"));
+    using Line = base::MemoryLog::Line;
+    const auto lines = fake.machine.log.lines();
+    ASSERT_GE(lines.size(), 2U);
+    EXPECT_EQ(lines[lines.size() - 2], (Line{Line::Kind::Error, "error calling extension - 7"}));
+    EXPECT_EQ(lines.back(), (Line{Line::Kind::Console, "no host"}));
 }
 
-TEST_F(Extension, TheLogTracesStartUpInOrder)
+TEST_F(Extension, EachLineOfTheLogComesBeforeWhatItTellsOf)
 {
+    std::vector<std::string> seen;
+    WatchedLog log;
+    log.onLine = [&](std::string_view text) {
+        const bool loading = providers.begin()->second->isLoading();
+        seen.push_back(std::string(text) + (loading ? ", loading" : "") + (editor() ? ", edited" : "")
+                       + (connection->messages.empty() ? "" : ", told"));
+    };
+    const base::System system{log, fake.machine.clock, fake.machine.mainQueue, fake.machine.backgroundQueue,
+                              fake.machine.defaultQueue};
+    const platform::Platform platform{system,     fake.notifications, fake.device, *fake.window, fake.images,
+                                      fake.files, fake.calendar,      fake.media,  fake.photos};
     offerRequired();
-    start();
-    EXPECT_EQ(fake.machine.log.texts(base::MemoryLog::Line::Kind::Message),
+    start(platform);
+    deliverRequired();
+    fake.machine.mainQueue.drain();
+    show();
+    editor()->doneAction();
+    fake.window->setVisible(false);
+    fake.window->setRootViewController(nullptr);
+    controller.reset();
+    EXPECT_EQ(seen,
               (std::vector<std::string>{
                   "VKVideoEditorExtensionViewController -setupChildViewControllers",
                   "VKVideoEditorExtensionViewController -inputItemsFromClientWithCompletionHandler:",
+                  "loaded input items, loading",
+                  "VKVideoEditorExtensionViewController -videoEditorViewDidFinishWithActivityTypes:, loading, edited",
+                  "VKVideoEditorExtensionViewController -viewDidDisappear:, loading, edited, told",
               }));
 }
 

@@ -30,9 +30,11 @@ public:
     }
 
     bool isLoading() const { return m_completion != nullptr; }
+    /// On the caller's thread.
+    void answer(const runtime::Value& item, const base::ErrorRef& error = nullptr) { m_completion(item, error); }
     void deliver(const runtime::Value& item, const base::ErrorRef& error = nullptr)
     {
-        std::thread([&] { m_completion(item, error); }).join();
+        std::thread([&] { answer(item, error); }).join();
     }
 
 private:
@@ -131,13 +133,14 @@ protected:
         providers.at(title)->deliver(item, error);
     }
     /// Starts as the runtime does, by the names of the declaration.
-    void start()
+    void start() { start(fake.platform); }
+    void start(const platform::Platform& platform)
     {
         VKVideoEditorExtensionContext::classObject();
         VKVideoEditorExtensionViewController::classObject();
         auto extension =
             platform::instantiateExtension({"VKVideoEditorExtensionContext", "VKVideoEditorExtensionViewController"});
-        extension.context->setUp(fake.platform, items, connection);
+        extension.context->setUp(platform, items, connection);
         context = std::dynamic_pointer_cast<VKVideoEditorExtensionContext>(extension.context);
         controller = std::dynamic_pointer_cast<VKVideoEditorExtensionViewController>(extension.principal);
         controller->view()->setFrame({{0, 0}, tests::FakePlatform::kPhone});

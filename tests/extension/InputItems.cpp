@@ -117,13 +117,38 @@ TEST_F(InputItems, AFailedItemIsLoggedAndDoesNotStopTheOthers)
 {
     offer(VKVideoEditorExtensionOverrideShareMessageKey);
     offerRequired();
+    offer(VKVideoEditorExtensionFileAttachmentKey);
+    offer(VKVideoEditorExtensionOverrideTintColorKey);
     start();
-    deliver(VKVideoEditorExtensionOverrideShareMessageKey, {}, base::Error::make("test", 7, "gone"));
+    const auto linesOf = [&](const std::string& title) {
+        return std::vector<base::MemoryLog::Line>{
+            {base::MemoryLog::Line::Kind::Error, "Error loading input item for type"},
+            {base::MemoryLog::Line::Kind::Console, title + ": gone"}};
+    };
+    const auto fails = [&](const std::string& title) {
+        const auto before = fake.machine.log.lines().size();
+        deliver(title, std::string("half of it"), base::Error::make("test", 7, "gone"));
+        const auto lines = fake.machine.log.lines();
+        return std::vector(lines.begin() + static_cast<std::ptrdiff_t>(before), lines.end());
+    };
+    EXPECT_EQ(fails(VKVideoEditorExtensionOverrideShareMessageKey),
+              linesOf(VKVideoEditorExtensionOverrideShareMessageKey));
     deliverRequired();
     fake.machine.mainQueue.drain();
-    EXPECT_TRUE(fake.machine.log.contains(base::MemoryLog::Line::Kind::Error, "Error loading input item for type"));
-    ASSERT_TRUE(editor());
+    const auto first = editor();
+    ASSERT_TRUE(first);
+
+    // What fails when all that is required is there brings no editor; what comes after it does.
+    EXPECT_EQ(fails(VKVideoEditorExtensionFileAttachmentKey), linesOf(VKVideoEditorExtensionFileAttachmentKey));
+    fake.machine.mainQueue.drain();
+    EXPECT_EQ(editor(), first);
+    EXPECT_EQ(fake.media.playerCount(), 1U);
+    deliver(VKVideoEditorExtensionOverrideTintColorKey, platform::Color{0, 1, 0, 1});
+    fake.machine.mainQueue.drain();
+    EXPECT_EQ(fake.media.playerCount(), 2U);
+    EXPECT_EQ(editor()->topToolBar()->tintColor(), (platform::Color{0, 1, 0, 1}));
     EXPECT_EQ(editor()->overrideShareMessage(), std::nullopt);
+    EXPECT_EQ(editor()->fileAttachmentURL(), std::nullopt);
 }
 
 TEST_F(InputItems, WithoutARequiredValueThePayloadBuildsNoEditor)
