@@ -1,5 +1,6 @@
 #include "support/TempMovieNames.h"
 
+#include <algorithm>
 #include <cstddef>
 
 namespace support {
@@ -31,12 +32,10 @@ std::string trimmedMovieName(std::string_view appName)
         const std::string_view substitute = substituteFor(byte);
         name += substitute.empty() ? std::string_view(&byte, 1) : substitute;
     }
-    if (name.size() > kLongestAppName) {
-        std::size_t end = kLongestAppName;
-        while (end > 0 && continuesCharacter(name[end]))
-            --end;
-        name.resize(end);
-    }
+    std::size_t end = std::min(name.size(), kLongestAppName);
+    while (end > 0 && continuesCharacter(name[end]))
+        --end;
+    name.resize(end);
     return name + "_";
 }
 

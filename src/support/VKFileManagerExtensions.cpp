@@ -1,5 +1,7 @@
 #include "support/VKFileManagerExtensions.h"
 
+#include <algorithm>
+#include <cmath>
 #include <cstdint>
 #include <limits>
 #include <string>
@@ -24,13 +26,9 @@ std::string pathOfEntry(platform::FileManager& manager, const std::string& name)
 std::int32_t truncated(double seconds)
 {
     using Limits = std::numeric_limits<std::int32_t>;
-    if (seconds != seconds)
+    if (std::isnan(seconds))
         return 0;
-    if (seconds >= static_cast<double>(Limits::max()))
-        return Limits::max();
-    if (seconds <= static_cast<double>(Limits::min()))
-        return Limits::min();
-    return static_cast<std::int32_t>(seconds);
+    return static_cast<std::int32_t>(std::clamp<double>(seconds, Limits::min(), Limits::max()));
 }
 
 /// Two of the log's lines print this, the low half of the error's address, where the others print its code.
@@ -113,16 +111,14 @@ std::int64_t _srDeleteFilesOlderThanTimeToLiveInSeconds(platform::FileManager& r
 
         // No number is older than nothing: comparisons with it fail, whatever the time to live.
         double age = std::numeric_limits<double>::quiet_NaN();
-        std::int64_t size = 0;
-        if (attributes) {
+        if (attributes)
             age = system.clock.date().timeIntervalSince(attributes.value().modificationDate);
-            size = attributes.value().size;
-        }
         if (timeToLive == 0.0 || age > timeToLive) {
             system.log.message("deleting old file");
             sticky.take(receiver.removeItem(path));
+            // Without an error the attributes were read, too.
             if (!sticky.error)
-                total += size;
+                total += attributes.value().size;
         }
     }
     return total;

@@ -4,8 +4,12 @@
 
 #include <gmock/gmock.h>
 
+#include <cerrno>
+#include <chrono>
 #include <optional>
+#include <string>
 #include <thread>
+#include <vector>
 
 namespace {
 
@@ -21,6 +25,7 @@ protected:
 
     tests::FakePlatform fake;
     int completions = 0;
+    std::vector<std::string> loggedByThen; ///< on the console, when the completion was called
     std::optional<Url> output;
     base::ErrorRef error;
     std::thread::id completedOn;
@@ -46,6 +51,7 @@ protected:
                 output = theOutput;
                 error = theError;
                 completedOn = std::this_thread::get_id();
+                loggedByThen = consoleLog();
             });
     }
     void mixMovie()
@@ -102,16 +108,29 @@ TEST_F(AudioMix, TheOutputIsNamedAfterTheSecondInTheTemporaryStore)
     EXPECT_FALSE(fake.files.holds(VKAudioMixUtility::tempFileURL(fake.platform).path()));
 }
 
-TEST_F(AudioMix, TwoCallsInOneSecondHaveTheSameOutput)
+TEST_F(AudioMix, TwoCallsInOneSecondHaveTheSameOutputSoThatTheSecondFails)
 {
     movieWithSoundTracks(1);
+    fake.machine.advance(std::chrono::milliseconds(1)); // the clock began with a second
     mixMovie();
     const auto first = fake.media.exportSession();
+    fake.machine.advance(std::chrono::milliseconds(998));
     mixMovie();
     const auto second = fake.media.exportSession();
-    EXPECT_NE(first, second);
+    ASSERT_NE(first, second);
     EXPECT_EQ(first->outputURL(), second->outputURL());
+    fake.machine.advance(std::chrono::milliseconds(1));
+    EXPECT_NE(VKAudioMixUtility::tempFileURL(fake.platform), first->outputURL()) << "the next second has its own";
+
     first->finish(ExportSession::Status::Completed);
+    EXPECT_EQ(output, first->outputURL());
+    fake.files.addFile(output->path(), 500);
+    second->finish(ExportSession::Status::Failed, base::Error::fromErrno(EEXIST, "create " + output->path()));
+    EXPECT_EQ(completions, 2);
+    EXPECT_EQ(output, std::nullopt);
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->code(), -5812);
+    EXPECT_TRUE(fake.files.holds(first->outputURL()->path())) << "what the first has made is not the second's";
 }
 
 TEST_F(AudioMix, SuccessGivesTheOutputAndNoError)
@@ -146,6 +165,7 @@ TEST_F(AudioMix, AFailedExportIsAnErrorOfTheSystemsOwn)
     ASSERT_TRUE(error);
     EXPECT_EQ(error->code(), -5812);
     EXPECT_THAT(consoleLog(), ElementsAre("VKAudioMixUtility: MovieWriterFailed"));
+    EXPECT_EQ(loggedByThen, consoleLog());
 }
 
 TEST_F(AudioMix, ACancelledExportIsTheSameErrorWithItsOwnLogLine)
@@ -156,6 +176,7 @@ TEST_F(AudioMix, ACancelledExportIsTheSameErrorWithItsOwnLogLine)
     ASSERT_TRUE(error);
     EXPECT_EQ(error->code(), -5812);
     EXPECT_THAT(consoleLog(), ElementsAre("VKAudioMixUtility: MovieWriterStatusCancelled"));
+    EXPECT_EQ(loggedByThen, consoleLog());
 }
 
 TEST_F(AudioMix, AMovieThatCannotBeOpenedIsStillHandedToTheExportWhichFails)

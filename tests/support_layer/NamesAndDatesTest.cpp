@@ -45,19 +45,30 @@ TEST(TheNameOfATemporaryMovie, HasNothingThatNoFileNameMayHave)
 {
     EXPECT_EQ(support::trimmedMovieName("AC/DC"), "AC\u2044DC_");
     EXPECT_EQ(support::trimmedMovieName(std::string("a\0b\nc\x7F", 6)), "a b c _");
+    EXPECT_EQ(support::trimmedMovieName("\x1F !~\x80"), "  !~\x80_") << "the last of those, and what is none";
     EXPECT_EQ(support::trimmedMovieName(".."), ".._");
     EXPECT_EQ(support::trimmedMovieName(""), "_");
 }
 
-TEST(TheNameOfATemporaryMovie, IsNoLongerThanFileSystemsTakeAndHasWholeLetters)
+TEST(TheNameOfATemporaryMovie, HasTwoHundredBytesOfTheAppsAtMostAndWholeLetters)
 {
-    std::string letters = "x";
-    for (int i = 0; i < 200; ++i)
-        letters += "ж";
-    const std::string name = support::tempMovieUrl(support::trimmedMovieName(letters), {1'700'000'000}).path();
-    EXPECT_LE(name.size(), 255U);
-    const std::string stem = support::trimmedMovieName(letters);
-    EXPECT_EQ(stem.substr(stem.size() - 3), "ж_");
+    const auto letters = [](std::string_view letter, int count) {
+        std::string text;
+        for (int i = 0; i < count; ++i)
+            text += letter;
+        return text;
+    };
+    EXPECT_EQ(support::trimmedMovieName(letters("x", 200)), letters("x", 200) + "_");
+    EXPECT_EQ(support::trimmedMovieName(letters("x", 201)), letters("x", 200) + "_");
+    // Letters of two, three and four bytes, with all kinds of continuations, cut at each of their bytes.
+    for (const std::string_view letter : {"\u0436", "\u0439", "\u20AC", "\uFFFD", "\U0001F3AC", "\U0001F3BF"})
+        for (std::size_t before = 0; before < letter.size(); ++before) {
+            SCOPED_TRACE(std::string(letter) + " behind " + std::to_string(before));
+            const std::string lead = letters("x", static_cast<int>(before));
+            const auto whole = static_cast<int>((200 - before) / letter.size());
+            EXPECT_EQ(support::trimmedMovieName(lead + letters(letter, 200)), lead + letters(letter, whole) + "_");
+        }
+    EXPECT_EQ(support::trimmedMovieName(letters("\x80", 201)), "_") << "no text at all";
 }
 
 TEST(TheTextOfADate, NeedsANewFormatterEveryTimeAndStaysInTheDevicesZone)

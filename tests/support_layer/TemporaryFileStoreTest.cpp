@@ -55,6 +55,22 @@ TEST_F(TemporaryFileStore, ItsSizeIsThatOfTheDirectoryEntryAndNotOfWhatItHolds)
     EXPECT_FALSE(error);
 }
 
+TEST_F(TemporaryFileStore, ItsSizeIsAskedOfTheSharedManager)
+{
+    tests::FakeFileManager shared{machine.system};
+    files.shared = &shared;
+    shared.addFile(kStore, 7);
+    files.addFile(kStore, 8);
+    EXPECT_EQ(_srSizeOfTempDir(files, nullptr), 7);
+    EXPECT_THAT(shared.calls, ElementsAre("attributes " + kStore));
+    EXPECT_THAT(files.calls, IsEmpty());
+
+    const base::ErrorRef scripted = shared.fail(FileOperation::Attributes, kStore, EACCES);
+    base::ErrorRef error;
+    EXPECT_EQ(_srSizeOfTempDir(files, &error), 0);
+    EXPECT_EQ(error, scripted);
+}
+
 TEST_F(TemporaryFileStore, ItsSizeIsNothingAndTheErrorIsPassedOnWhenItCannotBeRead)
 {
     const base::ErrorRef scripted = files.fail(FileOperation::Attributes, kStore, EACCES);
