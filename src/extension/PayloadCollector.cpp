@@ -33,10 +33,10 @@ void PayloadCollector::collect(std::string_view title, const runtime::Value& ite
     if (std::exchange(m_telling, true))
         return;
     while (!m_untold.empty()) {
-        const PayloadValues values = std::move(m_untold.front());
-        m_untold.pop_front();
+        const auto next = std::exchange(m_untold, {});
         lock.unlock();
-        m_tell(values);
+        for (const PayloadValues& values : next)
+            m_tell(values);
         lock.lock();
     }
     m_telling = false;

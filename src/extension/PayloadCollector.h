@@ -4,11 +4,11 @@
 #include "extension/Payload.h"
 #include "runtime/Value.h"
 
-#include <deque>
 #include <functional>
 #include <mutex>
 #include <string_view>
 #include <utility>
+#include <vector>
 
 class PayloadCollector {
 public:
@@ -32,6 +32,6 @@ private:
 
     mutable std::mutex m_mutex;
     PayloadValues m_values;
-    std::deque<PayloadValues> m_untold;
+    std::vector<PayloadValues> m_untold;
     bool m_telling = false;
 };

@@ -20,7 +20,8 @@ std::string_view substituteFor(char byte)
 {
     if (byte == '/')
         return "\u2044"; // looks the same
-    return static_cast<unsigned char>(byte) < 0x20 || byte == 0x7F ? " " : "";
+    const bool isControl = (byte & 0xE0) == 0 || byte == 0x7F;
+    return isControl ? " " : "";
 }
 
 } // namespace
