@@ -96,10 +96,12 @@ class Source:
         place = self.rangeOf(cursor)
         if cursor.kind not in CALLS or not place:
             return None
+        if "::" in self.textOf(*place).split("(")[0] and doesNothing(callOf(cursor)):
+            return None
         match = re.compile(rb"\s*;").match(self.bytes, place[1])
         text = self.textOf(*place)
         # What only says which thread we are on is no more than an assertion.
-        if not match or text.startswith(("static_cast<void>", "assert(")) or ".assertHere(" in text:
+        if not match or text.startswith("static_cast<void>") or re.match(r"(?:\w+(?:\.|->))?assert(?:Here)?\(", text):
             return None
         if cursor.kind == CursorKind.BINARY_OPERATOR and not re.search(r"[^=!<>]=[^=]", text):
             return None
@@ -233,9 +235,26 @@ def commute(first, second):
     """Whether these statements can as well stand the other way round: both put values into places of their own."""
     if not PLAIN.fullmatch(first) or not PLAIN.fullmatch(second):
         return False
-    one, other = (re.split(r"\(| = ", text, 1)[0] for text in (first, second))
+    one, other = (placeOf(text) for text in (first, second))
     # What is added to one thing is added in an order; but of handlers, each has events of its own.
-    return one != other or "addTarget" in one or bool(re.search(r"\b_?set\w*$", one))
+    return one != other or "addTarget" in first or bool(re.search(r"\b_?set\w*$", one))
+
+
+def placeOf(text):
+    """What a plain statement puts a value into: m_style, avTrimmer()->setDelegate; of what is added, the whole thing."""
+    place = re.match(r"((?:[\w.>:\-]|\(\)(?=->|\.))*)", text).group(1)
+    isWhole = text[len(place):].startswith(" = ") or re.search(r"\b_?set\w*$", place)
+    return place if isWhole else re.sub(r"(->|\.)\w+$", "", place)
+
+
+def doesNothing(call):
+    """Whether it is seen here that the called function has an empty body: a base class's call that is there to be
+    overridden."""
+    target = call.referenced.get_definition() if call is not None and call.referenced else None
+    if target is None or target.kind != CursorKind.CXX_METHOD:
+        return False
+    bodies = [child for child in target.get_children() if child.kind == CursorKind.COMPOUND_STMT]
+    return len(bodies) == 1 and not list(bodies[0].get_children())
 
 
 def oneLine(text):
