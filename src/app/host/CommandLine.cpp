@@ -130,7 +130,7 @@ base::Result<std::optional<TourCommand>> parseMovieCommand(Words words, bool isT
 
 base::Result<Command> parseOpen(Words words)
 {
-    auto command = parseMovieCommand(words, false);
+    auto command = parseMovieCommand(std::move(words), false);
     if (!command)
         return command.error();
     return command.value() ? Command(std::move(command.value()->open)) : Command(HelpCommand{});
@@ -138,7 +138,7 @@ base::Result<Command> parseOpen(Words words)
 
 base::Result<Command> parseTour(Words words)
 {
-    auto command = parseMovieCommand(words, true);
+    auto command = parseMovieCommand(std::move(words), true);
     if (!command)
         return command.error();
     if (!command.value())

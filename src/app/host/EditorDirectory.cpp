@@ -22,7 +22,7 @@ namespace {
 constexpr std::string_view kPrefix = "editor-";
 constexpr const char* kLock = "lock";
 constexpr const char* kSocket = "socket";
-constexpr time_t kDay = 24 * 60 * 60;
+constexpr time_t kDay = time_t(24) * 60 * 60;
 
 std::string environmentPath(const char* name)
 {

@@ -54,7 +54,7 @@ std::string length(double seconds)
     const auto whole = static_cast<long long>(seconds);
     if (whole < 60)
         return formatted("%.3f s", seconds);
-    return formatted("%lld:%02lld:%06.3f", whole / 3600, whole / 60 % 60, seconds - double(whole / 60 * 60));
+    return formatted("%lld:%02lld:%06.3f", whole / 3600, whole / 60 % 60, seconds - double(whole - whole % 60));
 }
 
 std::string aboutPicture(const ffmpeg::PictureFacts& facts)

@@ -172,7 +172,8 @@ bool DecodedFrame::renderMapped(SwsContext* context, std::uint8_t* bgra, std::pt
 
 bool DecodedFrame::render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int width, int height, Quality quality) const
 {
-    if (!bgra || width <= 0 || height <= 0 || width > kLargest || height > kLargest || bytesPerRow < width * 4)
+    if (!bgra || width <= 0 || height <= 0 || width > kLargest || height > kLargest
+        || bytesPerRow < std::ptrdiff_t(width) * 4)
         return false;
     const int flags = quality == Quality::Exact ? SWS_BICUBIC | SWS_ACCURATE_RND | SWS_FULL_CHR_H_INT : SWS_BILINEAR;
     const int scaledWidth = m_orientation.transpose ? height : width;
@@ -198,7 +199,7 @@ bool DecodedFrame::render(std::uint8_t* bgra, std::ptrdiff_t bytesPerRow, int wi
     if (hasAlpha(*m_picture)) {
         for (int y = 0; y < height; ++y)
             for (int x = 0; x < width; ++x)
-                bgra[y * bytesPerRow + x * 4 + 3] = 255;
+                bgra[y * bytesPerRow + std::ptrdiff_t(x) * 4 + 3] = 255;
     }
     return true;
 }

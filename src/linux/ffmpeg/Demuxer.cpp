@@ -136,7 +136,7 @@ int Demuxer::begin()
     opened->io_open = refuseToOpen;
     opened->interrupt_callback = {[](void* self) { return int(static_cast<Demuxer*>(self)->isCancelled()); }, this};
     opened->probesize = 4 << 20;
-    opened->max_analyze_duration = 2 * AV_TIME_BASE;
+    opened->max_analyze_duration = std::int64_t(2) * AV_TIME_BASE;
     opened->format_whitelist = av_strdup(kFormats);
     if (const int error = avformat_open_input(&opened, nullptr, nullptr, nullptr); error < 0)
         return error; // it freed the context
