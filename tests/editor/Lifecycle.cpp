@@ -280,4 +280,6 @@ TEST_F(Lifecycle, CommaAndPeriodGoPictureByPicture)
     EXPECT_TRUE(player().isPlaying());
     EXPECT_NEAR(press(Key::Period), 2, 1e-9);
     EXPECT_FALSE(player().isPlaying());
+    EXPECT_EQ(bottom(), (Items{editor->shareButton(), editor->flexSpace(), editor->playButton(), editor->flexSpace()}))
+        << "the bar says so, too";
 }

@@ -67,6 +67,22 @@ TEST_F(Playback, ADurationThatComesBeforeTheStatusWaitsForItAndIsTakenOnce)
     EXPECT_EQ(editor->editEndTime(), 7);
 }
 
+TEST_F(Playback, AStatusThatIsToldAloneOrADurationThatIsMakesTheItemReady)
+{
+    fake->media.movies.clear();
+    open();
+    fake->media.item()->learnDuration(10);
+    fake->media.item()->learnThatItIsReady();
+    EXPECT_TRUE(editor->currentItemLoaded()) << "of the status";
+
+    editor->reloadAVLayerWithURL(base::Url::fromPath(kMovie));
+    fake->media.item()->learnThatItIsReady();
+    EXPECT_FALSE(editor->currentItemLoaded());
+    fake->media.item()->learnDuration(4);
+    EXPECT_TRUE(editor->currentItemLoaded()) << "of the duration";
+    EXPECT_EQ(editor->editEndTime(), 4);
+}
+
 TEST_F(Playback, ChangesOfOtherObjectsAndKeysAreNotTheEditors)
 {
     fake->media.movies.clear();
@@ -256,9 +272,56 @@ TEST_F(Playback, ReloadingEndsTrimModeFirst)
     EXPECT_EQ(top(), phoneTop(editor->doneButton(), editor->saveButton()));
 }
 
-TEST_F(Playback, WithoutAPlayersTimescaleATimeIsInvalidAndChangesNothing)
+TEST_F(Playback, ThePlayHeadFollowsTheNewMovieToo)
 {
-    open(std::nullopt);
+    open();
+    fake->media.movies["/other.mp4"] = tests::FakeMovie::lasting(4);
+    editor->reloadAVLayerWithURL(base::Url::fromPath("/other.mp4"));
+    settle();
+    editor->playAction();
+    player().advance(1.5);
+    EXPECT_NEAR(editor->avTrimmer()->value(), 1.5, 1.0 / 30 + 1e-6);
+}
+
+TEST_F(Playback, ThePlayHeadMovesThirtyTimesASecond)
+{
+    open();
+    std::vector<double> places;
+    editor->playAction();
+    for (int i = 0; i < 600; ++i) {
+        player().advance(1.0 / 600);
+        if (places.empty() || editor->avTrimmer()->value() != places.back())
+            places.push_back(editor->avTrimmer()->value());
+    }
+    EXPECT_EQ(places.size(), 30U + 1) << "with the one where it stood";
+}
+
+TEST_F(Playback, PlacesAreSoughtInTheTimescaleOfThePlayersTime)
+{
+    open();
+    editor->movieScrubber_valueDidChange(*editor->avTrimmer(), 1.0 / 3);
+    EXPECT_EQ(player().seeks().back().value, 200);
+    EXPECT_EQ(player().seeks().back().timescale, 600);
+}
+
+TEST_F(Playback, APlaceThatIsNoNumberIsSoughtAsAnInvalidTimeAndChangesNothing)
+{
+    open();
+    editor->movieScrubber_valueDidChange(*editor->avTrimmer(), 3);
     editor->movieScrubber_valueDidChange(*editor->avTrimmer(), std::nan(""));
-    EXPECT_EQ(player().currentTime(), MediaTime::zero());
+    EXPECT_FALSE(player().seeks().back().isValid());
+    EXPECT_NEAR(player().currentTime().seconds(), 3, 1e-9);
+}
+
+TEST_F(Playback, WithoutAPlayersTimescaleATimeIsInvalid)
+{
+    open();
+    trimFrom(2, 5);
+    const auto kept = editor->avPlayer();
+    editor->setAvPlayer(nullptr);
+    editor->trimVideo();
+    editor->setAvPlayer(kept);
+    ASSERT_TRUE(fake->media.exportSession()->timeRange);
+    EXPECT_FALSE(fake->media.exportSession()->timeRange->start.isValid());
+    EXPECT_FALSE(fake->media.exportSession()->timeRange->duration.isValid());
 }

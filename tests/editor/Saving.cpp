@@ -5,7 +5,9 @@
 
 #include <gmock/gmock.h>
 
+#include <functional>
 #include <thread>
+#include <tuple>
 
 namespace {
 
@@ -14,6 +16,7 @@ using platform::ExportSession;
 using platform::kActivityTypeSaveToCameraRoll;
 using testing::Contains;
 using testing::ElementsAre;
+using testing::ElementsAreArray;
 using testing::IsEmpty;
 using testing::Not;
 using testing::Optional;
@@ -115,13 +118,27 @@ TEST_F(Saving, WhileTheShareSheetIsUpNothingHappensAndNothingIsListed)
 TEST_F(Saving, WhileTrimmingTheTrimIsAppliedNothingIsSavedAndEditingGoesOn)
 {
     open();
-    editor->setTrimming(true);
+    trimFrom(2, 5);
     save();
     EXPECT_THAT(done(), ElementsAre(kActivityTypeSaveToCameraRoll));
     ASSERT_TRUE(fake->media.exportSession());
     EXPECT_FALSE(fake->media.exportSession()->audioMix) << "a trim, not a mix";
+    const auto trimmed = editor->trimFilePath();
+    fake->media.movies[trimmed->path()] = tests::FakeMovie::lasting(3);
     mixEnds(ExportSession::Status::Completed);
     EXPECT_THAT(fake->photos.urls, IsEmpty());
+    EXPECT_THAT(delegate->finishes, IsEmpty());
+    EXPECT_THAT(done(), ElementsAre(kActivityTypeSaveToCameraRoll));
+
+    EXPECT_EQ(editor->videoURL(), trimmed);
+    editor->playAction();
+    player().advance(2);
+    EXPECT_TRUE(player().isPlaying());
+    EXPECT_NEAR(editor->avTrimmer()->value(), 2, 0.05);
+    trimFrom(1, 2);
+    save();
+    EXPECT_EQ(fake->media.exportSessionCount(), 2U);
+    EXPECT_EQ(fake->media.exportSession()->asset->url(), trimmed);
     EXPECT_THAT(delegate->finishes, IsEmpty());
 }
 
@@ -200,15 +217,72 @@ TEST_F(Saving, TheLibraryReadsTheMoviesPlaceWhenItsBlockRuns)
 TEST_F(Saving, NoButtonIsDisabledMeanwhileAndNothingElseChanges)
 {
     open();
-    const auto before = top();
+    editor->playAction();
+    editor->showUI();
+    const auto whole = [this] {
+        std::vector<std::tuple<std::shared_ptr<platform::View>, bool, bool, double>> views;
+        const std::function<void(const std::shared_ptr<platform::View>&)> add = [&](const auto& view) {
+            views.emplace_back(view, view->accessibility().enabled, view->isUserInteractionEnabled(), view->alpha());
+            for (const auto& each : view->subviews())
+                add(each);
+        };
+        fake->window->commit();
+        add(fake->window);
+        return views;
+    };
+    const auto before = whole();
     save();
-    EXPECT_EQ(top(), before);
-    EXPECT_TRUE(editor->respondsTo(runtime::Selector("saveAction")));
+    EXPECT_THAT(whole(), ElementsAreArray(before));
     EXPECT_FALSE(editor->isExporting());
     mixEnds(ExportSession::Status::Completed);
-    EXPECT_EQ(top(), before);
+    EXPECT_THAT(whole(), ElementsAreArray(before));
+    tap(editor->saveButton()->view());
+    EXPECT_EQ(fake->media.exportSessionCount(), 2U) << "also this one is answered";
+    mixEnds(ExportSession::Status::Completed);
     libraryEnds();
-    EXPECT_EQ(top(), before);
+    EXPECT_THAT(whole(), ElementsAreArray(before)) << "but for what closing does";
+}
+
+TEST_F(Saving, WhatTheLibraryTellsIsHeardOnTheMainQueuesNextTurn)
+{
+    open();
+    save();
+    mixEnds(ExportSession::Status::Completed);
+    std::thread([this] { fake->photos.fail(base::Error::make("posix", 28, "The disk is full.")); }).join();
+    EXPECT_THAT(errors(), IsEmpty());
+    EXPECT_THAT(delegate->finishes, IsEmpty());
+    settle();
+    EXPECT_THAT(errors(), ElementsAre("Error writing video to camera roll: 28"));
+    EXPECT_EQ(delegate->finishes.size(), 1U);
+}
+
+TEST_F(Saving, TheLogSaysSoBeforeTheListDoes)
+{
+    struct Witness final : base::Log {
+        std::function<void(std::string_view)> heard;
+        void message(std::string_view text) override { heard(text); }
+        void error(std::string_view) override {}
+        void console(std::string_view) override {}
+    } log;
+    const auto& system = fake->machine.system;
+    const base::System heard{log, system.clock, system.mainQueue, system.backgroundQueue, system.defaultQueue};
+    const auto& roles = fake->platform;
+    const platform::Platform platform{heard,       roles.notifications, roles.device, roles.mainScreen, roles.images,
+                                      roles.files, roles.calendar,      roles.media,  roles.photos};
+    std::vector<std::size_t> listed;
+    log.heard = [&](std::string_view text) {
+        if (text == "saveAction")
+            listed.push_back(editor->activityTypes()->size());
+    };
+    editor = VKVideoEditorViewController::initWithBundleIdentifier_URL_applicationName(platform, {},
+                                                                                       Url::fromPath(kMovie), {});
+    editor->setTrimming(true);
+    editor->saveAction();
+    EXPECT_THAT(listed, ElementsAre(0));
+    EXPECT_THAT(done(), ElementsAre(kActivityTypeSaveToCameraRoll));
+    fake->media.exportSession()->finish(ExportSession::Status::Cancelled);
+    settle();
+    editor.reset();
 }
 
 TEST_F(Saving, AnEditorThatIsLetGoMeanwhileStaysUntilTheLibraryHasTheMovie)

@@ -20,6 +20,14 @@ TEST_F(Scrubber, TimestampsAreEvenlySpacedAndStopAtTheMoviesEnd)
     EXPECT_EQ(stamps(10, 0, 20), (std::vector<double>{0, 2, 4, 6, 8, 10, 12, 14}));
 }
 
+TEST_F(Scrubber, TimestampsStopAtTheirCountAndOneAtTheVeryEndCounts)
+{
+    open();
+    EXPECT_EQ(stamps(5, 0, 10), (std::vector<double>{0, 2, 4, 6, 8}));
+    EXPECT_EQ(stamps(3, 1, 4), (std::vector<double>{1, 2, 3}));
+    EXPECT_EQ(stamps(6, 0, 12), (std::vector<double>{0, 2, 4, 6, 8, 10}));
+}
+
 TEST_F(Scrubber, AnEndOfZeroGivesOneTimestampAndACountOfZeroNone)
 {
     open();
@@ -59,18 +67,27 @@ TEST_F(Scrubber, UndoDoesNothingWhileExporting)
 
 TEST_F(Scrubber, MovingAHandlePausesSeeksLaterAndLeavesTheBarsAsTheyWere)
 {
-    open();
-    editor->playAction();
-    const auto before = bottom();
-    const auto seeks = player().seeks().size();
-    editor->movieScrubber_editingStartValueDidChange(*editor->avTrimmer(), 3);
-    EXPECT_FALSE(player().isPlaying());
-    EXPECT_TRUE(editor->isTrimming());
-    EXPECT_EQ(editor->editStartTime(), 3);
-    EXPECT_EQ(player().seeks().size(), seeks);
-    EXPECT_EQ(bottom(), before);
-    fake->machine.drain();
-    EXPECT_NEAR(player().seeks().back().seconds(), 3, 1e-9);
+    for (const bool isStart : {true, false}) {
+        SCOPED_TRACE(isStart);
+        makePlatform(tests::FakePlatform::kPhone);
+        open();
+        editor->playAction();
+        const auto before = bottom();
+        const auto seeks = player().seeks().size();
+        if (isStart)
+            editor->movieScrubber_editingStartValueDidChange(*editor->avTrimmer(), 3);
+        else
+            editor->movieScrubber_editingEndValueDidChange(*editor->avTrimmer(), 3);
+        EXPECT_FALSE(player().isPlaying());
+        EXPECT_TRUE(editor->isTrimming());
+        EXPECT_EQ(editor->editStartTime(), isStart ? 3 : 0);
+        EXPECT_EQ(editor->editEndTime(), isStart ? 10 : 3);
+        EXPECT_EQ(player().seeks().size(), seeks);
+        EXPECT_EQ(bottom(), before);
+        fake->machine.drain();
+        EXPECT_NEAR(player().seeks().back().seconds(), 3, 1e-9);
+        close();
+    }
 }
 
 TEST_F(Scrubber, ATurnedTrackGivesAnUprightSize)
@@ -81,6 +98,21 @@ TEST_F(Scrubber, ATurnedTrackGivesAnUprightSize)
     open();
     EXPECT_EQ(editor->getVideoSize(), (base::Size{1080, 1920}));
     EXPECT_DOUBLE_EQ(editor->movieScrubberThumbnailAspectRatio(*editor->avTrimmer()), 0.5625);
+}
+
+TEST_F(Scrubber, OnlyAMovieThatIsWideAndHighHasAnAspectRatioOfItsOwn)
+{
+    const auto ratioOf = [this](base::Size size) {
+        close();
+        makePlatform(tests::FakePlatform::kPhone);
+        fake->media.movies[kMovie] = tests::FakeMovie::lasting(10, size);
+        open();
+        return editor->movieScrubberThumbnailAspectRatio(*editor->avTrimmer());
+    };
+    EXPECT_EQ(ratioOf({0, 100}), 1);
+    EXPECT_EQ(ratioOf({100, 0}), 1);
+    EXPECT_EQ(ratioOf({1, 2}), 0.5);
+    EXPECT_EQ(ratioOf({2, 1}), 2);
 }
 
 TEST_F(Scrubber, AMovieWithoutAPictureHasNoSizeAndAnAspectRatioOfOne)

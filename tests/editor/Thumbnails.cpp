@@ -39,6 +39,8 @@ TEST_F(Thumbnails, TheStripOfALoadedMovieIsAskedForOneByOne)
     ASSERT_EQ(generator()->requests.size(), timestamps.size());
     for (std::size_t i = 0; i < timestamps.size(); ++i)
         EXPECT_NEAR(generator()->requests[i].time.seconds(), timestamps[i], 1e-9);
+    for (const auto& request : generator()->requests)
+        EXPECT_EQ(request.time.timescale, 1'000'000'000) << "so that it is not before the picture that it means";
     EXPECT_EQ(generator()->asset, editor->avPlayerItem()->asset());
     EXPECT_EQ(generator(), editor->thumbnailGenerator());
     EXPECT_EQ(fake->media.imageGeneratorCount(), 1U);

@@ -34,6 +34,30 @@ TEST_F(TrimMode, LeavingTheModeKeepsTheRange)
     EXPECT_EQ(fake->media.exportSessionCount(), 0U);
 }
 
+TEST_F(TrimMode, TheHandlesGoBackToTheEndsAnimated)
+{
+    open();
+    editor->avTrimmer()->moveHandle(platform::ScrubberHandle::Start, 4);
+    settle();
+    const auto handle = editor->avTrimmer()->startHandle();
+    const base::Rect before = handle->frame();
+    handle->takeAnimations();
+    editor->undoAction();
+    EXPECT_LT(handle->frame().minX(), before.minX());
+    const auto animations = handle->takeAnimations();
+    ASSERT_EQ(animations.size(), 1U);
+    EXPECT_EQ(animations.front().fromFrame, before);
+    EXPECT_EQ(animations.front().duration, platform::MovieScrubber::kFrameDuration);
+}
+
+TEST_F(TrimMode, ThePhonesLowerBarHoldsPlayAloneInTheMode)
+{
+    open();
+    editor->playAction();
+    trimFrom(2, 5);
+    EXPECT_EQ(bottom(), (Items{editor->flexSpace(), editor->playButton(), editor->flexSpace()}));
+}
+
 TEST_F(TrimMode, TheConfirmButtonConfirms)
 {
     open();

@@ -6,7 +6,8 @@
 
 #include <gmock/gmock.h>
 
-#include <atomic>
+#include <chrono>
+#include <future>
 #include <thread>
 
 using base::MediaTime;
@@ -148,19 +149,64 @@ TEST_F(Trimming, AnExportIsToldOfOnceTheMainQueueHasShownIt)
 {
     open();
     confirm(2, 5);
-    std::atomic<bool> told = false;
+    // On the main queue already there is nobody to wait for.
+    session()->finish(ExportSession::Status::Completed);
+    EXPECT_FALSE(editor->isExporting());
+    EXPECT_FALSE(editor->isTrimming());
+    EXPECT_EQ(editor->videoURL(), editor->trimFilePath());
+}
+
+TEST_F(Trimming, AnExportsThreadWaitsUntilTheMainQueueHasShownTheMovie)
+{
+    open();
+    confirm(2, 5);
+    std::thread::id shower;
+    fake->media.listener->heard = [&](const std::string& call) {
+        if (call.starts_with("asset "))
+            shower = std::this_thread::get_id();
+    };
+    std::promise<bool> stillExporting;
+    auto told = stillExporting.get_future();
     std::thread worker([&, running = session()] {
         running->finish(ExportSession::Status::Completed);
-        told = true;
+        stillExporting.set_value(editor->isExporting());
     });
-    EXPECT_TRUE(tests::waitUntil(fake->machine.mainQueue, [&] {
-        EXPECT_TRUE(!told || !editor->isExporting()) << "the session's thread waits for the main queue";
-        return !editor->isExporting();
-    }));
+    EXPECT_TRUE(tests::waitUntil(fake->machine.mainQueue,
+                                 [&] { return told.wait_for(std::chrono::seconds(0)) == std::future_status::ready; }));
     worker.join();
+    EXPECT_FALSE(told.get());
+    EXPECT_EQ(shower, std::this_thread::get_id());
+    fake->media.listener->heard = {};
     settle();
-    EXPECT_EQ(editor->videoURL(), editor->trimFilePath());
-    EXPECT_FALSE(editor->isTrimming());
+}
+
+TEST_F(Trimming, ClosingWhileATrimRunsTellsTheHostAndLetsItRunToItsEnd)
+{
+    fake->files.addDirectory("/private/var/mobile/Library/Velkor");
+    open();
+    confirm(2, 5);
+    const auto running = session();
+    const std::string trimmed = editor->trimFilePath()->path();
+    editor->doneAction();
+    ASSERT_EQ(delegate->finishes.size(), 1U);
+    EXPECT_EQ(*delegate->finishes.front(), ActivityTypes{platform::kActivityTypeSaveToCameraRoll});
+    EXPECT_TRUE(running->isRunning());
+    EXPECT_FALSE(running->wasCancelled);
+    EXPECT_TRUE(editor->isExporting());
+    EXPECT_TRUE(editor->isTrimming());
+
+    const std::weak_ptr<VKVideoEditorViewController> gone = editor;
+    editor.reset();
+    fake->window->setRootViewController(nullptr);
+    container.reset();
+    settle();
+    EXPECT_FALSE(gone.expired());
+    fake->files.addFile(trimmed, 100);
+    running->finish(ExportSession::Status::Completed);
+    settle();
+    EXPECT_TRUE(gone.expired());
+    EXPECT_FALSE(fake->files.holds(trimmed)) << "the end of the editor removes what came late, too";
+    EXPECT_EQ(delegate->finishes.size(), 1U);
 }
 
 TEST_F(Trimming, AFailureIsLoggedAndEverythingStaysAsItWas)
