@@ -173,6 +173,7 @@ def judge(found, count, runner, top, jobs, begin):
             done += 1
             if not each.result():
                 survivors.append((running[each], each.result()))
+                say(describe(running[each], top))  # at once: the rest can take long
             if done % 100 == 0:
                 say(f"{done} of {len(found)}, {len(survivors)} survive")
     survivors.sort(key=lambda each: (each[0].path, each[0].line))

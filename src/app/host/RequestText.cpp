@@ -48,7 +48,7 @@ std::string safeFileName(std::string_view name, std::string_view fallback)
     name.remove_prefix(name.rfind('/') + 1);
     // What does not fit goes from the stem: the extension says what kind of file it is.
     const std::size_t dot = name.rfind('.');
-    const bool hasExtension = dot != std::string_view::npos && dot > 0 && name.size() - dot <= 16;
+    const bool hasExtension = dot != std::string_view::npos && name.size() - dot <= 16;
     const auto plain = [](std::string_view character) {
         return isControl(character.front()) ? std::string_view("_") : character;
     };

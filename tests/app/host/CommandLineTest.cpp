@@ -111,4 +111,53 @@ TEST(CommandLine, SetsHowLongTheServiceStays)
     EXPECT_EQ(service({"service", "--idle-seconds=0"}), 0);
 }
 
+TEST(CommandLine, TakesEveryValueThatAnOptionCanHave)
+{
+    const auto arguments = [](const Words& words) { return open(words).editorArguments; };
+    EXPECT_THAT(arguments({"open", "m", "--device=phone"}), ElementsAre("--device", "phone"));
+    EXPECT_THAT(arguments({"open", "m", "--home-button", "yes"}), ElementsAre("--home-button", "yes"));
+    EXPECT_THAT(arguments({"open", "m", "--graphics-quality", "0"}), ElementsAre("--graphics-quality", "0"));
+    EXPECT_THAT(arguments({"open", "m", "--graphics-quality", "2147483647"}),
+                ElementsAre("--graphics-quality", "2147483647"));
+    EXPECT_THAT(refusal({"open", "m", "--graphics-quality", "2147483648"}), HasSubstr("is a number"));
+    EXPECT_THAT(arguments({"open", "--verbose", "m"}), ElementsAre("--verbose"));
+    EXPECT_THAT(refusal({"open", "m", "--verbose=yes"}), HasSubstr("--verbose takes no value"));
+    EXPECT_EQ(open({"open", "m", "--message", std::string(1024 * 1024, 'x')}).message->size(), 1024U * 1024)
+        << "as long as a text may be";
+}
+
+TEST(CommandLine, TakesATourOfAMovieIntoADirectory)
+{
+    const auto command = host::parseCommandLine({"tour", "m", "--output", "d", "--app-name", "Racer"});
+    ASSERT_TRUE(command) << command.error()->description();
+    const auto& tour = std::get<host::TourCommand>(command.value());
+    EXPECT_EQ(tour.open.movie, "m");
+    EXPECT_EQ(tour.open.appName, "Racer");
+    EXPECT_EQ(tour.output, "d");
+    EXPECT_EQ(refusal({"tour", "m", "--output=d"}), "(accepted)");
+    EXPECT_THAT(refusal({"tour", "--output", "d"}), HasSubstr("tour needs a movie"));
+    EXPECT_THAT(refusal({"tour", "m"}), HasSubstr("tour needs --output DIR"));
+    EXPECT_THAT(refusal({"tour", "m", "--output"}), HasSubstr("--output needs a value"));
+    EXPECT_THAT(refusal({"tour", "m", "--output", "d", "--json"}), HasSubstr("not --json"));
+    EXPECT_THAT(refusal({"tour", "m", "--output", "d", "--tint", "red"}), HasSubstr("--tint is a colour"));
+    EXPECT_THAT(refusal({"open", "m", "--output", "d"}), HasSubstr("no option --output"));
+}
+
+TEST(CommandLine, LeavesTheMediaCommandsToTheirOwn)
+{
+    EXPECT_TRUE(std::holds_alternative<host::MediaCommand>(host::parseCommandLine({"probe", "m"}).value()));
+    for (const Words& words : {Words{"probe", "-h"}, Words{"tour", "-h"}, Words{"service", "-h"}})
+        EXPECT_TRUE(std::holds_alternative<host::HelpCommand>(host::parseCommandLine(words).value()));
+    EXPECT_THAT(refusal({"probe"}), HasSubstr("probe needs a movie"));
+    EXPECT_THAT(refusal({"service", "--idle-seconds"}), HasSubstr("--idle-seconds needs a value"));
+}
+
+TEST(CommandLine, TakesNothingForAnOptionBehindTwoDashes)
+{
+    EXPECT_EQ(open({"open", "--json", "--", "--tint=red"}).movie, "--tint=red");
+    EXPECT_EQ(open({"open", "m", "--"}).movie, "m");
+    EXPECT_EQ(open({"open", "--", "--"}).movie, "--");
+    EXPECT_THAT(refusal({"open", "--", "a", "-h"}), HasSubstr("both a and -h"));
+}
+
 } // namespace

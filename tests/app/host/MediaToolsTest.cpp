@@ -65,12 +65,19 @@ TEST(Thumbnails, AreSpacedEvenlyFromTheStart)
     EXPECT_EQ(times[0], base::MediaTime::make(0, 1));
     EXPECT_EQ(times[3], base::MediaTime::make(7500, 1000));
     EXPECT_EQ(host::evenlySpaced(base::MediaTime::indefinite(), 2)[1], base::MediaTime::zero());
+    EXPECT_EQ(host::evenlySpaced(base::MediaTime::make(-5, 1), 2)[1], base::MediaTime::zero());
+    // Never behind the place: thousandths are rounded down.
+    const auto thirds = host::evenlySpaced(base::MediaTime::make(20, 1), 3);
+    EXPECT_EQ(thirds[1], base::MediaTime::make(6'666, 1000));
+    EXPECT_EQ(thirds[2], base::MediaTime::make(13'333, 1000));
+    EXPECT_EQ(thirds[1].timescale, 1000);
 }
 
 TEST(Thumbnails, AreNamedByPlaceAndTime)
 {
     EXPECT_EQ(host::thumbnailName(7, 100, base::MediaTime::make(90'500, 1000)), "07_00-01-30.500.png");
     EXPECT_EQ(host::thumbnailName(0, 1, base::MediaTime::make(0, 1000)), "0_00-00-00.000.png");
+    EXPECT_EQ(host::thumbnailName(9, 11, base::MediaTime::make(3'599'999, 1000)), "09_00-59-59.999.png");
     EXPECT_EQ(host::thumbnailName(9, 10, base::MediaTime::make(36'061'001, 1000)), "9_10-01-01.001.png");
 }
 

@@ -2,9 +2,11 @@
 
 #include "app/host/RequestText.h"
 #include "support/PrivateDirectory.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <gmock/gmock.h>
 
+#include <cerrno>
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -134,6 +136,8 @@ TEST_F(Preparing, NamesADescriptorByItsFirstBytes)
     EXPECT_EQ(name("\x1A\x45\xDF\xA3\x42\x82\x84webm"), "recording.webm");
     EXPECT_EQ(name("\x1A\x45\xDF\xA3\x42\x82\x88matroska"), "recording.mkv");
     EXPECT_EQ(name("x"), "recording.mp4");
+    EXPECT_EQ(name("webm"), "recording.mp4");
+    EXPECT_EQ(name("x\x1A\x45\xDF\xA3webm"), "recording.mp4") << "not at its start";
 }
 
 TEST_F(Preparing, ChecksAnAttachment)
@@ -143,8 +147,21 @@ TEST_F(Preparing, ChecksAnAttachment)
     EXPECT_THAT(refusal(std::move(asked)), HasSubstr("gone.txt"));
 
     asked = request(m_movie);
-    asked.attachmentPath = m_directory.write("log.txt", "");
+    const auto link = m_directory.path() / "link.txt";
+    const auto log = std::filesystem::canonical(m_directory.write("log.txt", ""));
+    std::filesystem::create_symlink(log, link);
+    asked.attachmentPath = link;
     ASSERT_TRUE(host::prepare(asked)) << "an empty file can be shared";
+    EXPECT_EQ(asked.attachmentPath, log.native()) << "whoever reads it later is where we are not";
+
+    asked = request(m_movie);
+    asked.attachment = posix::FileDescriptor(::open(log.c_str(), O_RDONLY | O_CLOEXEC));
+    asked.attachmentName = "../a\nb.txt";
+    ASSERT_TRUE(host::prepare(asked));
+    EXPECT_EQ(asked.attachmentName, "a_b.txt");
+    asked.attachmentName = "";
+    ASSERT_TRUE(host::prepare(asked));
+    EXPECT_EQ(asked.attachmentName, "attachment");
 
     asked = request(m_movie);
     asked.attachment = posix::FileDescriptor(::open(m_directory.path().c_str(), O_RDONLY | O_CLOEXEC));
@@ -153,6 +170,44 @@ TEST_F(Preparing, ChecksAnAttachment)
     asked = request(m_movie);
     asked.attachmentPath = m_directory.write("\xFF.txt", "x");
     EXPECT_THAT(refusal(std::move(asked)), HasSubstr("not UTF-8"));
+}
+
+TEST_F(Preparing, KeepsTheNameThatAMovieCameWith)
+{
+    auto asked = request(m_movie);
+    asked.movieName = "a/b\n.webm";
+    ASSERT_TRUE(host::prepare(asked));
+    EXPECT_EQ(asked.movieName, "b_.webm");
+    EXPECT_EQ(asked.appName, "b_");
+    asked = descriptor(m_movie);
+    asked.movieName = "race.webm";
+    asked.appName = "AC/DC";
+    ASSERT_TRUE(host::prepare(asked));
+    EXPECT_EQ(asked.movieName, "race.webm");
+    EXPECT_EQ(asked.appName, "AC\u2044DC");
+}
+
+TEST_F(Preparing, SaysWhatElseKeepsAFileFromBeingOpened)
+{
+    const std::pair<int, const char*> kWords[] = {{EACCES, " may not be read; ask its owner"},
+                                                  {EPERM, " may not be read; ask its owner"},
+                                                  {ENXIO, " is not a file with a movie"},
+                                                  {ENOTDIR, "there is no file "},
+                                                  {EMFILE, "cannot open "},
+                                                  {EIO, "cannot open "}};
+    for (const auto& [number, words] : kWords)
+        tests::whileRefusing({{SYS_openat, number, 2, O_NOCTTY}}, [&] {
+            auto asked = request(m_movie);
+            const auto prepared = host::prepare(asked);
+            ASSERT_FALSE(prepared);
+            EXPECT_EQ(prepared.error()->code(), number);
+            EXPECT_EQ(prepared.error()->domain(), dbus::kBadInputDomain);
+            EXPECT_THAT(prepared.error()->description(), HasSubstr(words));
+            EXPECT_THAT(prepared.error()->description(), HasSubstr(m_movie.native()));
+        });
+    dbus::EditRequest closed;
+    closed.movie = posix::FileDescriptor(1'000'000);
+    EXPECT_THAT(refusal(std::move(closed)), HasSubstr("cannot look at the movie"));
 }
 
 TEST_F(Preparing, RefusesTextsThatCannotTravel)
@@ -177,6 +232,9 @@ TEST(Texts, AreCheckedAsUtf8)
                             "\xF4\x90\x80\x80", "\xF5\x80\x80\x80", "\xE2\x82"})
         EXPECT_FALSE(host::checkText(bad, "it"));
     EXPECT_FALSE(host::checkText(std::string_view("\0", 1), "it"));
+    EXPECT_FALSE(host::checkText(std::string_view("a\0b", 3), "it")) << "wherever it stands";
+    EXPECT_TRUE(host::checkText(std::string(1024 * 1024, 'x'), "it")) << "as long as a text may be";
+    EXPECT_FALSE(host::checkText(std::string(1024 * 1024 + 1, 'x'), "it"));
 }
 
 TEST(Texts, BecomeSafeFileNames)
@@ -193,6 +251,16 @@ TEST(Texts, BecomeSafeFileNames)
     const std::string longest = host::safeFileName(std::string(300, 'x') + ".webm", "f");
     EXPECT_EQ(longest.size(), 255U);
     EXPECT_TRUE(longest.ends_with("x.webm"));
+    EXPECT_EQ(host::safeFileName("\xFF\xFE.\xFF", "f"), "__._") << "each byte that is no text";
+    EXPECT_EQ(host::safeFileName("a\x1F b\x7F~", "f"), "a_ b_~");
+    EXPECT_EQ(host::safeFileName("a/b/", "f"), "f");
+    EXPECT_EQ(host::safeFileName(std::string(255, 'x'), "f"), std::string(255, 'x')) << "it fits";
+    EXPECT_EQ(host::safeFileName(std::string(256, 'x'), "f"), std::string(255, 'x'));
+    // An extension has fifteen letters at most; what is longer belongs to the stem, and is cut.
+    EXPECT_TRUE(
+        host::safeFileName(std::string(300, 'x') + "." + std::string(15, 'e'), "f").ends_with("x.eeeeeeeeeeeeeee"));
+    EXPECT_EQ(host::safeFileName(std::string(300, 'x') + "." + std::string(16, 'e'), "f"), std::string(255, 'x'));
+    EXPECT_EQ(host::safeFileName("." + std::string(300, 'e'), "f"), "." + std::string(254, 'e'));
     std::string wide;
     for (int i = 0; i < 100; ++i)
         wide += "€";
@@ -203,7 +271,10 @@ TEST(Texts, BecomeAppNamesThatFileNamesCanBeginWith)
 {
     EXPECT_EQ(host::safeAppName("Tux Racer"), "Tux Racer");
     EXPECT_EQ(host::safeAppName("AC/DC\nLive"), "AC\u2044DC Live");
-    EXPECT_EQ(host::safeAppName(std::string(300, 'x')).size(), 200U);
+    EXPECT_EQ(host::safeAppName(std::string(300, 'x')), std::string(200, 'x'));
+    EXPECT_EQ(host::safeAppName(std::string(198, 'x') + "éy"), std::string(198, 'x') + "é");
+    EXPECT_EQ(host::safeAppName(std::string(199, 'x') + "éy"), std::string(199, 'x')) << "not within a character";
+    EXPECT_EQ(host::safeAppName("a\x1F\x7F b\xFF"), "a   b_");
     EXPECT_EQ(host::withoutExtension("a.b.mp4"), "a.b");
     EXPECT_EQ(host::withoutExtension("plain"), "plain");
     EXPECT_EQ(host::withoutExtension(".hidden"), ".hidden");

@@ -1,8 +1,16 @@
 #include "app/host/ProgressBar.h"
 
+#include "linux/posix/FileDescriptor.h"
+
 #include <gmock/gmock.h>
 
+#include <array>
 #include <cmath>
+#include <cstdlib>
+#include <fcntl.h>
+#include <pty.h>
+#include <sys/ioctl.h>
+#include <unistd.h>
 
 namespace {
 
@@ -28,6 +36,8 @@ TEST(ProgressBar, TakesWhatIsNoPartForTheNearestThatIs)
 TEST(ProgressBar, CountsLettersAndLeavesTheBarOutWhereThereIsNoRoom)
 {
     EXPECT_EQ(host::progressLine("Wörk", 0.5, 33), "Wörk [##########----------]  50 %");
+    EXPECT_EQ(host::progressLine("Étés", 0.5, 33), "Étés [##########----------]  50 %");
+    EXPECT_EQ(host::progressLine("Work", 0.5, 21), "Work [####----]  50 %");
     EXPECT_EQ(host::progressLine("Work", 0.5, 20), "Work  50 %");
     EXPECT_EQ(host::progressLine("Work", 0.5, 1000).size(), 100U);
 }
@@ -42,6 +52,81 @@ TEST(ProgressBar, SaysNothingWhereNobodyLooks)
     }
     EXPECT_EQ(std::ftell(file), 0);
     std::fclose(file);
+}
+
+/// A terminal of so many columns, and what is written to it.
+class OnATerminal : public testing::Test {
+protected:
+    void open(unsigned short columns, const char* kind = "xterm")
+    {
+        ::setenv("TERM", kind, 1);
+        winsize size = {24, columns, 0, 0};
+        termios raw = {};
+        int screen = -1;
+        int program = -1;
+        ASSERT_EQ(::openpty(&screen, &program, nullptr, &raw, &size), 0);
+        m_screen = posix::FileDescriptor(screen);
+        ::fcntl(screen, F_SETFL, O_NONBLOCK);
+        stream = ::fdopen(program, "w");
+    }
+    ~OnATerminal() override
+    {
+        std::fclose(stream);
+        ::unsetenv("TERM");
+    }
+
+    /// Since it was asked for last.
+    std::string shown()
+    {
+        std::array<char, 1000> bytes{};
+        const ssize_t count = ::read(m_screen.get(), bytes.data(), bytes.size());
+        return {bytes.data(), count > 0 ? static_cast<std::size_t>(count) : 0};
+    }
+
+    static constexpr const char* kEmptyLine = "\r\033[K";
+
+    std::FILE* stream = nullptr;
+    posix::FileDescriptor m_screen;
+};
+
+TEST_F(OnATerminal, AProgressBarIsDrawnWhenItChangesAndTakenAwayInTheEnd)
+{
+    open(33);
+    {
+        host::ProgressBar bar("Work", stream);
+        EXPECT_EQ(shown(), "");
+        bar.show(0.5);
+        EXPECT_EQ(shown(), kEmptyLine + host::progressLine("Work", 0.5, 33));
+        bar.show(0.501);
+        EXPECT_EQ(shown(), "") << "it looks the same";
+        bar.show(0.51);
+        EXPECT_EQ(shown(), kEmptyLine + host::progressLine("Work", 0.51, 33));
+        bar.clear();
+        EXPECT_EQ(shown(), kEmptyLine);
+        bar.clear();
+        EXPECT_EQ(shown(), "") << "there is nothing to take away";
+        bar.show(0.51);
+        EXPECT_EQ(shown(), kEmptyLine + host::progressLine("Work", 0.51, 33)) << "it was taken away";
+    }
+    EXPECT_EQ(shown(), kEmptyLine);
+}
+
+TEST_F(OnATerminal, AProgressBarIsAsWideAsTheTerminalOrAsMostAre)
+{
+    open(1);
+    host::ProgressBar("Work", stream).show(0);
+    EXPECT_EQ(shown(), kEmptyLine + host::progressLine("Work", 0, 1) + kEmptyLine);
+    const winsize unknown = {};
+    ASSERT_EQ(::ioctl(m_screen.get(), TIOCSWINSZ, &unknown), 0);
+    host::ProgressBar("Work", stream).show(0);
+    EXPECT_EQ(shown(), kEmptyLine + host::progressLine("Work", 0, 80) + kEmptyLine);
+}
+
+TEST_F(OnATerminal, AProgressBarIsNotDrawnWhereLinesCannotBeTakenAway)
+{
+    open(33, "dumb");
+    host::ProgressBar("Work", stream).show(0.5);
+    EXPECT_EQ(shown(), "");
 }
 
 } // namespace
