@@ -288,12 +288,12 @@ TEST_F(Playback, ThePlayHeadMovesThirtyTimesASecond)
     open();
     std::vector<double> places;
     editor->playAction();
-    for (int i = 0; i < 600; ++i) {
+    for (int i = 0; i < 1200; ++i) {
         player().advance(1.0 / 600);
         if (places.empty() || editor->avTrimmer()->value() != places.back())
             places.push_back(editor->avTrimmer()->value());
     }
-    EXPECT_EQ(places.size(), 30U + 1) << "with the one where it stood";
+    EXPECT_EQ(places.size(), 60U + 1) << "with the one where it stood";
 }
 
 TEST_F(Playback, PlacesAreSoughtInTheTimescaleOfThePlayersTime)

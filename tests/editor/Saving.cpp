@@ -136,8 +136,11 @@ TEST_F(Saving, WhileTrimmingTheTrimIsAppliedNothingIsSavedAndEditingGoesOn)
     EXPECT_TRUE(player().isPlaying());
     EXPECT_NEAR(editor->avTrimmer()->value(), 2, 0.05);
     trimFrom(1, 2);
+    editor->undoAction();
+    EXPECT_FALSE(editor->isTrimming()) << "nothing runs that would forbid it";
+    trimFrom(1, 2);
     save();
-    EXPECT_EQ(fake->media.exportSessionCount(), 2U);
+    ASSERT_EQ(fake->media.exportSessionCount(), 2U);
     EXPECT_EQ(fake->media.exportSession()->asset->url(), trimmed);
     EXPECT_THAT(delegate->finishes, IsEmpty());
 }
@@ -237,7 +240,7 @@ TEST_F(Saving, NoButtonIsDisabledMeanwhileAndNothingElseChanges)
     mixEnds(ExportSession::Status::Completed);
     EXPECT_THAT(whole(), ElementsAreArray(before));
     tap(editor->saveButton()->view());
-    EXPECT_EQ(fake->media.exportSessionCount(), 2U) << "also this one is answered";
+    ASSERT_EQ(fake->media.exportSessionCount(), 2U) << "also this one is answered";
     mixEnds(ExportSession::Status::Completed);
     libraryEnds();
     EXPECT_THAT(whole(), ElementsAreArray(before)) << "but for what closing does";
