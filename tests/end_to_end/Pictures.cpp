@@ -45,9 +45,9 @@ TEST_P(Picture, LooksAsItDid)
 }
 
 INSTANTIATE_TEST_SUITE_P(EndToEnd, Picture,
-                         testing::Values("phone", "phone-landscape", "phone-without-home-button", "phone-dark",
-                                         "phone-trim", "phone-dark-trim", "pad", "pad-without-home-button", "pad-flat",
-                                         "pad-dark", "pad-trim"),
+                         testing::Values("phone", "phone-landscape", "phone-landscape-flat",
+                                         "phone-without-home-button", "phone-dark", "phone-trim", "phone-dark-trim",
+                                         "pad", "pad-without-home-button", "pad-flat", "pad-dark", "pad-trim"),
                          [](const auto& picture) { return caseName(picture.param); });
 
 TEST(TurningAPhone, ToItsSideAndBackShowsWhatWasThere)
