@@ -163,15 +163,11 @@ ExtensionConnection::ExtensionConnection(base::Queue& mainQueue) : m_shared(std:
 ExtensionConnection::~ExtensionConnection()
 {
     flush();
-    std::unique_ptr<ExtensionLink> link;
-    {
+    // Ended without the mutex: completions run then, and may ask for more.
+    const auto link = [this] {
         const std::lock_guard lock(m_shared->mutex);
-        link = std::move(m_shared->link);
-        m_shared->disconnected = {};
-        m_shared->sent = {};
-    }
-    // Ended without the mutex: completions run now, and may ask for more.
-    link.reset();
+        return std::move(m_shared->link);
+    }();
 }
 
 base::Result<void> ExtensionConnection::connect(const std::string& address)

@@ -2,12 +2,14 @@
 
 #include "linux/dbus/HostConnection.h"
 #include "support/PrivateDirectory.h"
+#include "support/RefusedSystemCalls.h"
 #include "support/WithoutPrivileges.h"
 
 #include <gmock/gmock.h>
 
 #include <fcntl.h>
 #include <optional>
+#include <pwd.h>
 #include <sys/file.h>
 #include <sys/stat.h>
 #include <utime.h>
@@ -157,9 +159,53 @@ TEST_F(EditorDirectories, OneThatIsBeingMadeIsLeftForADay)
     const auto young = m_root / "editor-young";
     std::filesystem::create_directories(young);
     EXPECT_EQ(sweep(), 0);
-    const utimbuf longAgo = {1'000'000'000, 1'000'000'000};
-    ASSERT_EQ(::utime(young.c_str(), &longAgo), 0);
+    const auto madeBefore = [&](time_t seconds) {
+        const time_t then = ::time(nullptr) - seconds;
+        const utimbuf times = {then, then};
+        ASSERT_EQ(::utime(young.c_str(), &times), 0);
+    };
+    madeBefore(24 * 60 * 60 - 60);
+    EXPECT_EQ(sweep(), 0);
+    madeBefore(24 * 60 * 60 + 60);
     EXPECT_EQ(sweep(), 1);
+    EXPECT_FALSE(std::filesystem::exists(young));
+}
+
+TEST_F(EditorDirectories, OfOtherUsersAreLeftToThem)
+{
+    const auto path = dead("editor-theirs");
+    if (::chown(path.c_str(), 12'345, 12'345) != 0)
+        return; // only the super-user can give files away
+    EXPECT_EQ(sweep(), 0);
+    EXPECT_TRUE(std::filesystem::exists(path / "private/Velkor/movie.mp4"));
+}
+
+TEST_F(EditorDirectories, WhoseLocksCannotBeAskedForAreLeft)
+{
+    const auto path = dead("editor-aaaaaa");
+    tests::whileRefusing({{SYS_faccessat2, EIO}, {SYS_faccessat, EIO}}, [&] { EXPECT_EQ(sweep(), 0); });
+    EXPECT_TRUE(std::filesystem::exists(path));
+}
+
+TEST_F(EditorDirectories, ThatCannotBeLockedAreNotMade)
+{
+    tests::whileRefusing({{SYS_flock, ENOLCK}}, [&] {
+        const auto made = host::EditorDirectory::make(m_root);
+        ASSERT_FALSE(made);
+        EXPECT_EQ(made.error()->code(), ENOLCK);
+        EXPECT_THAT(made.error()->description(), StartsWith("cannot lock " + m_root.native() + "/editor-"));
+    });
+    EXPECT_TRUE(std::filesystem::is_empty(m_root));
+}
+
+TEST_F(EditorDirectories, HaveALockThatNobodyElseCanTake)
+{
+    const auto directory = make();
+    EXPECT_FALSE(std::filesystem::exists(directory.path() + "/lock.new"));
+    const posix::FileDescriptor again(::open((directory.path() + "/lock").c_str(), O_RDWR | O_CLOEXEC));
+    ASSERT_TRUE(again);
+    EXPECT_NE(::flock(again.get(), LOCK_EX | LOCK_NB), 0);
+    EXPECT_EQ(std::filesystem::status(directory.path() + "/lock").permissions(), std::filesystem::perms(0600));
 }
 
 TEST_F(EditorDirectories, ALongPathGetsItsSocketElsewhere)
@@ -211,11 +257,19 @@ TEST_F(EditorDirectories, ARootThatCannotBeMadeIsAnError)
 
 TEST_F(EditorDirectories, LieInTheCache)
 {
+    const char* const before = std::getenv("HOME");
+    const std::string home = before ? before : "/";
     ::setenv("XDG_CACHE_HOME", "/elsewhere", 1);
     EXPECT_EQ(host::editorDirectoriesRoot().value(), "/elsewhere/clipsa");
     ::setenv("XDG_CACHE_HOME", "relative", 1);
     ::setenv("HOME", "/home/somebody", 1);
     EXPECT_EQ(host::editorDirectoriesRoot().value(), "/home/somebody/.cache/clipsa");
+    for (const char* none : {"", "relative"}) {
+        ::setenv("HOME", none, 1);
+        EXPECT_EQ(host::editorDirectoriesRoot().value(),
+                  ::getpwuid(::geteuid())->pw_dir + std::string("/.cache/clipsa"));
+    }
+    ::setenv("HOME", home.c_str(), 1);
 }
 
 } // namespace

@@ -200,4 +200,46 @@ TEST_F(HandingOver, SaysWhenItCannot)
     EXPECT_FALSE(host::handOver(-1, m_target.path(), "movie.mp4"));
 }
 
+TEST_F(HandingOver, CopiesWhatTheEditorCouldNotReadUnderASecondName)
+{
+    tests::whileRefusing({{SYS_access, EACCES}}, [&] {
+        const auto way = handOver();
+        ASSERT_TRUE(way) << way.error()->description();
+        EXPECT_NE(way.value(), host::HandOverWay::HardLink);
+    });
+    EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
+    expectUntouched();
+}
+
+TEST_F(HandingOver, SharesTheBlocksWhereFileSystemsCan)
+{
+    // One that says so is believed; this one has done nothing.
+    tests::whileRefusing({{SYS_linkat, EXDEV}, {SYS_ioctl, 0, 1, FICLONE, true}}, [&] {
+        EXPECT_EQ(handOver().value(), host::HandOverWay::Reflink);
+        EXPECT_EQ(statusOf(m_copy).st_size, 0);
+        std::filesystem::remove(m_copy);
+        EXPECT_EQ(handOver(host::HandOverWay::Copy).value(), host::HandOverWay::Copy);
+    });
+    EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
+}
+
+TEST_F(HandingOver, SaysWhyACopyCannotBeMade)
+{
+    const std::pair<tests::RefusedSystemCall, const char*> kFailures[] = {
+        {{SYS_copy_file_range, ENOSPC}, "cannot copy the recording"},
+        {{SYS_utimensat, EROFS}, "cannot date "},
+        {{SYS_openat, EDQUOT, 2, O_CREAT}, "cannot make "}};
+    for (const auto& [refused, words] : kFailures)
+        tests::whileRefusing({{SYS_linkat, EXDEV}, tests::noReflinks(), refused}, [&] {
+            const auto way = handOver();
+            ASSERT_FALSE(way);
+            EXPECT_EQ(way.error()->code(), refused.error);
+            EXPECT_THAT(way.error()->description(), testing::StartsWith(words));
+            EXPECT_FALSE(std::filesystem::exists(m_copy));
+        });
+    const auto stopped = handOver(host::HandOverWay::Copy, [](std::uint64_t, std::uint64_t) { return false; });
+    EXPECT_THAT(stopped.error()->description(), testing::StartsWith("copying the recording was stopped"));
+    expectUntouched();
+}
+
 } // namespace

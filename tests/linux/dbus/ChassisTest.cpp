@@ -25,6 +25,8 @@ public:
             return true;
         if (message.arguments() != QVariantList{QStringLiteral("org.freedesktop.hostname1"), QStringLiteral("Chassis")})
             return false;
+        if (!chassis.isValid())
+            return connection.send(message.createReply());
         return connection.send(message.createReply(QVariant::fromValue(QDBusVariant(chassis))));
     }
 
@@ -49,6 +51,8 @@ TEST(Chassis, IsWhatTheHostNameServiceSays)
     EXPECT_EQ(ask(), std::nullopt);
     service.chassis = 7;
     EXPECT_EQ(ask(), std::nullopt);
+    service.chassis = QVariant();
+    EXPECT_EQ(ask(), std::nullopt) << "it answers with nothing at all";
     service.silent = true;
     EXPECT_EQ(ask(std::chrono::milliseconds(20)), std::nullopt);
 }

@@ -69,6 +69,21 @@ TEST_F(AnEditorsReport, IsReadToItsEnd)
     EXPECT_EQ(notes.back().path, "/videos/999.mp4");
 }
 
+TEST_F(AnEditorsReport, IsReadToItsLastByte)
+{
+    // One byte more than is read at once.
+    editor.add({Kind::Saved, "/" + std::string(4097 - 9, 'x'), ""});
+    EXPECT_THAT(host.notes(), SizeIs(1));
+}
+
+TEST_F(AnEditorsReport, IsNotReadFurtherThanAnybodySaves)
+{
+    // Each takes 4 KiB, of the mebibyte that is read.
+    for (int i = 0; i < 300; ++i)
+        editor.add({Kind::Saved, "/" + std::string(4096 - 9, 'x'), ""});
+    EXPECT_THAT(host.notes(), SizeIs(256));
+}
+
 TEST_F(AnEditorsReport, MayTellWhatThisHostDoesNotKnow)
 {
     ASSERT_EQ(::write(editor.descriptor(), "shared\0/a\0", 11), 11);

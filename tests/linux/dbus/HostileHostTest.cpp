@@ -152,6 +152,8 @@ TEST_F(HostileHost, TextAboveOneMiBIsAnError)
 {
     EXPECT_THAT(loadOf({boxed(QString(static_cast<int>(dbus::kMaximumTextSize) + 1, u'x'))}).text(),
                 HasSubstr("longer than 1 MiB"));
+    EXPECT_EQ(loadOf({boxed(QString(static_cast<int>(dbus::kMaximumTextSize), u'x'))}).text().size(),
+              dbus::kMaximumTextSize);
     // 1 MiB is counted in bytes.
     EXPECT_TRUE(loadOf({boxed(QString(static_cast<int>(dbus::kMaximumTextSize) / 2 + 1, u'ä'))}).error);
 }
