@@ -12,7 +12,6 @@ using platform::ExportSession;
 /// One mix under way. The asset and the session go back to the main queue, on which they live.
 struct VKAudioMixUtility::Export {
     const platform::Platform& platform;
-    base::Url output;
     Completion completion;
     std::shared_ptr<platform::Asset> asset;
     std::shared_ptr<ExportSession> session;
@@ -26,31 +25,32 @@ void VKAudioMixUtility::mixAudioForMovie_withCompletionHandler(const platform::P
         completion(std::nullopt, VKExtensions::_vkUserErrorForCode_userInfo(VKErrorNoMovie));
         return;
     }
-    const auto work =
-        std::make_shared<Export>(Export{platform, tempFileURL(platform), std::move(completion), nullptr, nullptr});
     base::MainQueue& main = platform.system.mainQueue;
+    const auto begin = [&platform, movie = *movie, output = tempFileURL(platform), completion = std::move(completion)] {
+        setUp(platform, movie, output, completion);
+    };
     if (main.isCurrent())
-        setUp(work, *movie);
+        begin();
     else
-        main.post([work, movie = *movie] { setUp(work, movie); });
+        main.post(begin);
 }
 
-void VKAudioMixUtility::setUp(const std::shared_ptr<Export>& work, const base::Url& movie)
+void VKAudioMixUtility::setUp(const platform::Platform& platform, const base::Url& movie, const base::Url& output,
+                              const Completion& completion)
 {
-    platform::MediaFramework& media = work->platform.media;
-    base::MainQueue& main = work->platform.system.mainQueue;
-    const auto asset = media.assetWithURL(movie);
-    work->asset = base::handedBackTo(main, asset);
-    work->session =
-        base::handedBackTo(main, media.exportSessionWithAsset(asset, platform::ExportPreset::HighestQuality));
-    work->session->setOutputURL(work->output);
-    work->session->setOutputFileType(platform::FileType::Mpeg4);
+    base::MainQueue& main = platform.system.mainQueue;
+    const auto asset = platform.media.assetWithURL(movie);
+    const auto session = platform.media.exportSessionWithAsset(asset, platform::ExportPreset::HighestQuality);
+    session->setOutputURL(output);
+    const auto work = std::make_shared<Export>(
+        Export{platform, completion, base::handedBackTo(main, asset), base::handedBackTo(main, session)});
     // The file is being opened: its tracks are known in a moment. The work keeps the asset until then.
-    work->asset->whenLoaded([work] { start(work); });
+    asset->whenLoaded([work] { start(work); });
 }
 
 void VKAudioMixUtility::start(const std::shared_ptr<Export>& work)
 {
+    work->session->setOutputFileType(platform::FileType::Mpeg4);
     work->session->setAudioMix(platform::audioMixOfAllTracks(*work->asset));
     work->session->exportAsynchronously([work] { finish(work); });
 }

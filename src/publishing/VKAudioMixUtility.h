@@ -29,7 +29,8 @@ public:
 
 private:
     struct Export;
-    static void setUp(const std::shared_ptr<Export>& work, const base::Url& movie);
+    static void setUp(const platform::Platform& platform, const base::Url& movie, const base::Url& output,
+                      const Completion& completion);
     static void start(const std::shared_ptr<Export>& work);
     static void finish(const std::shared_ptr<Export>& work);
 };
