@@ -4,6 +4,8 @@
 
 #include <gmock/gmock.h>
 
+#include <fstream>
+
 using namespace tests;
 using testing::IsEmpty;
 using testing::SizeIs;
@@ -82,10 +84,14 @@ TEST_F(Accidents, WhatALivingEditorUsesIsNotSwept)
 
 TEST_F(Accidents, AHostThatHangsLeavesNoWindowThatDoesNotClose)
 {
-    // Long enough for the host to be stopped before the tap, so that it never learns of it.
-    m_machine.setScript("wait picture\nprint on the screen\npause 1500\ntap Cancel");
+    // The host is stopped before the tap, so that it never learns of it.
+    const auto stopped = m_machine.home() / "stopped";
+    m_machine.setScript("wait picture\nprint on the screen\nwait file " + stopped.native() + "\ntap Cancel");
     const auto host = startEditing();
     host->signal(SIGSTOP);
+    siginfo_t stop{};
+    EXPECT_EQ(::waitid(P_PID, static_cast<id_t>(host->process()), &stop, WSTOPPED), 0);
+    std::ofstream(stopped) << "now";
     EXPECT_TRUE(waitForEnd(editor(), Child::kDeadline));
     host->signal(SIGCONT);
     EXPECT_EQ(host->wait().exitStatus, 0) << "it reads the message when it can";

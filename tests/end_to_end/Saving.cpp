@@ -1,16 +1,15 @@
 // The whole main job with the real processes: a recording is opened, cut and saved, and the recorder hears of it.
 #include "end_to_end/Machine.h"
 #include "end_to_end/SavedMovie.h"
+#include "support/ProcessorTime.h"
 
 #include <gmock/gmock.h>
 
 #include <algorithm>
-#include <chrono>
 #include <csignal>
 #include <fstream>
 #include <numeric>
 #include <sys/stat.h>
-#include <thread>
 
 using namespace tests;
 using testing::ElementsAre;
@@ -146,18 +145,19 @@ TEST_F(Save, IsFinishedWhenTheHostIsKilledMeanwhile)
     open();
 }
 
-// The moments are spread over the whole save: from the tap to the end of the editor.
+// The moments are spread over the whole work of saving: from the tap to the end of the editor.
 TEST_F(Save, LeavesTheWholeMovieOrNothingWheneverTheEditorIsKilled)
 {
-    using Clock = std::chrono::steady_clock;
     constexpr int kMoments = 24;
     setScript("print saving\ntap Save");
     const Machine::Words open = {"open", m_movie, "--app-name", "Tux Racer"};
     auto first = m_machine.start(open);
     ASSERT_TRUE(first.waitForText("saving\n"));
-    const auto begin = Clock::now();
+    const auto editors = m_machine.processes("clipsa-editor");
+    ASSERT_THAT(editors, SizeIs(1));
+    const auto begin = processorTimeOf(editors.front()).value_or(ProcessorTime(0));
+    const auto whole = waitForWork(editors.front()) - begin;
     ASSERT_EQ(first.wait().exitStatus, 0);
-    const auto whole = Clock::now() - begin;
     ASSERT_THAT(saved(), SizeIs(1));
     const std::string wanted = PrivateDirectory::read(saved().front());
 
@@ -167,11 +167,10 @@ TEST_F(Save, LeavesTheWholeMovieOrNothingWheneverTheEditorIsKilled)
         std::filesystem::remove_all(library());
         auto host = m_machine.start(open);
         ASSERT_TRUE(host.waitForText("saving\n"));
-        const auto until = Clock::now() + whole * i / kMoments;
-        while (Clock::now() < until)
-            std::this_thread::yield();
-        for (const pid_t editor : m_machine.processes("clipsa-editor"))
+        for (const pid_t editor : m_machine.processes("clipsa-editor")) {
+            waitForWork(editor, processorTimeOf(editor).value_or(ProcessorTime(0)) + whole * i / kMoments);
             ::kill(editor, SIGKILL);
+        }
         const auto end = host.wait();
         const auto movies = saved();
         if (!movies.empty()) {

@@ -83,7 +83,7 @@ TEST_F(Trim, CutsWhatWasCutAlthoughItsFileIsRemovedAtTheStart)
         wait trimmed
         wait frame 0
         print {duration}
-        pause 1001
+        later 1
         key right
         key right
         wait frame 2

@@ -5,6 +5,10 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
+#include <string_view>
+#include <utility>
+
 using platform::Button;
 using platform::Touch;
 using platform::View;
@@ -271,6 +275,53 @@ TEST_F(OverlayButtons, AFlatImageIsADiscWithTheGlyphPunchedOutAndDrawnBackInFain
     EXPECT_EQ(pixel(image, 40, 40)[0], 0);
 }
 
+TEST_F(OverlayButtons, TheFlatPicturesAreAGreyDiscWhoseGlyphIsDarkerWhilePressed)
+{
+    using Bytes = std::array<int, 4>; // blue, green, red, opacity; the first three multiplied by the last
+    const auto at = [](const platform::ImageRef& image, int x, int y) {
+        const std::uint8_t* bytes = pixel(image, x, y);
+        return Bytes{bytes[0], bytes[1], bytes[2], bytes[3]};
+    };
+    const auto button = std::dynamic_pointer_cast<FlatButton>(make(2));
+    for (const auto& [state, glyph] :
+         {std::pair(Button::State::Normal, 77), std::pair(Button::State::Highlighted, 128)}) {
+        const auto image = button->image(state);
+        EXPECT_EQ(at(image, 2, 2), (Bytes{0, 0, 0, 0})) << "outside";
+        EXPECT_EQ(at(image, 15, 15), (Bytes{235, 235, 235, 245})) << "the disc";
+        EXPECT_EQ(at(image, 40, 40), (Bytes{0, 0, 0, glyph})) << "the glyph";
+    }
+}
+
+TEST_F(OverlayButtons, AFlatImageWithoutOneOfItsMasksIsNone)
+{
+    struct AllBut final : platform::ImageCatalog {
+        AllBut(platform::ImageCatalog& theImages, std::string_view theMissing) : images(theImages), missing(theMissing)
+        {
+        }
+        platform::ImageRef imageNamed(std::string_view name) override
+        {
+            return name == missing ? nullptr : images.imageNamed(name);
+        }
+        platform::ImageCatalog& images;
+        std::string_view missing;
+    };
+    for (const char* name : {"VKVideoOverlayGlyphMask", "VKVideoOverlayBackgroundMask"}) {
+        AllBut images(fake.images, name);
+        const platform::Platform platform{fake.machine.system, fake.notifications, fake.device, *fake.window, images,
+                                          fake.files,          fake.calendar,      fake.media,  fake.photos};
+        EXPECT_EQ(FlatButton::_createOverlayImageWithBackgroundWhite_backgroundAlpha_glyphAlpha(platform, 1, 1, 1),
+                  nullptr);
+    }
+}
+
+TEST_F(OverlayButtons, BothLooksAreReadAloudAsPlay)
+{
+    const auto told = shown<FineButton>(0)->button()->accessibility();
+    EXPECT_EQ(told.name, "Play");
+    EXPECT_EQ(told.role, platform::AccessibilityRole::Button);
+    EXPECT_EQ(shown<FlatButton>(2)->accessibility().name, "Play");
+}
+
 TEST_F(OverlayButtons, AFlatImageIsDrawnAtTheScreensScale)
 {
     fake.window->setScale(2);
@@ -292,8 +343,17 @@ TEST_F(OverlayButtons, TheFlatButtonSwitchesImagesWhilePressed)
 
 TEST_F(OverlayButtons, TheFieldsCanBeReadByName)
 {
-    const auto button = shown<FineButton>(0);
-    EXPECT_EQ(std::any_cast<std::int64_t>(button->instanceVariable("_style")), 0);
-    EXPECT_EQ(runtime::fromValue<std::shared_ptr<Button>>(button->instanceVariable("_button")), button->button());
-    EXPECT_EQ(std::any_cast<Selector>(button->instanceVariable("_action")), tapped);
+    const auto fine = shown<FineButton>(0);
+    EXPECT_EQ(runtime::fromValue<std::shared_ptr<Button>>(fine->instanceVariable("_button")), fine->button());
+    EXPECT_EQ(runtime::fromValue<std::shared_ptr<View>>(fine->instanceVariable("_backdropView")), fine->backdropView());
+    const auto flat = shown<FlatButton>(2);
+    for (const auto& [view, style] : {std::pair<std::shared_ptr<View>, int>(fine, 0), {flat, 2}}) {
+        EXPECT_EQ(std::any_cast<std::int64_t>(view->instanceVariable("_style")), style);
+        EXPECT_EQ(std::any_cast<Selector>(view->instanceVariable("_action")), tapped);
+        EXPECT_EQ(view->respondsTo(Selector("_handleTap:")), style == 2);
+    }
+    EXPECT_EQ(fine->target(), target);
+    EXPECT_EQ(fine->action(), tapped);
+    EXPECT_EQ(flat->target(), target);
+    EXPECT_EQ(flat->action(), tapped);
 }

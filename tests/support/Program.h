@@ -43,6 +43,7 @@ public:
     Program(const Program&) = delete;
     Program& operator=(const Program&) = delete;
 
+    pid_t process() const { return m_process; }
     void signal(int number) const
     {
         if (m_process > 0)

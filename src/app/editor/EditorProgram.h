@@ -7,6 +7,7 @@
 
 #include "app/editor/EditorOptions.h"
 #include "app/editor/PayloadWatch.h"
+#include "app/editor/ScriptClock.h"
 #include "app/editor/WorkWatch.h"
 #include "base/Affinity.h"
 #include "base/SharedValue.h"
@@ -50,6 +51,7 @@ public:
     int run();
 
     const base::System& system() const { return m_system; }
+    ScriptClock& clock() { return m_clock; }
     platform::Window& window() { return *m_window; }
     qtui::Presenter& presenter() { return m_presenter; }
     /// Whether some of a movie has been on the screen.
@@ -73,7 +75,7 @@ private:
     void learnAboutRecording();
 
     EditorOptions m_options;
-    base::SystemClock m_clock;
+    ScriptClock m_clock;
     base::StreamLog m_log;
     base::MainQueue m_mainQueue;
     qtui::MainLoop m_loop;

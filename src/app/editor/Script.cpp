@@ -4,6 +4,7 @@
 #include "app/editor/SyntheticInput.h"
 #include "base/Environment.h"
 #include "editor/VKVideoEditorViewController.h"
+#include "linux/qt/items/WorkLine.h"
 
 #include <QFile>
 #include <QGuiApplication>
@@ -148,8 +149,12 @@ bool Script::carryOut(const Words& words)
         return m_program.window().View::bounds().size == base::Size{double(size.width()), double(size.height())}
                && m_program.system().clock.now() - *m_since > 2 * platform::Window::kTransitionDuration;
     }
+    if (command == "wait" && argument(1) == "frame")
+        return waitForFrame(words);
+    if (command == "wait" && argument(1) == "file")
+        return QFile::exists(QString::fromStdString(joined(words, 2, words.size())));
     if (command == "wait")
-        return argument(1) == "frame" ? waitForFrame(words) : waitFor(argument(1));
+        return waitFor(argument(1));
     if (command == "tap")
         return tap(words);
     if (command == "drag" || command == "hold")
@@ -166,9 +171,10 @@ bool Script::carryOut(const Words& words)
         m_program.presenter().setScheme(argument(1) == "dark" ? qtui::Scheme::Dark : qtui::Scheme::Light);
         return true;
     }
-    if (command == "pause")
-        return m_program.system().clock.now() - *m_since >= std::chrono::duration_cast<base::Instant>(
-                   std::chrono::duration<double, std::milli>(number(argument(1))));
+    if (command == "later") {
+        m_program.clock().putAhead(number(argument(1)));
+        return true;
+    }
     if (command == "picture")
         return picture(words);
     if (command == "transitions")
@@ -184,6 +190,8 @@ bool Script::waitFor(const std::string& what)
 {
     if (what == "waiting")
         return true; // it is not started earlier
+    if (what == "busy")
+        return m_program.presenter().workLine().isUnderWay() && m_program.presenter().workLine().width() > 0;
     const auto editor = m_program.editor();
     if (!editor)
         return false;
@@ -199,6 +207,12 @@ bool Script::waitFor(const std::string& what)
         const auto& here = editor->avTrimmer()->thumbnails();
         return !wanted.empty()
                && std::all_of(wanted.begin(), wanted.end(), [&](double timestamp) { return here.contains(timestamp); });
+    }
+    if (what == "zoomed")
+        return editor->avTrimmer()->isZoomed();
+    if (what == "fine") {
+        const auto frame = editor->avPlayer()->currentFrame();
+        return frame && !ffmpeg::FFmpegMediaFramework::isReduced(*frame);
     }
     if (what == "trimming")
         return editor->isTrimming();

@@ -3,12 +3,16 @@
 /// A script is a text file, one command a line, `#` for comments:
 ///   size W H               resize the window, in points
 ///   wait waiting           first of all: begin while the window waits for the recording
+///   wait busy              until the window shows that something is under way
 ///   wait picture|ready     until the movie's first picture is shown; until its item is ready (or failed)
 ///   wait hidden|shown      until the chrome has faded out or in
 ///   wait thumbnails        until the strip has all its pictures
+///   wait zoomed            until the strip shows the moments around a grip that is held still
 ///   wait trimming|trimmed  until trim mode is on; until it is off and the movie then shown is ready
 ///   wait frame [SECONDS]   until the picture of the present time is on the screen (the one that does not change any
 ///                          more, where the recording stands still), or that of SECONDS or a later one
+///   wait fine              until that picture is as fine as the recording's: one that is dragged past is not at first
+///   wait file PATH         until that file is there
 ///   tap NAME  |  tap X Y   touch a control by its accessible name, or a place in points
 ///   drag X1 Y1 X2 Y2       touch, move in small steps, lift
 ///   drag NAME DX           the same from a control's middle, DX points to the right
@@ -16,7 +20,7 @@
 ///   key NAME               space, escape, return, left, right, home, end, tab, comma, period, undo, i, o
 ///   close                  ask the window to close, as its title bar does
 ///   scheme light|dark
-///   pause MILLISECONDS     let time pass
+///   later SECONDS          put the calendar ahead
 ///   picture FILE [WORDS]   once nothing moves or fades, write what is on the screen as a PNG, into $CLIPSA_PICTURES or
 ///                          here; with WORDS, say so
 ///   print WORDS            a line at the end of the file $CLIPSA_REPORT, or on standard output; filled in are {time},

@@ -1,5 +1,6 @@
 #include "linux/ffmpeg/FFmpegMediaFramework.h"
 
+#include "linux/ffmpeg/DecodedFrame.h"
 #include "linux/ffmpeg/Engine.h"
 #include "linux/ffmpeg/FFmpegAsset.h"
 #include "linux/ffmpeg/FFmpegImageGenerator.h"
@@ -54,6 +55,12 @@ FFmpegMediaFramework::exportSessionWithAsset(const std::shared_ptr<platform::Ass
 {
     m_affinity.assertHere();
     return FFmpegExportSession::make(m_engine, ours(asset));
+}
+
+bool FFmpegMediaFramework::isReduced(const platform::VideoFrame& frame)
+{
+    const auto* const decoded = dynamic_cast<const DecodedFrame*>(&frame);
+    return decoded && decoded->isReduced();
 }
 
 /// One that fails in place of one of another framework.

@@ -46,6 +46,10 @@ public:
     std::shared_ptr<platform::ExportSession> exportSessionWithAsset(const std::shared_ptr<platform::Asset>& asset,
                                                                     platform::ExportPreset preset) override;
 
+    /// Whether the frame of a player has fewer pixels than the movie, because it was only scrubbed over: a player that
+    /// rests soon shows the whole one.
+    static bool isReduced(const platform::VideoFrame& frame);
+
 private:
     std::shared_ptr<FFmpegAsset> ours(const std::shared_ptr<platform::Asset>& asset) const;
 

@@ -1,11 +1,11 @@
 // `clipsa save`, as a program, on the test movies.
 #include "app/host/ClipsaProgram.h"
+#include "support/ProcessorTime.h"
 #include "support/WithoutPrivileges.h"
 
 #include <gmock/gmock.h>
 
 #include <algorithm>
-#include <chrono>
 #include <ctime>
 #include <filesystem>
 #include <fstream>
@@ -13,7 +13,6 @@
 #include <random>
 #include <sys/inotify.h>
 #include <sys/stat.h>
-#include <thread>
 
 namespace {
 
@@ -209,10 +208,9 @@ TEST_F(SavingFromAShell, SaysWhichSoundIsLeftOut)
     EXPECT_EQ(errors, "clipsa: Of “silenced.mkv” does not come along: sound that cannot be decoded.\n");
 }
 
-// The moments are spread over the whole run: from the start of the program to the thumbnail and beyond.
+// The moments are spread over the whole work: from the start of the program to the thumbnail and beyond.
 TEST_F(SavingFromAShell, LeavesTheWholeMovieOrNothingWheneverItIsKilled)
 {
-    using Clock = std::chrono::steady_clock;
     constexpr int kMoments = 200;
     const fs::path root = home / ".cache/clipsa";
     const fs::path movie = recording("one-frame.mp4");
@@ -221,9 +219,10 @@ TEST_F(SavingFromAShell, LeavesTheWholeMovieOrNothingWheneverItIsKilled)
         {});
     ASSERT_EQ(cut.wait(), 0) << cut.errors();
     bytes = tests::PrivateDirectory::read(movie);
-    const auto begin = Clock::now();
-    ASSERT_EQ(save({"--app-name", "Tux", movie}), 0) << errors;
-    const auto whole = Clock::now() - begin;
+    const Words words = command({"save", "--app-name", "Tux", movie});
+    tests::Program first(words, variables());
+    const auto whole = tests::waitForWork(first.process());
+    ASSERT_EQ(first.wait(), 0) << first.errors();
     const Words saved = namesIn(videos);
     ASSERT_EQ(saved.size(), 1U);
     const std::string wanted = tests::PrivateDirectory::read(videos / saved.front());
@@ -235,10 +234,8 @@ TEST_F(SavingFromAShell, LeavesTheWholeMovieOrNothingWheneverItIsKilled)
     for (int i = 0; i < kMoments; ++i) {
         SCOPED_TRACE("kill " + std::to_string(i));
         fs::remove_all(videos);
-        tests::Program program(command({"save", "--app-name", "Tux", movie}), variables());
-        const auto until = Clock::now() + whole * (random() % 1000) / 900;
-        while (Clock::now() < until)
-            std::this_thread::yield();
+        tests::Program program(words, variables());
+        tests::waitForWork(program.process(), whole * (random() % 1000) / 900);
         program.signal(SIGKILL);
         program.wait();
         const Words names = namesIn(videos);

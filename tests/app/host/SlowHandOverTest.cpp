@@ -150,7 +150,7 @@ TEST_F(ASlowHandOver, ShowsInTheEndWhatAQuickOneShows)
     ASSERT_TRUE(pumpUntilEnd());
     m_end.reset();
     m_waiting.clear();
-    start("wait waiting\npause 300\npicture waiting.png\nprint waiting\n" + rest + "slow.png\nkey escape");
+    start("wait waiting\nwait busy\npicture waiting.png\nprint waiting\n" + rest + "slow.png\nkey escape");
     ASSERT_TRUE(pumpUntilReported("waiting"));
     handOver();
     ASSERT_TRUE(pumpUntilEnd());

@@ -1,15 +1,14 @@
 // `clipsa trim`, as a program, on the test movies.
 #include "app/host/ClipsaProgram.h"
+#include "support/ProcessorTime.h"
 #include "support/RefusedSystemCalls.h"
 
 #include <QJsonArray>
 #include <gmock/gmock.h>
 
-#include <chrono>
 #include <filesystem>
 #include <fstream>
 #include <random>
-#include <thread>
 
 namespace {
 
@@ -179,14 +178,13 @@ TEST_F(Trim, FailsInOneLine)
     EXPECT_THAT(namesIn(directory.path()), IsEmpty());
 }
 
-// The moments are spread over the whole run: from the start of the program to beyond the end of the export.
+// The moments are spread over the whole work: from the start of the program to beyond the end of the export.
 TEST_F(Trim, LeavesAWholeMovieOrNoneWheneverItIsKilled)
 {
-    using Clock = std::chrono::steady_clock;
     const Words words = command({"trim", movie("groups.mp4"), "--from", "0.5", "-o", out});
-    const auto begin = Clock::now();
-    ASSERT_EQ(tests::Program(words, {}).wait(), 0);
-    const auto whole = Clock::now() - begin;
+    tests::Program first(words, {});
+    const auto whole = tests::waitForWork(first.process());
+    ASSERT_EQ(first.wait(), 0);
     const auto size = fs::file_size(out);
     fs::remove(out);
     std::mt19937 random(7);
@@ -194,9 +192,7 @@ TEST_F(Trim, LeavesAWholeMovieOrNoneWheneverItIsKilled)
     constexpr int kMoments = 40;
     for (int i = 0; i < kMoments; ++i) {
         tests::Program program(words, {});
-        const auto until = Clock::now() + whole * (random() % 1000) / 800;
-        while (Clock::now() < until)
-            std::this_thread::yield();
+        tests::waitForWork(program.process(), whole * (random() % 1000) / 800);
         program.signal(i % 2 ? SIGKILL : SIGINT);
         const int status = program.wait();
         const Words names = namesIn(directory.path());

@@ -1,7 +1,8 @@
 #include "Stage.h"
 
+#include "support/EventLoop.h"
+
 #include <QDir>
-#include <QThread>
 
 #include <algorithm>
 #include <cmath>
@@ -125,11 +126,8 @@ void Stage::settle()
 
 bool Stage::settleUntil(const std::function<bool()>& done)
 {
-    for (int i = 0; i < 500 && !done(); ++i) {
-        settle();
-        QThread::msleep(2);
-    }
-    return done();
+    settle();
+    return pumpUntil(mainQueue, done);
 }
 
 void Stage::resize(base::Size size)

@@ -1,5 +1,6 @@
 /// Encodes sound to AAC on all cores: in chunks, each by an encoder of its own that has heard what comes before, so that
-/// the packets are those of one encoder. One thread calls; it decodes while others encode.
+/// the packets have the times of one encoder's and no seam is heard. Their bytes may be others. One thread calls; it
+/// decodes while others encode.
 #pragma once
 
 #include "linux/ffmpeg/Demuxer.h"
