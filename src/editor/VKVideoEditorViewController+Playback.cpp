@@ -103,16 +103,17 @@ void VKVideoEditorViewController::itemDidFinishPlaying(const std::shared_ptr<run
 void VKVideoEditorViewController::playAction()
 {
     assertHere();
+    platform::Player& player = *avPlayer();
     if (isTrimming()) {
-        avPlayer()->seekToTime(mediaTime(editStartTime()));
+        player.seekToTime(mediaTime(editStartTime()));
         // Former boundaries stay attached to the player, and keep pausing it.
-        setTimeObserver(avPlayer()->addBoundaryTimeObserver({mediaTime(editEndTime())},
-                                                            [weak = weakSelf<VKVideoEditorViewController>()] {
-                                                                if (const auto self = weak.lock())
-                                                                    self->pauseAction();
-                                                            }));
+        setTimeObserver(player.addBoundaryTimeObserver({mediaTime(editEndTime())},
+                                                       [weak = weakSelf<VKVideoEditorViewController>()] {
+                                                           if (const auto self = weak.lock())
+                                                               self->pauseAction();
+                                                       }));
     }
-    avPlayer()->play();
+    player.play();
     if (!isUIHidden())
         hideUI();
     if (isIntroMode()) {
