@@ -27,6 +27,8 @@ TEST_F(Playback, AReadyItemWiresTheScrubberOnce)
     fake->media.movies.clear();
     open();
     EXPECT_EQ(editor->avTrimmer()->delegate(), nullptr);
+    EXPECT_EQ(editor->editStartTime(), 0.0);
+    EXPECT_EQ(editor->editEndTime(), 0.0);
     fake->media.item()->becomeReady(10);
     EXPECT_TRUE(editor->currentItemLoaded());
     EXPECT_EQ(editor->avTrimmer()->delegate(), editor);
@@ -174,6 +176,21 @@ TEST_F(Playback, PlayingInTrimModeGoesFromStartToEndAndStartsAgain)
     editor->playAction();
     EXPECT_NEAR(player().currentTime().seconds(), 5, 1e-9);
     EXPECT_TRUE(player().isPlaying());
+}
+
+TEST_F(Playback, TheLatestEndOfATrimsRangeCanBeTakenBack)
+{
+    open();
+    EXPECT_EQ(editor->timeObserver(), nullptr);
+    trimFrom(5, 8);
+    editor->playAction();
+    const auto former = editor->timeObserver();
+    editor->playAction();
+    ASSERT_NE(editor->timeObserver(), former);
+    player().removeTimeObserver(former);
+    player().removeTimeObserver(editor->timeObserver());
+    player().advance(4);
+    EXPECT_TRUE(player().isPlaying()) << "behind 8 where nobody waits any more";
 }
 
 TEST_F(Playback, AFormerEndStaysAttachedAndKeepsPausing)
