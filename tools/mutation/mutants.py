@@ -1,5 +1,6 @@
 """Finds what can be broken in a C++ source, one place at a time, with the compiler's own view of it (libclang)."""
 
+import os
 import re
 from dataclasses import dataclass, field
 
@@ -42,15 +43,22 @@ class Source:
     """The cursors of one translation unit that stand in one of its files."""
 
     def __init__(self, path, arguments, main):
-        self.path = path
+        self.path, self.files = path, {}
         with open(path, "rb") as file:
             self.bytes = file.read()
         unit = Index.create().parse(main, args=arguments, options=TranslationUnit.PARSE_NONE)
         self.mutants = []
         self.seen = set()
         for cursor in unit.cursor.get_children():
-            if cursor.location.file and cursor.location.file.name == path:
+            if self.isHere(cursor.location):
                 self.visit(cursor, [])
+
+    def isHere(self, location):
+        """Headers are found through links."""
+        name = location.file.name if location.file else None
+        if name not in self.files:
+            self.files[name] = name is not None and os.path.realpath(name) == os.path.realpath(self.path)
+        return self.files[name]
 
     def textOf(self, start, end):
         return self.bytes[start:end].decode()
@@ -58,7 +66,7 @@ class Source:
     def rangeOf(self, cursor):
         """None for what a macro has made or what is not of this file."""
         extent = cursor.extent
-        if not extent.start.file or extent.start.file.name != self.path or extent.end.file.name != self.path:
+        if not self.isHere(extent.start) or not self.isHere(extent.end):
             return None
         start, end = extent.start.offset, extent.end.offset
         return (start, end) if start < end else None
