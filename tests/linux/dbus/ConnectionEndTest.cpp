@@ -119,6 +119,19 @@ TEST_F(TheEndOfAConnection, IsNotTakenForTheHostsOwnDoing)
     EXPECT_EQ(m_hostDisconnects, 0);
 }
 
+TEST_F(TheEndOfAConnection, CanComeBeforeItsBeginning)
+{
+    listen({});
+    m_host->disconnectEditor();
+    dbus::ExtensionConnection late(m_mainQueue);
+    bool refused = false;
+    late.setDisconnectedHandler([&] { refused = true; });
+    if (late.connect(m_host->address())) {
+        EXPECT_TRUE(tests::pumpUntil(m_mainQueue, [&] { return refused; }));
+    }
+    EXPECT_EQ(m_connects, 0);
+}
+
 TEST_F(TheEndOfAConnection, IsNoAnswerToALateLoad)
 {
     dbus::LoadedItem answerLater;

@@ -47,7 +47,7 @@ TEST_F(Connection, OnlyTheFirstFinishCounts)
     connect({});
     proxy()->send(kFinish, {runtime::toValue(std::vector<std::string>{"first"})});
     proxy()->send(kFinish, {runtime::toValue(std::vector<std::string>{"second"})});
-    EXPECT_TRUE(tests::whilePumping([&] { return m_extension->flush(); }));
+    EXPECT_TRUE(tests::whilePumping([&] { return m_extension->flush(std::chrono::hours(1)); })) << "woken, not late";
     m_extension.reset();
 
     EXPECT_TRUE(tests::pumpUntil(m_mainQueue, [&] { return m_hostDisconnects > 0; }));

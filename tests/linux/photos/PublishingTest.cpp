@@ -28,6 +28,8 @@ TEST_F(TheVideoLibrary, NamesAMovieAfterItsAppAndDate)
     EXPECT_THAT(namesIn(videos), ElementsAre(name));
     EXPECT_THAT(published, ElementsAre(videos / name));
     EXPECT_THAT(errors(), IsEmpty());
+    EXPECT_THAT(log.texts(base::MemoryLog::Line::Kind::Message),
+                ElementsAre("saved in the library: " + (videos / name).native()));
 }
 
 TEST_F(TheVideoLibrary, HoldsTheWholeMovieAndLeavesTheRecordingAsItWas)
@@ -227,8 +229,11 @@ TEST_F(TheVideoLibrary, CanBeToldToGiveUpWhileItCopies)
 {
     auto with = options();
     with.goOn = [] { return false; };
-    tests::whileRefusing({tests::noReflinks()},
-                         [&] { expectFailure(save(base::Url::fromPath(source), with), ECANCELED); });
+    tests::whileRefusing({tests::noReflinks()}, [&] {
+        const auto outcome = save(base::Url::fromPath(source), with);
+        expectFailure(outcome, ECANCELED);
+        EXPECT_THAT(outcome.text(), testing::EndsWith(": it was given up")) << "which the library can do nothing about";
+    });
 }
 
 /// One that can do less than the one that the tests run on.
