@@ -156,6 +156,8 @@ def main():
     suites.copyTree(top, tree)
     chosen = [each for each in suites.suitesThatLink(top, arguments.folders) if re.search(arguments.suites, each)]
     runner = suites.Runner(tree, os.path.join(top, "build/dev/test-movies"), chosen, arguments.jobs)
+    if not runner.expectConfined():
+        sys.exit("mutate: a broken program could remove anything, and cannot be kept from it here: namespaces are needed")
     found = build(top, tree, runner, found)
     runner.findTests()
     say("Running each test by itself…")

@@ -10,6 +10,7 @@ from concurrent.futures import ThreadPoolExecutor
 
 CHUNKS = (1.0, 6.0, float("inf"))  # seconds: the quick tests come first, as the first failure ends
 LONGEST = 60  # seconds: of a test that is run for each of its mutants
+CONFINED = os.path.join(os.path.dirname(os.path.abspath(__file__)), "confined")
 
 
 class Suite:
@@ -59,6 +60,13 @@ class Runner:
         self.suites = [Suite(each, os.path.join(self.build, "bin", "tests-" + each.replace("/", "-"))) for each in suites]
         self.reached = {}  # of each test: the bytes
 
+    def expectConfined(self):
+        """A broken program is run only where it can harm nothing but what is its own."""
+        with tempfile.TemporaryDirectory(prefix="clipsa-mutate.") as directory:
+            seen = subprocess.run([CONFINED, directory, "sh", "-c", 'echo >/tmp/here; echo 2>&1 >"$0"', self.tree + "/mine"],
+                                  capture_output=True).returncode
+            return seen not in (0, 125) and os.path.exists(os.path.join(directory, "here"))
+
     def environment(self, home, **more):
         values = dict(os.environ, HOME=home, LC_ALL="C.UTF-8", TZ="UTC", QT_QPA_PLATFORM="offscreen",
                       QT_QUICK_BACKEND="software", XDG_RUNTIME_DIR=os.path.join(home, "runtime"), TMPDIR=home,
@@ -68,23 +76,37 @@ class Runner:
             values.pop(name, None)
         return values
 
-    def run(self, command, limit, **more):
-        """Gives the exit status; of a program that takes too long, None. With a home of its own."""
-        with tempfile.TemporaryDirectory(prefix="clipsa-mutate.", ignore_cleanup_errors=True) as home:
-            os.mkdir(os.path.join(home, "runtime"), 0o700)
+    def run(self, command, limit, files=None, reached=0, **more):
+        """Gives the exit status and, of so many mutants, the bytes that tell which were reached; of a program that takes
+        too long, None. It has a /tmp of its own, with `files` in it, and a home there."""
+        with tempfile.TemporaryDirectory(prefix="clipsa-mutate.", ignore_cleanup_errors=True) as directory:
+            os.makedirs(os.path.join(directory, "home/runtime"), 0o700)
+            os.chmod(directory, 0o1777)
+            for name, contents in (files or {}).items():
+                with open(os.path.join(directory, name), "w") as file:
+                    file.write(contents)
+            if reached:
+                more["CLIPSA_MUTANTS_REACHED"] = "/tmp/reached"
+                with open(os.path.join(directory, "reached"), "wb") as file:
+                    file.truncate(reached)
             # A session of its own, so that what it has started ends with it.
-            process = subprocess.Popen(command, env=self.environment(home, **more), start_new_session=True,
-                                       stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
+            process = subprocess.Popen([CONFINED, directory, *command], env=self.environment("/tmp/home", **more),
+                                       start_new_session=True, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL,
+                                       stderr=subprocess.DEVNULL)
             try:
-                return process.wait(limit)
+                status = process.wait(limit)
             except subprocess.TimeoutExpired:
-                return None
+                status = None
             finally:
                 try:
                     os.killpg(process.pid, 9)
                 except ProcessLookupError:
                     pass
                 process.wait()
+            if not reached:
+                return status, b""
+            with open(os.path.join(directory, "reached"), "rb") as file:
+                return status, file.read()
 
     def compile(self):
         """Builds the suites. Gives what the compiler says, empty when all is well."""
@@ -123,12 +145,9 @@ class Runner:
         return failing
 
     def measured(self, suite, test, count):
-        with tempfile.NamedTemporaryFile(prefix="clipsa-reached.") as file:
-            file.truncate(count)
-            begin = time.monotonic()
-            status = self.run([suite.program, "--gtest_filter=" + test], 300, CLIPSA_MUTANTS_REACHED=file.name)
-            with open(file.name, "rb") as written:
-                return status, time.monotonic() - begin, written.read()
+        begin = time.monotonic()
+        status, reached = self.run([suite.program, "--gtest_filter=" + test], 300, reached=count)
+        return status, time.monotonic() - begin, reached
 
     def reaching(self, mutant):
         return [(self.seconds(place), *place) for place, reached in self.reached.items() if reached[mutant.number]]
@@ -153,12 +172,10 @@ class Runner:
         return False
 
     def fails(self, suite, tests, mutant):
-        with tempfile.NamedTemporaryFile("w", prefix="clipsa-filter.") as flags:
-            flags.write("--gtest_fail_fast\n--gtest_filter=" + ":".join(test for _, _, test in tests) + "\n")
-            flags.flush()
-            limit = 10 + 4 * sum(seconds for seconds, _, _ in tests)
-            return self.run([suite.program, "--gtest_flagfile=" + flags.name], limit,
-                            CLIPSA_MUTANT=str(mutant.number)) != 0
+        flags = "--gtest_fail_fast\n--gtest_filter=" + ":".join(test for _, _, test in tests) + "\n"
+        limit = 10 + 4 * sum(seconds for seconds, _, _ in tests)
+        return self.run([suite.program, "--gtest_flagfile=/tmp/flags"], limit, {"flags": flags},
+                        CLIPSA_MUTANT=str(mutant.number))[0] != 0
 
 
 def copyTree(top, tree):

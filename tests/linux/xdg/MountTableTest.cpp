@@ -85,6 +85,8 @@ TEST_F(AMountTable, KnowsItsRootsHoweverTheyAreWritten)
     EXPECT_TRUE(table.isRoot("/private/var/mobile/Library/Velkor/../.."));
     EXPECT_TRUE(table.isRoot("/tmp/.."));
     EXPECT_TRUE(table.isRoot("/"));
+    EXPECT_TRUE(table.isRoot("//"));
+    EXPECT_TRUE(xdg::MountTable().isRoot("/")) << "without any mount, too";
     EXPECT_FALSE(table.isRoot("/private/var/mobile"));
     EXPECT_FALSE(table.isRoot("/private/var/mobile/Library/Velkor/"));
     EXPECT_FALSE(table.isRoot(""));

@@ -183,11 +183,12 @@ TYPED_TEST(AFileManager, RemovesALinkAndNotItsTarget)
     EXPECT_THAT(this->names(""), UnorderedElementsAre("store"));
 }
 
-TYPED_TEST(AFileManager, DoesNotRemoveWhatIsMissingOrTheRoot)
+// Nor the root of all; but that is asked of a table alone (KnowsItsRootsHoweverTheyAreWritten): here, code that forgot it
+// would remove this machine.
+TYPED_TEST(AFileManager, DoesNotRemoveWhatIsMissing)
 {
     EXPECT_EQ(this->codeOf(this->files.removeItem(this->at("nothing")).error()), ENOENT);
     EXPECT_EQ(this->codeOf(this->files.removeItem("").error()), ENOENT);
-    EXPECT_EQ(this->codeOf(this->files.removeItem("//").error()), EBUSY);
 }
 
 TYPED_TEST(AFileManager, MovesFilesAndFullDirectories)
