@@ -321,7 +321,8 @@ TEST_F(ANewFile, ThatIsCopiedForItsNameFailsAsTheCopyDoes)
         tests::whileRefusing({noLinks, tests::noReflinks(), failure}, [&] { number = file.takeName("movie.mp4"); });
         EXPECT_EQ(number, failure.error);
         EXPECT_THAT(namesIn(place), SizeIs(file.isHidden() ? 1 : 0)) << failure.error;
-        // Nothing of it is lost: it can be tried again.
+        // Nothing of it is lost: it is somebody's, and can be tried again.
+        posix::sweepNewFiles(parent.get());
         EXPECT_EQ(file.takeName("movie.mp4"), 0);
         EXPECT_EQ(contents(), "contents");
         EXPECT_THAT(namesIn(place), ElementsAre("movie.mp4"));

@@ -46,6 +46,18 @@ TEST_F(TheFilesOfThisMachine, AreCreatedWhenTheyWereModifiedIfThatWasBeforeTheir
     EXPECT_EQ(attributes.modificationDate, base::Date{1'500'000'000.25});
 }
 
+TEST_F(TheFilesOfThisMachine, AreAsOldAsTheirContentsWhereNobodyKnowsTheirBirth)
+{
+    const std::string file = "/proc/version";
+    struct statx found = {};
+    ASSERT_EQ(::statx(AT_FDCWD, file.c_str(), 0, STATX_BTIME, &found), 0);
+    if ((found.stx_mask & STATX_BTIME) != 0)
+        return;
+    const auto attributes = files.attributesOfItem(file).value();
+    EXPECT_GT(attributes.modificationDate, base::Date{0});
+    EXPECT_EQ(attributes.creationDate, attributes.modificationDate);
+}
+
 TEST_F(TheFilesOfThisMachine, ArePutIntoDirectoriesThatTheUsersMaskMakesPrivate)
 {
     const mode_t before = ::umask(0);
