@@ -19,7 +19,6 @@ namespace {
 
 using testing::AllOf;
 using testing::HasSubstr;
-using testing::IsEmpty;
 using testing::Not;
 using testing::StartsWith;
 

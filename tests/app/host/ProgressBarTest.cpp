@@ -4,10 +4,8 @@
 
 #include <gmock/gmock.h>
 
-#include <array>
 #include <cmath>
 #include <cstdlib>
-#include <fcntl.h>
 #include <pty.h>
 #include <sys/ioctl.h>
 #include <unistd.h>
@@ -66,7 +64,6 @@ protected:
         int program = -1;
         ASSERT_EQ(::openpty(&screen, &program, nullptr, &raw, &size), 0);
         m_screen = posix::FileDescriptor(screen);
-        ::fcntl(screen, F_SETFL, O_NONBLOCK);
         stream = ::fdopen(program, "w");
     }
     ~OnATerminal() override
@@ -75,12 +72,15 @@ protected:
         ::unsetenv("TERM");
     }
 
-    /// Since it was asked for last.
+    /// Since it was asked for last; a terminal shows what is written to it when it comes to it.
     std::string shown()
     {
-        std::array<char, 1000> bytes{};
-        const ssize_t count = ::read(m_screen.get(), bytes.data(), bytes.size());
-        return {bytes.data(), count > 0 ? static_cast<std::size_t>(count) : 0};
+        std::fputc('|', stream);
+        std::fflush(stream);
+        std::string text;
+        for (char each = 0; ::read(m_screen.get(), &each, 1) == 1 && each != '|';)
+            text += each;
+        return text;
     }
 
     static constexpr const char* kEmptyLine = "\r\033[K";

@@ -12,7 +12,6 @@ using testing::AllOf;
 using testing::EndsWith;
 using testing::HasSubstr;
 using testing::IsEmpty;
-using testing::Not;
 using testing::StartsWith;
 
 using tests::namesIn;

@@ -20,7 +20,7 @@ using testing::IsEmpty;
 using tests::PrivateDirectory;
 using tests::RefusedSystemCall;
 
-constexpr std::uint64_t kMebibyte = 1024 * 1024;
+constexpr std::uint64_t kMebibyte = std::uint64_t{1024} * 1024;
 
 /// No two places have the same byte for a long way.
 std::string someBytes(std::size_t size)

@@ -111,7 +111,7 @@ TEST_F(ANewFile, ReplacesNothingAndCanTakeAnotherName)
         tests::whileRefusing(refused, [&] {
             posix::NewFile file = make();
             EXPECT_EQ(file.takeName("movie.mp4"), EEXIST);
-            EXPECT_EQ(file.isHidden(), refused.size() > 0) << "it is not copied for a name that is taken";
+            EXPECT_EQ(file.isHidden(), !refused.empty()) << "it is not copied for a name that is taken";
             EXPECT_EQ(file.takeName("other.mp4"), 0);
             EXPECT_FALSE(file.isHidden());
         });
