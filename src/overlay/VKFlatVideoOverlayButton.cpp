@@ -77,8 +77,8 @@ ImageRef VKFlatVideoOverlayButton::_createOverlayImageWithBackgroundWhite_backgr
 
     platform::Canvas canvas(disc->size(), platform.mainScreen.scale());
     canvas.fill({{0, 0}, disc->size()}, backgroundWhite, backgroundAlpha);
-    canvas.draw(*disc, {0, 0}, BlendMode::DestinationOut, 1.0);
-    canvas.draw(*glyph, {0, 0}, BlendMode::DestinationOut, 1.0);
+    for (const ImageRef& mask : {disc, glyph})
+        canvas.draw(*mask, {0, 0}, BlendMode::DestinationOut, 1.0);
     canvas.draw(*glyph, {0, 0}, BlendMode::SourceOver, glyphAlpha);
     return canvas.image();
 }

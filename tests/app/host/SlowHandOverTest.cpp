@@ -8,11 +8,14 @@
 #include "support/Program.h"
 #include "support/RefusedSystemCalls.h"
 
+#include <QFileSystemWatcher>
 #include <QImage>
 #include <QRect>
 
 #include <gmock/gmock.h>
 
+#include <filesystem>
+#include <fstream>
 #include <string>
 
 using testing::ElementsAre;
@@ -103,8 +106,9 @@ protected:
     /// Once the script has got so far.
     bool pumpUntilReported(const std::string& line)
     {
-        QTimer tick; // wakes the loop: a file tells nobody that it has grown
-        tick.start(std::chrono::milliseconds(5));
+        const std::filesystem::path file = m_directory.path() / "report";
+        std::ofstream(file, std::ios::app).flush();                       // there may be none to be watched
+        const QFileSystemWatcher watcher({QString::fromStdString(file)}); // wakes the loop when it grows
         return tests::pumpUntil([&] { return report().find(line + "\n") != std::string::npos || m_end; }) && !m_end;
     }
     bool pumpUntilEnd()

@@ -174,9 +174,10 @@ def start_edit(recorder, **options):
 def expect_leaving_after_sigterm(bus):
     service = dbus.Interface(bus.get_object("org.freedesktop.DBus", "/org/freedesktop/DBus"), "org.freedesktop.DBus")
     process = service.GetConnectionUnixProcessID("org.clipsa.Clipsa")
+    owners = []
+    bus.watch_name_owner("org.clipsa.Clipsa", owners.append)
     os.kill(process, signal.SIGTERM)
-    while service.NameHasOwner("org.clipsa.Clipsa"):
-        pass
+    until(lambda: owners and not owners[-1])
 
 
 def slow_file():
