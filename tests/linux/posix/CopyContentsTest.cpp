@@ -10,6 +10,7 @@
 
 #include <cerrno>
 #include <fcntl.h>
+#include <fstream>
 #include <string>
 #include <vector>
 
@@ -34,6 +35,14 @@ std::string someBytes(std::size_t size)
     return bytes;
 }
 
+/// In one piece: some are large.
+std::string contentsOf(const std::filesystem::path& path)
+{
+    std::string contents(std::filesystem::file_size(path), '\0');
+    std::ifstream(path, std::ios::binary).read(contents.data(), static_cast<std::streamsize>(contents.size()));
+    return contents;
+}
+
 class Copying : public testing::Test {
 protected:
     ~Copying() override { tests::systemCalls() = {}; }
@@ -55,7 +64,7 @@ protected:
         });
         return outcome;
     }
-    std::string copied() const { return PrivateDirectory::read(target); }
+    std::string copied() const { return contentsOf(target); }
 
     PrivateDirectory directory;
     const std::string bytes = someBytes(3'000'001);
@@ -84,7 +93,7 @@ TEST_F(Copying, WithoutASizeTakesAllThereIsInSuchSteps)
     const auto outcome = copy(std::nullopt);
     EXPECT_EQ(outcome.number, 0);
     EXPECT_THAT(outcome.told, ElementsAre(16 * kMebibyte, 20 * kMebibyte));
-    EXPECT_EQ(copied(), PrivateDirectory::read(source));
+    EXPECT_EQ(copied(), contentsOf(source));
 }
 
 TEST_F(Copying, ByHandMovesTheProgressAtEveryMebibyte)
@@ -178,7 +187,7 @@ TEST_F(Copying, GoesOnInAnotherWayWhereOneIsRefusedMidway)
     };
     EXPECT_EQ(copy(40 * kMebibyte, {kNoSending}).number, 0);
     EXPECT_EQ(calls, 2) << "what is refused once is not asked for again";
-    EXPECT_EQ(copied(), PrivateDirectory::read(source));
+    EXPECT_EQ(copied(), contentsOf(source));
 }
 
 TEST_F(Copying, GoesOnBehindASignal)
