@@ -43,8 +43,11 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override { return classObject(); }
 
-    std::shared_ptr<VKVideoEditorViewControllerDelegate> delegate() const { return m_delegate.lock(); }
-    void setDelegate(std::weak_ptr<VKVideoEditorViewControllerDelegate> delegate) { m_delegate = std::move(delegate); }
+    std::shared_ptr<VKVideoEditorViewControllerDelegate> delegate() const { return here(m_delegate).lock(); }
+    void setDelegate(std::weak_ptr<VKVideoEditorViewControllerDelegate> delegate)
+    {
+        here(m_delegate) = std::move(delegate);
+    }
 
     /// Asked of the device once a process.
     bool deviceHasHomeButton() const;
@@ -137,6 +140,8 @@ public:
     void confirmTrim();
 
 private:
+    using ViewController::here; // the properties' is theirs
+
     explicit VKVideoEditorViewController(const platform::Platform& platform) : m_platform(platform) {}
 
     // Construction, in this order.

@@ -54,11 +54,11 @@ public:
     // Properties. The payload's values arrive from the threads that load them.
     const std::shared_ptr<VKVideoEditorViewController>& videoEditorViewController() const
     {
-        return m_videoEditorViewController;
+        return here(m_videoEditorViewController);
     }
     void setVideoEditorViewController(std::shared_ptr<VKVideoEditorViewController> editor)
     {
-        m_videoEditorViewController = std::move(editor);
+        here(m_videoEditorViewController) = std::move(editor);
     }
     std::optional<std::string> bundleIdentifier() const { return m_payload->values().bundleIdentifier; }
     void setBundleIdentifier(std::optional<std::string> value)

@@ -14,17 +14,17 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override { return classObject(); }
 
-    std::int64_t style() const override { return m_style; }
+    std::int64_t style() const override { return here(m_style); }
     void setTarget_action(const std::weak_ptr<runtime::Object>& target, const runtime::Selector& action) override;
     std::shared_ptr<platform::View> asView() override { return self<platform::View>(); }
 
-    std::shared_ptr<runtime::Object> target() const { return m_target.lock(); }
-    void setTarget(const std::weak_ptr<runtime::Object>& target) { m_target = target; }
-    const runtime::Selector& action() const { return m_action; }
-    void setAction(const runtime::Selector& action) { m_action = action; }
+    std::shared_ptr<runtime::Object> target() const { return here(m_target).lock(); }
+    void setTarget(const std::weak_ptr<runtime::Object>& target) { here(m_target) = target; }
+    const runtime::Selector& action() const { return here(m_action); }
+    void setAction(const runtime::Selector& action) { here(m_action) = action; }
 
-    const std::shared_ptr<platform::Button>& button() const { return m_button; }
-    const std::shared_ptr<platform::BackdropView>& backdropView() const { return m_backdropView; }
+    const std::shared_ptr<platform::Button>& button() const { return here(m_button); }
+    const std::shared_ptr<platform::BackdropView>& backdropView() const { return here(m_backdropView); }
 
     void _playButtonActivate(const std::shared_ptr<runtime::Object>& sender);
     void _playButtonDeactivate(const std::shared_ptr<runtime::Object>& sender);

@@ -63,6 +63,12 @@ protected:
     {
         m_affinity.assertHere(where);
     }
+    /// The same where all that is done is reading or setting `member`, which it gives.
+    template <typename T> T& here(T& member, base::SourceLocation where = base::SourceLocation::current()) const
+    {
+        assertHere(where);
+        return member;
+    }
 
     /// Tells the observers of `key`. They may come and go, and release this object, while they are told.
     void didChangeValueForKey(std::string_view key);

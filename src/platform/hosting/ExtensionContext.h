@@ -18,10 +18,10 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
-    const std::vector<InputItem>& inputItems() const { return m_inputItems; }
-    const Platform& platform() const { return *m_platform; }
-    std::shared_ptr<AuxiliaryConnection> auxiliaryConnection() const { return m_connection; }
-    std::shared_ptr<runtime::Object> principalObject() const { return m_principalObject.lock(); }
+    const std::vector<InputItem>& inputItems() const { return here(m_inputItems); }
+    const Platform& platform() const { return *here(m_platform); }
+    std::shared_ptr<AuxiliaryConnection> auxiliaryConnection() const { return here(m_connection); }
+    std::shared_ptr<runtime::Object> principalObject() const { return here(m_principalObject).lock(); }
 
     /// What the extension offers its host, and what it expects of it.
     virtual ConnectionInterface vendorInterface() const { return {}; }
@@ -30,7 +30,7 @@ public:
     // For the runtime that starts the extension.
     void setUp(const Platform& platform, std::vector<InputItem> inputItems,
                std::shared_ptr<AuxiliaryConnection> connection);
-    void setPrincipalObject(const std::shared_ptr<runtime::Object>& object) { m_principalObject = object; }
+    void setPrincipalObject(const std::shared_ptr<runtime::Object>& object) { here(m_principalObject) = object; }
 
 private:
     const Platform* m_platform = nullptr;
@@ -45,8 +45,8 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
-    std::shared_ptr<ExtensionContext> extensionContext() const { return m_context; }
-    void setExtensionContext(std::shared_ptr<ExtensionContext> context) { m_context = std::move(context); }
+    std::shared_ptr<ExtensionContext> extensionContext() const { return here(m_context); }
+    void setExtensionContext(std::shared_ptr<ExtensionContext> context) { here(m_context) = std::move(context); }
 
 private:
     std::shared_ptr<ExtensionContext> m_context;

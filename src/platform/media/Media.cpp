@@ -27,6 +27,7 @@ AudioMix audioMixOfAllTracks(const Asset& asset)
 
 PlayerLayer::~PlayerLayer()
 {
+    assertHere();
     unfollow();
 }
 

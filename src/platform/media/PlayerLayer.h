@@ -15,11 +15,11 @@ public:
 
     static std::shared_ptr<PlayerLayer> withPlayer(const std::shared_ptr<Player>& player);
 
-    const std::shared_ptr<Player>& player() const { return m_player; }
+    const std::shared_ptr<Player>& player() const { return here(m_player); }
     void setPlayer(const std::shared_ptr<Player>& player);
 
     /// Null when there is no player, or no picture yet.
-    VideoFrameRef currentFrame() const { return m_player ? m_player->currentFrame() : nullptr; }
+    VideoFrameRef currentFrame() const { return here(m_player) ? m_player->currentFrame() : nullptr; }
     /// What to tell the user in place of a picture: why the item cannot be played. Empty while there is nothing to tell.
     std::string failureText() const;
     /// What to tell the user over the first picture: that the movie was cut off. Empty elsewhere, and while it plays.

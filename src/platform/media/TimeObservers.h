@@ -29,7 +29,11 @@ public:
     [[nodiscard]] Token addBoundary(std::vector<base::MediaTime> times, std::function<void()> callback);
     /// Does nothing for a token that is not (or no longer) known.
     void remove(const Token& token);
-    bool isEmpty() const { return m_entries.empty(); }
+    bool isEmpty() const
+    {
+        m_affinity.assertHere();
+        return m_entries.empty();
+    }
 
     /// The first moment behind `time` for which somebody waits.
     std::optional<base::MediaTime> nextAfter(base::MediaTime time) const;

@@ -22,7 +22,7 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
-    int style() const { return m_style; }
+    int style() const { return here(m_style); }
 
     /// Takes `view` (a subview of this view's superview) into the mask, or out of it when it carries no flags.
     void updateMaskViewsFor(const std::shared_ptr<View>& view);

@@ -21,14 +21,14 @@ public:
     static std::shared_ptr<BarButtonItem> fixedSpace(double width);
     static std::shared_ptr<BarButtonItem> withCustomView(std::shared_ptr<View> view);
 
-    Kind kind() const { return m_kind; }
-    const runtime::TargetAction& targetAction() const { return m_targetAction; }
-    bool isSpace() const { return m_kind == Kind::FlexibleSpace || m_kind == Kind::FixedSpace; }
+    Kind kind() const { return here(m_kind); }
+    const runtime::TargetAction& targetAction() const { return here(m_targetAction); }
+    bool isSpace() const { return here(m_kind) == Kind::FlexibleSpace || m_kind == Kind::FixedSpace; }
 
     /// Points; 0 means: as wide as its content.
-    double width() const { return m_width; }
+    double width() const { return here(m_width); }
     void setWidth(double width);
-    base::EdgeInsets imageInsets() const { return m_imageInsets; }
+    base::EdgeInsets imageInsets() const { return here(m_imageInsets); }
     void setImageInsets(base::EdgeInsets insets);
 
     /// What stands in the toolbar: the custom view, or a button made once. Null for spaces.

@@ -24,16 +24,16 @@ public:
 
     /// A glyph of the presenter's icon set, drawn sharp at any scale in the tint colour: "play", "pause", "share".
     void setGlyph(std::string name);
-    const std::string& glyph() const { return m_glyph; }
+    const std::string& glyph() const { return here(m_glyph); }
     /// Moves the glyph inside the button.
     void setImageInsets(base::EdgeInsets insets);
-    base::EdgeInsets imageInsets() const { return m_imageInsets; }
+    base::EdgeInsets imageInsets() const { return here(m_imageInsets); }
 
     void setTitle(std::string title);
-    const std::string& title() const { return m_title; }
+    const std::string& title() const { return here(m_title); }
     /// A bold title marks what confirms.
     void setEmphasized(bool emphasized);
-    bool isEmphasized() const { return m_emphasized; }
+    bool isEmphasized() const { return here(m_emphasized); }
 
     base::Size sizeThatFits() const override;
     bool activate() override;

@@ -81,6 +81,7 @@ Canvas::Canvas(base::Size size, double scale)
 
 void Canvas::fill(base::Rect rect, double white, double alpha)
 {
+    m_affinity.assertHere();
     const auto edge = [this](double points, int most) {
         return static_cast<int>(std::lround(std::clamp(points * m_scale, 0.0, static_cast<double>(most))));
     };
@@ -96,6 +97,7 @@ void Canvas::fill(base::Rect rect, double white, double alpha)
 
 void Canvas::draw(const Image& image, base::Point at, BlendMode mode, double alpha)
 {
+    m_affinity.assertHere();
     const Bitmap& source = image.bitmap();
     const double pixel = m_scale / image.scale();
     const auto columns = lines(source.width, at.x * m_scale, pixel, m_bitmap.width);
@@ -114,6 +116,7 @@ void Canvas::draw(const Image& image, base::Point at, BlendMode mode, double alp
 
 ImageRef Canvas::image() const
 {
+    m_affinity.assertHere();
     return std::make_shared<const Image>(m_bitmap, m_scale);
 }
 

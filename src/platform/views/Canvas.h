@@ -1,6 +1,7 @@
 /// A bitmap to draw on: transparent at first, in points, y downwards. One thread at a time.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Geometry.h"
 #include "platform/views/Image.h"
 
@@ -24,6 +25,7 @@ public:
     ImageRef image() const;
 
 private:
+    base::Affinity m_affinity;
     Bitmap m_bitmap;
     double m_scale;
 };

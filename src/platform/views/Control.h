@@ -30,13 +30,13 @@ public:
     /// Sends the actions of every target that asked for one of `events`, in the order in which they were added.
     void sendActionsFor(unsigned events);
 
-    bool isEnabled() const { return m_enabled; }
+    bool isEnabled() const { return here(m_enabled); }
     void setEnabled(bool enabled);
-    bool isHighlighted() const { return m_highlighted; }
+    bool isHighlighted() const { return here(m_highlighted); }
     void setHighlighted(bool highlighted);
 
-    bool passesTouchesToSuperviewRecognizers() const override { return m_passesTouches; }
-    void setPassesTouchesToSuperviewRecognizers(bool passes) { m_passesTouches = passes; }
+    bool passesTouchesToSuperviewRecognizers() const override { return here(m_passesTouches); }
+    void setPassesTouchesToSuperviewRecognizers(bool passes) { here(m_passesTouches) = passes; }
 
     std::shared_ptr<View> hitTest(base::Point point) override;
     void touchBegan(const Touch& touch) override;
@@ -44,7 +44,7 @@ public:
     void touchEnded(const Touch& touch) override;
     void touchCancelled(const Touch& touch) override;
 
-    bool canBecomeFocused() const override { return m_enabled; }
+    bool canBecomeFocused() const override { return here(m_enabled); }
 
 private:
     struct Registration {

@@ -13,7 +13,7 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
-    const ImageRef& image() const { return m_image; }
+    const ImageRef& image() const { return here(m_image); }
 
 private:
     ImageRef m_image;

@@ -16,14 +16,14 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
-    const std::string& text() const { return m_text; }
+    const std::string& text() const { return here(m_text); }
     void setText(std::string text);
     /// In points.
-    double fontSize() const { return m_fontSize; }
+    double fontSize() const { return here(m_fontSize); }
     void setFontSize(double points);
-    Color textColor() const { return m_textColor; }
+    Color textColor() const { return here(m_textColor); }
     void setTextColor(Color color);
-    TextAlignment textAlignment() const { return m_alignment; }
+    TextAlignment textAlignment() const { return here(m_alignment); }
     void setTextAlignment(TextAlignment alignment);
 
     Accessibility accessibility() const override;

@@ -13,9 +13,10 @@ namespace platform {
 class Layer : public runtime::Object {
 public:
     /// In the coordinates of the view that it was added to.
-    base::Rect frame() const { return m_frame; }
+    base::Rect frame() const { return here(m_frame); }
     void setFrame(base::Rect frame)
     {
+        assertHere();
         if (m_frame == frame)
             return;
         m_frame = frame;
@@ -23,10 +24,10 @@ public:
     }
 
     /// Grows with each change that has to be drawn.
-    std::uint64_t revision() const { return m_revision; }
+    std::uint64_t revision() const { return here(m_revision); }
 
     /// Who is told of such changes: the view that it was added to.
-    void setDisplayHandler(std::function<void()> handler) { m_displayHandler = std::move(handler); }
+    void setDisplayHandler(std::function<void()> handler) { here(m_displayHandler) = std::move(handler); }
 
 protected:
     void setNeedsDisplay()

@@ -71,35 +71,38 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
-    void setDelegate(std::weak_ptr<MovieScrubberDelegate> delegate) { m_delegate = std::move(delegate); }
-    std::shared_ptr<MovieScrubberDelegate> delegate() const { return m_delegate.lock(); }
-    void setDataSource(std::weak_ptr<MovieScrubberDataSource> dataSource) { m_dataSource = std::move(dataSource); }
-    std::shared_ptr<MovieScrubberDataSource> dataSource() const { return m_dataSource.lock(); }
+    void setDelegate(std::weak_ptr<MovieScrubberDelegate> delegate) { here(m_delegate) = std::move(delegate); }
+    std::shared_ptr<MovieScrubberDelegate> delegate() const { return here(m_delegate).lock(); }
+    void setDataSource(std::weak_ptr<MovieScrubberDataSource> dataSource)
+    {
+        here(m_dataSource) = std::move(dataSource);
+    }
+    std::shared_ptr<MovieScrubberDataSource> dataSource() const { return here(m_dataSource).lock(); }
 
-    double minimumTrimLength() const { return m_minimumTrimLength; } ///< seconds
-    void setMinimumTrimLength(double seconds) { m_minimumTrimLength = seconds; }
-    bool isEditable() const { return m_editable; }
+    double minimumTrimLength() const { return here(m_minimumTrimLength); } ///< seconds
+    void setMinimumTrimLength(double seconds) { here(m_minimumTrimLength) = seconds; }
+    bool isEditable() const { return here(m_editable); }
     void setEditable(bool editable);
     /// Seconds that a grip is held still until the strip is zoomed; never when 0.
-    double zoomDelay() const { return m_zoomDelay; }
-    void setZoomDelay(double seconds) { m_zoomDelay = seconds; }
-    double edgeInset() const { return m_edgeInset; } ///< points
+    double zoomDelay() const { return here(m_zoomDelay); }
+    void setZoomDelay(double seconds) { here(m_zoomDelay) = seconds; }
+    double edgeInset() const { return here(m_edgeInset); } ///< points
     void setEdgeInset(double points);
 
     /// Where the play head is, in seconds. Setting it tells nobody. NaN is kept as 0.
-    double value() const { return m_value; }
+    double value() const { return here(m_value); }
     void setValue(double seconds);
     /// Seconds; 0 while nothing is loaded.
-    double duration() const { return m_duration; }
+    double duration() const { return here(m_duration); }
 
     // The range, in seconds: all of the movie unless it is being edited.
-    bool isEditing() const { return m_editing; }
+    bool isEditing() const { return here(m_editing); }
     /// Tells nobody. Leaving lets go of a grip that is held.
     void setEditing_animated(bool editing, bool animated);
-    double editingStartValue() const { return m_range.start; }
-    double editingEndValue() const { return m_range.end; }
+    double editingStartValue() const { return here(m_range).start; }
+    double editingEndValue() const { return here(m_range).end; }
     /// The minimum trim length, or all of a movie that is shorter.
-    double leastRange() const { return std::min(m_minimumTrimLength, m_duration); }
+    double leastRange() const { return std::min(here(m_minimumTrimLength), m_duration); }
 
     /// Asks the data source for everything anew.
     void reloadData();
@@ -112,19 +115,19 @@ public:
     base::Rect trackRect() const;
     double playHeadX() const;
     /// Those on the strip, evenly spaced.
-    const std::vector<double>& timestamps() const { return m_timestamps; }
+    const std::vector<double>& timestamps() const { return here(m_timestamps); }
     /// Those on the strip and, while it is zoomed, those of the whole movie.
-    const std::map<double, ImageRef>& thumbnails() const { return m_thumbnails; }
-    bool isZoomed() const { return m_zoomed; }
+    const std::map<double, ImageRef>& thumbnails() const { return here(m_thumbnails); }
+    bool isZoomed() const { return here(m_zoomed); }
     // Seconds at the left and at the right end of the track.
-    double visibleStart() const { return m_visible.start; }
-    double visibleEnd() const { return m_visible.end; }
-    ScrubberHandle held() const { return m_held; }
+    double visibleStart() const { return here(m_visible).start; }
+    double visibleEnd() const { return here(m_visible).end; }
+    ScrubberHandle held() const { return here(m_held); }
     // Null until first laid out.
-    const std::shared_ptr<PlayHeadView>& playHead() const { return m_playHead; }
-    const std::shared_ptr<TrimFrameView>& trimFrame() const { return m_frameView; }
-    const std::shared_ptr<TrimHandleView>& startHandle() const { return m_startHandle; }
-    const std::shared_ptr<TrimHandleView>& endHandle() const { return m_endHandle; }
+    const std::shared_ptr<PlayHeadView>& playHead() const { return here(m_playHead); }
+    const std::shared_ptr<TrimFrameView>& trimFrame() const { return here(m_frameView); }
+    const std::shared_ptr<TrimHandleView>& startHandle() const { return here(m_startHandle); }
+    const std::shared_ptr<TrimHandleView>& endHandle() const { return here(m_endHandle); }
 
     base::Size sizeThatFits() const override { return {frame().width(), kHeight}; }
     Accessibility accessibility() const override;

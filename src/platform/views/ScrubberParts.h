@@ -22,7 +22,7 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
-    bool isHeld() const { return m_held; }
+    bool isHeld() const { return here(m_held); }
     void setHeld(bool held);
 
 private:
@@ -39,9 +39,9 @@ public:
     const runtime::Class& isa() const override;
 
     /// Outside editing there are only the grips.
-    bool isEditing() const { return m_editing; }
+    bool isEditing() const { return here(m_editing); }
     void setEditing(bool editing);
-    ScrubberHandle held() const { return m_held; }
+    ScrubberHandle held() const { return here(m_held); }
     void setHeld(ScrubberHandle held);
 
 private:

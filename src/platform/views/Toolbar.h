@@ -26,12 +26,12 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
-    const Items& items() const { return m_items; }
+    const Items& items() const { return here(m_items); }
     /// The same item may stand in several places when it is a space.
     void setItems(Items items, bool animated = false);
 
-    std::shared_ptr<ToolbarDelegate> delegate() const { return m_delegate.lock(); }
-    void setDelegate(std::weak_ptr<ToolbarDelegate> delegate) { m_delegate = std::move(delegate); }
+    std::shared_ptr<ToolbarDelegate> delegate() const { return here(m_delegate).lock(); }
+    void setDelegate(std::weak_ptr<ToolbarDelegate> delegate) { here(m_delegate) = std::move(delegate); }
 
     /// Places the items: the row's title (a custom view between flexible spaces) is centred in the bar itself as long
     /// as it does not meet its neighbours.

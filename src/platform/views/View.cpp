@@ -18,7 +18,10 @@ constexpr double kLeastAlphaForTouches = 0.01;
 
 View::View(base::Rect frame) : m_frame(frame) {}
 
-View::~View() = default;
+View::~View()
+{
+    assertHere();
+}
 
 const runtime::Class& View::classObject()
 {

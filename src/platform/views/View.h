@@ -48,37 +48,37 @@ public:
     const runtime::Class& isa() const override;
 
     // Geometry: the frame is in the superview's coordinates, the bounds in its own.
-    base::Rect frame() const { return m_frame; }
+    base::Rect frame() const { return here(m_frame); }
     void setFrame(base::Rect frame);
-    base::Rect bounds() const { return {{0, 0}, m_frame.size}; }
-    base::Point center() const { return m_frame.center(); }
+    base::Rect bounds() const { return {{0, 0}, here(m_frame).size}; }
+    base::Point center() const { return here(m_frame).center(); }
     void setCenter(base::Point center);
-    unsigned autoresizingMask() const { return m_autoresizingMask; }
-    void setAutoresizingMask(unsigned mask) { m_autoresizingMask = mask; }
+    unsigned autoresizingMask() const { return here(m_autoresizingMask); }
+    void setAutoresizingMask(unsigned mask) { here(m_autoresizingMask) = mask; }
     /// What it would like to be; the current size by default.
-    virtual base::Size sizeThatFits() const { return m_frame.size; }
+    virtual base::Size sizeThatFits() const { return here(m_frame).size; }
     void sizeToFit();
     base::Point convertToRoot(base::Point point) const;
     base::Point convertFromRoot(base::Point point) const;
 
     // Looks.
-    double alpha() const { return m_alpha; }
+    double alpha() const { return here(m_alpha); }
     void setAlpha(double alpha);
-    bool isHidden() const { return m_hidden; }
+    bool isHidden() const { return here(m_hidden); }
     void setHidden(bool hidden);
-    Color backgroundColor() const { return m_backgroundColor; }
+    Color backgroundColor() const { return here(m_backgroundColor); }
     void setBackgroundColor(Color color);
-    bool clipsToBounds() const { return m_clipsToBounds; }
+    bool clipsToBounds() const { return here(m_clipsToBounds); }
     void setClipsToBounds(bool clips);
     /// Nothing means: the superview's, and in the end the presenter's accent colour.
-    std::optional<Color> tintColor() const { return m_tintColor; }
+    std::optional<Color> tintColor() const { return here(m_tintColor); }
     void setTintColor(std::optional<Color> color);
     std::optional<Color> effectiveTintColor() const;
 
     // The tree.
-    const std::vector<Child>& children() const { return m_children; }
+    const std::vector<Child>& children() const { return here(m_children); }
     std::vector<std::shared_ptr<View>> subviews() const;
-    std::shared_ptr<View> superview() const { return m_superview.lock(); }
+    std::shared_ptr<View> superview() const { return here(m_superview).lock(); }
     /// Adding a view that is already here brings it to the front.
     void addSubview(const std::shared_ptr<View>& view);
     void insertSubview_belowSubview(const std::shared_ptr<View>& view, const std::shared_ptr<View>& sibling);
@@ -89,27 +89,27 @@ public:
     std::shared_ptr<Responder> nextResponder() const override;
 
     // Layout by constraints: every constraint between this view and views below it is kept here.
-    bool translatesAutoresizingMaskIntoConstraints() const { return m_translatesAutoresizing; }
+    bool translatesAutoresizingMaskIntoConstraints() const { return here(m_translatesAutoresizing); }
     void setTranslatesAutoresizingMaskIntoConstraints(bool translates);
     /// A constraint equal to one that is kept already is not kept twice: it only becomes the newest.
     void addConstraint(const LayoutConstraint& constraint);
-    const std::vector<LayoutConstraint>& constraints() const { return m_constraints; }
+    const std::vector<LayoutConstraint>& constraints() const { return here(m_constraints); }
     /// Marks this view for layout before the next picture.
     void setNeedsLayout();
-    bool needsLayout() const { return m_needsLayout; }
+    bool needsLayout() const { return here(m_needsLayout); }
     /// Lays out this view and everything below it that is marked, now.
     void layoutIfNeeded();
     /// Solves the constraints kept here and places the subviews. Overriders call this first.
     virtual void layoutSubviews();
 
     // Touch.
-    bool isUserInteractionEnabled() const { return m_userInteractionEnabled; }
-    void setUserInteractionEnabled(bool enabled) { m_userInteractionEnabled = enabled; }
+    bool isUserInteractionEnabled() const { return here(m_userInteractionEnabled); }
+    void setUserInteractionEnabled(bool enabled) { here(m_userInteractionEnabled) = enabled; }
     /// The frontmost view below `point` (own coordinates) that takes touches; null outside, hidden or below alpha 0.01.
     virtual std::shared_ptr<View> hitTest(base::Point point);
     virtual bool pointInside(base::Point point) const { return bounds().contains(point); }
     void addGestureRecognizer(const std::shared_ptr<GestureRecognizer>& recognizer);
-    const std::vector<std::shared_ptr<GestureRecognizer>>& gestureRecognizers() const { return m_recognizers; }
+    const std::vector<std::shared_ptr<GestureRecognizer>>& gestureRecognizers() const { return here(m_recognizers); }
     /// Whether touches that begin here may also reach the recognisers of views above.
     virtual bool passesTouchesToSuperviewRecognizers() const { return true; }
     virtual void touchBegan(const Touch&) {}
@@ -127,21 +127,21 @@ public:
     virtual void setNumber(double /*number*/) {}
     virtual Accessibility accessibility() const;
     void setAccessibilityLabel(std::string label);
-    const std::string& accessibilityLabel() const { return m_accessibilityLabel; }
+    const std::string& accessibilityLabel() const { return here(m_accessibilityLabel); }
 
     /// Flags that make this view part of the mask of a backdrop below it; see BackdropView.
-    unsigned backdropMaskFlags() const { return m_backdropMaskFlags; }
+    unsigned backdropMaskFlags() const { return here(m_backdropMaskFlags); }
     void setBackdropMaskFlags(unsigned flags);
 
     // For the presenter.
     /// Grows with each change of this view itself: values, children and their order.
-    std::uint64_t revision() const { return m_revision; }
+    std::uint64_t revision() const { return here(m_revision); }
     /// Gives and forgets what was animated since the last call; one entry a property, the latest.
     std::vector<PropertyAnimation> takeAnimations();
 
     // For controllers.
     std::shared_ptr<ViewController> viewController() const;
-    void setViewController(const std::weak_ptr<ViewController>& controller) { m_viewController = controller; }
+    void setViewController(const std::weak_ptr<ViewController>& controller) { here(m_viewController) = controller; }
 
 protected:
     /// Tells the presenter that this view has to be drawn anew.

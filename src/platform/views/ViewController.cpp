@@ -10,6 +10,7 @@ namespace platform {
 
 void TransitionCoordinator::animateAlongsideTransition(Block alongside, Block completion)
 {
+    m_affinity.assertHere();
     if (alongside)
         m_alongside.push_back(std::move(alongside));
     if (completion)
@@ -18,6 +19,7 @@ void TransitionCoordinator::animateAlongsideTransition(Block alongside, Block co
 
 void TransitionCoordinator::runAlongside()
 {
+    m_affinity.assertHere();
     while (!m_alongside.empty())
         for (const Block& block : std::exchange(m_alongside, {}))
             block();
@@ -25,11 +27,15 @@ void TransitionCoordinator::runAlongside()
 
 void TransitionCoordinator::runCompletions()
 {
+    m_affinity.assertHere();
     for (const Block& block : std::exchange(m_completions, {}))
         block();
 }
 
-ViewController::~ViewController() = default;
+ViewController::~ViewController()
+{
+    assertHere();
+}
 
 const runtime::Class& ViewController::classObject()
 {

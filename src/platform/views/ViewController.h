@@ -4,6 +4,7 @@
 /// viewDidAppear, one whose view leaves it the two opposite calls, each once.
 #pragma once
 
+#include "base/Affinity.h"
 #include "platform/views/View.h"
 
 #include <functional>
@@ -19,7 +20,11 @@ public:
 
     explicit TransitionCoordinator(base::Instant duration) : m_duration(duration) {}
 
-    base::Instant duration() const { return m_duration; }
+    base::Instant duration() const
+    {
+        m_affinity.assertHere();
+        return m_duration;
+    }
     /// `alongside` runs once the new size is in force, inside the transition's animation; `completion` after it.
     void animateAlongsideTransition(Block alongside, Block completion);
 
@@ -28,6 +33,7 @@ public:
     void runCompletions();
 
 private:
+    base::Affinity m_affinity;
     base::Instant m_duration;
     std::vector<Block> m_alongside;
     std::vector<Block> m_completions;
@@ -43,13 +49,13 @@ public:
 
     /// Loads the view on first use: loadView, then viewDidLoad.
     std::shared_ptr<View> view();
-    bool isViewLoaded() const { return m_view != nullptr; }
+    bool isViewLoaded() const { return here(m_view) != nullptr; }
     void setView(std::shared_ptr<View> view);
 
     // Containment. A parent adds the child, puts its view among its own and then says that it did move; it says that it
     // will move to none, takes the view out and then removes the child. Any other order fails an assertion.
-    std::shared_ptr<ViewController> parent() const { return m_parent.lock(); }
-    const std::vector<std::shared_ptr<ViewController>>& childViewControllers() const { return m_children; }
+    std::shared_ptr<ViewController> parent() const { return here(m_parent).lock(); }
+    const std::vector<std::shared_ptr<ViewController>>& childViewControllers() const { return here(m_children); }
     void addChildViewController(const std::shared_ptr<ViewController>& child);
     void removeFromParentViewController();
     /// Said to the child when it is added; its parent says that it will move to none. An override calls this.
@@ -70,7 +76,7 @@ public:
     virtual void viewWillTransitionToSize_withTransitionCoordinator(base::Size size,
                                                                     TransitionCoordinator& coordinator);
 
-    bool hasAppeared() const { return m_appeared; }
+    bool hasAppeared() const { return here(m_appeared); }
     std::shared_ptr<Responder> nextResponder() const override;
     std::shared_ptr<Window> window() const override;
 

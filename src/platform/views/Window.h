@@ -24,27 +24,27 @@ public:
 
     // Screen: the window is the whole of it.
     base::Rect bounds() const override { return View::bounds(); }
-    double scale() const override { return m_scale; }
+    double scale() const override { return here(m_scale); }
     void setScale(double scale);
 
     std::shared_ptr<Window> window() const override;
     std::shared_ptr<Responder> nextResponder() const override { return nullptr; }
 
     /// For views that let time pass.
-    base::MainQueue& mainQueue() const { return m_mainQueue; }
+    base::MainQueue& mainQueue() const { return here(m_mainQueue); }
 
     /// Its view fills the window.
     void setRootViewController(const std::shared_ptr<ViewController>& controller);
-    std::shared_ptr<ViewController> rootViewController() const { return m_root; }
+    std::shared_ptr<ViewController> rootViewController() const { return here(m_root); }
     /// Shows or hides the window: the controllers appear or disappear.
     void setVisible(bool visible);
-    bool isVisible() const { return m_visible; }
+    bool isVisible() const { return here(m_visible); }
 
     /// A new size: coalesced, so that one transition runs for all that is asked before the main queue's next turn.
     void requestSize(base::Size size);
     /// The transition itself, at once. Does nothing when the size is the current one.
     void transitionToSize(base::Size size);
-    std::uint64_t transitionCount() const { return m_transitions; }
+    std::uint64_t transitionCount() const { return here(m_transitions); }
 
     // Events, positions in the window's coordinates.
     void touchDown(const Touch& touch);
@@ -56,7 +56,7 @@ public:
     bool keyDown(Key key, char character = 0, bool control = false);
 
     // First responder.
-    std::shared_ptr<Responder> firstResponder() const { return m_firstResponder.lock(); }
+    std::shared_ptr<Responder> firstResponder() const { return here(m_firstResponder).lock(); }
     void setFirstResponder(const std::shared_ptr<Responder>& responder);
 
     // Keyboard focus: Tab order is the order of drawing, top to bottom, leading to trailing.
@@ -66,7 +66,7 @@ public:
 
     // For the presenter.
     /// Called once when the tree stops being what was last committed; again only after `commit()`.
-    void setNeedsCommitHandler(std::function<void()> handler) { m_needsCommitHandler = std::move(handler); }
+    void setNeedsCommitHandler(std::function<void()> handler) { here(m_needsCommitHandler) = std::move(handler); }
     /// Lays out what needs it; the presenter mirrors the tree right after.
     void commit();
     void noteChange();
