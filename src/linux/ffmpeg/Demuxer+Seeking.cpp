@@ -46,6 +46,7 @@ void Demuxer::leave()
 
 bool Demuxer::seek(int stream, std::int64_t timestamp)
 {
+    m_affinity.assertHere();
     leave();
     if (!isMatroska())
         return av_seek_frame(m_context.get(), stream, timestamp, AVSEEK_FLAG_BACKWARD) >= 0;
@@ -59,6 +60,7 @@ bool Demuxer::seek(int stream, std::int64_t timestamp)
 
 bool Demuxer::seekSound(int sound, int pictures, std::int64_t moment)
 {
+    m_affinity.assertHere();
     const auto seekBy = [&](int by) { return seek(by, av_rescale_q(moment, AV_TIME_BASE_Q, stream(by).time_base)); };
     // Matroska's table is that of the pictures; of the sound it knows what happened to be read.
     return (isMatroska() && pictures >= 0 && seekBy(pictures)) || seekBy(sound);
@@ -75,6 +77,7 @@ bool Demuxer::seekToByte(std::int64_t position)
 
 bool Demuxer::seekTo(int stream, const PacketEntry& packet)
 {
+    m_affinity.assertHere();
     std::array ways{Way::ByPlace, Way::BeforePlace, Way::ByTime};
     std::iter_swap(ways.begin(), std::find(ways.begin(), ways.end(), m_way));
     for (const Way way : ways) {
@@ -117,6 +120,7 @@ bool Demuxer::readUpTo(int stream, const PacketEntry& wanted)
 
 bool Demuxer::seekToStart(int stream)
 {
+    m_affinity.assertHere();
     if (m_isFresh)
         return true;
     // Elsewhere no table need have the first packet, and only a new reader counts from it.
@@ -160,6 +164,7 @@ void Demuxer::keepTable(AVFormatContext& before)
 
 bool Demuxer::findsKeyframes(int stream)
 {
+    m_affinity.assertHere();
     if (!isMatroska() || !m_isFresh)
         return isMov();
     const std::int64_t lookedTo = m_hasLookedAtPackets ? avio_tell(m_context->pb) : 0;

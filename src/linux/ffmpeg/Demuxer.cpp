@@ -160,12 +160,14 @@ int Demuxer::begin()
 
 void Demuxer::lookAtPackets()
 {
+    m_affinity.assertHere();
     if (!std::exchange(m_hasLookedAtPackets, true))
         avformat_find_stream_info(m_context.get(), nullptr);
 }
 
 void Demuxer::select(const std::vector<int>& streams)
 {
+    m_affinity.assertHere();
     m_selected = streams;
     for (int i = 0; i < streamCount(); ++i) {
         const bool wanted = std::find(streams.begin(), streams.end(), i) != streams.end();
@@ -175,6 +177,7 @@ void Demuxer::select(const std::vector<int>& streams)
 
 int Demuxer::read(AVPacket& packet)
 {
+    m_affinity.assertHere();
     av_packet_unref(&packet);
     if (m_lost != 0)
         return m_lost;
@@ -204,16 +207,19 @@ int Demuxer::read(AVPacket& packet)
 
 bool Demuxer::seeksByTable() const
 {
+    m_affinity.assertHere();
     return hasTable(*m_context);
 }
 
 bool Demuxer::isMov() const
 {
+    m_affinity.assertHere();
     return isOfKind(*m_context, "mov");
 }
 
 bool Demuxer::isMatroska() const
 {
+    m_affinity.assertHere();
     return isOfKind(*m_context, "matroska");
 }
 

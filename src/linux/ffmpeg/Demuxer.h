@@ -1,6 +1,7 @@
 /// Reads a file's packets. One thread at a time; each reader of a movie has a demuxer of its own over the shared file.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
 #include "linux/ffmpeg/OpenFile.h"
@@ -24,23 +25,51 @@ public:
     static base::Result<std::unique_ptr<Demuxer>> open(std::shared_ptr<OpenFile> file, Cancelled cancelled);
     ~Demuxer();
 
-    const OpenFile& file() const { return *m_file; }
-    AVFormatContext& context() { return *m_context; }
-    AVStream& stream(int index) { return *m_context->streams[index]; }
-    int streamCount() const { return static_cast<int>(m_context->nb_streams); }
-    bool isCancelled() const { return m_cancelled && *m_cancelled; }
+    const OpenFile& file() const
+    {
+        m_affinity.assertHere();
+        return *m_file;
+    }
+    AVFormatContext& context()
+    {
+        m_affinity.assertHere();
+        return *m_context;
+    }
+    AVStream& stream(int index)
+    {
+        m_affinity.assertHere();
+        return *m_context->streams[index];
+    }
+    int streamCount() const
+    {
+        m_affinity.assertHere();
+        return static_cast<int>(m_context->nb_streams);
+    }
+    bool isCancelled() const
+    {
+        m_affinity.assertHere();
+        return m_cancelled && *m_cancelled;
+    }
     /// Reads packets to know what headers do not tell, profiles for example; what was read comes all the same. Opening
     /// does that already for files without a header, and the library fails when it is asked twice.
     void lookAtPackets();
     /// From now on reading stops when this is set.
-    void setCancelled(Cancelled cancelled) { m_cancelled = std::move(cancelled); }
+    void setCancelled(Cancelled cancelled)
+    {
+        m_affinity.assertHere();
+        m_cancelled = std::move(cancelled);
+    }
 
     /// Only the packets of these streams are read.
     void select(const std::vector<int>& streams);
     /// 0, AVERROR_EOF at the end or where the file is cut, or another error after which nothing more can be read.
     int read(AVPacket& packet);
     /// Why bytes could not be read since the last seek, as a negative errno; 0 while all could.
-    int readError() const { return m_readError; }
+    int readError() const
+    {
+        m_affinity.assertHere();
+        return m_readError;
+    }
     /// To the last keyframe at or before `timestamp` of `stream` that is known; later ones may follow where the file has no
     /// table. False when there is none; the reader stands anywhere then.
     bool seek(int stream, std::int64_t timestamp);
@@ -61,6 +90,9 @@ public:
     bool isMov() const;
     bool isMatroska() const;
 
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
+
 private:
     Demuxer(std::shared_ptr<OpenFile> file, Cancelled cancelled);
 
@@ -77,6 +109,7 @@ private:
     static int readBytes(void* self, std::uint8_t* into, int count);
     static std::int64_t moveTo(void* self, std::int64_t offset, int whence);
 
+    base::Affinity m_affinity;
     std::shared_ptr<OpenFile> m_file;
     Cancelled m_cancelled;
     std::int64_t m_position = 0;

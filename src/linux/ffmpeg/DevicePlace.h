@@ -1,4 +1,5 @@
-/// How much of what a sound device was given was heard, by where the device says that it is. One thread at a time.
+/// How much of what a sound device was given was heard, by where the device says that it is. Whoever shares it between
+/// threads locks it.
 #pragma once
 
 #include "base/Clock.h"

@@ -36,6 +36,7 @@ FFmpegAsset::FFmpegAsset(std::shared_ptr<Engine> engine, std::optional<base::Url
 
 FFmpegAsset::~FFmpegAsset()
 {
+    assertHere();
     *m_cancelled = true;
 }
 

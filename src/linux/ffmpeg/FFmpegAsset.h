@@ -15,15 +15,15 @@ public:
     /// Gives up opening.
     ~FFmpegAsset() override;
 
-    const std::optional<base::Url>& url() const override { return m_url; }
-    base::ErrorRef error() const override { return m_error; }
+    const std::optional<base::Url>& url() const override { return here(m_url); }
+    base::ErrorRef error() const override { return here(m_error); }
     base::MediaTime duration() const override;
     std::vector<platform::AssetTrack> tracks() const override;
     std::string whatIsMissing() const override;
     void whenLoaded(std::function<void()> then) override;
 
     /// Null while loading, and when it failed. Everything that reads the movie starts here: see Movie::demuxer.
-    const std::shared_ptr<Movie>& movie() const { return m_movie; }
+    const std::shared_ptr<Movie>& movie() const { return here(m_movie); }
 
 private:
     FFmpegAsset(std::shared_ptr<Engine> engine, std::optional<base::Url> url);

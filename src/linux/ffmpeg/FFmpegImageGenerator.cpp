@@ -19,6 +19,7 @@ FFmpegImageGenerator::FFmpegImageGenerator(std::shared_ptr<Engine> engine, std::
 
 FFmpegImageGenerator::~FFmpegImageGenerator()
 {
+    assertHere();
     if (m_workers)
         m_workers->cancel();
     m_engine->retire(std::move(m_workers));

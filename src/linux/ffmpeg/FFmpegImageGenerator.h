@@ -21,12 +21,12 @@ public:
                                                       std::shared_ptr<FFmpegAsset> asset);
     ~FFmpegImageGenerator() override;
 
-    void setMaximumSize(base::Size size) override { m_maximumSize = size; }
-    base::Size maximumSize() const override { return m_maximumSize; }
+    void setMaximumSize(base::Size size) override { here(m_maximumSize) = size; }
+    base::Size maximumSize() const override { return here(m_maximumSize); }
     void generateImagesAsynchronouslyForTimes(const std::vector<base::MediaTime>& times, Handler handler) override;
 
     /// Pictures decoded so far, for tests and measurements.
-    std::int64_t decodedCount() const { return m_workers ? m_workers->decodedCount() : 0; }
+    std::int64_t decodedCount() const { return here(m_workers) ? m_workers->decodedCount() : 0; }
 
 private:
     FFmpegImageGenerator(std::shared_ptr<Engine> engine, std::shared_ptr<FFmpegAsset> asset);

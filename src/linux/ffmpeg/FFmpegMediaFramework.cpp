@@ -20,7 +20,10 @@ FFmpegMediaFramework::FFmpegMediaFramework(const base::System& system, runtime::
     av_log_set_level(AV_LOG_QUIET);
 }
 
-FFmpegMediaFramework::~FFmpegMediaFramework() = default;
+FFmpegMediaFramework::~FFmpegMediaFramework()
+{
+    m_affinity.assertHere();
+}
 
 std::shared_ptr<platform::Asset> FFmpegMediaFramework::assetWithURL(const std::optional<base::Url>& url)
 {

@@ -29,6 +29,7 @@ FFmpegPlayer::FFmpegPlayer(std::shared_ptr<Engine> engine, std::shared_ptr<FFmpe
 
 FFmpegPlayer::~FFmpegPlayer()
 {
+    assertHere();
     if (m_item)
         m_item->setTimeSource({});
     *m_left = true;

@@ -26,26 +26,26 @@ public:
                                               std::shared_ptr<FFmpegPlayerItem> item);
     ~FFmpegPlayer() override;
 
-    std::shared_ptr<platform::PlayerItem> currentItem() const override { return m_item; }
+    std::shared_ptr<platform::PlayerItem> currentItem() const override { return here(m_item); }
     /// At the end of the item it ends again at once.
     void play() override;
     void pause() override;
-    bool isPlaying() const override { return m_playing; }
+    bool isPlaying() const override { return here(m_playing); }
     base::MediaTime currentTime() const override;
     void seekToTime(base::MediaTime time) override;
     void stepByCount(int frames) override;
-    void setActionAtItemEnd(platform::ActionAtItemEnd action) override { m_actionAtItemEnd = action; }
+    void setActionAtItemEnd(platform::ActionAtItemEnd action) override { here(m_actionAtItemEnd) = action; }
     ObserverToken addPeriodicTimeObserver(base::MediaTime interval,
                                           std::function<void(base::MediaTime)> callback) override;
     ObserverToken addBoundaryTimeObserver(std::vector<base::MediaTime> times, std::function<void()> callback) override;
-    void removeTimeObserver(const ObserverToken& token) override { m_observers.remove(token); }
-    platform::VideoFrameRef currentFrame() const override { return m_frame; }
-    void setFrameHandler(std::function<void()> handler) override { m_frameHandler = std::move(handler); }
+    void removeTimeObserver(const ObserverToken& token) override { here(m_observers).remove(token); }
+    platform::VideoFrameRef currentFrame() const override { return here(m_frame); }
+    void setFrameHandler(std::function<void()> handler) override { here(m_frameHandler) = std::move(handler); }
 
     /// Whether time goes on: playing, and neither picture nor sound is waited for.
-    bool isRunning() const { return m_running; }
+    bool isRunning() const { return here(m_running); }
     /// Paused, and the full picture for where it stands is shown (or there is none).
-    bool isSettled() const { return !m_playing && m_movie && m_settled && m_steps == 0; }
+    bool isSettled() const { return !here(m_playing) && m_movie && m_settled && m_steps == 0; }
     /// While running: whether the next picture has been decoded, or there is none any more.
     bool hasPictures() const;
 

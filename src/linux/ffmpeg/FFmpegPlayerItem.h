@@ -13,15 +13,15 @@ class FFmpegPlayerItem final : public platform::PlayerItem {
 public:
     static std::shared_ptr<FFmpegPlayerItem> make(std::shared_ptr<FFmpegAsset> asset);
 
-    std::shared_ptr<platform::Asset> asset() const override { return m_asset; }
-    Status status() const override { return m_status; }
-    base::ErrorRef error() const override { return m_asset->error(); }
+    std::shared_ptr<platform::Asset> asset() const override { return here(m_asset); }
+    Status status() const override { return here(m_status); }
+    base::ErrorRef error() const override { return here(m_asset)->error(); }
     base::MediaTime duration() const override;
-    base::MediaTime currentTime() const override { return m_now ? m_now() : base::MediaTime::zero(); }
+    base::MediaTime currentTime() const override { return here(m_now) ? m_now() : base::MediaTime::zero(); }
 
-    const std::shared_ptr<FFmpegAsset>& ffmpegAsset() const { return m_asset; }
+    const std::shared_ptr<FFmpegAsset>& ffmpegAsset() const { return here(m_asset); }
     /// Who knows where it stands: the latest player. That one takes itself back before it goes.
-    void setTimeSource(std::function<base::MediaTime()> now) { m_now = std::move(now); }
+    void setTimeSource(std::function<base::MediaTime()> now) { here(m_now) = std::move(now); }
 
 private:
     explicit FFmpegPlayerItem(std::shared_ptr<FFmpegAsset> asset) : m_asset(std::move(asset)) {}

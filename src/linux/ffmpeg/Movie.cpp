@@ -87,6 +87,7 @@ base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file,
     if (const auto found = movie->findDuration(cancelled); !found)
         return failed(found.error());
     movie->findLikelyPackets();
+    movie->m_spare->detach(); // for whoever asks for a reader first
     return movie;
 }
 

@@ -41,11 +41,13 @@ void PictureWorker::cancel()
 
 void PictureWorker::show(std::uint64_t generation, std::int64_t tick)
 {
+    m_affinity.assertHere();
     request(generation, tick, false);
 }
 
 void PictureWorker::play(std::uint64_t generation, std::int64_t tick)
 {
+    m_affinity.assertHere();
     request(generation, tick, true);
 }
 
@@ -64,6 +66,7 @@ void PictureWorker::request(std::uint64_t generation, std::int64_t tick, bool pl
 
 FrameRef PictureWorker::takeDue(std::int64_t tick)
 {
+    m_affinity.assertHere();
     FrameRef due;
     {
         const std::lock_guard lock(m_mutex);
@@ -80,12 +83,14 @@ FrameRef PictureWorker::takeDue(std::int64_t tick)
 
 std::optional<std::int64_t> PictureWorker::nextDue() const
 {
+    m_affinity.assertHere();
     const std::lock_guard lock(m_mutex);
     return m_queue.empty() ? std::nullopt : std::optional(m_queue.front()->pts());
 }
 
 bool PictureWorker::isAhead() const
 {
+    m_affinity.assertHere();
     const std::lock_guard lock(m_mutex);
     return !m_queue.empty() || m_exhausted;
 }
@@ -98,6 +103,7 @@ bool PictureWorker::hasRoom() const
 
 void PictureWorker::loop()
 {
+    m_inside.assertHere();
     const auto source = VideoSource::open(m_movie, m_cancelled, threadCount());
     for (;;) {
         Request request;
@@ -129,6 +135,7 @@ void PictureWorker::loop()
 
 void PictureWorker::answer(VideoSource& source, const Request& request)
 {
+    m_inside.assertHere();
     const auto want = request.plays ? VideoSource::Want::Played : VideoSource::Want::Any;
     VideoSource::Glimpse glimpse;
     if (!request.plays)
@@ -142,6 +149,7 @@ void PictureWorker::answer(VideoSource& source, const Request& request)
 
 void PictureWorker::give(const Request& request, const std::optional<ShownFrame>& shown)
 {
+    m_inside.assertHere();
     m_answered = request.generation;
     m_unrefined = shown && shown->frame->isReduced();
     m_playedTo = shown ? shown->until : kForever;
@@ -154,6 +162,7 @@ void PictureWorker::give(const Request& request, const std::optional<ShownFrame>
 
 void PictureWorker::refine(VideoSource& source, const Request& request)
 {
+    m_inside.assertHere();
     const auto shown = source.at(request.tick, VideoSource::Want::Full, [&] { return isOvertaken(request); });
     m_unrefined = false;
     if (!isOvertaken(request))
@@ -164,6 +173,7 @@ void PictureWorker::refine(VideoSource& source, const Request& request)
 /// But it is the only one; the next is what was due when it was begun.
 void PictureWorker::playOn(VideoSource& source, const Request& request)
 {
+    m_inside.assertHere();
     std::int64_t tick = m_playedTo;
     {
         const std::lock_guard lock(m_mutex);

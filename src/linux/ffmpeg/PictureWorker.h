@@ -1,8 +1,10 @@
 /// The thread of a player that decodes pictures: one at rest, or a few ahead of the time that is played.
 ///
-/// Each request carries a generation; a newer request overtakes an older one between two packets.
+/// Each request carries a generation; a newer request overtakes an older one between two packets. Asked by the thread
+/// that made it; cancelled and destroyed on any.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/VideoSource.h"
 
 #include <atomic>
@@ -64,6 +66,7 @@ private:
     bool hasRoom() const;
     bool isOvertaken(const Request& request) const { return m_generation.load() != request.generation; }
 
+    base::Affinity m_affinity; ///< of who asks
     const std::shared_ptr<const Movie> m_movie;
     const Arrived m_arrived;
     const std::shared_ptr<std::atomic<bool>> m_cancelled = std::make_shared<std::atomic<bool>>(false);
@@ -77,6 +80,7 @@ private:
     bool m_exhausted = false;   ///< no more pictures come to the queue
 
     // The thread's own.
+    base::Affinity m_inside = base::Affinity::detached();
     std::uint64_t m_answered = 0;
     bool m_unrefined = false;    ///< what was given is reduced
     std::int64_t m_playedTo = 0; ///< the tick from which the next queued picture is visible

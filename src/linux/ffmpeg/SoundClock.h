@@ -2,6 +2,7 @@
 /// too long. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Clock.h"
 #include "linux/ffmpeg/AudioOutput.h"
 
@@ -20,6 +21,7 @@ public:
     /// The run stands at `frames` now. It waits for the device, or already goes on without it.
     void start(std::int64_t frames, base::Instant now, bool isOnItsOwn)
     {
+        m_affinity.assertHere();
         m_frames = m_ownFrames = frames;
         m_device = 0;
         m_movedAt = m_ownAt = now;
@@ -29,6 +31,7 @@ public:
     /// Where the run is; never before where it was. `device` is what was heard of it, as the device says.
     std::int64_t frames(std::int64_t device, base::Instant now)
     {
+        m_affinity.assertHere();
         if (device > m_device) {
             m_device = device;
             m_movedAt = now;
@@ -46,9 +49,14 @@ public:
         return m_frames;
     }
 
-    bool isOnItsOwn() const { return m_isOnItsOwn; }
+    bool isOnItsOwn() const
+    {
+        m_affinity.assertHere();
+        return m_isOnItsOwn;
+    }
 
 private:
+    base::Affinity m_affinity;
     std::int64_t m_frames = 0;
     std::int64_t m_device = 0;
     base::Instant m_movedAt{0};

@@ -42,6 +42,7 @@ void SoundWorker::cancel()
 
 void SoundWorker::start(std::uint64_t generation, std::int64_t frame)
 {
+    m_affinity.assertHere();
     {
         const std::lock_guard lock(m_mutex);
         ++m_generation;
@@ -54,6 +55,7 @@ void SoundWorker::start(std::uint64_t generation, std::int64_t frame)
 
 void SoundWorker::stop()
 {
+    m_affinity.assertHere();
     m_muted = true;
     {
         const std::lock_guard lock(m_mutex);
@@ -65,6 +67,7 @@ void SoundWorker::stop()
 
 void SoundWorker::loop()
 {
+    m_inside.assertHere();
     auto mixer = SoundMixer::open(m_movie, m_cancelled);
     SoundMixer* const opened = mixer ? mixer.value().get() : nullptr;
     std::uint64_t done = 0;
@@ -102,6 +105,7 @@ void SoundWorker::loop()
 
 void SoundWorker::begin(SoundMixer* mixer, std::uint64_t generation, std::int64_t frame)
 {
+    m_inside.assertHere();
     if (mixer) {
         mixer->seek(frame);
         m_ring.reset(frame);
@@ -127,6 +131,7 @@ void SoundWorker::begin(SoundMixer* mixer, std::uint64_t generation, std::int64_
 
 void SoundWorker::fillRing(SoundMixer& mixer, std::size_t atMost)
 {
+    m_inside.assertHere();
     std::array<float, kChunk * 2> chunk{};
     for (std::size_t filled = 0; filled < atMost && m_ring.room() >= kChunk && !*m_cancelled; filled += kChunk) {
         const std::int64_t from = m_ring.next();

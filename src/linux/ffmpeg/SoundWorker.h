@@ -1,6 +1,9 @@
 /// The thread of a player that decodes sound ahead of the device, and starts and stops the device.
+///
+/// Asked by the thread that made it; cancelled and destroyed on any.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/AudioOutput.h"
 #include "linux/ffmpeg/Movie.h"
 #include "linux/ffmpeg/SoundMixer.h"
@@ -29,9 +32,17 @@ public:
     /// Plays from this frame of the movie on, in pairs of samples.
     void start(std::uint64_t generation, std::int64_t frame);
     /// The pictures are at this frame already: what the device asks for next is not from before it.
-    void hurryTo(std::int64_t frame) { m_ring.hurryTo(frame); }
+    void hurryTo(std::int64_t frame)
+    {
+        m_affinity.assertHere();
+        m_ring.hurryTo(frame);
+    }
     /// Frames that were left out for that since the start, beside those that the device was given.
-    std::int64_t skipped() const { return m_ring.skipped(); }
+    std::int64_t skipped() const
+    {
+        m_affinity.assertHere();
+        return m_ring.skipped();
+    }
     /// Silence at once; the device goes soon after.
     void stop();
 
@@ -40,6 +51,7 @@ private:
     void begin(SoundMixer* mixer, std::uint64_t generation, std::int64_t frame);
     void fillRing(SoundMixer& mixer, std::size_t atMost);
 
+    base::Affinity m_affinity; ///< of who asks
     const std::shared_ptr<const Movie> m_movie;
     const MakeAudioOutput m_makeOutput;
     const Started m_started;
@@ -56,6 +68,7 @@ private:
     static constexpr std::size_t kRing = std::size_t{2} * kSampleRate; ///< frames
 
     // The thread's own, but for the ring's reading end, which is the device's.
+    base::Affinity m_inside = base::Affinity::detached();
     SoundRing m_ring{kRing};
     std::shared_ptr<AudioOutput> m_output;
 

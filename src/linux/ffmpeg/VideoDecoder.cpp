@@ -51,6 +51,7 @@ base::Result<std::unique_ptr<VideoDecoder>> VideoDecoder::open(const AVStream& s
 
 void VideoDecoder::send(const AVPacket& packet)
 {
+    m_affinity.assertHere();
     if (m_firstKeyframe == AV_NOPTS_VALUE && (packet.flags & AV_PKT_FLAG_KEY))
         m_firstKeyframe = packet.pts;
     // Pictures were taken out before, so the decoder has room; anything else it says is about a damaged packet.
@@ -59,11 +60,13 @@ void VideoDecoder::send(const AVPacket& packet)
 
 void VideoDecoder::finish()
 {
+    m_affinity.assertHere();
     avcodec_send_packet(m_context.get(), nullptr);
 }
 
 FrameRef VideoDecoder::receive()
 {
+    m_affinity.assertHere();
     for (;;) {
         const int result = avcodec_receive_frame(m_context.get(), m_frame.get());
         if (result == AVERROR(EAGAIN) || result == AVERROR_EOF || result == AVERROR(EINVAL))
@@ -89,17 +92,20 @@ FrameRef VideoDecoder::receive()
 
 void VideoDecoder::flush()
 {
+    m_affinity.assertHere();
     avcodec_flush_buffers(m_context.get());
     m_lastPts = m_firstKeyframe = AV_NOPTS_VALUE;
 }
 
 void VideoDecoder::setSkipsUnreferenced(bool skips)
 {
+    m_affinity.assertHere();
     m_context->skip_frame = skips ? AVDISCARD_NONREF : AVDISCARD_DEFAULT;
 }
 
 void VideoDecoder::setMendsGaps(bool mends)
 {
+    m_affinity.assertHere();
     m_context->error_concealment = mends || !canLeaveGaps() ? FF_EC_GUESS_MVS | FF_EC_DEBLOCK : 0;
 }
 

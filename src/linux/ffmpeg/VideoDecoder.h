@@ -3,6 +3,7 @@
 /// Damaged packets are passed over: there are fewer pictures then, or such with flaws, never an error.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/DecodedFrame.h"
 #include "linux/ffmpeg/HardwareDevice.h"
@@ -34,11 +35,18 @@ public:
     /// Makes up what is missing of a picture, which is slow. For packets sent from now on, if it canLeaveGaps(); decoders
     /// of several threads always do.
     void setMendsGaps(bool mends);
-    bool canLeaveGaps() const { return m_context->thread_count == 1; }
+    bool canLeaveGaps() const
+    {
+        m_affinity.assertHere();
+        return m_context->thread_count == 1;
+    }
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
 
 private:
     VideoDecoder(Owned<AVCodecContext> context, const VideoTrack& track);
 
+    base::Affinity m_affinity;
     Owned<AVCodecContext> m_context;
     Owned<AVFrame> m_frame;
     VideoTrack m_track;

@@ -273,7 +273,11 @@ TEST_F(Places, AreStillFoundWhereStartingOverFailedForAMoment)
     const auto index = opened->packetIndex(cancelled);
     const auto demuxer = picturesOnly();
     ASSERT_EQ(read(*demuxer, 2).size(), 2U);
-    tests::whileRefusing({{SYS_pread64, EIO}}, [&] { EXPECT_FALSE(demuxer->seekToStart(0)); });
+    demuxer->detach();
+    tests::whileRefusing({{SYS_pread64, EIO}}, [&] {
+        EXPECT_FALSE(demuxer->seekToStart(0));
+        demuxer->detach();
+    });
     EXPECT_EQ(read(*demuxer, 1).size(), 0U) << "it stands nowhere";
     const std::int64_t last = std::prev(all.end(), 15)->pts;
     ASSERT_TRUE(demuxer->seekTo(opened->video()->stream, *index->keyframeAt(last)));
@@ -290,11 +294,13 @@ TEST_F(Places, ThatCannotBeReadAreNotTakenForTheEnd)
         const auto first = opened->packetIndex(cancelled)->packets().front();
         int error = 0;
         const tests::RefusedSystemCall secondBuffer{SYS_pread64, EIO, 0, 0, false, 3, 64 << 10};
+        demuxer->detach();
         tests::whileRefusing({secondBuffer}, [&] {
             // Opening may have read all of it: from the start again.
             demuxer->seekTo(opened->video()->stream, first);
             const auto packet = ffmpeg::newPacket();
             while ((error = demuxer->read(*packet)) == 0) {}
+            demuxer->detach();
         });
         EXPECT_EQ(error, AVERROR(EIO)) << name;
         EXPECT_EQ(demuxer->readError(), AVERROR(EIO)) << name;

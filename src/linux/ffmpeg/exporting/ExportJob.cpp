@@ -68,8 +68,13 @@ public:
         const TellLog log = [this](const std::string& line) { tellOnce(line); };
         // The sound is looked at meanwhile. When the pictures cannot be copied it is as good for the next attempt.
         if (!m_sounds.valid())
-            m_sounds = std::async(std::launch::async, openSoundSources, m_job.movie, m_range, m_job.mix, soundMode,
-                                  m_job.cancelled, log);
+            m_sounds = std::async(std::launch::async, [this, soundMode, log] {
+                auto opened = openSoundSources(m_job.movie, m_range, m_job.mix, soundMode, m_job.cancelled, log);
+                if (opened)
+                    for (const auto& each : opened.value())
+                        each->detach();
+                return opened;
+            });
         std::vector<std::unique_ptr<TrackSource>> tracks;
         if (movie.video()) {
             auto video = openVideoSource(m_job.movie, m_range, mode, m_job.cancelled, log);

@@ -21,8 +21,8 @@ public:
 
     void setOutputURL(std::optional<base::Url> url) override;
     void setOutputFileType(platform::FileType /*there is one*/) override {}
-    void setTimeRange(std::optional<base::MediaTimeRange> range) override { m_range = range; }
-    void setAudioMix(std::optional<platform::AudioMix> mix) override { m_mix = std::move(mix); }
+    void setTimeRange(std::optional<base::MediaTimeRange> range) override { here(m_range) = range; }
+    void setAudioMix(std::optional<platform::AudioMix> mix) override { here(m_mix) = std::move(mix); }
     void exportAsynchronously(std::function<void()> done) override;
 
     void cancelExport() override { *m_cancelled = true; }

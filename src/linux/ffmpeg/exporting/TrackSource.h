@@ -1,6 +1,8 @@
-/// One track of an exported movie, given packet by packet in decode order. One thread at a time.
+/// One track of an exported movie, given packet by packet in decode order. One thread at a time: whoever
+/// has it detaches it for the next.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/MediaTime.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
@@ -28,7 +30,23 @@ public:
     virtual base::Result<bool> next(AVPacket& packet) = 0;
 
     /// When all have come: where packets of different origin follow each other, and what is to be seen there.
-    virtual base::Result<std::vector<Joint>> joints() { return std::vector<Joint>(); }
+    virtual base::Result<std::vector<Joint>> joints()
+    {
+        m_affinity.assertHere();
+        return std::vector<Joint>();
+    }
+
+    /// What its owner calls last before another thread goes on with it. Whoever has parts detaches them, too.
+    virtual void detach() { m_affinity.detach(); }
+
+protected:
+    void assertHere(base::SourceLocation where = base::SourceLocation::current()) const
+    {
+        m_affinity.assertHere(where);
+    }
+
+private:
+    base::Affinity m_affinity;
 };
 
 } // namespace ffmpeg

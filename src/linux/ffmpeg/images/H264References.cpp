@@ -65,11 +65,13 @@ bool H264References::readParameters()
 
 void H264References::restart()
 {
+    m_affinity.assertHere();
     m_isKnown = false;
 }
 
 H264References::Picture H264References::follow(const AVPacket& packet)
 {
+    m_affinity.assertHere();
     Picture picture;
     picture.number = m_count++;
     m_isKnown = picture.isKnown = read(packet, picture);
@@ -231,6 +233,7 @@ std::vector<H264References::Reference> H264References::listOf(const Slice& slice
 
 Owned<AVPacket> H264References::standInFor(const AVPacket& packet, const Picture& picture, bool isWhole) const
 {
+    m_affinity.assertHere();
     Owned<AVPacket> standIn = newPacket();
     const Bytes parameters = h264::standInParameters(m_standInId, picture.sps);
     const Sps& sps = m_sps.at(picture.sps);

@@ -4,6 +4,7 @@
 /// is dropped so must be replaced by something that decodes in no time, because a decoder counts its references.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Libraries.h"
 #include "linux/ffmpeg/bitstream/H264Slices.h"
 
@@ -59,6 +60,7 @@ private:
     bool addReferences(const h264::Slice& slice, const h264::Sps& sps, Picture& picture) const;
     std::vector<Reference> listOf(const h264::Slice& slice, std::size_t which) const;
 
+    base::Affinity m_affinity;
     h264::Configuration m_configuration;
     std::map<std::uint32_t, h264::Sps> m_sps;
     std::map<std::uint32_t, h264::Pps> m_pps;

@@ -1,10 +1,12 @@
-/// The threads that make an image generator's pictures. Made and cancelled on the main queue; destroyed anywhere.
+/// The threads that make an image generator's pictures. Made and asked on one thread, the main queue's; cancelled and
+/// destroyed anywhere.
 ///
 /// Each has a decoder of one thread, which was faster for many groups of pictures than one decoder of many threads; only
 /// when all that waits lies in one group, one decoder takes all processors. A group is given to one thread, and what is
 /// asked for in it is answered in order, also what comes while it is under way.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Queue.h"
 #include "linux/ffmpeg/images/PictureWalk.h"
 #include "platform/media/ImageGenerator.h"
@@ -68,6 +70,7 @@ private:
     void make(Worker& worker, const Job& job);
     void answer(const Request& request, const FrameRef& frame, const base::ErrorRef& error);
 
+    base::Affinity m_affinity; ///< of who asks
     const base::Result<std::shared_ptr<const Movie>> m_movie;
     const int m_niceness;
     const std::shared_ptr<std::atomic<bool>> m_cancelled = std::make_shared<std::atomic<bool>>(false);

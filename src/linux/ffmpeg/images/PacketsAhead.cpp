@@ -25,6 +25,7 @@ std::size_t sizeOf(const AVPacket& packet)
 
 void PacketsAhead::restart()
 {
+    m_affinity.assertHere();
     m_entries.clear();
     m_readAll = false;
     if (m_references)
@@ -33,6 +34,7 @@ void PacketsAhead::restart()
 
 void PacketsAhead::fill(Demuxer& demuxer)
 {
+    m_affinity.assertHere();
     std::size_t bytes = 0;
     for (const Entry& each : m_entries)
         bytes += sizeOf(*each.packet);
@@ -48,6 +50,7 @@ void PacketsAhead::fill(Demuxer& demuxer)
 
 void PacketsAhead::add(Owned<AVPacket> packet)
 {
+    m_affinity.assertHere();
     H264References::Picture picture;
     if (m_references)
         picture = m_references->follow(*packet);
@@ -56,6 +59,7 @@ void PacketsAhead::add(Owned<AVPacket> packet)
 
 Owned<AVPacket> PacketsAhead::take()
 {
+    m_affinity.assertHere();
     Owned<AVPacket> packet = std::move(m_entries.front().packet);
     m_entries.pop_front();
     return packet;
@@ -77,6 +81,7 @@ bool PacketsAhead::isPassed(std::size_t index, std::int64_t tick) const
 
 Owned<AVPacket> PacketsAhead::standInForFirst(std::int64_t tick, bool isWhole) const
 {
+    m_affinity.assertHere();
     const Entry& first = m_entries.front();
     if (!first.picture.canBeReplaced() || !isFirstPassed(tick)
         || !std::all_of(m_entries.begin(), m_entries.end(), [](const Entry& each) { return each.picture.isKnown; }))
@@ -95,6 +100,7 @@ Owned<AVPacket> PacketsAhead::standInForFirst(std::int64_t tick, bool isWhole) c
 
 bool PacketsAhead::isAnyShown(std::int64_t pts, std::int64_t tick) const
 {
+    m_affinity.assertHere();
     if (!m_readAll && m_entries.size() + 1 < m_enough)
         return true; // nobody knows
     return std::any_of(m_entries.begin(), m_entries.end(), [&](const Entry& each) {

@@ -2,6 +2,7 @@
 /// see, and which of those no other needs. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Demuxer.h"
 #include "linux/ffmpeg/images/H264References.h"
 
@@ -27,13 +28,25 @@ public:
     void fill(Demuxer& demuxer);
     /// The next one in the order of decoding.
     void add(Owned<AVPacket> packet);
-    bool isEmpty() const { return m_entries.empty(); }
-    const AVPacket& first() const { return *m_entries.front().packet; }
+    bool isEmpty() const
+    {
+        m_affinity.assertHere();
+        return m_entries.empty();
+    }
+    const AVPacket& first() const
+    {
+        m_affinity.assertHere();
+        return *m_entries.front().packet;
+    }
     Owned<AVPacket> take();
 
     /// Whether the first takes part in no picture but its own, and that one is never seen by who wants what is visible at
     /// `tick` or later: a decoder may leave it out if no other refers to it.
-    bool isFirstPassed(std::int64_t tick) const { return isPassed(0, tick); }
+    bool isFirstPassed(std::int64_t tick) const
+    {
+        m_affinity.assertHere();
+        return isPassed(0, tick);
+    }
     /// What can be decoded instead of the first, which nobody sees and no other needs, although it says that others refer
     /// to it. Null when it is needed. See H264References::standInFor().
     Owned<AVPacket> standInForFirst(std::int64_t tick, bool isWhole) const;
@@ -49,6 +62,7 @@ private:
 
     bool isPassed(std::size_t index, std::int64_t tick) const;
 
+    base::Affinity m_affinity;
     const std::size_t m_enough;
     std::unique_ptr<H264References> m_references; ///< null where the stream does not tell
     std::deque<Entry> m_entries;

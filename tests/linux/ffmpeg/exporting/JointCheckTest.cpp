@@ -36,6 +36,11 @@ public:
     }
     base::Result<bool> next(AVPacket& packet) override { return m_source->next(packet); }
     base::Result<std::vector<ffmpeg::Joint>> joints() override { return m_source->joints(); }
+    void detach() override
+    {
+        m_source->detach();
+        TrackSource::detach();
+    }
 
 private:
     std::unique_ptr<TrackSource> m_source;

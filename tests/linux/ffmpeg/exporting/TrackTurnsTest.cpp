@@ -77,6 +77,35 @@ TEST(TrackTurns, GoToTheTrackThatIsFurthestBehind)
     EXPECT_THAT(wordsOf(turns), ElementsAre("A0-400", "B0-400", "A500-900", "B500-600.", "A1000-1100."));
 }
 
+/// Asserts the thread that it is on, as every track does.
+class Faithful final : public ffmpeg::TrackSource {
+public:
+    explicit Faithful(base::Result<bool> answer) : m_answer(std::move(answer)) {}
+
+    base::Result<void> describe(AVStream&) override { return {}; }
+    base::Result<bool> next(AVPacket&) override
+    {
+        assertHere();
+        return m_answer;
+    }
+
+private:
+    const base::Result<bool> m_answer;
+};
+
+TEST(TrackTurns, HaveTheTracksOnAThreadOfTheirOwnAndGiveThemBack)
+{
+    Faithful ending(false);
+    Faithful failing(base::Error::make("ffmpeg", -1, "broken"));
+    EXPECT_TRUE(ending.joints()) << "it is this thread's";
+    {
+        TrackTurns turns({{&ending, {1, 10}, {1, 1000}}, {&failing, {1, 10}, {1, 1000}}});
+        EXPECT_THAT(wordsOf(turns), ElementsAre("A.", "broken"));
+    }
+    EXPECT_TRUE(ending.joints()) << "it is this thread's again";
+    EXPECT_TRUE(failing.joints()) << "also after a failure";
+}
+
 TEST(TrackTurns, TellOfATrackWithoutPackets)
 {
     TenASecond a(3);

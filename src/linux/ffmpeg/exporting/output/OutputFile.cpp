@@ -69,6 +69,7 @@ base::ErrorRef OutputFile::failure(int error) const
 
 int OutputFile::write(std::int64_t position, const std::uint8_t* bytes, std::size_t count)
 {
+    m_affinity.assertHere();
     while (count > 0) {
         const ssize_t done = pwrite(descriptor(), bytes, count, position);
         if (done < 0 && errno == EINTR)
@@ -93,11 +94,13 @@ void OutputFile::sendToDisk(std::int64_t until)
 
 void OutputFile::sendToDisk()
 {
+    m_affinity.assertHere();
     sync_file_range(descriptor(), 0, 0, SYNC_FILE_RANGE_WRITE);
 }
 
 base::Result<void> OutputFile::clear()
 {
+    m_affinity.assertHere();
     if (ftruncate(descriptor(), 0) != 0)
         return failure(errno);
     m_onItsWay = 0;
@@ -106,6 +109,7 @@ base::Result<void> OutputFile::clear()
 
 base::Result<void> OutputFile::publish()
 {
+    m_affinity.assertHere();
     if (const auto sealed = m_file->seal(); !sealed)
         return failure(static_cast<int>(sealed.error()->code()));
     int error = m_file->takeName(m_name);

@@ -2,6 +2,7 @@
 /// thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/OpenFile.h"
 #include "linux/posix/NewFile.h"
@@ -24,8 +25,16 @@ public:
     OutputFile& operator=(const OutputFile&) = delete;
 
     /// The last component of the path, for messages.
-    const std::string& name() const { return m_name; }
-    int descriptor() const { return m_file->descriptor(); }
+    const std::string& name() const
+    {
+        m_affinity.assertHere();
+        return m_name;
+    }
+    int descriptor() const
+    {
+        m_affinity.assertHere();
+        return m_file->descriptor();
+    }
 
     /// All of it, or a negative errno. Past the end is fine. From time to time the disk is given what was written.
     int write(std::int64_t position, const std::uint8_t* bytes, std::size_t count);
@@ -42,6 +51,7 @@ private:
     base::ErrorRef failure(int error) const;
     void sendToDisk(std::int64_t until);
 
+    base::Affinity m_affinity;
     std::string m_path;
     std::shared_ptr<const OpenFile> m_source;
     std::string m_name;

@@ -32,10 +32,14 @@ std::size_t sizeOf(const TrackTurns::Turn& turn)
 
 TrackTurns::TrackTurns(const std::vector<Track>& tracks)
 {
-    for (const Track& each : tracks)
+    for (const Track& each : tracks) {
+        each.source->detach();
         m_readings.push_back({each, nullptr});
+    }
     m_thread = std::jthread([this] {
         auto end = readAll();
+        for (const Reading& each : m_readings)
+            each.track.source->detach();
         const std::lock_guard lock(m_mutex);
         m_end = std::move(end);
         m_changed.notify_all();
@@ -44,6 +48,7 @@ TrackTurns::TrackTurns(const std::vector<Track>& tracks)
 
 TrackTurns::~TrackTurns()
 {
+    m_affinity.assertHere();
     const std::lock_guard lock(m_mutex);
     m_isUnwanted = true;
     m_changed.notify_all();
@@ -104,6 +109,7 @@ bool TrackTurns::give(Turn turn)
 
 Result<std::optional<TrackTurns::Turn>> TrackTurns::next()
 {
+    m_affinity.assertHere();
     if (m_taken.empty()) {
         std::unique_lock lock(m_mutex);
         while (m_read.empty() && !m_end)

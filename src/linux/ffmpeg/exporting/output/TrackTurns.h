@@ -2,6 +2,7 @@
 /// is half of an export's work and writing the other.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Demuxer.h"
 #include "linux/ffmpeg/exporting/TrackSource.h"
 
@@ -15,6 +16,7 @@
 
 namespace ffmpeg {
 
+/// Belongs to the thread that makes it.
 class TrackTurns {
 public:
     struct Track {
@@ -30,7 +32,7 @@ public:
         bool isLast = false; ///< the track has no more
     };
 
-    /// Until this has ended nobody else uses the sources.
+    /// Until this has ended nobody else uses the sources; it detaches them at its beginning and at its end.
     explicit TrackTurns(const std::vector<Track>& tracks);
     ~TrackTurns();
     TrackTurns(const TrackTurns&) = delete;
@@ -51,6 +53,7 @@ private:
     static base::Result<void> fetch(Reading& reading);
     bool give(Turn turn);
 
+    base::Affinity m_affinity;
     std::vector<Reading> m_readings; ///< the thread's
     std::deque<Turn> m_taken;        ///< of whoever calls next()
 

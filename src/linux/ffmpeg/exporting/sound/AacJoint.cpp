@@ -157,6 +157,7 @@ bool AacJoints::isSeamless(const std::vector<const AVPacket*>& packets, const st
 
 std::optional<AacJoint> AacJoints::atStart(const std::vector<AacPiece>& pieces, std::size_t first) const
 {
+    m_affinity.assertHere();
     const auto begin = static_cast<std::ptrdiff_t>(first) - 1;
     const std::ptrdiff_t end = std::min(begin + kFarthest, std::ssize(pieces) - kBehind - 1);
     const std::ptrdiff_t start = begin - kRunUp;
@@ -205,6 +206,7 @@ std::optional<AacJoint> AacJoints::atStart(const std::vector<AacPiece>& pieces, 
 
 std::optional<AacJoint> AacJoints::atEnd(const std::vector<AacPiece>& pieces, std::size_t last) const
 {
+    m_affinity.assertHere();
     const auto end = static_cast<std::ptrdiff_t>(last);
     const std::ptrdiff_t nearest = std::max<std::ptrdiff_t>(kBehind, end - kFarthest);
     const int channels = static_cast<int>(m_channels);

@@ -2,6 +2,7 @@
 /// ones without a seam. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Libraries.h"
 #include "linux/ffmpeg/exporting/sound/AacFrame.h"
 #include "linux/ffmpeg/exporting/sound/SampleSource.h"
@@ -48,6 +49,7 @@ private:
     bool isSeamless(const std::vector<const AVPacket*>& packets, const std::vector<AacPiece>& pieces,
                     std::ptrdiff_t from, std::ptrdiff_t edge, std::ptrdiff_t seam, bool isKnown) const;
 
+    base::Affinity m_affinity;
     const AVCodecParameters& m_parameters;
     std::size_t m_channels;
 };

@@ -125,6 +125,7 @@ base::Result<ChunkedEncoder::Packets> ChunkedEncoder::encode(const SoundEncoder:
 
 base::Result<bool> ChunkedEncoder::next(AVPacket& packet)
 {
+    m_affinity.assertHere();
     while (m_ready.empty()) {
         if (m_cancelled && *m_cancelled)
             return base::Error::make("ffmpeg", AVERROR_EXIT, "encoding was cancelled");
@@ -148,6 +149,13 @@ base::Result<bool> ChunkedEncoder::next(AVPacket& packet)
     av_packet_move_ref(&packet, m_ready.front().get());
     m_ready.pop_front();
     return true;
+}
+
+void ChunkedEncoder::detach()
+{
+    m_source->detach();
+    m_model->detach();
+    m_affinity.detach();
 }
 
 } // namespace ffmpeg

@@ -3,6 +3,7 @@
 /// decodes while others encode.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Demuxer.h"
 #include "linux/ffmpeg/exporting/sound/SampleSource.h"
 #include "linux/ffmpeg/exporting/sound/SoundEncoder.h"
@@ -31,9 +32,15 @@ public:
     ~ChunkedEncoder();
 
     /// An encoder like those that are used.
-    const SoundEncoder& model() const { return *m_model; }
+    const SoundEncoder& model() const
+    {
+        m_affinity.assertHere();
+        return *m_model;
+    }
     /// Times in samples; the first packet begins before 0, by the encoder's priming. False behind the last.
     base::Result<bool> next(AVPacket& packet);
+    /// What its owner calls last before another thread goes on with it.
+    void detach();
 
 private:
     using Packets = std::vector<Owned<AVPacket>>;
@@ -52,6 +59,7 @@ private:
     static base::Result<Packets> encode(const SoundEncoder::Settings& settings, const Chunk& chunk,
                                         const std::function<bool()>& isUnwanted);
 
+    base::Affinity m_affinity;
     std::unique_ptr<SampleSource> m_source;
     std::unique_ptr<SoundEncoder> m_model;
     SoundEncoder::Settings m_settings;

@@ -235,6 +235,7 @@ std::optional<CopiedTrack::Refusal> CopiedTrack::prepareStart()
 
 base::Result<void> CopiedTrack::describe(AVStream& output)
 {
+    assertHere();
     const AVStream& stream = m_packets->stream();
     if (const int error = avcodec_parameters_copy(output.codecpar, &m_packets->parameters()); error < 0)
         return base::Error::make("ffmpeg", error, "sound cannot be described: " + textOf(error));
@@ -260,6 +261,7 @@ void CopiedTrack::give(AVPacket& packet, std::int64_t at, std::int64_t samples)
 
 base::Result<bool> CopiedTrack::next(AVPacket& packet)
 {
+    assertHere();
     av_packet_unref(&packet);
     if (!m_first.empty()) {
         av_packet_move_ref(&packet, m_first.front().get());
@@ -299,6 +301,14 @@ base::Result<bool> CopiedTrack::next(AVPacket& packet)
     m_last.pop_front();
     give(packet, m_next, kAacFrame);
     return true;
+}
+
+void CopiedTrack::detach()
+{
+    m_packets->detach();
+    if (m_placement)
+        m_placement->detach();
+    TrackSource::detach();
 }
 
 } // namespace ffmpeg

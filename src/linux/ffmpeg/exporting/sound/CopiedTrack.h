@@ -28,6 +28,7 @@ public:
 
     base::Result<void> describe(AVStream& output) override;
     base::Result<bool> next(AVPacket& packet) override;
+    void detach() override;
 
 private:
     CopiedTrack(std::unique_ptr<TrackPackets> packets, const ExportRange& range);

@@ -37,6 +37,7 @@ void TrackLabels::putOn(AVStream& output) const
 
 base::Result<void> EncodedTrack::describe(AVStream& output)
 {
+    assertHere();
     m_labels.putOn(output);
     return describeAs(output, m_encoder->model(), m_encoder->model().rate());
 }
@@ -58,12 +59,14 @@ base::Result<std::unique_ptr<TrackSource>> LosslessTrack::open(std::unique_ptr<S
 
 base::Result<void> LosslessTrack::describe(AVStream& output)
 {
+    assertHere();
     m_labels.putOn(output);
     return describeAs(output, *m_encoder, m_samples->rate());
 }
 
 base::Result<bool> LosslessTrack::next(AVPacket& packet)
 {
+    assertHere();
     av_packet_unref(&packet);
     // The last packet of FLAC is an empty one that tells a checksum of all.
     while (!m_encoder->receive(packet) || packet.size == 0) {
@@ -84,6 +87,19 @@ base::Result<bool> LosslessTrack::next(AVPacket& packet)
         m_sent += got;
     }
     return true;
+}
+
+void EncodedTrack::detach()
+{
+    m_encoder->detach();
+    TrackSource::detach();
+}
+
+void LosslessTrack::detach()
+{
+    m_samples->detach();
+    m_encoder->detach();
+    TrackSource::detach();
 }
 
 } // namespace ffmpeg

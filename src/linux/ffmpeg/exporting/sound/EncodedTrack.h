@@ -29,7 +29,12 @@ public:
     }
 
     base::Result<void> describe(AVStream& output) override;
-    base::Result<bool> next(AVPacket& packet) override { return m_encoder->next(packet); }
+    base::Result<bool> next(AVPacket& packet) override
+    {
+        assertHere();
+        return m_encoder->next(packet);
+    }
+    void detach() override;
 
 private:
     std::unique_ptr<ChunkedEncoder> m_encoder;
@@ -45,6 +50,7 @@ public:
 
     base::Result<void> describe(AVStream& output) override;
     base::Result<bool> next(AVPacket& packet) override;
+    void detach() override;
 
 private:
     LosslessTrack(std::unique_ptr<SampleSource> samples, std::unique_ptr<SoundEncoder> encoder, TrackLabels labels)

@@ -4,6 +4,7 @@
 /// Its memory is short and known, so that the same sound is limited alike wherever reading began.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/exporting/sound/SampleSource.h"
 
 #include <cstddef>
@@ -22,6 +23,8 @@ public:
     Planes push(const Planes& samples);
     /// The rest.
     Planes finish();
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
 
 private:
     static constexpr std::size_t kTaps = 12; ///< of the filter that finds peaks between samples (ITU-R BS.1770)
@@ -29,6 +32,7 @@ private:
     void findPeaks(std::size_t from, std::size_t until);
     Planes give(std::size_t until);
 
+    base::Affinity m_affinity;
     std::size_t m_reach;                       ///< samples to each side over which the gain changes: 5 ms
     float m_quiet;                             ///< samples below this have no peak between them that is too loud
     std::vector<std::vector<float>> m_filters; ///< one for each place between two samples

@@ -18,6 +18,7 @@ MixedSamples::MixedSamples(std::vector<std::unique_ptr<SampleSource>> tracks)
 
 int MixedSamples::read(Planes& into, int count)
 {
+    assertHere();
     const auto wanted = static_cast<std::size_t>(count);
     into.resize(m_ready.size());
     while (!m_hasEnded && m_ready.front().size() < wanted) {
@@ -50,6 +51,14 @@ int MixedSamples::read(Planes& into, int count)
         m_ready[channel].erase(m_ready[channel].begin(), end);
     }
     return static_cast<int>(got);
+}
+
+void MixedSamples::detach()
+{
+    for (const auto& each : m_tracks)
+        each->detach();
+    m_limiter.detach();
+    SampleSource::detach();
 }
 
 } // namespace ffmpeg

@@ -14,9 +14,18 @@ public:
     /// All of one rate and with as many channels. It lasts as long as the longest of them.
     explicit MixedSamples(std::vector<std::unique_ptr<SampleSource>> tracks);
 
-    int rate() const override { return m_tracks.front()->rate(); }
-    int channels() const override { return m_tracks.front()->channels(); }
+    int rate() const override
+    {
+        assertHere();
+        return m_tracks.front()->rate();
+    }
+    int channels() const override
+    {
+        assertHere();
+        return m_tracks.front()->channels();
+    }
     int read(Planes& into, int count) override;
+    void detach() override;
 
 private:
     std::vector<std::unique_ptr<SampleSource>> m_tracks;

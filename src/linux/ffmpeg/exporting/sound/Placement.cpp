@@ -23,11 +23,13 @@ Placement::Placement(AVRational timeBase, std::int64_t origin, int rate, Manner 
 
 double Placement::said(std::int64_t pts) const
 {
+    m_affinity.assertHere();
     return static_cast<double>(pts) * m_samplesPerTick - m_origin;
 }
 
 void Placement::begin(const std::vector<Piece>& pieces)
 {
+    m_affinity.assertHere();
     m_hasBegun = true;
     m_drift = 0;
     if (pieces.empty())
@@ -57,6 +59,7 @@ void Placement::begin(const std::vector<Piece>& pieces)
 
 std::int64_t Placement::place(const Piece& piece)
 {
+    m_affinity.assertHere();
     if (!m_hasBegun)
         begin({piece});
     const double off = said(piece.pts) - static_cast<double>(m_next);

@@ -2,6 +2,7 @@
 /// times. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Libraries.h"
 
 #include <cstdint>
@@ -26,14 +27,21 @@ public:
     /// Finds where the first of these begins from the times of all: each was rounded in its own way, so together they
     /// know better.
     void begin(const std::vector<Piece>& pieces);
-    bool hasBegun() const { return m_hasBegun; }
+    bool hasBegun() const
+    {
+        m_affinity.assertHere();
+        return m_hasBegun;
+    }
     /// Where this piece begins; pieces come in order. A jump in time is followed.
     std::int64_t place(const Piece& piece);
 
     /// What the file says, in samples from the movie's start.
     double said(std::int64_t pts) const;
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
 
 private:
+    base::Affinity m_affinity;
     double m_samplesPerTick;
     double m_origin;
     double m_tolerance; ///< samples

@@ -1,6 +1,7 @@
 /// Gives sound as samples, from a start to an end. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Libraries.h"
 
 #include <cstddef>
@@ -20,6 +21,17 @@ public:
     /// Appends up to `count` samples to each channel and tells how many; fewer only at the end. What cannot be read is
     /// silent; a negative AVERROR where reading was cancelled.
     virtual int read(Planes& into, int count) = 0;
+    /// What its owner calls last before another thread goes on with it. Whoever has parts detaches them, too.
+    virtual void detach() { m_affinity.detach(); }
+
+protected:
+    void assertHere(base::SourceLocation where = base::SourceLocation::current()) const
+    {
+        m_affinity.assertHere(where);
+    }
+
+private:
+    base::Affinity m_affinity;
 };
 
 } // namespace ffmpeg

@@ -24,12 +24,14 @@ std::unique_ptr<SoundDecoder> SoundDecoder::open(const AVCodecParameters& parame
 
 bool SoundDecoder::send(const AVPacket* packet)
 {
+    m_affinity.assertHere();
     const int result = avcodec_send_packet(m_context.get(), packet);
     return result >= 0 || result == AVERROR_EOF;
 }
 
 const AVFrame* SoundDecoder::receive()
 {
+    m_affinity.assertHere();
     if (avcodec_receive_frame(m_context.get(), m_frame.get()) < 0)
         return nullptr;
     AVFrame& frame = *m_frame;

@@ -2,6 +2,7 @@
 /// thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Libraries.h"
 
 #include <cstdint>
@@ -21,10 +22,13 @@ public:
 
     /// How many samples the file says do not belong to the sound at this frame's end.
     static int surplusOf(const AVFrame& frame);
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
 
 private:
     explicit SoundDecoder(Owned<AVCodecContext> context) : m_context(std::move(context)), m_frame(newFrame()) {}
 
+    base::Affinity m_affinity;
     Owned<AVCodecContext> m_context;
     Owned<AVFrame> m_frame;
     std::int64_t m_expected = AV_NOPTS_VALUE; ///< when the next frame begins

@@ -78,6 +78,7 @@ base::Result<std::unique_ptr<SoundEncoder>> SoundEncoder::open(const Settings& s
 
 base::Result<void> SoundEncoder::describe(AVCodecParameters& parameters) const
 {
+    m_affinity.assertHere();
     if (const int error = avcodec_parameters_from_context(&parameters, m_context.get()); error < 0)
         return base::Error::make("ffmpeg", error, "sound cannot be described: " + textOf(error));
     return {};
@@ -85,6 +86,7 @@ base::Result<void> SoundEncoder::describe(AVCodecParameters& parameters) const
 
 int SoundEncoder::send(const Planes& planes, std::size_t from, int count, std::int64_t pts)
 {
+    m_affinity.assertHere();
     av_frame_unref(m_frame.get());
     m_frame->format = m_context->sample_fmt;
     m_frame->sample_rate = m_context->sample_rate;

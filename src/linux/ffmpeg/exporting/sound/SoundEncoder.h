@@ -1,6 +1,7 @@
 /// Encodes samples to packets. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
 #include "linux/ffmpeg/exporting/sound/SampleSource.h"
@@ -32,17 +33,39 @@ public:
     static std::int64_t mostBits(int rate, int channels);
 
     /// How many samples each send() must bring, but for the last.
-    int frameSize() const { return m_context->frame_size; }
-    int rate() const { return m_context->sample_rate; }
+    int frameSize() const
+    {
+        m_affinity.assertHere();
+        return m_context->frame_size;
+    }
+    int rate() const
+    {
+        m_affinity.assertHere();
+        return m_context->sample_rate;
+    }
     /// How many samples the first packet begins before the first that was sent.
-    int priming() const { return m_context->initial_padding; }
+    int priming() const
+    {
+        m_affinity.assertHere();
+        return m_context->initial_padding;
+    }
     base::Result<void> describe(AVCodecParameters& parameters) const;
 
     /// A frame of `count` samples of `planes`, from `from` on, which is shown at `pts` (in samples).
     int send(const Planes& planes, std::size_t from, int count, std::int64_t pts);
-    int finish() { return avcodec_send_frame(m_context.get(), nullptr); }
+    int finish()
+    {
+        m_affinity.assertHere();
+        return avcodec_send_frame(m_context.get(), nullptr);
+    }
     /// False when there is none yet, or none left.
-    bool receive(AVPacket& packet) { return avcodec_receive_packet(m_context.get(), &packet) >= 0; }
+    bool receive(AVPacket& packet)
+    {
+        m_affinity.assertHere();
+        return avcodec_receive_packet(m_context.get(), &packet) >= 0;
+    }
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
 
 private:
     SoundEncoder(Owned<AVCodecContext> context, int bits)
@@ -50,6 +73,7 @@ private:
     {
     }
 
+    base::Affinity m_affinity;
     Owned<AVCodecContext> m_context;
     Owned<AVFrame> m_frame;
     int m_bits;

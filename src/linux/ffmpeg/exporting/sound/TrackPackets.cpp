@@ -158,6 +158,7 @@ bool TrackPackets::trySeek(double seconds)
 
 void TrackPackets::seek(double seconds)
 {
+    m_affinity.assertHere();
     m_ahead.reset();
     if (!trySeek(seconds))
         toStart();
@@ -198,6 +199,7 @@ int TrackPackets::readTimed(AVPacket& packet)
 
 int TrackPackets::read(AVPacket& packet)
 {
+    m_affinity.assertHere();
     if (const int error = readTimed(packet); error < 0)
         return error;
     if (packet.duration <= 0 && m_samplesOfAac == 0) {
@@ -210,6 +212,12 @@ int TrackPackets::read(AVPacket& packet)
     }
     m_duration = packet.duration;
     return 0;
+}
+
+void TrackPackets::detach()
+{
+    m_demuxer->detach();
+    m_affinity.detach();
 }
 
 } // namespace ffmpeg

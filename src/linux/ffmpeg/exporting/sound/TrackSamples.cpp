@@ -218,11 +218,13 @@ void TrackSamples::append(std::int64_t at, Planes samples)
 
 bool TrackSamples::isEmpty()
 {
+    assertHere();
     return decodeUntil(m_next + 1) == 0 && end() <= m_next;
 }
 
 int TrackSamples::read(Planes& into, int count)
 {
+    assertHere();
     into.resize(static_cast<std::size_t>(m_channels));
     std::int64_t until = std::min(m_next + count, m_until);
     if (const int error = decodeUntil(until); error < 0)
@@ -247,6 +249,15 @@ int TrackSamples::read(Planes& into, int count)
     m_next = until;
     m_hasGiven = m_hasGiven || length > 0;
     return static_cast<int>(length);
+}
+
+void TrackSamples::detach()
+{
+    m_packets->detach();
+    m_decoder->detach();
+    if (m_placement)
+        m_placement->detach();
+    SampleSource::detach();
 }
 
 } // namespace ffmpeg

@@ -23,11 +23,24 @@ public:
     /// Whether there is no sound in the range; looks for the first.
     bool isEmpty();
     /// Whether a part of what was read so far could not be decoded.
-    bool isDamaged() const { return m_isDamaged; }
+    bool isDamaged() const
+    {
+        assertHere();
+        return m_isDamaged;
+    }
 
-    int rate() const override { return m_rate; }
-    int channels() const override { return m_channels; }
+    int rate() const override
+    {
+        assertHere();
+        return m_rate;
+    }
+    int channels() const override
+    {
+        assertHere();
+        return m_channels;
+    }
     int read(Planes& into, int count) override;
+    void detach() override;
 
 private:
     struct Block {

@@ -87,6 +87,7 @@ Result<std::unique_ptr<TrackSource>> EncodedVideoSource::open(std::unique_ptr<Pi
 
 Result<void> EncodedVideoSource::describe(AVStream& output)
 {
+    assertHere();
     if (auto done = describeLike(m_packets->stream(), m_packets->movie().firstFrame()->picture(),
                                  m_packets->outTimeBase(), output);
         !done)
@@ -111,6 +112,7 @@ Result<void> EncodedVideoSource::describe(AVStream& output)
 
 Result<bool> EncodedVideoSource::next(AVPacket& packet)
 {
+    assertHere();
     while (!m_line.pop(packet)) {
         if (m_ended)
             return false;
@@ -197,6 +199,17 @@ Result<void> EncodedVideoSource::moveOut()
             return done;
     }
     return {};
+}
+
+void EncodedVideoSource::detach()
+{
+    m_packets->detach();
+    m_scaler.detach();
+    m_encoder->detach();
+    if (m_feed)
+        m_feed->detach();
+    m_line.detach();
+    TrackSource::detach();
 }
 
 } // namespace ffmpeg

@@ -21,6 +21,7 @@ public:
 
     base::Result<void> describe(AVStream& output) override;
     base::Result<bool> next(AVPacket& packet) override;
+    void detach() override;
 
 private:
     /// `picture` is like those that come out.

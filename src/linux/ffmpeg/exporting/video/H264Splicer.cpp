@@ -54,6 +54,7 @@ std::vector<ByteView> H264Splicer::unitsIn(const AVPacket& packet) const
 /// Containers mark as keyframes also pictures that later ones look past; only these are never looked past.
 bool H264Splicer::isJoint(const AVPacket& keyframe) const
 {
+    assertHere();
     const auto units = unitsIn(keyframe);
     return std::any_of(units.begin(), units.end(), [](ByteView nal) { return h264::unitOf(nal) == Unit::Idr; });
 }
@@ -69,6 +70,7 @@ const h264::Sps& H264Splicer::spsOf(ByteView slice) const
 
 bool H264Splicer::holdsHalf(const AVPacket& packet) const
 {
+    assertHere();
     if (std::all_of(m_sps.begin(), m_sps.end(), [](const h264::Sps& each) { return each.isProgressive; }))
         return false;
     int fields = 0;
@@ -82,6 +84,7 @@ bool H264Splicer::holdsHalf(const AVPacket& packet) const
 
 int H264Splicer::reorderDepth() const
 {
+    assertHere();
     std::uint32_t depth = 0;
     for (const h264::Sps& each : m_sps)
         if (each.restriction)
@@ -91,6 +94,7 @@ int H264Splicer::reorderDepth() const
 
 bool H264Splicer::showsInOrder() const
 {
+    assertHere();
     constexpr std::uint32_t kInOrder = 2; // the type of picture order that knows no other
     return std::all_of(m_sps.begin(), m_sps.end(), [](const h264::Sps& each) {
         return each.profile == FF_PROFILE_H264_BASELINE || each.orderType == kInOrder
@@ -100,6 +104,7 @@ bool H264Splicer::showsInOrder() const
 
 void H264Splicer::see(const AVPacket& copied)
 {
+    assertHere();
     for (const ByteView nal : unitsIn(copied)) {
         const Unit unit = h264::unitOf(nal);
         if (unit == Unit::Slice || unit == Unit::SliceA || unit == Unit::Idr)
@@ -123,6 +128,7 @@ h264::Configuration H264Splicer::usedSets() const
 
 base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDepth)
 {
+    assertHere();
     std::set<std::uint32_t> taken;
     for (const h264::Sps& each : m_sps)
         taken.insert(each.id);
@@ -184,6 +190,7 @@ base::Result<void> H264Splicer::prepare(EncoderRequest& request, int reorderDept
 
 base::Result<void> H264Splicer::join(const AVCodecContext& encoder)
 {
+    assertHere();
     const auto header =
         h264::Configuration::parse({encoder.extradata, static_cast<std::size_t>(encoder.extradata_size)});
     if (!header)
@@ -204,6 +211,7 @@ base::Result<void> H264Splicer::join(const AVCodecContext& encoder)
 
 base::Result<void> H264Splicer::describe(AVCodecParameters& parameters)
 {
+    assertHere();
     h264::Configuration all = usedSets();
     all.sps.insert(all.sps.end(), m_encoderSps.begin(), m_encoderSps.end());
     all.pps.insert(all.pps.end(), m_encoderPps.begin(), m_encoderPps.end());
@@ -222,6 +230,7 @@ bool H264Splicer::isKnown(ByteView set) const
 
 base::Result<void> H264Splicer::adoptCopied(AVPacket& packet)
 {
+    assertHere();
     std::vector<ByteView> units = unitsIn(packet);
     bool isChanged = m_hasStartCodes;
     for (const ByteView nal : units) {
@@ -247,6 +256,7 @@ base::Result<void> H264Splicer::adoptCopied(AVPacket& packet)
 
 base::Result<void> H264Splicer::adoptEncoded(AVPacket& packet)
 {
+    assertHere();
     std::vector<ByteView> units = unitsBetweenStartCodes(payloadOf(packet));
     std::erase_if(units, [](ByteView nal) {
         const Unit unit = h264::unitOf(nal);

@@ -17,7 +17,11 @@ public:
     bool holdsHalf(const AVPacket& packet) const override;
     int reorderDepth() const override;
     bool showsInOrder() const override;
-    bool wantsToSee() const override { return m_header.pps.size() > 1 || m_header.sps.size() > 1; }
+    bool wantsToSee() const override
+    {
+        assertHere();
+        return m_header.pps.size() > 1 || m_header.sps.size() > 1;
+    }
     void see(const AVPacket& copied) override;
     base::Result<void> prepare(EncoderRequest& request, int reorderDepth) override;
     base::Result<void> join(const AVCodecContext& encoder) override;

@@ -68,6 +68,7 @@ std::vector<ByteView> HevcSplicer::unitsIn(const AVPacket& packet) const
 /// Pictures of other kinds of keyframes may be shown before them, and need what stands before them.
 bool HevcSplicer::isJoint(const AVPacket& keyframe) const
 {
+    assertHere();
     const auto units = unitsIn(keyframe);
     return std::any_of(units.begin(), units.end(), [](ByteView nal) {
         const Unit unit = hevc::unitOf(nal);
@@ -77,6 +78,7 @@ bool HevcSplicer::isJoint(const AVPacket& keyframe) const
 
 bool HevcSplicer::isOpenJoint(const AVPacket& keyframe) const
 {
+    assertHere();
     const auto units = unitsIn(keyframe);
     return std::any_of(units.begin(), units.end(), [](ByteView nal) {
         return hevc::unitOf(nal) >= Unit::FirstIrap && hevc::unitOf(nal) <= Unit::Cra;
@@ -85,6 +87,7 @@ bool HevcSplicer::isOpenJoint(const AVPacket& keyframe) const
 
 int HevcSplicer::reorderDepth() const
 {
+    assertHere();
     std::uint32_t depth = 0;
     for (const Bytes& set : m_header.sets)
         if (hevc::unitOf(set) == Unit::Sps)
@@ -94,6 +97,7 @@ int HevcSplicer::reorderDepth() const
 
 void HevcSplicer::see(const AVPacket& copied)
 {
+    assertHere();
     for (const ByteView nal : unitsIn(copied))
         if (hevc::unitOf(nal) <= Unit::LastPicture)
             m_usedPps.insert(hevc::ppsOfSlice(nal));
@@ -128,6 +132,7 @@ std::vector<Bytes> HevcSplicer::usedSets() const
 
 base::Result<void> HevcSplicer::prepare(EncoderRequest& request, int /*reorderDepth*/)
 {
+    assertHere();
     std::array<std::set<std::uint32_t>, 3> taken;
     for (const Bytes& set : m_header.sets) {
         if (hevc::unitOf(set) == Unit::Vps)
@@ -164,6 +169,7 @@ base::Result<void> HevcSplicer::prepare(EncoderRequest& request, int /*reorderDe
 
 base::Result<void> HevcSplicer::join(const AVCodecContext& encoder)
 {
+    assertHere();
     const auto header =
         hevc::Configuration::parse({encoder.extradata, static_cast<std::size_t>(encoder.extradata_size)});
     if (!header)
@@ -187,6 +193,7 @@ base::Result<void> HevcSplicer::join(const AVCodecContext& encoder)
 
 base::Result<void> HevcSplicer::describe(AVCodecParameters& parameters)
 {
+    assertHere();
     std::vector<Bytes> all = usedSets();
     all.insert(all.end(), m_encoderSets.begin(), m_encoderSets.end());
     std::stable_sort(all.begin(), all.end(),
@@ -204,6 +211,7 @@ base::Result<void> HevcSplicer::describe(AVCodecParameters& parameters)
 
 base::Result<void> HevcSplicer::close(AVPacket& openJoint)
 {
+    assertHere();
     std::vector<Bytes> changed;
     std::vector<ByteView> units = unitsIn(openJoint);
     changed.reserve(units.size()); // the views lead into them
@@ -223,6 +231,7 @@ void HevcSplicer::insertHdr(std::vector<ByteView>& units) const
 
 base::Result<void> HevcSplicer::adoptCopied(AVPacket& packet)
 {
+    assertHere();
     std::vector<ByteView> units = unitsIn(packet);
     for (const ByteView nal : units) {
         const auto isSame = [&](const Bytes& set) {
@@ -243,6 +252,7 @@ base::Result<void> HevcSplicer::adoptCopied(AVPacket& packet)
 
 base::Result<void> HevcSplicer::adoptEncoded(AVPacket& packet)
 {
+    assertHere();
     std::vector<Bytes> slices;
     for (const ByteView nal : unitsBetweenStartCodes(payloadOf(packet))) {
         if (nal.size() <= 2 || hevc::unitOf(nal) > Unit::LastPicture)

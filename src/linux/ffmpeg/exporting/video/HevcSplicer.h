@@ -17,8 +17,16 @@ public:
     bool isJoint(const AVPacket& keyframe) const override;
     bool isOpenJoint(const AVPacket& keyframe) const override;
     int reorderDepth() const override;
-    bool showsInOrder() const override { return reorderDepth() == 0; }
-    bool wantsToSee() const override { return m_header.sets.size() > 3; }
+    bool showsInOrder() const override
+    {
+        assertHere();
+        return reorderDepth() == 0;
+    }
+    bool wantsToSee() const override
+    {
+        assertHere();
+        return m_header.sets.size() > 3;
+    }
     void see(const AVPacket& copied) override;
     base::Result<void> prepare(EncoderRequest& request, int reorderDepth) override;
     base::Result<void> join(const AVCodecContext& encoder) override;

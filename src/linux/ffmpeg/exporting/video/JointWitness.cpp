@@ -41,6 +41,7 @@ base::ErrorRef noMemory()
 
 Result<void> JointWitness::beginStretch(const AVCodecParameters& parameters)
 {
+    m_affinity.assertHere();
     Stretch& stretch = m_stretches.emplace_back();
     stretch.first.firstPacket = m_packets;
     if (!stretch.parameters.get() || avcodec_parameters_copy(stretch.parameters.get(), &parameters) < 0)
@@ -50,6 +51,7 @@ Result<void> JointWitness::beginStretch(const AVCodecParameters& parameters)
 
 Result<void> JointWitness::beginStretch(const AVCodecContext& encoder)
 {
+    m_affinity.assertHere();
     const Parameters parameters;
     if (!parameters.get() || avcodec_parameters_from_context(parameters.get(), &encoder) < 0)
         return noMemory();
@@ -58,6 +60,7 @@ Result<void> JointWitness::beginStretch(const AVCodecContext& encoder)
 
 void JointWitness::seePicture(const AVFrame& picture)
 {
+    m_affinity.assertHere();
     auto& given = m_stretches.back().given;
     if (given.size() < kCompared)
         given.push_back(PictureLook::of(picture));
@@ -65,6 +68,7 @@ void JointWitness::seePicture(const AVFrame& picture)
 
 void JointWitness::seePacket(const AVPacket& packet, bool beginsGroup)
 {
+    m_affinity.assertHere();
     Stretch& stretch = m_stretches.back();
     if (beginsGroup && m_packets > stretch.first.firstPacket) {
         stretch.last.firstPacket = m_packets;
@@ -106,6 +110,7 @@ Result<JointSide> JointWitness::sideOf(const Stretch& stretch, const Group& grou
 
 Result<std::vector<Joint>> JointWitness::joints() const
 {
+    m_affinity.assertHere();
     std::vector<Joint> joints;
     for (std::size_t i = 0; i < m_stretches.size(); ++i) {
         if (i == 0 && m_stretches.size() > 1)

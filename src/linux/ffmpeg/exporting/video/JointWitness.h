@@ -6,6 +6,7 @@
 /// because the joint begins a group that needs none of it; so checking costs the same however long the groups are.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/exporting/video/PictureLooks.h"
 
@@ -39,6 +40,8 @@ public:
 
     /// All is written: decodes what was remembered. The error says that an encoder's pictures are not those it was given.
     base::Result<std::vector<Joint>> joints() const;
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
 
 private:
     struct Group {
@@ -62,6 +65,7 @@ private:
     static void add(Group& group, const AVPacket& packet);
     static base::Result<JointSide> sideOf(const Stretch& stretch, const Group& group);
 
+    base::Affinity m_affinity;
     std::deque<Stretch> m_stretches;
     std::int64_t m_packets = 0;
 };

@@ -54,18 +54,21 @@ base::Result<std::unique_ptr<Splicer>> KeyframeSplicer::make(const AVStream& str
 
 bool KeyframeSplicer::isJoint(const AVPacket& keyframe) const
 {
+    assertHere();
     const auto pictures = m_isAv1 ? picturesOfAv1(payloadOf(keyframe)) : picturesOfVp9(payloadOf(keyframe));
     return pictures.startsGroup;
 }
 
 int KeyframeSplicer::picturesHeldBack(const AVPacket& packet) const
 {
+    assertHere();
     const auto pictures = m_isAv1 ? picturesOfAv1(payloadOf(packet)) : picturesOfVp9(payloadOf(packet));
     return pictures.hidden - pictures.shownAgain;
 }
 
 void KeyframeSplicer::see(const AVPacket& copied)
 {
+    assertHere();
     if (!(copied.flags & AV_PKT_FLAG_KEY))
         return;
     const auto pictures = picturesOfVp9(payloadOf(copied));
@@ -77,6 +80,7 @@ void KeyframeSplicer::see(const AVPacket& copied)
 
 base::Result<void> KeyframeSplicer::prepare(EncoderRequest& request, int /*reorderDepth*/)
 {
+    assertHere();
     // No picture before its time.
     if (m_isAv1) {
         // At this speed the encoder writes where nothing is when there are no colours.
@@ -101,6 +105,7 @@ base::Result<void> KeyframeSplicer::prepare(EncoderRequest& request, int /*reord
 
 base::Result<void> KeyframeSplicer::describe(AVCodecParameters& parameters)
 {
+    assertHere();
     // Not every container says it, and the muxer asks.
     parameters.format = m_format;
     parameters.width = m_width;
@@ -139,11 +144,13 @@ base::Result<void> KeyframeSplicer::completeKeyframe(AVPacket& packet) const
 
 base::Result<void> KeyframeSplicer::adoptCopied(AVPacket& packet)
 {
+    assertHere();
     return completeKeyframe(packet);
 }
 
 base::Result<void> KeyframeSplicer::adoptEncoded(AVPacket& packet)
 {
+    assertHere();
     return completeKeyframe(packet);
 }
 

@@ -21,10 +21,18 @@ public:
     bool isJoint(const AVPacket& keyframe) const override;
     int picturesHeldBack(const AVPacket& packet) const override;
     /// Browsers' recordings grow on the way, and players make room for what the header says.
-    bool wantsToSee() const override { return !m_isAv1; }
+    bool wantsToSee() const override
+    {
+        assertHere();
+        return !m_isAv1;
+    }
     void see(const AVPacket& copied) override;
     base::Result<void> prepare(EncoderRequest& request, int reorderDepth) override;
-    base::Result<void> join(const AVCodecContext& /*encoder*/) override { return {}; }
+    base::Result<void> join(const AVCodecContext& /*encoder*/) override
+    {
+        assertHere();
+        return {};
+    }
     base::Result<void> describe(AVCodecParameters& parameters) override;
     base::Result<void> adoptCopied(AVPacket& packet) override;
     base::Result<void> adoptEncoded(AVPacket& packet) override;

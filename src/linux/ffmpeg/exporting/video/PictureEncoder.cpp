@@ -77,6 +77,7 @@ base::Result<std::unique_ptr<PictureEncoder>> PictureEncoder::open(const Encoder
 
 base::Result<void> PictureEncoder::encode(const AVFrame& picture, std::int64_t pts, std::int64_t duration)
 {
+    m_affinity.assertHere();
     const Owned<AVFrame> frame(av_frame_clone(&picture));
     if (!frame)
         return failure(AVERROR(ENOMEM), m_context->codec->name);
@@ -94,6 +95,7 @@ base::Result<void> PictureEncoder::encode(const AVFrame& picture, std::int64_t p
 
 base::Result<void> PictureEncoder::finish()
 {
+    m_affinity.assertHere();
     const int error = avcodec_send_frame(m_context.get(), nullptr);
     if (error < 0 && error != AVERROR_EOF)
         return failure(error, m_context->codec->name);
@@ -121,6 +123,7 @@ base::Result<void> PictureEncoder::drain()
 
 Owned<AVPacket> PictureEncoder::take()
 {
+    m_affinity.assertHere();
     if (m_packets.empty())
         return nullptr;
     auto packet = std::move(m_packets.front());

@@ -1,6 +1,7 @@
 /// Encodes pictures. One thread, but the encoder uses more.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
 
@@ -51,18 +52,25 @@ public:
     static base::Result<std::unique_ptr<PictureEncoder>> open(const EncoderRequest& request);
 
     /// The header of what comes out; known from the start.
-    const AVCodecContext& context() const { return *m_context; }
+    const AVCodecContext& context() const
+    {
+        m_affinity.assertHere();
+        return *m_context;
+    }
     /// `pts` grows from picture to picture. Pictures are as the request says.
     base::Result<void> encode(const AVFrame& picture, std::int64_t pts, std::int64_t duration);
     /// Nothing more is encoded; the rest comes out.
     base::Result<void> finish();
     /// Null when there is none at the moment.
     Owned<AVPacket> take();
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
 
 private:
     explicit PictureEncoder(Owned<AVCodecContext> context) : m_context(std::move(context)) {}
     base::Result<void> drain();
 
+    base::Affinity m_affinity;
     Owned<AVCodecContext> m_context;
     std::deque<Owned<AVPacket>> m_packets;
     std::deque<std::pair<std::int64_t, std::int64_t>> m_durations; ///< by pts, of what is inside

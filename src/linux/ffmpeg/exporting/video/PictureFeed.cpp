@@ -28,6 +28,7 @@ base::Result<std::unique_ptr<PictureFeed>> PictureFeed::start(PicturePackets& pa
 
 base::Result<FrameRef> PictureFeed::next()
 {
+    m_affinity.assertHere();
     for (;;) {
         if (FrameRef frame = m_decoder->receive())
             return frame;
@@ -47,6 +48,12 @@ base::Result<FrameRef> PictureFeed::next()
             m_end = std::exchange(m_packet, newPacket());
         m_decoder->finish();
     }
+}
+
+void PictureFeed::detach()
+{
+    m_decoder->detach();
+    m_affinity.detach();
 }
 
 } // namespace ffmpeg

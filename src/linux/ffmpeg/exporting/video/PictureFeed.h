@@ -1,6 +1,7 @@
 /// Decodes a stretch of a movie's pictures, for encoding them again. One thread, but the decoder uses more.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/VideoDecoder.h"
 #include "linux/ffmpeg/exporting/video/PicturePackets.h"
 
@@ -25,11 +26,18 @@ public:
     /// The next picture in the order of presentation; null at the end. Packets that were damaged give none.
     base::Result<FrameRef> next();
     /// The packet that ended the stretch; null when the movie did, or before the end.
-    Owned<AVPacket> takeEnd() { return std::move(m_end); }
+    Owned<AVPacket> takeEnd()
+    {
+        m_affinity.assertHere();
+        return std::move(m_end);
+    }
+    /// What its owner calls last before another thread goes on with it.
+    void detach();
 
 private:
     PictureFeed(PicturePackets& packets, std::unique_ptr<VideoDecoder> decoder, std::int64_t skipBefore, IsEnd isEnd);
 
+    base::Affinity m_affinity;
     PicturePackets& m_packets;
     std::unique_ptr<VideoDecoder> m_decoder;
     std::int64_t m_skipBefore;

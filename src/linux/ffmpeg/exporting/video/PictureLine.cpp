@@ -15,6 +15,7 @@ PictureLine::PictureLine(int depth, std::int64_t step, std::optional<std::int64_
 
 base::Result<void> PictureLine::push(Owned<AVPacket> packet, bool isJoint)
 {
+    m_affinity.assertHere();
     if (isJoint)
         forgetLateKeyframes();
     if (m_count == 0)
@@ -40,6 +41,7 @@ base::Result<void> PictureLine::push(Owned<AVPacket> packet, bool isJoint)
 
 void PictureLine::finish(std::optional<std::int64_t> end)
 {
+    m_affinity.assertHere();
     m_finished = true;
     forgetLateKeyframes();
     if (m_packets.empty())
@@ -61,6 +63,7 @@ void PictureLine::forgetLateKeyframes()
 
 bool PictureLine::pop(AVPacket& packet)
 {
+    m_affinity.assertHere();
     // The last one is held back: its duration is known at the end.
     if (m_packets.size() < (m_finished ? 1 : m_followers + 2))
         return false;

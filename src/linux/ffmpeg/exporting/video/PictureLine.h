@@ -8,6 +8,7 @@
 /// FFmpeg's loses what it has not given by then. Such are no longer told to be keyframes, so that nobody begins there.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
 
@@ -33,6 +34,8 @@ public:
     void finish(std::optional<std::int64_t> end = std::nullopt);
     /// False when more must be pushed first, or all have come out.
     bool pop(AVPacket& packet);
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
 
 private:
     struct Waiting {
@@ -42,6 +45,7 @@ private:
 
     void forgetLateKeyframes();
 
+    base::Affinity m_affinity;
     int m_depth;
     std::int64_t m_step;
     std::optional<std::int64_t> m_last;

@@ -36,6 +36,7 @@ base::Result<std::unique_ptr<PicturePackets>> PicturePackets::open(std::shared_p
 
 void PicturePackets::seek(std::int64_t outTick)
 {
+    m_affinity.assertHere();
     m_ready.clear();
     m_next = nullptr;
     m_ended = 0;
@@ -113,6 +114,7 @@ bool PicturePackets::isRefreshed(std::uint32_t until, std::int64_t outTick)
 
 int PicturePackets::read(AVPacket& packet)
 {
+    m_affinity.assertHere();
     if (m_ready.empty())
         if (const int result = gatherOneTime(); result != 0)
             return result;
@@ -187,6 +189,7 @@ base::Result<PicturePacket> PicturePackets::look(const AVPacket& packet, const S
 
 base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::int64_t end, const Splicer& splicer)
 {
+    m_affinity.assertHere();
     seek(start);
     PacketWindow window;
     window.startsMovie = m_startsMovie;
@@ -226,6 +229,7 @@ base::Result<PacketWindow> PicturePackets::headWindow(std::int64_t start, std::i
 
 base::Result<PacketWindow> PicturePackets::tailWindow(std::int64_t from, std::int64_t end, const Splicer& splicer)
 {
+    m_affinity.assertHere();
     const std::int64_t second = track().timescale;
     from = std::min(from, m_movie->duration().convertedTo(track().timescale).value);
     for (std::int64_t back = 0;; back = back ? back * 2 : second) {
@@ -256,6 +260,7 @@ base::Result<PacketWindow> PicturePackets::tailWindow(std::int64_t from, std::in
 
 bool PicturePackets::isInterrupted()
 {
+    m_affinity.assertHere();
     if (!isMov())
         return false;
     AVStream& stream = this->stream();
@@ -274,6 +279,7 @@ bool PicturePackets::isInterrupted()
 
 base::Result<std::vector<PicturePacket>> PicturePackets::copiedWindow(const VideoPlan& plan, const Splicer& splicer)
 {
+    m_affinity.assertHere();
     seek(plan.copyFrom);
     std::vector<PicturePacket> packets;
     int behind = 0;
@@ -291,6 +297,12 @@ base::Result<std::vector<PicturePacket>> PicturePackets::copiedWindow(const Vide
             packets.push_back(each);
     }
     return packets;
+}
+
+void PicturePackets::detach()
+{
+    m_demuxer->detach();
+    m_affinity.detach();
 }
 
 } // namespace ffmpeg

@@ -5,6 +5,7 @@
 /// clocks of milliseconds make of pictures that came in a burst, get times of their own, a tick apart.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/ffmpeg/Movie.h"
 #include "linux/ffmpeg/bitstream/H264Headers.h"
 #include "linux/ffmpeg/exporting/video/Splicer.h"
@@ -23,21 +24,61 @@ public:
     /// `movie` has pictures.
     static base::Result<std::unique_ptr<PicturePackets>> open(std::shared_ptr<const Movie> movie, Cancelled cancelled);
 
-    const Movie& movie() const { return *m_movie; }
-    const VideoTrack& track() const { return *m_movie->video(); }
-    AVStream& stream() { return m_demuxer->stream(track().stream); }
-    AVFormatContext& context() { return m_demuxer->context(); }
+    const Movie& movie() const
+    {
+        m_affinity.assertHere();
+        return *m_movie;
+    }
+    const VideoTrack& track() const
+    {
+        m_affinity.assertHere();
+        return *m_movie->video();
+    }
+    AVStream& stream()
+    {
+        m_affinity.assertHere();
+        return m_demuxer->stream(track().stream);
+    }
+    AVFormatContext& context()
+    {
+        m_affinity.assertHere();
+        return m_demuxer->context();
+    }
     /// Whether the file's times of decoding are its own, and all times are exact.
-    bool isMov() const { return m_demuxer->isMov(); }
-    bool isCancelled() const { return m_demuxer->isCancelled(); }
+    bool isMov() const
+    {
+        m_affinity.assertHere();
+        return m_demuxer->isMov();
+    }
+    bool isCancelled() const
+    {
+        m_affinity.assertHere();
+        return m_demuxer->isCancelled();
+    }
 
-    std::int64_t outTick(std::int64_t pts) const { return (pts - track().origin) * m_scale; }
+    std::int64_t outTick(std::int64_t pts) const
+    {
+        m_affinity.assertHere();
+        return (pts - track().origin) * m_scale;
+    }
     /// A time span, in ticks of the output.
-    std::int64_t outTicks(std::int64_t duration) const { return duration * m_scale; }
-    AVRational outTimeBase() const { return {1, track().timescale}; }
+    std::int64_t outTicks(std::int64_t duration) const
+    {
+        m_affinity.assertHere();
+        return duration * m_scale;
+    }
+    AVRational outTimeBase() const
+    {
+        m_affinity.assertHere();
+        return {1, track().timescale};
+    }
 
     /// AVI and ASF tell only when packets are decoded. From now on they are shown then.
-    void setShowsInOrder() { m_showsInOrder = true; }
+    void setShowsInOrder()
+    {
+        m_affinity.assertHere();
+        m_showsInOrder = true;
+    }
 
     /// What is read next is a keyframe shown at or before this tick of the output, or the first packet of all: whoever
     /// decodes from there has all that is shown from this tick on as it should be.
@@ -54,6 +95,8 @@ public:
     bool isInterrupted();
     /// All that is copied, and what is hidden in between.
     base::Result<std::vector<PicturePacket>> copiedWindow(const VideoPlan& plan, const Splicer& splicer);
+    /// What its owner calls last before another thread goes on with it.
+    void detach();
 
 private:
     PicturePackets(std::shared_ptr<const Movie> movie, std::unique_ptr<Demuxer> demuxer);
@@ -67,6 +110,7 @@ private:
     int gatherOneTime();
     base::Result<PicturePacket> look(const AVPacket& packet, const Splicer& splicer) const;
 
+    base::Affinity m_affinity;
     std::shared_ptr<const Movie> m_movie;
     std::unique_ptr<Demuxer> m_demuxer;
     std::int64_t m_scale;

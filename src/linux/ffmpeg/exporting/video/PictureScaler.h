@@ -1,6 +1,7 @@
 /// Brings pictures of any size and format to those that an encoder takes. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
 
@@ -25,8 +26,11 @@ public:
     /// The picture itself where it fits already, extended by the odd row or column that it lacks; else scaled to the whole
     /// width or height, black beside it.
     base::Result<Owned<AVFrame>> fit(const AVFrame& picture);
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
 
 private:
+    base::Affinity m_affinity;
     AVPixelFormat m_format;
     int m_width;
     int m_height;

@@ -148,6 +148,7 @@ Result<void> SplicedVideoSource::showToSplicer()
 
 Result<void> SplicedVideoSource::describe(AVStream& output)
 {
+    assertHere();
     if (auto done = describeLike(m_packets->stream(), m_packets->movie().firstFrame()->picture(),
                                  m_packets->outTimeBase(), output);
         !done)
@@ -159,6 +160,7 @@ Result<void> SplicedVideoSource::describe(AVStream& output)
 
 Result<bool> SplicedVideoSource::next(AVPacket& packet)
 {
+    assertHere();
     while (!m_line->pop(packet)) {
         if (m_state == State::Ended)
             return false;
@@ -344,6 +346,22 @@ Result<void> SplicedVideoSource::endCopying(bool isExpected)
     if (isCut && m_log && !m_packets->movie().durationBeforeCut()) // which is told already
         m_log("“" + m_packets->movie().file()->name() + "” ends before its index does: pictures are missing.");
     return beginStretch(isExpected && !m_plan.tail.empty() ? State::Tail : State::Ended);
+}
+
+void SplicedVideoSource::detach()
+{
+    m_packets->detach();
+    m_splicer->detach();
+    if (m_encoder)
+        m_encoder->detach();
+    if (m_packer)
+        m_packer->detach();
+    if (m_feed)
+        m_feed->detach();
+    if (m_line)
+        m_line->detach();
+    m_witness.detach();
+    TrackSource::detach();
 }
 
 } // namespace ffmpeg

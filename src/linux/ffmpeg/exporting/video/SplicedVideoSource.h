@@ -27,7 +27,12 @@ public:
     base::Result<void> describe(AVStream& output) override;
     /// May still find that the packets cannot be copied.
     base::Result<bool> next(AVPacket& packet) override;
-    base::Result<std::vector<Joint>> joints() override { return m_witness.joints(); }
+    base::Result<std::vector<Joint>> joints() override
+    {
+        assertHere();
+        return m_witness.joints();
+    }
+    void detach() override;
 
 private:
     enum class State { Head, Copy, Tail, Ended };

@@ -1,6 +1,7 @@
 /// Joins copied packets with encoded ones of the same codec under one header. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
 #include "linux/ffmpeg/exporting/video/PictureEncoder.h"
@@ -47,6 +48,17 @@ public:
     virtual base::Result<void> close(AVPacket& /*openJoint*/) { return {}; }
     virtual base::Result<void> adoptCopied(AVPacket& packet) = 0;
     virtual base::Result<void> adoptEncoded(AVPacket& packet) = 0;
+    /// What its owner calls last before another thread goes on with it.
+    void detach() { m_affinity.detach(); }
+
+protected:
+    void assertHere(base::SourceLocation where = base::SourceLocation::current()) const
+    {
+        m_affinity.assertHere(where);
+    }
+
+private:
+    base::Affinity m_affinity;
 };
 
 } // namespace ffmpeg
