@@ -122,6 +122,7 @@ EditorProgram::EditorProgram(const EditorOptions& options)
 
 EditorProgram::~EditorProgram()
 {
+    m_affinity.assertHere();
     // The queues outlive what their tasks use: what is still to be done, like emptying the store of temporary movies, is
     // done while all of that is there.
     m_extension = {};

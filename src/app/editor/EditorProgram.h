@@ -50,12 +50,32 @@ public:
     /// Until the host is done with us; gives the process's exit status.
     int run();
 
-    const base::System& system() const { return m_system; }
-    ScriptClock& clock() { return m_clock; }
-    platform::Window& window() { return *m_window; }
-    qtui::Presenter& presenter() { return m_presenter; }
+    const base::System& system() const
+    {
+        m_affinity.assertHere();
+        return m_system;
+    }
+    ScriptClock& clock()
+    {
+        m_affinity.assertHere();
+        return m_clock;
+    }
+    platform::Window& window()
+    {
+        m_affinity.assertHere();
+        return *m_window;
+    }
+    qtui::Presenter& presenter()
+    {
+        m_affinity.assertHere();
+        return m_presenter;
+    }
     /// Whether some of a movie has been on the screen.
-    bool hasShownPicture() const { return m_pictureSeen; }
+    bool hasShownPicture() const
+    {
+        m_affinity.assertHere();
+        return m_pictureSeen;
+    }
     /// Null before the payload has come, and after the end.
     std::shared_ptr<VKVideoEditorViewController> editor() const;
 
@@ -74,6 +94,7 @@ private:
     photos::LibraryOptions libraryOptions();
     void learnAboutRecording();
 
+    base::Affinity m_affinity;
     EditorOptions m_options;
     ScriptClock m_clock;
     base::StreamLog m_log;
@@ -108,7 +129,6 @@ private:
     bool m_shown = false;
     bool m_leaving = false;
     bool m_pictureSeen = false;
-    base::Affinity m_affinity;
 };
 
 } // namespace app

@@ -60,6 +60,7 @@ const runtime::Class& NoticeScreen::classObject()
 
 void NoticeScreen::loadView()
 {
+    assertHere();
     ViewController::loadView();
     view()->setBackgroundColor(platform::Color::black());
     for (const std::string& line : linesOf(m_words)) {
@@ -80,12 +81,14 @@ void NoticeScreen::loadView()
 
 void NoticeScreen::viewWillAppear(bool animated)
 {
+    assertHere();
     becomeFirstResponder();
     ViewController::viewWillAppear(animated);
 }
 
 void NoticeScreen::viewDidLayoutSubviews()
 {
+    assertHere();
     ViewController::viewDidLayoutSubviews();
     const base::Rect bounds = view()->bounds();
     m_bar->setFrame(base::Rect::make(0, 0, bounds.width(), m_barHeight));
@@ -100,11 +103,13 @@ void NoticeScreen::viewDidLayoutSubviews()
 
 std::vector<platform::KeyCommand> NoticeScreen::keyCommands() const
 {
+    assertHere();
     return {{platform::Key::Escape, 0, false, Selector("close"), "Close"}};
 }
 
 void NoticeScreen::close()
 {
+    assertHere();
     if (m_handlers.closed)
         m_handlers.closed();
 }

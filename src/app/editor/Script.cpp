@@ -84,7 +84,10 @@ Script::Script(EditorProgram& program, const std::string& path) : m_program(prog
     }
 }
 
-Script::~Script() = default;
+Script::~Script()
+{
+    m_affinity.assertHere();
+}
 
 bool Script::beginsWithWaiting() const
 {

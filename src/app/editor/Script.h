@@ -56,7 +56,11 @@ public:
     /// Whether it is for the window that waits for the recording.
     bool beginsWithWaiting() const;
     void start();
-    bool hasStarted() const { return m_started; }
+    bool hasStarted() const
+    {
+        m_affinity.assertHere();
+        return m_started;
+    }
 
 private:
     using Words = std::vector<std::string>;

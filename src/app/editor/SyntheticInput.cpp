@@ -32,21 +32,25 @@ void touch(QQuickWindow& window, QEvent::Type type, QEventPoint::State state, ba
 
 void SyntheticInput::press(base::Point at)
 {
+    m_affinity.assertHere();
     touch(m_window, QEvent::TouchBegin, QEventPoint::Pressed, at);
 }
 
 void SyntheticInput::move(base::Point to)
 {
+    m_affinity.assertHere();
     touch(m_window, QEvent::TouchUpdate, QEventPoint::Updated, to);
 }
 
 void SyntheticInput::release(base::Point at)
 {
+    m_affinity.assertHere();
     touch(m_window, QEvent::TouchEnd, QEventPoint::Released, at);
 }
 
 bool SyntheticInput::key(const std::string& name)
 {
+    m_affinity.assertHere();
     static const std::map<std::string, int> kKeys{
         {"space", Qt::Key_Space}, {"escape", Qt::Key_Escape}, {"return", Qt::Key_Return}, {"left", Qt::Key_Left},
         {"right", Qt::Key_Right}, {"home", Qt::Key_Home},     {"end", Qt::Key_End},       {"tab", Qt::Key_Tab},

@@ -1,6 +1,7 @@
 /// Touches and keys as a person would make them, sent into a window through Qt's own events. GUI thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Geometry.h"
 
 #include <string>
@@ -21,6 +22,7 @@ public:
     bool key(const std::string& name);
 
 private:
+    base::Affinity m_affinity;
     QQuickWindow& m_window;
 };
 

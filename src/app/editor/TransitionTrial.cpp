@@ -50,6 +50,7 @@ TransitionTrial::TransitionTrial(EditorProgram& program, int count)
 
 bool TransitionTrial::goOn()
 {
+    m_affinity.assertHere();
     QQuickWindow& window = m_program.presenter().quickWindow();
     if (m_running) {
         if (m_program.window().transitionCount() == m_before)
@@ -71,6 +72,7 @@ bool TransitionTrial::goOn()
 
 std::string TransitionTrial::result() const
 {
+    m_affinity.assertHere();
     char text[160];
     std::snprintf(text, sizeof text, "transitions %zu first %.3f last %.3f memory %ld %ld", m_wanted - kWarmUp,
                   meanMilliseconds(m_times.begin() + kWarmUp, m_times.begin() + kWarmUp + kSample),

@@ -2,6 +2,7 @@
 /// first. GUI thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Clock.h"
 
 #include <cstdint>
@@ -27,13 +28,18 @@ public:
     /// Starts the next transition when the last one has been made and mirrored, or waits for that; true when all have
     /// been made. Call it again and again from the event loop.
     bool goOn();
-    std::uint64_t count() const { return m_times.size(); }
+    std::uint64_t count() const
+    {
+        m_affinity.assertHere();
+        return m_times.size();
+    }
 
     /// "transitions 1000 first 0.512 last 0.530 memory 81234 81300": means of the first and the last hundred in
     /// milliseconds of processor time, kilobytes after the warm-up and at the end.
     std::string result() const;
 
 private:
+    base::Affinity m_affinity;
     EditorProgram& m_program;
     const std::size_t m_wanted;
     std::uint64_t m_before = 0;

@@ -28,7 +28,11 @@ public:
     ~WorkWatch();
 
     /// Whether anything is under way now, told or not.
-    bool isWorking() const { return !m_list.isEmpty(); }
+    bool isWorking() const
+    {
+        m_affinity.assertHere();
+        return !m_list.isEmpty();
+    }
 
 private:
     struct Link;

@@ -128,6 +128,7 @@ EditorProcess::EditorProcess(std::unique_ptr<State> state) : m_state(std::move(s
 
 EditorProcess::~EditorProcess()
 {
+    m_affinity.assertHere();
     m_state->ended = {};
     if (m_state->running) {
         signal(SIGKILL);

@@ -211,7 +211,10 @@ void EditorSession::State::leave()
 
 EditorSession::EditorSession(std::unique_ptr<State> state) : m_state(std::move(state)) {}
 
-EditorSession::~EditorSession() = default;
+EditorSession::~EditorSession()
+{
+    m_affinity.assertHere();
+}
 
 base::Result<std::unique_ptr<EditorSession>> EditorSession::start(dbus::EditRequest request, const Place& place,
                                                                   Handlers handlers)

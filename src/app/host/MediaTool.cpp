@@ -65,20 +65,26 @@ struct MediaTool::Machine {
 
 MediaTool::MediaTool() : m_machine(std::make_unique<Machine>()) {}
 
-MediaTool::~MediaTool() = default;
+MediaTool::~MediaTool()
+{
+    m_affinity.assertHere();
+}
 
 const base::System& MediaTool::system() const
 {
+    m_affinity.assertHere();
     return m_machine->system;
 }
 
 platform::MediaFramework& MediaTool::media()
 {
+    m_affinity.assertHere();
     return m_machine->media;
 }
 
 void MediaTool::tellLog(base::MemoryLog::Line::Kind kind)
 {
+    m_affinity.assertHere();
     const auto lines = m_machine->log.lines();
     for (std::size_t& i = m_machine->told; i < lines.size(); ++i)
         if (lines[i].kind == kind)
@@ -87,6 +93,7 @@ void MediaTool::tellLog(base::MemoryLog::Line::Kind kind)
 
 base::Result<std::shared_ptr<platform::Asset>> MediaTool::open(const std::string& path)
 {
+    m_affinity.assertHere();
     // Looked at first, because the words for what is no file are better there.
     if (const auto file = openInput(path, Emptiness::Refused); !file)
         return file.error();
@@ -104,6 +111,7 @@ base::Result<std::shared_ptr<platform::Asset>> MediaTool::open(const std::string
 
 bool MediaTool::runUntil(const std::function<bool()>& done, const std::function<void()>& meanwhile)
 {
+    m_affinity.assertHere();
     Machine& machine = *m_machine;
     base::Instant next = machine.clock.now();
     while (machine.signals.arrived() == 0) {
@@ -126,6 +134,7 @@ bool MediaTool::runUntil(const std::function<bool()>& done, const std::function<
 
 base::ErrorRef MediaTool::runExport(platform::ExportSession& session, const std::function<void()>& meanwhile)
 {
+    m_affinity.assertHere();
     session.exportAsynchronously([] {});
     if (!runUntil([this] { return m_machine->works.isEmpty(); }, meanwhile))
         session.cancelExport();
@@ -154,11 +163,13 @@ void MediaTool::finishWork()
 
 int MediaTool::interruption() const
 {
+    m_affinity.assertHere();
     return m_machine->signals.arrived();
 }
 
 int MediaTool::fail(const base::ErrorRef& error) const
 {
+    m_affinity.assertHere();
     if (interruption() != 0)
         return 128 + interruption();
     complain(error->description());

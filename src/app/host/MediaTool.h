@@ -2,6 +2,7 @@
 /// made before any other thread: it keeps SIGINT, SIGTERM and SIGHUP from ending the process at once.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 #include "base/System.h"
 #include "platform/media/MediaFramework.h"
@@ -47,6 +48,7 @@ private:
 
     void finishWork();
 
+    base::Affinity m_affinity;
     std::unique_ptr<Machine> m_machine;
 };
 

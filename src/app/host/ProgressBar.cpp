@@ -56,11 +56,13 @@ ProgressBar::ProgressBar(std::string what, std::FILE* stream)
 
 ProgressBar::~ProgressBar()
 {
+    m_affinity.assertHere();
     clear();
 }
 
 void ProgressBar::show(double part)
 {
+    m_affinity.assertHere();
     if (!m_isTerminal)
         return;
     std::string line = progressLine(m_what, part, columnsOf(m_stream));
@@ -73,6 +75,7 @@ void ProgressBar::show(double part)
 
 void ProgressBar::clear()
 {
+    m_affinity.assertHere();
     if (std::exchange(m_shown, {}).empty())
         return;
     std::fputs("\r\033[K", m_stream);

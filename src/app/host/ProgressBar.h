@@ -1,6 +1,8 @@
 /// A line on a terminal that tells how far work has come; nothing where the stream is no terminal. One thread.
 #pragma once
 
+#include "base/Affinity.h"
+
 #include <cstdio>
 #include <string>
 
@@ -24,6 +26,7 @@ public:
     void clear();
 
 private:
+    base::Affinity m_affinity;
     const std::string m_what;
     std::FILE* const m_stream;
     const bool m_isTerminal;

@@ -34,6 +34,7 @@ TerminationWatch::TerminationWatch()
 
 TerminationWatch::~TerminationWatch()
 {
+    m_affinity.assertHere();
     ::eventfd_write(m_ending.get(), 1);
     m_thread.join();
 }

@@ -3,6 +3,7 @@
 /// They are waited for on a thread of their own, because every other one can be held up by a file on a slow disk.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/posix/FileDescriptor.h"
 
 #include <atomic>
@@ -26,11 +27,16 @@ public:
     /// The signal that came; 0 when none did. Any thread.
     int arrived() const { return m_arrived; }
     /// Can be read from as soon as one has come; not to be read from.
-    int descriptor() const { return m_told.get(); }
+    int descriptor() const
+    {
+        m_affinity.assertHere();
+        return m_told.get();
+    }
 
 private:
     void run();
 
+    base::Affinity m_affinity;
     std::atomic<int> m_arrived = 0;
     posix::FileDescriptor m_signals;
     posix::FileDescriptor m_told;

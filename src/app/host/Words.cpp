@@ -23,6 +23,7 @@ std::optional<std::int32_t> wholeNumber(const std::string& text)
 
 bool Words::advance()
 {
+    m_affinity.assertHere();
     m_value.reset();
     if (m_next >= m_words.size())
         return false;
@@ -42,6 +43,7 @@ bool Words::advance()
 
 base::Result<std::string> Words::value()
 {
+    m_affinity.assertHere();
     if (!m_value && m_next < m_words.size())
         m_value = m_words[m_next++];
     if (!m_value)

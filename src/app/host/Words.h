@@ -1,6 +1,7 @@
 /// The words of a command line, one by one. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Result.h"
 
 #include <cstddef>
@@ -26,17 +27,34 @@ public:
     /// To the next word. False at the end.
     bool advance();
 
-    bool isOption() const { return m_isOption; }
+    bool isOption() const
+    {
+        m_affinity.assertHere();
+        return m_isOption;
+    }
     /// Without the value that it brought along.
-    const std::string& word() const { return m_word; }
-    bool hasOwnValue() const { return m_value.has_value(); }
+    const std::string& word() const
+    {
+        m_affinity.assertHere();
+        return m_word;
+    }
+    bool hasOwnValue() const
+    {
+        m_affinity.assertHere();
+        return m_value.has_value();
+    }
     /// Whether it asks for help.
-    bool isHelp() const { return m_isOption && (m_word == "--help" || m_word == "-h"); }
+    bool isHelp() const
+    {
+        m_affinity.assertHere();
+        return m_isOption && (m_word == "--help" || m_word == "-h");
+    }
 
     /// The option's value, a word behind it perhaps.
     base::Result<std::string> value();
 
 private:
+    base::Affinity m_affinity;
     const std::vector<std::string>& m_words;
     std::size_t m_next;
     bool m_onlyPlain = false;

@@ -4,6 +4,7 @@
 /// be called on any thread. Needs a QCoreApplication, but no running event loop of the caller's.
 #pragma once
 
+#include "base/Affinity.h"
 #include "base/Queue.h"
 #include "base/Result.h"
 #include "platform/hosting/Connection.h"
@@ -60,6 +61,7 @@ private:
     class Provider;
 
     std::shared_ptr<Shared> m_shared;
+    base::Affinity m_affinity; ///< of the start-up
     std::vector<platform::InputItem> m_items;
     bool m_fetched = false;
 };

@@ -171,7 +171,10 @@ struct HostConnection::State final : QDBusVirtualObject {
 
 HostConnection::HostConnection(std::unique_ptr<State> state) : m_state(std::move(state)) {}
 
-HostConnection::~HostConnection() = default;
+HostConnection::~HostConnection()
+{
+    m_affinity.assertHere();
+}
 
 base::Result<std::unique_ptr<HostConnection>> HostConnection::listen(const std::string& path,
                                                                      std::vector<HostItem> items, Handlers handlers)

@@ -346,7 +346,10 @@ private:
 
 RecorderService::RecorderService(std::unique_ptr<Bus> bus) : m_bus(std::move(bus)) {}
 
-RecorderService::~RecorderService() = default;
+RecorderService::~RecorderService()
+{
+    m_affinity.assertHere();
+}
 
 base::Result<std::unique_ptr<RecorderService>> RecorderService::start(Launcher launcher, std::chrono::milliseconds idle,
                                                                       std::function<void()> whenIdle)

@@ -95,6 +95,7 @@ VideoLibrary::Transaction::open(const std::optional<base::Url>& url) const
 
 void VideoLibrary::Transaction::createAssetFromVideoAtFileURL(const std::optional<base::Url>& url)
 {
+    m_affinity.assertHere();
     auto source = open(url);
     if (source)
         m_sources.push_back(std::move(source).value());
@@ -104,6 +105,7 @@ void VideoLibrary::Transaction::createAssetFromVideoAtFileURL(const std::optiona
 
 base::Result<std::vector<std::string>> VideoLibrary::Transaction::commit()
 {
+    m_affinity.assertHere();
     if (m_error)
         return m_error;
     if (m_sources.empty())
@@ -147,6 +149,7 @@ base::Result<std::vector<std::string>> VideoLibrary::Transaction::commit()
 
 std::vector<base::Result<std::string>> VideoLibrary::Transaction::keepUnsaved() const
 {
+    m_affinity.assertHere();
     std::vector<base::Result<std::string>> kept;
     for (const Source& source : m_sources)
         kept.push_back(photos::keepUnsaved(source.file.get(), source.name, m_options.unsavedDirectories));

@@ -2,6 +2,7 @@
 /// none. One thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/photos/LibraryDirectory.h"
 #include "linux/photos/VideoLibrary.h"
 #include "linux/posix/FileDescriptor.h"
@@ -38,6 +39,7 @@ private:
     base::Result<posix::NewFile> copy(const Source& source, const LibraryDirectory& directory, double done) const;
     base::ErrorRef explained(const base::ErrorRef& error, const Source& source) const;
 
+    base::Affinity m_affinity;
     const LibraryOptions& m_options;
     base::Work& m_work;
     std::vector<Source> m_sources;

@@ -50,6 +50,7 @@ QImage renderVector(const QString& path, QSizeF size, double scale)
 
 QImage Icons::glyph(const std::string& name, const QColor& color, double scale)
 {
+    m_affinity.assertHere();
     QImage& glyph = m_glyphs[{name, color.rgba(), scale}];
     if (!glyph.isNull())
         return glyph;

@@ -1,6 +1,8 @@
 /// The presenter's own pictures: vector files compiled into the program, drawn sharp at any scale. GUI thread.
 #pragma once
 
+#include "base/Affinity.h"
+
 #include <QColor>
 #include <QImage>
 
@@ -25,6 +27,7 @@ public:
     QImage glyph(const std::string& name, const QColor& color, double scale);
 
 private:
+    base::Affinity m_affinity;
     std::map<std::tuple<std::string, QRgb, double>, QImage> m_glyphs;
 };
 

@@ -30,6 +30,7 @@ MainLoop::MainLoop(base::MainQueue& queue) : m_queue(queue)
 MainLoop::~MainLoop()
 {
     m_affinity.assertHere();
+    m_affinity.assertHere();
     m_queue.setWake({});
 }
 

@@ -13,7 +13,10 @@ Mirror::Mirror(platform::Window& window, QQuickItem& root, Stage& stage, const b
     m_focusRing.setParentItem(&root);
 }
 
-Mirror::~Mirror() = default;
+Mirror::~Mirror()
+{
+    m_affinity.assertHere();
+}
 
 bool Mirror::commit()
 {

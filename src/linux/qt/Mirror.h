@@ -27,11 +27,23 @@ public:
 
     /// Null when the view is not in the tree.
     ViewItem* itemFor(const platform::View& view) const;
-    std::size_t itemCount() const { return m_peers.size(); }
+    std::size_t itemCount() const
+    {
+        m_affinity.assertHere();
+        return m_peers.size();
+    }
     /// The videos that said something at the last commit, those behind first.
-    const std::vector<VideoItem*>& messages() const { return m_messages; }
+    const std::vector<VideoItem*>& messages() const
+    {
+        m_affinity.assertHere();
+        return m_messages;
+    }
     /// Whether a picture of a video could be seen at the last commit.
-    bool showsVideo() const { return m_showsVideo; }
+    bool showsVideo() const
+    {
+        m_affinity.assertHere();
+        return m_showsVideo;
+    }
 
 private:
     struct Peer {

@@ -36,6 +36,7 @@ Presenter::Presenter(std::shared_ptr<platform::Window> window, const base::Clock
 
 Presenter::~Presenter()
 {
+    m_affinity.assertHere();
     m_window->setNeedsCommitHandler({});
     m_quickWindow->hide();
     // The items go before the window that they are in.

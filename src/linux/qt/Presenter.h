@@ -58,7 +58,11 @@ public:
     /// Mirrors the tree now, instead of with the next picture. Does nothing when nothing has changed.
     void commit();
     /// Whether something was still on its way at the last commit: moving, growing or fading.
-    bool isAnimating() const { return m_animating; }
+    bool isAnimating() const
+    {
+        m_affinity.assertHere();
+        return m_animating;
+    }
     /// Commits, and gives what stands on the screen, in pixels.
     QImage grab();
 
@@ -66,7 +70,11 @@ public:
     QQuickWindow& quickWindow();
     const Statistics& statistics() const;
     const Mirror& mirror() const;
-    WorkLine& workLine() { return *m_workLine; }
+    WorkLine& workLine()
+    {
+        m_affinity.assertHere();
+        return *m_workLine;
+    }
 
 private:
     friend class StageWindow;

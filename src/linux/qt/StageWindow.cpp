@@ -21,21 +21,25 @@ StageWindow::StageWindow(Presenter& presenter, platform::Window& views, const ba
 
 StageWindow::~StageWindow()
 {
+    m_affinity.assertHere();
     m_root.setParentItem(nullptr);
 }
 
 const Mirror& StageWindow::mirror() const
 {
+    m_affinity.assertHere();
     return m_presenter.mirror();
 }
 
 WorkLine& StageWindow::workLine() const
 {
+    m_affinity.assertHere();
     return m_presenter.workLine();
 }
 
 QAccessibleInterface* StageWindow::accessibleRoot() const
 {
+    m_affinity.assertHere();
     return QAccessible::queryAccessibleInterface(const_cast<StageWindow*>(this));
 }
 

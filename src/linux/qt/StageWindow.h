@@ -1,6 +1,7 @@
 /// The window on the screen, as far as Qt is concerned: hands events to the presenter. GUI thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/qt/input/InputFeed.h"
 
 #include <QQuickItem>
@@ -31,9 +32,21 @@ public:
     StageWindow(Presenter& presenter, platform::Window& views, const base::Clock& clock);
     ~StageWindow() override;
 
-    RootItem& root() { return m_root; }
-    InputFeed& input() { return m_input; }
-    platform::Window& views() const { return m_views; }
+    RootItem& root()
+    {
+        m_affinity.assertHere();
+        return m_root;
+    }
+    InputFeed& input()
+    {
+        m_affinity.assertHere();
+        return m_input;
+    }
+    platform::Window& views() const
+    {
+        m_affinity.assertHere();
+        return m_views;
+    }
     const Mirror& mirror() const;
     WorkLine& workLine() const;
 
@@ -44,6 +57,7 @@ protected:
     void resizeEvent(QResizeEvent* event) override;
 
 private:
+    base::Affinity m_affinity;
     Presenter& m_presenter;
     platform::Window& m_views;
     InputFeed m_input;

@@ -10,6 +10,7 @@ SvgImageCatalog::SvgImageCatalog(std::function<double()> scale) : m_scale(std::m
 
 platform::ImageRef SvgImageCatalog::imageNamed(std::string_view name)
 {
+    m_affinity.assertHere();
     const double scale = m_scale();
     const auto key = std::pair(std::string(name), scale);
     if (const auto found = m_images.find(key); found != m_images.end())

@@ -1,6 +1,7 @@
 /// The program's picture resources, drawn from vector files for the screen that they are shown on. GUI thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "platform/views/Image.h"
 
 #include <functional>
@@ -19,6 +20,7 @@ public:
     platform::ImageRef imageNamed(std::string_view name) override;
 
 private:
+    base::Affinity m_affinity;
     std::function<double()> m_scale;
     std::map<std::pair<std::string, double>, platform::ImageRef> m_images;
 };

@@ -43,7 +43,11 @@ public:
     /// Answers the question about the home button only: 2 for none, 1 for one.
     std::int32_t integerAnswer(std::string_view key, std::int32_t fallback) const override;
     bool booleanAnswer(std::string_view key) const override;
-    std::int32_t graphicsQuality() const override { return m_values.graphicsQuality; }
+    std::int32_t graphicsQuality() const override
+    {
+        m_affinity.assertHere();
+        return m_values.graphicsQuality;
+    }
 
 private:
     const DeviceValues m_values;

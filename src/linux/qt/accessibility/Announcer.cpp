@@ -28,6 +28,7 @@ Announcer::Announcer(std::function<void(QAccessibleEvent*)> tell)
 
 void Announcer::announce(StageWindow& window)
 {
+    m_affinity.assertHere();
     announceMessages(window);
     announceFocus(window);
 }

@@ -2,6 +2,7 @@
 /// it belongs. GUI thread; Qt's factory owns it, and the item outlives it.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/qt/items/ViewItem.h"
 
 #include <QAccessibleInterface>
@@ -25,6 +26,7 @@ protected:
     explicit ItemAccessible(PeerItem& item) : m_item(item) {}
 
 private:
+    base::Affinity m_affinity;
     PeerItem& m_item;
 };
 

@@ -3,6 +3,7 @@
 /// The tree is asked for live from the views; an interface lives as long as the view's item.
 #pragma once
 
+#include "base/Affinity.h"
 #include "platform/views/View.h"
 
 #include <QAccessible>
@@ -43,6 +44,7 @@ private:
     void announceMessages(StageWindow& window);
     void tellOf(QObject& item, QAccessible::Event kind) const;
 
+    base::Affinity m_affinity;
     std::function<void(QAccessibleEvent*)> m_tell;
     std::weak_ptr<platform::View> m_focused;
     double m_number = 0; ///< of the focused view, where it has one

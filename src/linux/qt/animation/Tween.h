@@ -1,4 +1,4 @@
-/// One value on its way from what was shown to what the model says. A value itself; GUI thread.
+/// One value on its way from what was shown to what the model says. A value itself.
 #pragma once
 
 #include "base/Clock.h"

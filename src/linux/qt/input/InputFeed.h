@@ -26,7 +26,11 @@ public:
     InputFeed(platform::Window& window, const base::Clock& clock) : m_window(window), m_clock(clock) {}
 
     /// What closing the window by keys does: Ctrl+W, Ctrl+Q.
-    void setCloseHandler(std::function<void()> handler) { m_close = std::move(handler); }
+    void setCloseHandler(std::function<void()> handler)
+    {
+        m_affinity.assertHere();
+        m_close = std::move(handler);
+    }
 
     /// True when the event was one of input, whether or not somebody answered it. Keys that nobody took stay unaccepted.
     bool handle(QEvent& event);

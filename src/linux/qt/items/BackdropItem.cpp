@@ -41,6 +41,7 @@ base::Rect united(const base::Rect& a, const base::Rect& b)
 
 base::Rect BackdropItem::modelFrame(const platform::View& view) const
 {
+    assertHere();
     base::Rect frame = view.frame();
     if (!frame.isEmpty())
         return frame;
@@ -69,6 +70,7 @@ QColor BackdropItem::tint(const platform::BackdropView& backdrop) const
 
 bool BackdropItem::needsDrawing(platform::View& view, bool visible)
 {
+    assertHere();
     const auto& backdrop = dynamic_cast<const platform::BackdropView&>(view);
     if (!visible)
         return false;
@@ -77,6 +79,7 @@ bool BackdropItem::needsDrawing(platform::View& view, bool visible)
 
 std::vector<Sprite> BackdropItem::draw(platform::View& view)
 {
+    assertHere();
     const auto& backdrop = dynamic_cast<const platform::BackdropView&>(view);
     const QColor color = tint(backdrop);
     m_masks = masksOf(backdrop);

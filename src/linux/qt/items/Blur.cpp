@@ -61,11 +61,13 @@ std::vector<Blur::Source> Blur::sourcesBehind(const Stage& stage, const QRectF& 
 
 bool Blur::isStale(const Stage& stage, const QRectF& windowRect, const QColor& tint) const
 {
+    m_affinity.assertHere();
     return m_image.isNull() || m_rect != windowRect || m_tint != tint || m_sources != sourcesBehind(stage, windowRect);
 }
 
 void Blur::update(Stage& stage, const QRectF& windowRect, const QColor& tint)
 {
+    m_affinity.assertHere();
     m_rect = windowRect;
     m_tint = tint;
     m_sources = sourcesBehind(stage, windowRect);

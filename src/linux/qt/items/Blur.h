@@ -1,6 +1,7 @@
 /// What lies behind a rectangle of the window, blurred on the CPU: works on every rendering backend. GUI thread.
 #pragma once
 
+#include "base/Affinity.h"
 #include "linux/qt/items/Stage.h"
 
 #include <QImage>
@@ -18,7 +19,11 @@ public:
     void update(Stage& stage, const QRectF& windowRect, const QColor& tint);
 
     /// A few pixels, opaque: to be stretched smoothly over the rectangle.
-    const QImage& image() const { return m_image; }
+    const QImage& image() const
+    {
+        m_affinity.assertHere();
+        return m_image;
+    }
 
 private:
     struct Source {
@@ -30,6 +35,7 @@ private:
 
     static std::vector<Source> sourcesBehind(const Stage& stage, const QRectF& windowRect);
 
+    base::Affinity m_affinity;
     QImage m_image;
     QRectF m_rect;
     QColor m_tint;

@@ -29,11 +29,13 @@ QColor ButtonItem::tint(const platform::View& view) const
 
 bool ButtonItem::needsDrawing(platform::View& view, bool)
 {
+    assertHere();
     return m_drawnTint.isValid() && tint(view) != m_drawnTint;
 }
 
 std::vector<Sprite> ButtonItem::draw(platform::View& view)
 {
+    assertHere();
     const auto& button = dynamic_cast<const platform::Button&>(view);
     std::vector<Sprite> sprites = ViewItem::draw(view);
     m_drawnTint = tint(view);

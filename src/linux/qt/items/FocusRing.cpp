@@ -13,6 +13,7 @@ FocusRing::FocusRing(Stage& stage) : PeerItem(stage)
 
 void FocusRing::showAround(const QRectF& target, const QRectF& window)
 {
+    assertHere();
     constexpr double kContrast = 1;
     constexpr double kWidth = metrics::kFocusRing;
     constexpr double kAway = kWidth + kContrast;

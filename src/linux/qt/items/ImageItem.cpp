@@ -7,6 +7,7 @@ namespace qtui {
 
 std::vector<Sprite> ImageItem::draw(platform::View& view)
 {
+    assertHere();
     std::vector<Sprite> sprites = ViewItem::draw(view);
     const QImage picture = toQImage(dynamic_cast<const platform::ImageView&>(view).image());
     if (picture.isNull())

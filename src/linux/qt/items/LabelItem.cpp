@@ -24,6 +24,7 @@ Qt::Alignment toQt(platform::TextAlignment alignment)
 
 std::vector<Sprite> LabelItem::draw(platform::View& view)
 {
+    assertHere();
     const auto& label = dynamic_cast<const platform::Label&>(view);
     std::vector<Sprite> sprites = ViewItem::draw(view);
     if (label.text().empty() || ownRect().width() <= 0)

@@ -15,6 +15,7 @@ double Stage::snapped(double points) const
 
 QPointF PeerItem::place(const QRectF& frame, QPointF parentOrigin)
 {
+    assertHere();
     m_origin = m_stage.snapped(parentOrigin + frame.topLeft());
     const QPointF end = m_stage.snapped(parentOrigin + frame.bottomRight());
     m_size = QSizeF(std::max(0.0, end.x() - m_origin.x()), std::max(0.0, end.y() - m_origin.y()));
@@ -25,6 +26,7 @@ QPointF PeerItem::place(const QRectF& frame, QPointF parentOrigin)
 
 QRectF PeerItem::drawnRect() const
 {
+    assertHere();
     QRectF rect = ownRect();
     for (const Sprite& sprite : sprites())
         rect = rect.united(sprite.rect);
@@ -33,6 +35,7 @@ QRectF PeerItem::drawnRect() const
 
 void PeerItem::setShown(bool hidden, double alpha, bool standsInGroup)
 {
+    assertHere();
     m_hidden = hidden;
     m_alpha = alpha;
     setVisible(!hidden && !standsInGroup);
@@ -41,6 +44,7 @@ void PeerItem::setShown(bool hidden, double alpha, bool standsInGroup)
 
 void PeerItem::showGroup(const QRectF& windowRect)
 {
+    assertHere();
     std::vector<Ingredient> ingredients{{windowRect, 0, 0, 1}};
     collect(ingredients);
     // Its own alpha is not part of the picture: a fade does not paint it anew.
@@ -51,6 +55,7 @@ void PeerItem::showGroup(const QRectF& windowRect)
 
 void PeerItem::endGroup()
 {
+    assertHere();
     m_ingredients.clear();
     setStandIn(std::nullopt);
 }

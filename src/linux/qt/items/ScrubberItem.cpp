@@ -64,6 +64,7 @@ platform::ImageRef pictureAt(double timestamp, const std::map<double, platform::
 
 std::vector<Sprite> ScrubberItem::draw(platform::View& view)
 {
+    assertHere();
     const auto& scrubber = dynamic_cast<const platform::MovieScrubber&>(view);
     const auto inset = [](const base::Rect& rect) {
         constexpr double kInset = platform::MovieScrubber::kTrackInset;

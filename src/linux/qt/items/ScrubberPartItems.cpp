@@ -45,6 +45,7 @@ void drawMark(QPainter& painter, const QRectF& mark, const QColor& color)
 
 std::vector<Sprite> PlayHeadItem::draw(platform::View& view)
 {
+    assertHere();
     const bool held = dynamic_cast<const platform::PlayHeadView&>(view).isHeld();
     const double radius = held ? kKnobRadiusHeld : kKnobRadius;
     const QPointF center = ownRect().center();
@@ -65,6 +66,7 @@ std::vector<Sprite> PlayHeadItem::draw(platform::View& view)
 
 std::vector<Sprite> TrimFrameItem::draw(platform::View& view)
 {
+    assertHere();
     const auto& frame = dynamic_cast<const platform::TrimFrameView&>(view);
     const double grip = platform::TrimFrameView::kGripWidth;
     const QRectF own = ownRect();

@@ -107,6 +107,7 @@ SpriteItem::SpriteItem()
 
 void SpriteItem::setSprites(std::vector<Sprite> sprites)
 {
+    assertHere();
     std::erase_if(sprites, [](const Sprite& sprite) {
         return sprite.rect.isEmpty() || (!sprite.isPicture() && sprite.color.alpha() == 0);
     });
@@ -116,6 +117,7 @@ void SpriteItem::setSprites(std::vector<Sprite> sprites)
 
 void SpriteItem::setStandIn(std::optional<Sprite> standIn)
 {
+    assertHere();
     if (!m_standIn && !standIn)
         return;
     m_standIn = std::move(standIn);

@@ -1,6 +1,8 @@
 /// What an item draws: filled rectangles and pictures, back to front. Works the same on every rendering backend.
 #pragma once
 
+#include "base/Affinity.h"
+
 #include <QColor>
 #include <QImage>
 #include <QQuickItem>
@@ -31,7 +33,7 @@ class SpriteItem : public QQuickItem {
 public:
     SpriteItem();
 
-    const std::vector<Sprite>& sprites() const { return m_sprites; }
+    const std::vector<Sprite>& sprites() const { return here(m_sprites); }
     /// Draws them with the next picture.
     void setSprites(std::vector<Sprite> sprites);
     /// Draws this instead of the sprites, until there is none again.
@@ -41,7 +43,20 @@ protected:
     /// Runs on the render thread while the GUI thread stands still.
     QSGNode* updatePaintNode(QSGNode* node, UpdatePaintNodeData* data) override;
 
+    /// First thing in each entry point.
+    void assertHere(base::SourceLocation where = base::SourceLocation::current()) const
+    {
+        m_affinity.assertHere(where);
+    }
+    /// The same where all that is done is reading or setting `member`, which it gives.
+    template <typename T> T& here(T& member, base::SourceLocation where = base::SourceLocation::current()) const
+    {
+        assertHere(where);
+        return member;
+    }
+
 private:
+    base::Affinity m_affinity;
     std::vector<Sprite> m_sprites;
     std::optional<Sprite> m_standIn;
 };

@@ -4,11 +4,13 @@ namespace qtui {
 
 bool ToolbarItem::needsDrawing(platform::View&, bool visible)
 {
+    assertHere();
     return visible && stage().liveBlur && m_blur.isStale(stage(), windowRect(), stage().material(stage().theme.bar));
 }
 
 std::vector<Sprite> ToolbarItem::draw(platform::View& view)
 {
+    assertHere();
     std::vector<Sprite> sprites;
     const QColor bar = stage().material(stage().theme.bar);
     if (stage().liveBlur) {

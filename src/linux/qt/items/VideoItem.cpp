@@ -31,6 +31,7 @@ const QColor kPlateColor(0, 0, 0, 190); // white is readable on it also where th
 
 void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
 {
+    assertHere();
     m_isSeen = visible;
     if (!visible)
         return;

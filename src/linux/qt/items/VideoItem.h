@@ -15,17 +15,17 @@ class VideoItem final : public PeerItem {
 public:
     VideoItem(const std::shared_ptr<platform::PlayerLayer>& layer, Stage& stage) : PeerItem(stage), m_layer(layer) {}
 
-    std::shared_ptr<platform::PlayerLayer> layer() const { return m_layer.lock(); }
+    std::shared_ptr<platform::PlayerLayer> layer() const { return here(m_layer).lock(); }
 
     /// Fetches the player's picture when it is another one. Nothing is converted while nobody can see it.
     void refresh(platform::PlayerLayer& layer, bool visible);
 
     /// What is said over the picture or in its place, where it can be seen; else empty.
-    QString message() const { return !m_isSeen ? QString() : m_words.isEmpty() ? m_notice : m_words; }
+    QString message() const { return !here(m_isSeen) ? QString() : m_words.isEmpty() ? m_notice : m_words; }
     /// As it was last converted; null until there was one.
-    const QImage& picture() const { return m_picture; }
+    const QImage& picture() const { return here(m_picture); }
     /// Where it stands, in window coordinates.
-    QRectF pictureRect() const { return m_pictureRect.translated(windowRect().topLeft()); }
+    QRectF pictureRect() const { return here(m_pictureRect).translated(windowRect().topLeft()); }
 
 private:
     bool convert(const platform::VideoFrame& frame, QSize size, platform::VideoFrame::Quality quality);

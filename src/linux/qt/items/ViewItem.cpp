@@ -4,7 +4,7 @@ namespace qtui {
 
 void ViewItem::refresh(platform::View& view, bool visible)
 {
-    m_affinity.assertHere();
+    assertHere();
     setClip(view.clipsToBounds());
     const bool asks = needsDrawing(view, visible);
     if (!asks && m_revision == view.revision() && m_generation == stage().generation && m_drawnSize == shownSize())
@@ -18,6 +18,7 @@ void ViewItem::refresh(platform::View& view, bool visible)
 
 std::vector<Sprite> ViewItem::draw(platform::View& view)
 {
+    assertHere();
     return {{ownRect(), toQColor(view.backgroundColor()), {}, false}};
 }
 

@@ -4,7 +4,6 @@
 /// something that it shows has changed.
 #pragma once
 
-#include "base/Affinity.h"
 #include "linux/qt/animation/Tween.h"
 #include "linux/qt/items/Sprite.h"
 #include "linux/qt/items/Stage.h"
@@ -23,8 +22,8 @@ public:
     /// origin make it land on whole pixels. Gives its own origin in window coordinates.
     QPointF place(const QRectF& frame, QPointF parentOrigin);
     /// What it covers now, in window coordinates.
-    QRectF windowRect() const { return {m_origin, m_size}; }
-    QSizeF shownSize() const { return m_size; }
+    QRectF windowRect() const { return {here(m_origin), m_size}; }
+    QSizeF shownSize() const { return here(m_size); }
     /// What it covers and draws, in window coordinates; can reach beyond its frame.
     QRectF drawnRect() const;
 
@@ -68,12 +67,12 @@ class ViewItem : public PeerItem {
 public:
     ViewItem(const std::shared_ptr<platform::View>& view, Stage& stage) : PeerItem(stage), m_view(view) {}
 
-    std::shared_ptr<platform::View> view() const { return m_view.lock(); }
+    std::shared_ptr<platform::View> view() const { return here(m_view).lock(); }
 
     /// Where the model puts it, in the superview's coordinates.
     virtual base::Rect modelFrame(const platform::View& view) const { return view.frame(); }
-    Tween<double>& alphaTween() { return m_alphaTween; }
-    Tween<base::Rect>& frameTween() { return m_frameTween; }
+    Tween<double>& alphaTween() { return here(m_alphaTween); }
+    Tween<base::Rect>& frameTween() { return here(m_frameTween); }
 
     /// Draws anew if it has to. `visible`: some of it can be seen.
     void refresh(platform::View& view, bool visible);
@@ -91,7 +90,6 @@ private:
     std::uint64_t m_revision = 0;
     std::uint64_t m_generation = 0;
     QSizeF m_drawnSize;
-    base::Affinity m_affinity;
 };
 
 /// The peer that fits the kind of view.

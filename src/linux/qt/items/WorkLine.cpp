@@ -26,12 +26,14 @@ WorkLine::WorkLine(Stage& stage) : PeerItem(stage)
 
 void WorkLine::begin(std::optional<double> progress)
 {
+    assertHere();
     m_underWay = m_changed = true;
     m_progress = progress;
 }
 
 void WorkLine::end()
 {
+    assertHere();
     m_underWay = false;
     m_changed = true;
     m_progress.reset();
@@ -39,11 +41,13 @@ void WorkLine::end()
 
 std::optional<int> WorkLine::percent() const
 {
+    assertHere();
     return m_progress ? std::optional(static_cast<int>(std::lround(*m_progress * 100))) : std::nullopt;
 }
 
 void WorkLine::showIn(const QRectF& window)
 {
+    assertHere();
     const bool isSame = m_window == window && m_generation == stage().generation;
     if (!std::exchange(m_changed, false) && isSame)
         return;

@@ -17,8 +17,8 @@ public:
     void begin(std::optional<double> progress);
     void end();
 
-    bool isUnderWay() const { return m_underWay; }
-    std::optional<double> progress() const { return m_progress; }
+    bool isUnderWay() const { return here(m_underWay); }
+    std::optional<double> progress() const { return here(m_progress); }
     /// The progress as people are told of it.
     std::optional<int> percent() const;
 
