@@ -16,6 +16,7 @@
 
 #include <filesystem>
 #include <fstream>
+#include <sstream>
 #include <string>
 
 using testing::ElementsAre;
@@ -24,19 +25,28 @@ using testing::Optional;
 
 namespace {
 
-/// Of all pixels that differ, in words; empty when none does.
+/// How many pixels differ, which is the first, and where all of them lie, in words; empty when none does.
 std::string placeOfDifference(const QImage& one, const QImage& other)
 {
     if (one.size() != other.size())
         return "they differ in size";
     QRect place;
+    std::string first;
+    int count = 0;
     for (int y = 0; y < one.height(); ++y)
-        for (int x = 0; x < one.width(); ++x)
-            if (one.pixel(x, y) != other.pixel(x, y))
-                place |= QRect(x, y, 1, 1);
-    return place.isEmpty() ? ""
-                           : std::to_string(place.width()) + " x " + std::to_string(place.height()) + " at "
-                                 + std::to_string(place.x()) + ", " + std::to_string(place.y());
+        for (int x = 0; x < one.width(); ++x) {
+            if (one.pixel(x, y) == other.pixel(x, y))
+                continue;
+            std::ostringstream words;
+            words << "the first at " << x << ", " << y << std::hex << " is " << one.pixel(x, y) << ", not "
+                  << other.pixel(x, y);
+            first = count++ == 0 ? words.str() : first;
+            place |= QRect(x, y, 1, 1);
+        }
+    std::ostringstream words;
+    words << count << " pixels, " << first << "; all in " << place.width() << " x " << place.height() << " at "
+          << place.x() << ", " << place.y();
+    return count == 0 ? "" : words.str();
 }
 
 class ASlowHandOver : public ::testing::Test {
