@@ -165,16 +165,17 @@ TEST_F(Trimming, AnExportsThreadWaitsUntilTheMainQueueHasShownTheMovie)
         if (call.starts_with("asset "))
             shower = std::this_thread::get_id();
     };
-    std::promise<bool> stillExporting;
-    auto told = stillExporting.get_future();
+    std::promise<std::optional<base::Url>> shown;
+    auto told = shown.get_future();
     std::thread worker([&, running = session()] {
         running->finish(ExportSession::Status::Completed);
-        stillExporting.set_value(editor->isExporting());
+        shown.set_value(editor->videoURL());
     });
     EXPECT_TRUE(tests::waitUntil(fake->machine.mainQueue,
                                  [&] { return told.wait_for(std::chrono::seconds(0)) == std::future_status::ready; }));
     worker.join();
-    EXPECT_FALSE(told.get());
+    EXPECT_EQ(told.get(), editor->trimFilePath());
+    EXPECT_FALSE(editor->isExporting());
     EXPECT_EQ(shower, std::this_thread::get_id());
     fake->media.listener->heard = {};
     settle();
