@@ -172,7 +172,6 @@ ExtensionConnection::~ExtensionConnection()
 
 base::Result<void> ExtensionConnection::connect(const std::string& address)
 {
-    m_affinity.assertHere();
     assert(!m_shared->link);
     static std::atomic<int> count = 0;
     const QString name = QStringLiteral("clipsa-host-%1").arg(++count);
@@ -210,7 +209,6 @@ void ExtensionConnection::setSentHandler(std::function<void()> handler)
 
 base::Result<std::vector<platform::InputItem>> ExtensionConnection::inputItems()
 {
-    m_affinity.assertHere();
     if (m_fetched)
         return m_items;
     if (!m_shared->link)

@@ -1,10 +1,9 @@
 /// The extension's end of the private connection to its host: fetches the payload, and carries messages back.
 ///
-/// connect() and inputItems() belong to the start-up, on one thread, and block it for a few milliseconds. The rest may
-/// be called on any thread. Needs a QCoreApplication, but no running event loop of the caller's.
+/// connect() and inputItems() belong to the start-up, one after the other, and block it for a few milliseconds. The rest
+/// may be called on any thread. Needs a QCoreApplication, but no running event loop of the caller's.
 #pragma once
 
-#include "base/Affinity.h"
 #include "base/Queue.h"
 #include "base/Result.h"
 #include "platform/hosting/Connection.h"
@@ -61,7 +60,6 @@ private:
     class Provider;
 
     std::shared_ptr<Shared> m_shared;
-    base::Affinity m_affinity; ///< of the start-up
     std::vector<platform::InputItem> m_items;
     bool m_fetched = false;
 };

@@ -14,6 +14,7 @@
 
 #include <gmock/gmock.h>
 
+#include <chrono>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -104,7 +105,8 @@ protected:
     {
         const auto movie = std::filesystem::path(m_place->movieDirectory()) / "clock.mp4";
         std::filesystem::copy_file(tests::movie(source), movie);
-        std::filesystem::last_write_time(movie, {}); // the title tells it
+        // The title tells when it was made, to the minute: the earlier of when it was written and when the file came.
+        std::filesystem::last_write_time(movie, std::chrono::file_clock::from_sys(std::chrono::sys_seconds{}));
         for (const auto& answer : m_waiting)
             answer(runtime::Value(host::kDeviceMovieDirectory + std::string("clock.mp4")));
     }
@@ -157,7 +159,7 @@ TEST_F(ASlowHandOver, IsWaitedForInAWindowWithoutSave)
 
 TEST_F(ASlowHandOver, ShowsInTheEndWhatAQuickOneShows)
 {
-    const std::string rest = "wait picture\nwait ready\nwait frame 0\nwait thumbnails\npicture ";
+    const std::string rest = "wait picture\nwait ready\nwait frame 0\nwait thumbnails\nprint {date}\npicture ";
     start(rest + "quick.png\nkey escape");
     ASSERT_TRUE(tests::pumpUntil([&] { return !m_waiting.empty(); }));
     handOver();
@@ -168,6 +170,7 @@ TEST_F(ASlowHandOver, ShowsInTheEndWhatAQuickOneShows)
     ASSERT_TRUE(pumpUntilReported("waiting"));
     handOver();
     ASSERT_TRUE(pumpUntilEnd());
+    EXPECT_EQ(report(), "January 1 12:00 AM\nwaiting\nJanuary 1 12:00 AM\n");
     EXPECT_THAT(m_finished, Optional(IsEmpty())) << "the editor has the keys";
     const QImage waiting = picture("waiting.png");
     int moving = 0;
