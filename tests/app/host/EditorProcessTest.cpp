@@ -27,6 +27,23 @@ using tests::Words;
 
 namespace fs = std::filesystem;
 
+/// Another file in the place of a standard stream, while it lives.
+class StandardStream {
+public:
+    StandardStream(int number, const posix::FileDescriptor& file)
+        : m_number(number), m_before(::fcntl(number, F_DUPFD_CLOEXEC, 10))
+    {
+        ::dup2(file.get(), number);
+    }
+    ~StandardStream() { ::dup2(m_before.get(), m_number); }
+    StandardStream(const StandardStream&) = delete;
+    StandardStream& operator=(const StandardStream&) = delete;
+
+private:
+    const int m_number;
+    const posix::FileDescriptor m_before;
+};
+
 class AnEditorsProcess : public testing::Test {
 protected:
     /// A shell that does what `script` says; files are in `$0`, the test's directory.
@@ -66,16 +83,21 @@ TEST_F(AnEditorsProcess, HasTheFilesThatItIsGivenAndNoOthers)
     const auto other = open("another");
     m_start.lock = lock.get();
     m_start.report = report.get();
-    run("for each in /proc/$$/fd/*; do echo \"${each##*/} $(readlink $each)\" >>\"$0/files\"; done");
+    {
+        // The host's own, which are three different ones.
+        const StandardStream input(STDIN_FILENO, open("the input"));
+        const StandardStream output(STDOUT_FILENO, open("the output"));
+        const StandardStream errors(STDERR_FILENO, open("the errors"));
+        start("for each in /proc/$$/fd/*; do echo \"${each##*/} $(readlink $each)\" >>\"$0/files\"; done");
+    }
+    ASSERT_TRUE(tests::pumpUntil([&] { return m_ends > 0; }));
     const std::string files = read("files");
     EXPECT_THAT(files,
                 AllOf(HasSubstr("0 /dev/null\n"), HasSubstr("3 " + (m_directory.path() / "the lock").native()),
                       HasSubstr("4 " + (m_directory.path() / "the report").native()), Not(HasSubstr("another"))));
-    const auto fileOf = [&](const std::string& number) {
-        const std::size_t at = files.find("\n" + number + " ") + 1;
-        return files.substr(at + 2, files.find('\n', at) - at - 2);
-    };
-    EXPECT_EQ(fileOf("1"), fileOf("2")) << "what it says is none of its host's results";
+    // What it says is none of its host's results.
+    EXPECT_THAT(files, AllOf(HasSubstr("1 " + (m_directory.path() / "the errors").native() + "\n"),
+                             HasSubstr("2 " + (m_directory.path() / "the errors").native() + "\n")));
 }
 
 TEST_F(AnEditorsProcess, HasNoLockAndNoReportIfThereAreNone)
