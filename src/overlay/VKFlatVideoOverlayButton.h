@@ -35,7 +35,7 @@ public:
 private:
     using Button::Button;
 
-    std::int64_t m_style = 0;
+    std::int64_t m_style = kStyleAutomatic;
     std::weak_ptr<runtime::Object> m_target;
     runtime::Selector m_action;
 };

@@ -35,7 +35,7 @@ private:
 
     void addBackdrop(const platform::Platform& platform);
 
-    std::int64_t m_style = 0;
+    std::int64_t m_style = kStyleAutomatic;
     std::shared_ptr<platform::Button> m_button;
     std::shared_ptr<platform::BackdropView> m_backdropView;
     std::weak_ptr<runtime::Object> m_target;
