@@ -44,11 +44,10 @@ void FrameCache::makeRoom(std::int64_t focus, Overflow overflow, std::int64_t re
 {
     const auto last = farthest(focus);
     const bool isWanted = last->first / 2 >= focus / 2 - reach / 2 && last->first / 2 <= focus / 2 + reach / 2;
-    if (overflow == Overflow::Drop || !isWanted)
-        erase(last);
-    else if (m_counts[1] > 0)
+    const bool mayReduce = overflow != Overflow::Drop && isWanted;
+    if (mayReduce && m_counts[1] > 0)
         reduce(farthestOf(1, focus), 0);
-    else if (m_counts[kFull] > kKeptAmongReduced)
+    else if (mayReduce && m_counts[kFull] > kKeptAmongReduced)
         reduce(farthestOf(kFull, focus), 0);
     else
         erase(last);

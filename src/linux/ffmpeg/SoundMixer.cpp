@@ -10,7 +10,7 @@ namespace ffmpeg {
 namespace {
 
 /// A track that has no packets for so long is taken as silent; reading on for it would fill the memory with the others.
-constexpr std::int64_t kFarthestAhead = kSampleRate * 4;
+constexpr std::int64_t kFarthestAhead = std::int64_t(kSampleRate) * 4;
 /// Sought before what is wanted: decoders need a start.
 constexpr std::int64_t kRunUp = AV_TIME_BASE / 4;
 /// The limiter's gain returns to 1 with this share a sample: about a tenth of a second.

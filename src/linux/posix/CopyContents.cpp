@@ -15,8 +15,8 @@ namespace posix {
 namespace {
 
 /// Large enough to cost nothing, small enough to stop soon, and that the progress moves.
-constexpr std::uint64_t kStep = 16 * 1024 * 1024;
-constexpr std::size_t kBuffer = 1024 * 1024;
+constexpr std::uint64_t kStep = 16 << 20;
+constexpr std::size_t kBuffer = 1 << 20;
 
 /// Copies up to `count` bytes at `offset`: the number of bytes, 0 at the end, -1 with errno.
 using CopyStep = ssize_t (*)(int from, int to, off_t offset, std::size_t count);

@@ -14,6 +14,7 @@
 #include <fstream>
 #include <optional>
 #include <sys/stat.h>
+#include <unistd.h>
 
 namespace {
 
@@ -46,6 +47,9 @@ private:
 
 class AnEditorsProcess : public testing::Test {
 protected:
+    /// What this test inherited from whoever runs it is not its host's.
+    AnEditorsProcess() { ::close_range(3, ~0U, CLOSE_RANGE_CLOEXEC); }
+
     /// A shell that does what `script` says; files are in `$0`, the test's directory.
     void start(const std::string& script)
     {

@@ -14,7 +14,7 @@ namespace {
 
 constexpr unsigned kMostWorkers = 4;
 /// Of the pictures that all decoders together may work on: each keeps up to 17 of them, of 1.5 bytes a pixel.
-constexpr std::int64_t kMostPixels = 4 * 3840 * 2160;
+constexpr std::int64_t kMostPixels = std::int64_t(4) * 3840 * 2160;
 
 int processors()
 {

@@ -64,8 +64,8 @@ Limiter::Limiter(int rate, int channels)
         std::vector<float> filter;
         double sum = 0;
         for (std::size_t tap = 0; tap < kTaps; ++tap) {
-            const double x = static_cast<double>(tap) - (kTaps / 2 - 1) - static_cast<double>(place) / kPlaces;
-            const double window = 0.5 + 0.5 * std::cos(std::numbers::pi * x / (kTaps / 2));
+            const double x = static_cast<double>(tap) - (kTaps / 2.0 - 1) - static_cast<double>(place) / kPlaces;
+            const double window = 0.5 + 0.5 * std::cos(std::numbers::pi * x / (kTaps / 2.0));
             const double value = std::sin(std::numbers::pi * x) / (std::numbers::pi * x) * window;
             filter.push_back(static_cast<float>(value));
             sum += std::abs(value);

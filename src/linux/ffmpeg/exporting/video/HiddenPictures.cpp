@@ -12,8 +12,8 @@ std::vector<ByteView> framesOfVp9(ByteView packet)
 {
     if (packet.empty() || (packet.back() & 0xE0) != 0xC0)
         return {packet};
-    const auto count = static_cast<std::size_t>((packet.back() & 7) + 1);
-    const auto bytes = static_cast<std::size_t>((packet.back() >> 3 & 3) + 1);
+    const auto count = static_cast<std::size_t>(packet.back() & 7) + 1;
+    const auto bytes = static_cast<std::size_t>(packet.back() >> 3 & 3) + 1;
     const std::size_t index = 2 + count * bytes;
     if (packet.size() < index || packet[packet.size() - index] != packet.back())
         return {packet};

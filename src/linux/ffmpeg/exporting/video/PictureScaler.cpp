@@ -137,7 +137,7 @@ base::Result<Owned<AVFrame>> PictureScaler::fit(const AVFrame& picture)
         const bool isChroma = plane == 1 || plane == 2;
         const int x = isChroma ? left >> about.log2_chroma_w : left;
         const int y = isChroma ? top >> about.log2_chroma_h : top;
-        const int bytes = (about.comp[plane].depth + 7) / 8;
+        const std::ptrdiff_t bytes = (about.comp[plane].depth + 7) / 8;
         to[static_cast<std::size_t>(plane)] = out->data[plane] + std::ptrdiff_t(y) * out->linesize[plane] + x * bytes;
     }
     sws_scale(m_scaler.get(), picture.data, picture.linesize, 0, picture.height, to.data(), out->linesize);
