@@ -55,6 +55,7 @@ void ImageWorkers::cancel()
 
 void ImageWorkers::add(std::vector<Request> requests)
 {
+    m_affinity.assertHere();
     {
         const std::lock_guard lock(m_mutex);
         for (Request& each : requests) {

@@ -112,6 +112,7 @@ void Limiter::findPeaks(std::size_t from, std::size_t until)
 
 Planes Limiter::push(const Planes& samples)
 {
+    m_affinity.assertHere();
     for (std::size_t channel = 0; channel < m_samples.size(); ++channel)
         m_samples[channel].insert(m_samples[channel].end(), samples[channel].begin(), samples[channel].end());
     const std::size_t known = m_samples.front().size();
@@ -146,6 +147,7 @@ Planes Limiter::give(std::size_t until)
 
 Planes Limiter::finish()
 {
+    m_affinity.assertHere();
     const std::size_t rest = m_samples.front().size() - 2 * m_reach;
     const Planes silence(m_samples.size(), std::vector<float>(2 * m_reach + kTaps / 2, 0.0f));
     Planes given = push(silence);

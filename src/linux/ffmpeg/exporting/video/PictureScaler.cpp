@@ -91,6 +91,7 @@ bool isRgb(AVPixelFormat format)
 
 base::Result<Owned<AVFrame>> PictureScaler::fit(const AVFrame& picture)
 {
+    m_affinity.assertHere();
     if (isOfPalette(static_cast<AVPixelFormat>(picture.format))) {
         auto same = plain(picture);
         return same ? fit(*same.value()) : std::move(same);
