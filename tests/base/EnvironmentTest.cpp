@@ -6,10 +6,10 @@
 
 TEST(Environment, OfWhatIsNotSetOrSetToNothingIsEmpty)
 {
-    ::unsetenv("CLIPSA_TEST_VARIABLE"); // NOLINT(concurrency-mt-unsafe): no other thread runs
+    ::unsetenv("CLIPSA_TEST_VARIABLE");
     EXPECT_EQ(base::environment("CLIPSA_TEST_VARIABLE"), "");
-    ::setenv("CLIPSA_TEST_VARIABLE", "", 1); // NOLINT(concurrency-mt-unsafe)
+    ::setenv("CLIPSA_TEST_VARIABLE", "", 1);
     EXPECT_EQ(base::environment("CLIPSA_TEST_VARIABLE"), "");
-    ::setenv("CLIPSA_TEST_VARIABLE", "a b", 1); // NOLINT(concurrency-mt-unsafe)
+    ::setenv("CLIPSA_TEST_VARIABLE", "a b", 1);
     EXPECT_EQ(base::environment("CLIPSA_TEST_VARIABLE"), "a b");
 }

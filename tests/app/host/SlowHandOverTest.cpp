@@ -84,8 +84,8 @@ protected:
             {"--connect", m_connection->address(), "--device-root", m_place->deviceRoot(), "--device", "phone"},
             {},
             m_place->lock()};
-        for (const auto& variable : scripted(script))
-            editor.environment.push_back(variable);
+        for (const auto& [name, value] : scripted(script))
+            editor.environment.emplace_back(name, value);
         editor.arguments.insert(editor.arguments.end(), options.begin(), options.end());
         auto process = host::EditorProcess::start(editor, [this](host::ProcessEnd end) { m_end = end; });
         ASSERT_TRUE(process) << process.error()->description();

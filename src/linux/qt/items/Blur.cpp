@@ -39,8 +39,8 @@ void paintVideo(QPainter& painter, const VideoItem& video, const QRectF& windowR
                               part.width() * scaleX, part.height() * scaleY)
                            .toAlignedRect()
                            .intersected(picture.rect());
-    const QImage cropped(picture.constScanLine(crop.top()) + crop.left() * 4, crop.width(), crop.height(),
-                         picture.bytesPerLine(), picture.format());
+    const QImage cropped(picture.constScanLine(crop.top()) + std::ptrdiff_t(crop.left()) * 4, crop.width(),
+                         crop.height(), picture.bytesPerLine(), picture.format());
     const QSize small(std::max(1, static_cast<int>(std::lround(part.width() / cell.width()))),
                       std::max(1, static_cast<int>(std::lround(part.height() / cell.height()))));
     painter.drawImage(part, cropped.scaled(small, Qt::IgnoreAspectRatio, Qt::SmoothTransformation));
