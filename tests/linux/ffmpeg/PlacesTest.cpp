@@ -325,7 +325,7 @@ TEST_F(Places, InAMovieWithoutATableAreFoundWithoutReadingAllBeforeThem)
     const auto& packets = opened->packetIndex(cancelled)->packets();
     const auto source = std::move(VideoSource::open(opened, cancelled, 1)).value();
     const auto walk = std::move(ffmpeg::PictureWalk::open(opened, cancelled)).value();
-    for (const std::size_t picture : {110, 80, 95}) {
+    for (const std::size_t picture : {110U, 80U, 95U}) {
         const std::int64_t tick = packets[picture].pts;
         const std::int64_t before = bytesRead();
         ASSERT_TRUE(source->at(tick, VideoSource::Want::Full, [] { return false; }));

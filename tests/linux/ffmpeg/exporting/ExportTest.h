@@ -45,7 +45,7 @@ protected:
         session->exportAsynchronously([&] { ++ended; });
         EXPECT_TRUE(waitFor([&] { return ended > 0; }));
         EXPECT_EQ(ended, 1);
-        lastError = session->error();
+        m_lastError = session->error();
         return session->status();
     }
     ExportStatus cut(const std::string& from, const std::string& to, std::optional<Range> range)
@@ -79,7 +79,7 @@ protected:
         std::ifstream file(path, std::ios::binary);
         return {std::istreambuf_iterator<char>(file), {}};
     }
-    std::string errorText() const { return lastError ? lastError->description() : ""; }
+    std::string errorText() const { return m_lastError ? m_lastError->description() : ""; }
     /// Names of what lies in the directory.
     std::vector<std::string> files() const { return namesIn(directory()); }
     bool saysEncodedAsAWhole() const
@@ -92,7 +92,7 @@ protected:
 
 private:
     PrivateDirectory m_directory;
-    base::ErrorRef lastError;
+    base::ErrorRef m_lastError;
 };
 
 } // namespace tests
