@@ -15,7 +15,7 @@ public:
     {
         ::syscall(SYS_capget, &m_header, m_before);
         __user_cap_data_struct reduced[2] = {m_before[0], m_before[1]};
-        for (const unsigned right : {CAP_DAC_OVERRIDE, CAP_DAC_READ_SEARCH}) {
+        for (const unsigned right : {unsigned{CAP_DAC_OVERRIDE}, unsigned{CAP_DAC_READ_SEARCH}}) {
             ::prctl(PR_CAPBSET_DROP, right);
             reduced[0].effective &= ~(1U << right);
         }

@@ -34,7 +34,7 @@ protected:
         const auto path = m_root / name;
         std::filesystem::create_directories(path / "private/Velkor");
         std::ofstream(path / "private/Velkor/movie.mp4") << "trimmed";
-        std::ofstream(path / "lock");
+        std::ofstream(path / "lock").flush();
         return path;
     }
 
@@ -127,7 +127,7 @@ TEST_F(EditorDirectories, ThatCannotBeRemovedAsAWholeAreSweptAnotherTime)
 TEST_F(EditorDirectories, SweepingLeavesWhatIsNotAnEditors)
 {
     std::filesystem::create_directories(m_root / "other");
-    std::ofstream(m_root / "other/lock");
+    std::ofstream(m_root / "other/lock").flush();
     std::ofstream(m_root / "editor-file") << "a file";
     EXPECT_EQ(sweep(), 0);
     EXPECT_TRUE(std::filesystem::exists(m_root / "other/lock"));
@@ -138,7 +138,7 @@ TEST_F(EditorDirectories, SweepingLeavesWhatIsNotAnEditors)
 TEST_F(EditorDirectories, SweepingFollowsNoLinks)
 {
     const auto precious = m_directory.write("outside/precious", "x");
-    std::ofstream(precious.parent_path() / "lock");
+    std::ofstream(precious.parent_path() / "lock").flush();
     std::filesystem::create_directories(m_root);
     std::filesystem::create_symlink(precious.parent_path(), m_root / "editor-linked");
     const auto withLink = dead("editor-withlink");
