@@ -239,8 +239,16 @@ TEST_F(Saving, NoButtonIsDisabledMeanwhileAndNothingElseChanges)
     EXPECT_FALSE(editor->isExporting());
     mixEnds(ExportSession::Status::Completed);
     EXPECT_THAT(whole(), ElementsAreArray(before));
+    // The button is not only alive: it saves once more what the library is being given.
+    fake->media.movies[editor->videoURL()->path()] = tests::FakeMovie::lasting(10);
+    tap(editor->saveButton()->view());
+    settle();
+    ASSERT_EQ(fake->media.exportSessionCount(), 2U);
+    mixEnds(ExportSession::Status::Completed);
+    EXPECT_EQ(fake->photos.urls.size(), 2U);
     libraryEnds();
     EXPECT_THAT(whole(), ElementsAreArray(before)) << "but for what closing does";
+    libraryEnds();
 }
 
 TEST_F(Saving, WhatTheLibraryTellsIsHeardOnTheMainQueuesNextTurn)
