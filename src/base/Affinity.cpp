@@ -20,11 +20,6 @@ Affinity Affinity::detached()
     return Affinity(std::thread::id());
 }
 
-void Affinity::moveHere()
-{
-    m_thread = std::this_thread::get_id();
-}
-
 void Affinity::detach()
 {
     m_thread = std::thread::id();

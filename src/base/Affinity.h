@@ -28,9 +28,6 @@ public:
     Affinity(const Affinity& other);
     Affinity& operator=(const Affinity&) { return *this; }
 
-    /// Belongs to the calling thread from now on. For what one thread makes and hands to another, which calls it before
-    /// anything else.
-    void moveHere();
     /// Belongs to whichever thread asserts next: what its owner calls last before it hands the object to another thread.
     void detach();
 
@@ -48,7 +45,6 @@ private:
 class Affinity {
 public:
     static Affinity detached() { return {}; }
-    void moveHere() {}
     void detach() {}
     void assertHere(SourceLocation = {}) const {}
 };

@@ -21,16 +21,6 @@ TEST(Affinity, IsToTheThreadThatMadeIt)
                  "AffinityTest.cpp:[0-9]+: .* was called on thread .*, but belongs to");
 }
 
-TEST(Affinity, MovesWithTheObject)
-{
-    base::Affinity affinity;
-    elsewhere([&] {
-        affinity.moveHere();
-        affinity.assertHere();
-    });
-    EXPECT_DEATH(affinity.assertHere(), "belongs to thread");
-}
-
 TEST(Affinity, ThatIsDetachedIsToWhoeverAsksFirst)
 {
     const base::Affinity affinity = base::Affinity::detached();

@@ -1,11 +1,10 @@
-/// One track of an exported movie, given packet by packet in decode order. One thread at a time: whoever
-/// has it detaches it for the next.
+/// One track of an exported movie, given packet by packet in decode order. One thread at a time.
 #pragma once
 
-#include "base/Affinity.h"
 #include "base/MediaTime.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
+#include "linux/ffmpeg/exporting/Detachable.h"
 #include "linux/ffmpeg/exporting/video/JointWitness.h"
 
 namespace ffmpeg {
@@ -17,10 +16,8 @@ struct ExportRange {
     base::MediaTime end;
 };
 
-class TrackSource {
+class TrackSource : public Detachable {
 public:
-    virtual ~TrackSource() = default;
-
     /// Fills in the output's stream: codec parameters with their header, time base, metadata, disposition, side data.
     /// Called once, before the first packet.
     virtual base::Result<void> describe(AVStream& output) = 0;
@@ -32,21 +29,9 @@ public:
     /// When all have come: where packets of different origin follow each other, and what is to be seen there.
     virtual base::Result<std::vector<Joint>> joints()
     {
-        m_affinity.assertHere();
+        assertHere();
         return std::vector<Joint>();
     }
-
-    /// What its owner calls last before another thread goes on with it. Whoever has parts detaches them, too.
-    virtual void detach() { m_affinity.detach(); }
-
-protected:
-    void assertHere(base::SourceLocation where = base::SourceLocation::current()) const
-    {
-        m_affinity.assertHere(where);
-    }
-
-private:
-    base::Affinity m_affinity;
 };
 
 } // namespace ffmpeg
