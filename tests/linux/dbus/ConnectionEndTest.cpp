@@ -8,6 +8,7 @@
 #include <QTimer>
 
 #include <atomic>
+#include <future>
 #include <optional>
 
 using testing::IsEmpty;
@@ -149,6 +150,25 @@ TEST_F(TheEndOfAConnection, IsNoAnswerToALateLoad)
     m_host.reset();
     answerLater(runtime::toValue("nor this"));
     EXPECT_EQ(completions, 1);
+}
+
+TEST_F(TheEndOfAConnection, IsToldWhenNothingIsBeingLoadedAnyMore)
+{
+    bool asked = false;
+    dbus::HostAttachment never;
+    never.load = [&](const dbus::LoadedItem&) { asked = true; };
+    connect({{"never", {never}}});
+    std::atomic<bool> told = false;
+    std::promise<bool> toldBefore;
+    m_extension->setDisconnectedHandler([] {});
+    m_items[0].attachments[0]->loadItemForTypeIdentifier(
+        platform::kGenericDataType, [&](const runtime::Value&, const base::ErrorRef&) { toldBefore.set_value(told); });
+    ASSERT_TRUE(tests::pumpUntil([&] { return asked; }));
+    m_mainQueue.setWake([&] { told = true; });
+    m_host.reset();
+    EXPECT_FALSE(toldBefore.get_future().get());
+    ASSERT_TRUE(tests::pumpUntil(m_mainQueue, [&] { return told.load(); }));
+    m_mainQueue.setWake({});
 }
 
 TEST_F(TheEndOfAConnection, IsNoticedByWhoBeginsToWatchTooLate)

@@ -5,6 +5,9 @@
 
 #include <gmock/gmock.h>
 
+#include <cstdlib>
+#include <unistd.h>
+
 using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::Pair;
@@ -62,6 +65,16 @@ TEST(EditOptions, HaveNoFileWhereNoneWasSent)
 {
     EXPECT_FALSE(dbus::descriptorFrom(QVariant()));
     EXPECT_FALSE(dbus::descriptorFrom(QVariant::fromValue(QDBusUnixFileDescriptor())));
+}
+
+TEST(EditOptions, LeaveTheNumbersOfTheStandardStreamsToThose)
+{
+    const QVariant file = QVariant::fromValue(QDBusUnixFileDescriptor(STDERR_FILENO));
+    const auto number = [&] {
+        ::close(STDIN_FILENO);
+        return dbus::descriptorFrom(file).get();
+    };
+    EXPECT_EXIT(std::exit(number() > STDERR_FILENO ? 0 : 1), testing::ExitedWithCode(0), "");
 }
 
 } // namespace
