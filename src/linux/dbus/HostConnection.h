@@ -43,8 +43,8 @@ public:
         std::function<void()> disconnected;
     };
 
-    /// The longest path that a socket can have.
-    static constexpr std::size_t kMaximumPathSize = 107;
+    /// The longest path of a socket that libdbus takes, which leaves some of the 108 bytes of an address alone.
+    static constexpr std::size_t kMaximumPathSize = 99;
 
     /// Listens on a new socket at `path`, in a directory that nobody else can write to.
     static base::Result<std::unique_ptr<HostConnection>> listen(const std::string& path, std::vector<HostItem> items,

@@ -250,9 +250,18 @@ TEST_F(Connection, APathWithOddCharactersIsAnAddress)
 
 TEST_F(Connection, APathThatIsTooLongForASocketIsAnError)
 {
-    const auto listening = dbus::HostConnection::listen("/tmp/" + std::string(200, 'x'), {}, {});
-    ASSERT_FALSE(listening);
-    EXPECT_THAT(listening.error()->description(), HasSubstr("too long"));
+    // One byte more, and libdbus refuses it.
+    const std::string folder = m_directory.path().native() + "/";
+    const std::string longest = folder + std::string(99 - folder.size(), 'x');
+    const auto listening = dbus::HostConnection::listen(longest, {text("t", "v")}, {});
+    ASSERT_TRUE(listening) << listening.error()->description();
+    m_extension = newExtension(listening.value()->address());
+    fetch();
+    EXPECT_EQ(load(0).text(), "v");
+
+    const auto tooLong = dbus::HostConnection::listen(longest + "x", {}, {});
+    ASSERT_FALSE(tooLong);
+    EXPECT_THAT(tooLong.error()->description(), HasSubstr("too long"));
 }
 
 TEST(Selectors, BecomeMembers)
@@ -260,7 +269,8 @@ TEST(Selectors, BecomeMembers)
     EXPECT_EQ(dbus::memberName(runtime::Selector("extensionDidFinishWithActivityTypes:")),
               "ExtensionDidFinishWithActivityTypes");
     EXPECT_EQ(dbus::memberName(runtime::Selector("saveAction")), "SaveAction");
-    EXPECT_EQ(dbus::memberName(runtime::Selector("move:to:")), "MoveTo");
+    EXPECT_EQ(dbus::memberName(runtime::Selector("add:zoom:")), "AddZoom");
+    EXPECT_EQ(dbus::memberName(runtime::Selector("URL:_of:")), "URL_of") << "only small letters have a great one";
     EXPECT_EQ(dbus::interfaceName("VKVideoEditorExtensionHostProtocol"),
               "org.clipsa.VKVideoEditorExtensionHostProtocol");
 }

@@ -5,7 +5,6 @@
 
 #include <gmock/gmock.h>
 
-#include <cstdlib>
 #include <unistd.h>
 
 using testing::ElementsAre;
@@ -74,7 +73,7 @@ TEST(EditOptions, LeaveTheNumbersOfTheStandardStreamsToThose)
         ::close(STDIN_FILENO);
         return dbus::descriptorFrom(file).get();
     };
-    EXPECT_EXIT(std::exit(number() > STDERR_FILENO ? 0 : 1), testing::ExitedWithCode(0), "");
+    EXPECT_EXIT(::_exit(number() > STDERR_FILENO ? 0 : 1), testing::ExitedWithCode(0), "");
 }
 
 } // namespace

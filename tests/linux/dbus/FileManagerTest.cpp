@@ -19,6 +19,7 @@ TEST_F(Recorders, AFileManagerOpensSeveralFiles)
     ASSERT_EQ(m_editors.size(), 2U);
     EXPECT_EQ(m_editors[0]->request.moviePath, "/tmp/a b.mp4");
     EXPECT_EQ(m_editors[1]->request.moviePath, "/c.webm");
+    EXPECT_THAT(m_editors[0]->request.editorArguments, ElementsAre("--explain")) << "nobody else is told";
     EXPECT_THAT(m_editors[1]->request.environment,
                 ElementsAre(std::pair<std::string, std::string>("DESKTOP_STARTUP_ID", "id")));
     caller.leave();
@@ -50,12 +51,33 @@ TEST_F(Recorders, AFileManagerIsAnsweredOnceWhenAllOfItsFilesHaveBeenLookedAt)
     }
 }
 
+TEST_F(Recorders, AFileManagerMayAskForNothingOrForWhatIsNoFile)
+{
+    serve();
+    Caller caller;
+    const auto open = [&](const QStringList& uris) {
+        return caller.call("org.freedesktop.Application", "Open", {uris, QVariantMap{}}).type();
+    };
+    EXPECT_EQ(open({}), QDBusMessage::ReplyMessage);
+    EXPECT_TRUE(m_editors.empty());
+    // Whoever opens it says in words that there is no such file.
+    EXPECT_EQ(open({QStringLiteral("https://example.org/a.mp4")}), QDBusMessage::ReplyMessage);
+    ASSERT_EQ(m_editors.size(), 1U);
+    EXPECT_EQ(m_editors[0]->request.moviePath, "https://example.org/a.mp4");
+}
+
 TEST_F(Recorders, ActivatingWithoutAFileIsRefusedInWords)
 {
     serve();
     Caller caller;
     EXPECT_THAT(caller.call("org.freedesktop.Application", "Activate", {QVariantMap{}}).errorMessage().toStdString(),
                 HasSubstr("give it a recording"));
+    EXPECT_THAT(caller
+                    .call("org.freedesktop.Application", "ActivateAction",
+                          {QStringLiteral("new"), QVariantList(), QVariantMap{}})
+                    .errorMessage()
+                    .toStdString(),
+                HasSubstr("no actions"));
 }
 
 } // namespace

@@ -2,6 +2,7 @@
 #include "Recorders.h"
 
 #include <QDBusConnectionInterface>
+#include <QTimer>
 
 #include <gmock/gmock.h>
 
@@ -78,6 +79,16 @@ TEST_F(Recorders, AreToldWhichOptionIsWrong)
     EXPECT_THAT(m_editors, IsEmpty());
 }
 
+TEST_F(Recorders, AreRefusedInTheLogToo)
+{
+    serve();
+    Caller caller;
+    testing::internal::CaptureStderr();
+    edit(caller, {{QStringLiteral("tint"), QStringLiteral("\x1b[31m\n")}});
+    EXPECT_EQ(testing::internal::GetCapturedStderr(),
+              "clipsa: the option \"tint\" must be a colour like #3584e4, not \"?[31m?\"\n");
+}
+
 TEST_F(Recorders, AreToldWhenThereIsNoEditorToBeHad)
 {
     serve();
@@ -148,8 +159,27 @@ TEST_F(Recorders, AWrongSignatureIsNoCall)
     Caller caller;
     EXPECT_EQ(caller.call("org.clipsa.Recorder1", "Edit", {QStringLiteral("/path"), QVariantMap{}}).type(),
               QDBusMessage::ErrorMessage);
+    EXPECT_EQ(caller.call("org.freedesktop.Application", "Open", {QStringLiteral("/path")}).type(),
+              QDBusMessage::ErrorMessage);
     EXPECT_EQ(caller.call("org.clipsa.Recorder1", "Explode", {}).type(), QDBusMessage::ErrorMessage);
     EXPECT_THAT(m_editors, IsEmpty());
+}
+
+TEST_F(Recorders, CanAskWhatThereIsToCall)
+{
+    serve();
+    Caller caller;
+    const QString session = sessionOf(edit(caller));
+    const auto described = [&](const QString& path) {
+        return caller.call("org.freedesktop.DBus.Introspectable", "Introspect", {}, path)
+            .arguments()
+            .value(0)
+            .toString()
+            .toStdString();
+    };
+    EXPECT_THAT(described(kPath), HasSubstr("<interface name=\"org.clipsa.Recorder1\">"));
+    EXPECT_THAT(described(session), HasSubstr("<interface name=\"org.clipsa.RecorderSession1\">"));
+    EXPECT_THAT(described(kPath + QStringLiteral("/session/99")), Not(HasSubstr("RecorderSession1")));
 }
 
 TEST_F(Recorders, CloseTheirOwnSessionsOnly)
@@ -183,6 +213,31 @@ TEST_F(Recorders, WhoLeavesTakesTheirOwnEditorsAlong)
     EXPECT_FALSE(m_editors[1]->askedToGo);
 }
 
+TEST_F(Recorders, WhoLeavesAfterOneOfTheirSessionsTakesTheOthersAlong)
+{
+    serve();
+    Caller caller;
+    edit(caller);
+    edit(caller);
+    m_editors[0]->events.ended({});
+    ASSERT_TRUE(tests::pumpUntil([&] { return m_editors[0]->gone; }));
+    caller.leave();
+    caller.bus = QDBusConnection(QStringLiteral("none"));
+    EXPECT_TRUE(tests::pumpUntil([&] { return m_editors[1]->askedToGo; }));
+}
+
+TEST_F(Recorders, WhoHasLeftBeforeTheyAreServedLeavesNoEditorBehind)
+{
+    serve();
+    {
+        Caller caller;
+        const QDBusPendingCall nobodyWaits = caller.startEdit(movie());
+        caller.bus.interface()->isServiceRegistered(kService); // the bus has passed it on when it answers this
+    }
+    ASSERT_TRUE(tests::pumpUntil([&] { return !m_editors.empty(); }));
+    EXPECT_TRUE(tests::pumpUntil([&] { return m_editors[0]->askedToGo; }));
+}
+
 TEST_F(Recorders, SessionsEndWithTheirEditors)
 {
     serve();
@@ -196,22 +251,41 @@ TEST_F(Recorders, SessionsEndWithTheirEditors)
     EXPECT_EQ(caller.call("org.clipsa.RecorderSession1", "Close", {}, session).type(), QDBusMessage::ErrorMessage);
 }
 
-TEST_F(Recorders, TheServiceLeavesWhenItHasNothingToDo)
+/// Every timer that was started before and is shorter has its turn first.
+void letTimersPassOf(std::chrono::milliseconds length)
+{
+    bool passed = false;
+    QTimer::singleShot(length, Qt::PreciseTimer, [&] { passed = true; });
+    EXPECT_TRUE(tests::pumpUntil([&] { return passed; }));
+}
+
+TEST_F(Recorders, TheServiceLeavesOnceWhenItHasNothingToDo)
 {
     serve(std::chrono::milliseconds(1));
     EXPECT_TRUE(tests::pumpUntil([&] { return m_idle > 0; }));
     Caller caller;
     EXPECT_FALSE(caller.bus.interface()->isServiceRegistered(kService));
+    letTimersPassOf(std::chrono::milliseconds(4));
+    EXPECT_EQ(m_idle, 1);
 }
 
 TEST_F(Recorders, TheServiceStaysWhileThereIsASession)
 {
-    serve(std::chrono::milliseconds(300));
+    constexpr std::chrono::milliseconds kIdle(20);
+    serve(kIdle);
     Caller caller;
-    edit(caller);
-    ASSERT_EQ(m_editors.size(), 1U);
-    EXPECT_FALSE(tests::pumpUntil([&] { return m_idle > 0; }, std::chrono::milliseconds(600)));
-    m_editors[0]->events.ended("the editor ended early");
+    // Twice: the second comes when the first has ended, and the service thinks of leaving.
+    for (std::size_t i = 0; i < 2; ++i) {
+        const QDBusPendingCall asked = caller.startEdit(movie());
+        caller.bus.interface()->isServiceRegistered(kService); // the bus has passed it on when it answers this
+        QDBusPendingCallWatcher pending(asked);
+        EXPECT_TRUE(tests::pumpUntil([&] { return pending.isFinished(); }));
+        ASSERT_EQ(m_editors.size(), i + 1) << pending.reply().errorMessage().toStdString();
+        letTimersPassOf(2 * kIdle);
+        EXPECT_EQ(m_idle, 0);
+        EXPECT_TRUE(caller.bus.interface()->isServiceRegistered(kService));
+        m_editors[i]->events.ended("the editor ended early");
+    }
     EXPECT_TRUE(tests::pumpUntil([&] { return m_idle > 0; }));
 }
 
