@@ -125,6 +125,7 @@ def parse():
     parser.add_argument("--only", default="", metavar="EXPRESSION", help="sources whose path has this")
     parser.add_argument("--tests", default="", metavar="EXPRESSION", help="tests whose name has this")
     parser.add_argument("--suites", default="", metavar="EXPRESSION", help="suites whose folder has this")
+    parser.add_argument("--again", metavar="FILE", help="those that FILE names, as an earlier run printed them")
     parser.add_argument("--sample", type=int, metavar="N", help="so many of the mutants, by chance")
     parser.add_argument("--seed", type=int, default=1)
     parser.add_argument("--jobs", type=int, default=os.cpu_count())
@@ -142,6 +143,10 @@ def main():
     arguments = parse()
     top, begin = arguments.top, time.monotonic()
     found = findMutants(top, arguments.folders, arguments.only)
+    if arguments.again:
+        with open(arguments.again) as file:
+            named = {withoutLine(line) for line in file}
+        found = [each for each in found if withoutLine(describe(each, top)) in named]
     if arguments.sample and arguments.sample < len(found):
         found = random.Random(arguments.seed).sample(found, arguments.sample)
     found.sort(key=lambda each: (each.path, each.line))
@@ -189,6 +194,11 @@ def judge(found, count, runner, top, jobs, begin):
 
 def describe(mutant, top):
     return f"{os.path.relpath(mutant.path, top)}:{mutant.line}: {mutant.kind}: {mutant.text}"
+
+
+def withoutLine(description):
+    """Lines move between two runs."""
+    return re.sub(r":\d+:", ":", description, count=1).split("  (no test")[0].strip()
 
 
 if __name__ == "__main__":

@@ -2,9 +2,8 @@
 
 #include "linux/dbus/DisconnectWatch.h"
 #include "linux/dbus/Protocol.h"
+#include "linux/dbus/Reply.h"
 #include "linux/dbus/Wire.h"
-
-#include <QDBusPendingCallWatcher>
 
 #include <limits>
 #include <utility>
@@ -70,16 +69,14 @@ void ExtensionLink::load(std::uint32_t item, std::uint32_t attachment, std::stri
             message << item << attachment << toQt(type);
             const std::uint64_t load = ++m_lastLoad;
             m_loads.emplace(load, std::move(completion));
-            auto* watcher = new QDBusPendingCallWatcher(m_connection.asyncCall(message, kNoLimit), &m_worker);
-            QObject::connect(watcher, &QDBusPendingCallWatcher::finished, &m_worker,
-                             [this, load, type = std::move(type)](QDBusPendingCallWatcher* finished) {
-                                 finished->deleteLater();
-                                 auto found = m_loads.extract(load);
-                                 if (found.empty())
-                                     return;
-                                 const auto loaded = itemFromReply(finished->reply(), type);
-                                 found.mapped()(loaded ? loaded.value() : runtime::Value(), loaded.error());
-                             });
+            whenAnswered(m_connection.asyncCall(message, kNoLimit), m_worker,
+                         [this, load, type = std::move(type)](const QDBusMessage& reply) {
+                             auto found = m_loads.extract(load);
+                             if (found.empty())
+                                 return;
+                             const auto loaded = itemFromReply(reply, type);
+                             found.mapped()(loaded ? loaded.value() : runtime::Value(), loaded.error());
+                         });
         });
 }
 
@@ -99,15 +96,12 @@ bool ExtensionLink::send(const QDBusMessage& message, std::function<void(const b
         QString(), QLatin1String(kHostPath), QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"));
     const QDBusPendingCall answer = m_connection.asyncCall(ping, kPingLimitMilliseconds);
     QMetaObject::invokeMethod(&m_worker, [this, answer, failed = std::move(failed)] {
-        auto* watcher = new QDBusPendingCallWatcher(answer, &m_worker);
-        QObject::connect(watcher, &QDBusPendingCallWatcher::finished, &m_worker,
-                         [this, failed](QDBusPendingCallWatcher* finished) {
-                             finished->deleteLater();
-                             // Without a connection the ending is told instead.
-                             if (finished->isError() && m_connection.isConnected())
-                                 failed(errorFromReply(finished->reply()));
-                             messageArrived();
-                         });
+        whenAnswered(answer, m_worker, [this, failed](const QDBusMessage& reply) {
+            // Without a connection the ending is told instead.
+            if (reply.type() == QDBusMessage::ErrorMessage && m_connection.isConnected())
+                failed(errorFromReply(reply));
+            messageArrived();
+        });
     });
     return true;
 }

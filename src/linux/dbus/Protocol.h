@@ -16,7 +16,7 @@ inline constexpr const char* kRuntimeInterface = "org.clipsa.ExtensionRuntime1";
 
 /// The longest text that is taken from the other side, in bytes of UTF-8.
 inline constexpr std::size_t kMaximumTextSize = 1 << 20;
-/// More items, attachments or types than anybody has use for; whoever sends more is broken.
+/// More items than anybody has use for; whoever sends more is broken.
 inline constexpr std::size_t kMaximumCount = 1024;
 
 /// The domain of this layer's errors.

@@ -6,12 +6,11 @@
 #include "linux/dbus/EditOptions.h"
 #include "linux/dbus/Protocol.h"
 #include "linux/dbus/RecorderIntrospection.h"
+#include "linux/dbus/Reply.h"
 #include "linux/dbus/Wire.h"
 
 #include <QDBusConnection>
 #include <QDBusMessage>
-#include <QDBusPendingCallWatcher>
-#include <QDBusPendingReply>
 #include <QDBusServiceWatcher>
 #include <QDBusVirtualObject>
 #include <QTimer>
@@ -286,13 +285,11 @@ private:
         auto question = QDBusMessage::createMethodCall(
             QStringLiteral("org.freedesktop.DBus"), QStringLiteral("/org/freedesktop/DBus"),
             QStringLiteral("org.freedesktop.DBus"), QStringLiteral("NameHasOwner"));
-        auto* watcher = new QDBusPendingCallWatcher(m_connection.asyncCall(question << toQt(caller)), this);
-        connect(watcher, &QDBusPendingCallWatcher::finished, this, [this, caller](QDBusPendingCallWatcher* finished) {
-            finished->deleteLater();
-            const QDBusPendingReply<bool> there = *finished;
-            if (there.isValid() && !there.value())
-                callerLeft(toQt(caller));
-        });
+        whenAnswered(m_connection.asyncCall(question << toQt(caller)), *this,
+                     [this, caller](const QDBusMessage& reply) {
+                         if (reply.arguments() == QVariantList{false})
+                             callerLeft(toQt(caller));
+                     });
     }
 
     void callerLeft(const QString& name)

@@ -2,10 +2,11 @@
 
 #include "linux/dbus/Protocol.h"
 #include "platform/hosting/InputItem.h"
-#include "platform/views/Color.h"
 
 #include <QDBusMetaType>
 #include <QDBusVariant>
+
+#include <mutex>
 
 namespace dbus {
 
@@ -25,10 +26,10 @@ base::Result<runtime::Value> colorFrom(const QDBusArgument& argument)
 {
     if (argument.currentSignature() != QStringLiteral("(dddd)"))
         return malformed("the host sent neither text nor a colour");
-    const auto wire = qdbus_cast<WireColor>(argument);
-    if (!isShare(wire.red) || !isShare(wire.green) || !isShare(wire.blue) || !isShare(wire.alpha))
+    const platform::Color color = qdbus_cast<WireColor>(argument).color;
+    if (!isShare(color.red) || !isShare(color.green) || !isShare(color.blue) || !isShare(color.alpha))
         return malformed("the host sent a colour with a part outside 0 to 1");
-    return runtime::Value(platform::Color{wire.red, wire.green, wire.blue, wire.alpha});
+    return runtime::Value(color);
 }
 
 } // namespace
@@ -49,16 +50,18 @@ const QDBusArgument& operator>>(const QDBusArgument& in, WireItem& item)
     return in;
 }
 
-QDBusArgument& operator<<(QDBusArgument& out, const WireColor& color)
+QDBusArgument& operator<<(QDBusArgument& out, const WireColor& wire)
 {
+    const platform::Color& color = wire.color;
     out.beginStructure();
     out << color.red << color.green << color.blue << color.alpha;
     out.endStructure();
     return out;
 }
 
-const QDBusArgument& operator>>(const QDBusArgument& in, WireColor& color)
+const QDBusArgument& operator>>(const QDBusArgument& in, WireColor& wire)
 {
+    platform::Color& color = wire.color;
     in.beginStructure();
     in >> color.red >> color.green >> color.blue >> color.alpha;
     in.endStructure();
@@ -67,13 +70,13 @@ const QDBusArgument& operator>>(const QDBusArgument& in, WireColor& color)
 
 void registerWireTypes()
 {
-    [[maybe_unused]] static const bool registered = [] {
+    static std::once_flag once;
+    std::call_once(once, [] {
         qDBusRegisterMetaType<QList<QStringList>>();
         qDBusRegisterMetaType<WireItem>();
         qDBusRegisterMetaType<QList<WireItem>>();
         qDBusRegisterMetaType<WireColor>();
-        return true;
-    }();
+    });
 }
 
 QString toQt(std::string_view text)
@@ -110,7 +113,7 @@ base::Result<QVariant> toWire(const runtime::Value& value)
         return QVariant(toQt(*text));
     }
     if (const auto* color = std::any_cast<platform::Color>(&value))
-        return QVariant::fromValue(WireColor{color->red, color->green, color->blue, color->alpha});
+        return QVariant::fromValue(WireColor{*color});
     if (const auto* texts = std::any_cast<std::vector<std::string>>(&value))
         return QVariant(toQt(*texts));
     return base::Error::make(kErrorDomain, kBadArgument, "a value of this type cannot travel");

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "base/Result.h"
+#include "platform/views/Color.h"
 #include "runtime/Value.h"
 
 #include <QDBusArgument>
@@ -27,16 +28,13 @@ struct WireItem {
 
 /// Red, green, blue and opacity: `(dddd)`.
 struct WireColor {
-    double red = 0;
-    double green = 0;
-    double blue = 0;
-    double alpha = 1;
+    platform::Color color;
 };
 
 QDBusArgument& operator<<(QDBusArgument& out, const WireItem& item);
 const QDBusArgument& operator>>(const QDBusArgument& in, WireItem& item);
-QDBusArgument& operator<<(QDBusArgument& out, const WireColor& color);
-const QDBusArgument& operator>>(const QDBusArgument& in, WireColor& color);
+QDBusArgument& operator<<(QDBusArgument& out, const WireColor& wire);
+const QDBusArgument& operator>>(const QDBusArgument& in, WireColor& wire);
 
 /// Makes the types above known to QtDBus; before any of them travels.
 void registerWireTypes();

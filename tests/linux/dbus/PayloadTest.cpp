@@ -14,13 +14,13 @@ TEST_F(Payload, ArrivesWithTitlesTextsAndColors)
 {
     connect({text("one", "Grüße 🎬"),
              text("two", ""),
-             {"three", {dbus::HostAttachment::of(platform::Color{0.25, 0.5, 0.75, 1}, platform::kColorType)}}});
+             {"three", {dbus::HostAttachment::of(platform::Color{0.25, 0.5, 0.75, 0.125}, platform::kColorType)}}});
 
     ASSERT_EQ(m_items.size(), 3U);
     EXPECT_EQ(m_items[0].attributedTitle, "one");
     EXPECT_EQ(load(0).text(), "Grüße 🎬");
     EXPECT_EQ(load(1).text(), "");
-    EXPECT_EQ(runtime::fromValue<platform::Color>(load(2).value), (platform::Color{0.25, 0.5, 0.75, 1}));
+    EXPECT_EQ(runtime::fromValue<platform::Color>(load(2).value), (platform::Color{0.25, 0.5, 0.75, 0.125}));
 }
 
 TEST_F(Payload, ConformsToTheGenericTypeAndToTheListedOnes)
@@ -55,6 +55,22 @@ TEST_F(Payload, AnEmptyOneIsAnEmptyList)
     connect({});
 
     EXPECT_THAT(m_items, IsEmpty());
+}
+
+TEST_F(Payload, IsAsLongAsAnybodyHasUseForAndNoLonger)
+{
+    std::vector<dbus::HostItem> items(1024, text("t", "v"));
+    connect(items);
+    EXPECT_EQ(m_items.size(), 1024U);
+
+    m_extension.reset();
+    m_host.reset();
+    items.push_back(text("one", "too many"));
+    listen(std::move(items));
+    m_extension = newExtension(m_host->address());
+    const auto tooMany = tests::whilePumping([this] { return m_extension->inputItems(); });
+    ASSERT_FALSE(tooMany);
+    EXPECT_THAT(tooMany.error()->description(), HasSubstr("more items"));
 }
 
 TEST_F(Payload, EveryLoadCompletesOnceWithItsOwnItem)
