@@ -199,7 +199,12 @@ class Source:
             except ValueError:
                 isLarge = False  # hexadecimal
             broken = f"{text} * 2" if isLarge else f"{text} + 1"
-        declared = [each for each in ancestors if each.kind in (CursorKind.VAR_DECL, CursorKind.FIELD_DECL)]
+        declared = [each for each in ancestors
+                    if each.kind in (CursorKind.VAR_DECL, CursorKind.FIELD_DECL, CursorKind.PARM_DECL)]
+        # How long an answer is waited for at most: who noticed one more would have waited as long.
+        if declared and re.search(r"limit", declared[-1].spelling, re.I) and re.search(
+                r"chrono|seconds", self.textOf(*(self.rangeOf(declared[-1]) or place)), re.I):
+            return
         words = []
         if declared and self.rangeOf(declared[-1]):
             # A constant that may be another one is none to the compiler.
@@ -236,7 +241,8 @@ def callOf(cursor):
 
 
 # What only puts a value into a place: m_style = style; button->setAlpha(0.0); names.push_back(…) is none.
-PLAIN = re.compile(r"(?:[\w.>:\-]|\(\))*(?:\b_?(?:set|add|insert|sizeToFit)\w*\(.*\)| = [^=].*);", re.S)
+PLAIN = re.compile(r"(?:[\w.>:\-]|\(\))*(?:\b_?(?:set|add|insert|sizeToFit|connect)\w*\(.*\)| = [^=].*"
+                   r"|qDBusRegisterMetaType<.*>\(\));", re.S)
 
 
 def commute(first, second):
@@ -245,7 +251,8 @@ def commute(first, second):
         return False
     one, other = (placeOf(text) for text in (first, second))
     # What is added to one thing is added in an order; but of handlers, each has events of its own.
-    return one != other or "addTarget" in first or bool(re.search(r"\b_?set\w*$", one))
+    return one != other or bool(re.search(r"addTarget|\bconnect\(|RegisterMetaType", first + second)
+                                or re.search(r"\b_?set\w*$", one))
 
 
 def placeOf(text):
