@@ -10,7 +10,6 @@
 #include <QDBusMessage>
 
 #include <algorithm>
-#include <atomic>
 #include <cassert>
 #include <mutex>
 #include <utility>
@@ -173,8 +172,7 @@ ExtensionConnection::~ExtensionConnection()
 base::Result<void> ExtensionConnection::connect(const std::string& address)
 {
     assert(!m_shared->link);
-    static std::atomic<int> count = 0;
-    const QString name = QStringLiteral("clipsa-host-%1").arg(++count);
+    const QString name = newConnectionName();
     const auto connection = QDBusConnection::connectToPeer(toQt(address), name);
     if (!connection.isConnected()) {
         const QString why = connection.lastError().message();
@@ -219,12 +217,13 @@ base::Result<std::vector<platform::InputItem>> ExtensionConnection::inputItems()
     const auto items = itemsFromReply(reply);
     if (!items)
         return items.error();
-    for (std::uint32_t i = 0; const WireItem& wire : items.value()) {
+    for (const WireItem& wire : items.value()) {
         platform::InputItem item{fromQt(wire.title), {}};
-        for (std::uint32_t j = 0; const QStringList& types : wire.attachments)
-            item.attachments.push_back(std::make_shared<Provider>(m_shared, i, j++, fromQt(types)));
+        for (const QStringList& types : wire.attachments)
+            item.attachments.push_back(std::make_shared<Provider>(m_shared, static_cast<std::uint32_t>(m_items.size()),
+                                                                  static_cast<std::uint32_t>(item.attachments.size()),
+                                                                  fromQt(types)));
         m_items.push_back(std::move(item));
-        ++i;
     }
     m_fetched = true;
     return m_items;

@@ -32,24 +32,12 @@ const char* const kIntrospection = R"XML(
 )XML";
 
 const char* const kHostInterface = "org.clipsa.VKVideoEditorExtensionHostProtocol";
-const char* const kFinishMember = "ExtensionDidFinishWithActivityTypes";
 
 /// "unix:path=" with everything escaped that an address cannot hold as it is.
-std::string addressOf(const std::string& path)
+QString addressOf(const std::string& path)
 {
-    static constexpr char kHex[] = "0123456789abcdef";
-    std::string address = "unix:path=";
-    for (const char character : path) {
-        const auto byte = static_cast<unsigned char>(character);
-        if ((byte < 128 && std::isalnum(byte)) || std::string_view("-_/.").find(character) != std::string_view::npos) {
-            address += character;
-        } else {
-            address += '%';
-            address += kHex[byte >> 4];
-            address += kHex[byte & 15];
-        }
-    }
-    return address;
+    const auto bytes = QByteArray::fromStdString(path);
+    return QStringLiteral("unix:path=") + QString::fromLatin1(bytes.toPercentEncoding("/", "~"));
 }
 
 } // namespace
@@ -104,25 +92,26 @@ struct HostConnection::State final : QDBusVirtualObject {
 
     bool handleMessage(const QDBusMessage& message, const QDBusConnection& connection) override
     {
-        if (!peer->value() || message.path() != QLatin1String(kHostPath))
+        if (!peer->value())
             return false;
-        if (message.interface() == QLatin1String(kRuntimeInterface)) {
-            if (message.member() == QLatin1String("InputItems") && message.signature().isEmpty())
-                return connection.send(message.createReply(QVariant::fromValue(wireItems())));
-            if (message.member() == QLatin1String("LoadItem") && message.signature() == QLatin1String("uus")) {
-                load(message, connection);
-                return true;
-            }
-        }
-        if (message.interface() == QLatin1String(kHostInterface) && message.member() == QLatin1String(kFinishMember)
-            && message.signature() == QLatin1String("as")) {
-            if (message.isReplyRequired())
-                connection.send(message.createReply());
-            if (const auto finished = std::exchange(handlers.finished, {}))
-                finished(fromQt(message.arguments().constFirst().toStringList()));
-            return true;
-        }
-        return false;
+        const QString call = message.interface() + u'.' + message.member() + u'(' + message.signature() + u')';
+        if (call == QLatin1String(kRuntimeInterface) + QStringLiteral(".InputItems()"))
+            connection.send(message.createReply(QVariant::fromValue(wireItems())));
+        else if (call == QLatin1String(kRuntimeInterface) + QStringLiteral(".LoadItem(uus)"))
+            load(message, connection);
+        else if (call == QLatin1String(kHostInterface) + QStringLiteral(".ExtensionDidFinishWithActivityTypes(as)"))
+            finish(message, connection);
+        else
+            return false;
+        return true;
+    }
+
+    void finish(const QDBusMessage& message, const QDBusConnection& connection)
+    {
+        if (message.isReplyRequired())
+            connection.send(message.createReply());
+        if (const auto finished = std::exchange(handlers.finished, {}))
+            finished(fromQt(message.arguments().constFirst().toStringList()));
     }
 
     QList<WireItem> wireItems() const
@@ -182,7 +171,7 @@ base::Result<std::unique_ptr<HostConnection>> HostConnection::listen(const std::
     registerWireTypes();
     if (path.size() > kMaximumPathSize)
         return base::Error::make(kErrorDomain, kTooLarge, "the path is too long for a socket: " + path);
-    auto state = std::make_unique<State>(toQt(addressOf(path)), std::move(items), std::move(handlers));
+    auto state = std::make_unique<State>(addressOf(path), std::move(items), std::move(handlers));
     if (!state->server.isConnected())
         return base::Error::make(kErrorDomain, kNotConnected,
                                  "cannot listen at " + path + ": " + fromQt(state->server.lastError().message()));

@@ -80,10 +80,14 @@ public:
     bool handleMessage(const QDBusMessage& message, const QDBusConnection&) override
     {
         const QString call = message.interface() + u'.' + message.member();
-        if (message.path() != QLatin1String(kPath))
-            return call == QLatin1String(kSessionInterface) + QStringLiteral(".Close") && closeSession(message);
         const QString signature = message.signature();
-        if (call == QLatin1String(kRecorderInterface) + QStringLiteral(".Edit") && signature == QLatin1String("ha{sv}"))
+        const Session* session = sessionAt(message.path());
+        if (session && call == QLatin1String(kSessionInterface) + QStringLiteral(".Close"))
+            closeSession(message, *session);
+        else if (message.path() != QLatin1String(kPath))
+            return false;
+        else if (call == QLatin1String(kRecorderInterface) + QStringLiteral(".Edit")
+                 && signature == QLatin1String("ha{sv}"))
             edit(message);
         else if (call == QLatin1String(kApplicationInterface) + QStringLiteral(".Open")
                  && signature == QLatin1String("asa{sv}"))
@@ -113,12 +117,12 @@ private:
         return QLatin1String(kPath) + QStringLiteral("/session/%1").arg(number);
     }
 
-    std::optional<std::uint64_t> sessionAt(const QString& path) const
+    const Session* sessionAt(const QString& path) const
     {
         for (const auto& [number, session] : m_sessions)
             if (pathOf(number) == path)
-                return number;
-        return std::nullopt;
+                return &session;
+        return nullptr;
     }
 
     void answer(const QDBusMessage& message, const QVariantList& values = {})
@@ -172,8 +176,8 @@ private:
             const auto url = base::Url::fromString(fromQt(uri));
             EditRequest request;
             request.moviePath = url && url->isFile() ? url->path() : fromQt(uri);
+            request.editorArguments = {"--explain"}; // file managers do not wait for how it ends
             takePlatformData(data, request);
-            request.editorArguments.emplace_back("--explain"); // file managers do not wait for how it ends
             launch(std::move(request), fromQt(message.service()), false,
                    [=, this](const base::Result<std::uint64_t>& session) {
                        if (!session)
@@ -207,36 +211,46 @@ private:
             return;
         }
         const std::uint64_t number = ++m_lastSession;
-        EditorEvents events;
-        events.started = [this, number](const base::Result<void>& started) {
-            const Answer tellCaller = std::exchange(m_sessions.at(number).answer, {});
-            if (started) {
-                tellCaller(number);
-                return;
-            }
-            tellCaller(started.error());
-            forgetLater(number);
-        };
-        events.noted = [this, number](const MovieNote& note) {
-            if (note.kind == MovieNote::Kind::Saved)
-                tell(number, QStringLiteral("Saved"), {toQt(note.path)});
-            else if (note.kind == MovieNote::Kind::Unsaved)
-                tell(number, QStringLiteral("SaveFailed"), {toQt(note.path), toQt(note.why)});
-        };
-        events.completed = [this, number](const std::vector<std::string>& activityTypes) {
-            tell(number, QStringLiteral("Completed"), {toQt(activityTypes)});
-        };
-        events.ended = [this, number](const std::string& failure) {
-            if (!failure.empty())
-                tell(number, QStringLiteral("Failed"), {toQt(failure)});
-            tell(number, QStringLiteral("Ended"), {});
-            forgetLater(number);
-        };
+        EditorEvents events{
+            .started = [this, number](const base::Result<void>& started) { tellStarted(number, started); },
+            .noted = [this, number](const MovieNote& note) { tellNoted(number, note); },
+            .completed =
+                [this, number](const std::vector<std::string>& activityTypes) {
+                    tell(number, QStringLiteral("Completed"), {toQt(activityTypes)});
+                },
+            .ended = [this, number](const std::string& failure) { tellEnded(number, failure); }};
         m_idle.stop();
         if (isCallers)
             watch(caller);
         auto editor = m_launcher(std::move(request), std::move(events));
         m_sessions.emplace(number, Session{std::move(caller), isCallers, std::move(whenStarted), std::move(editor)});
+    }
+
+    void tellStarted(std::uint64_t number, const base::Result<void>& started)
+    {
+        const Answer tellCaller = std::exchange(m_sessions.at(number).answer, {});
+        if (started) {
+            tellCaller(number);
+            return;
+        }
+        tellCaller(started.error());
+        forgetLater(number);
+    }
+
+    void tellNoted(std::uint64_t number, const MovieNote& note)
+    {
+        if (note.kind == MovieNote::Kind::Saved)
+            tell(number, QStringLiteral("Saved"), {toQt(note.path)});
+        else if (note.kind == MovieNote::Kind::Unsaved)
+            tell(number, QStringLiteral("SaveFailed"), {toQt(note.path), toQt(note.why)});
+    }
+
+    void tellEnded(std::uint64_t number, const std::string& failure)
+    {
+        if (!failure.empty())
+            tell(number, QStringLiteral("Failed"), {toQt(failure)});
+        tell(number, QStringLiteral("Ended"), {});
+        forgetLater(number);
     }
 
     /// The editor that calls us is destroyed with its session.
@@ -299,19 +313,14 @@ private:
                 session.editor->close();
     }
 
-    bool closeSession(const QDBusMessage& message)
+    void closeSession(const QDBusMessage& message, const Session& session)
     {
-        const auto number = sessionAt(message.path());
-        if (!number)
-            return false;
-        const Session& session = m_sessions.at(*number);
         if (!session.isCallers || session.caller != fromQt(message.service())) {
             refuse(message, "only the recorder that asked for a session can close it");
-            return true;
+            return;
         }
         session.editor->close();
         answer(message);
-        return true;
     }
 
     /// Calls that reached us while we had the name are answered before we go; and what we sent has left when the bus
@@ -351,11 +360,8 @@ RecorderService::~RecorderService()
 base::Result<std::unique_ptr<RecorderService>> RecorderService::start(Launcher launcher, std::chrono::milliseconds idle,
                                                                       std::function<void()> whenIdle)
 {
-    registerWireTypes();
     // Of its own, so that the name goes when the service goes.
-    static int count = 0;
-    const auto connection =
-        QDBusConnection::connectToBus(QDBusConnection::SessionBus, QStringLiteral("clipsa-service-%1").arg(++count));
+    const auto connection = QDBusConnection::connectToBus(QDBusConnection::SessionBus, newConnectionName());
     if (!connection.isConnected())
         return base::Error::make(
             kErrorDomain, kNotConnected,

@@ -5,6 +5,7 @@
 
 #include <QDBusMetaType>
 #include <QDBusVariant>
+#include <QUuid>
 
 #include <mutex>
 
@@ -72,11 +73,15 @@ void registerWireTypes()
 {
     static std::once_flag once;
     std::call_once(once, [] {
-        qDBusRegisterMetaType<QList<QStringList>>();
         qDBusRegisterMetaType<WireItem>();
         qDBusRegisterMetaType<QList<WireItem>>();
         qDBusRegisterMetaType<WireColor>();
     });
+}
+
+QString newConnectionName()
+{
+    return QStringLiteral("clipsa-") + QUuid::createUuid().toString(QUuid::WithoutBraces);
 }
 
 QString toQt(std::string_view text)

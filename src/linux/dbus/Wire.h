@@ -39,6 +39,9 @@ const QDBusArgument& operator>>(const QDBusArgument& in, WireColor& wire);
 /// Makes the types above known to QtDBus; before any of them travels.
 void registerWireTypes();
 
+/// For a connection of one's own; QtDBus tells them apart by their names.
+QString newConnectionName();
+
 QString toQt(std::string_view text);
 std::string fromQt(const QString& text);
 QStringList toQt(const std::vector<std::string>& texts);

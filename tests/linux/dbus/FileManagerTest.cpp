@@ -1,6 +1,9 @@
 // What file managers ask of the service: to open files, without an answer about how that ends.
 #include "Recorders.h"
 
+#include <QDBusConnectionInterface>
+#include <QTimer>
+
 #include <gmock/gmock.h>
 
 using testing::ElementsAre;
@@ -27,6 +30,26 @@ TEST_F(Recorders, AFileManagerOpensSeveralFiles)
     Caller next;
     edit(next); // behind the news of the one who left
     EXPECT_FALSE(m_editors[0]->askedToGo) << "nobody in particular asked for this editor";
+}
+
+TEST_F(Recorders, AFileManagerIsToldNothingOfItsFiles)
+{
+    serve();
+    Caller caller;
+    QTimer heard;
+    caller.bus.connect(kService, QString(), QStringLiteral("org.clipsa.RecorderSession1"), QStringLiteral("Ended"),
+                       &heard, SLOT(start()));
+    const auto isHeard = [&] {
+        caller.bus.interface()->isServiceRegistered(kService); // the bus answers behind the signal
+        QCoreApplication::processEvents();
+        return heard.isActive();
+    };
+    caller.call("org.freedesktop.Application", "Open", {QStringList{QStringLiteral("file:///a")}, QVariantMap{}});
+    m_editors.at(0)->events.ended({});
+    EXPECT_FALSE(isHeard());
+    edit(caller);
+    m_editors.at(1)->events.ended({});
+    EXPECT_TRUE(isHeard());
 }
 
 TEST_F(Recorders, AFileManagerIsAnsweredOnceWhenAllOfItsFilesHaveBeenLookedAt)

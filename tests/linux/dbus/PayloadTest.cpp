@@ -1,5 +1,8 @@
 #include "Connected.h"
 
+#include <QThread>
+
+#include <future>
 #include <thread>
 
 using testing::ElementsAre;
@@ -21,6 +24,16 @@ TEST_F(Payload, ArrivesWithTitlesTextsAndColors)
     EXPECT_EQ(load(0).text(), "Grüße 🎬");
     EXPECT_EQ(load(1).text(), "");
     EXPECT_EQ(runtime::fromValue<platform::Color>(load(2).value), (platform::Color{0.25, 0.5, 0.75, 0.125}));
+}
+
+TEST_F(Payload, IsLoadedOnAThreadThatADebuggerShowsByName)
+{
+    connect({text("t", "v")});
+    std::promise<QString> name;
+    m_items[0].attachments[0]->loadItemForTypeIdentifier(
+        platform::kGenericDataType,
+        [&](const runtime::Value&, const base::ErrorRef&) { name.set_value(QThread::currentThread()->objectName()); });
+    EXPECT_EQ(tests::whilePumping([&] { return name.get_future().get(); }).toStdString(), "host");
 }
 
 TEST_F(Payload, ConformsToTheGenericTypeAndToTheListedOnes)
