@@ -13,10 +13,10 @@ namespace {
 
 constexpr std::chrono::seconds kLongCopy{1};
 
-CopyProgress progressFor(const DeliveryEvents& events, DetachedWork::Client& client)
+CopyProgress progressFor(const DeliveryEvents& events, DetachedWork::Client& client, const base::Clock& clock)
 {
-    return [&, start = std::chrono::steady_clock::now(), told = false](std::uint64_t, std::uint64_t total) mutable {
-        if (!told && std::chrono::steady_clock::now() - start > kLongCopy) {
+    return [&, start = clock.now(), told = false](std::uint64_t, std::uint64_t total) mutable {
+        if (!told && clock.now() - start > kLongCopy) {
             told = true;
             client.post([copying = events.copying, total] { copying(total); });
         }
@@ -47,9 +47,10 @@ base::Result<runtime::Value> deliverMovie(const FileDelivery& delivery, const Co
 
 } // namespace
 
-void deliverFiles(const FileDelivery& delivery, const DeliveryEvents& events, DetachedWork::Client& client)
+void deliverFiles(const FileDelivery& delivery, const DeliveryEvents& events, DetachedWork::Client& client,
+                  const base::Clock& clock)
 {
-    const CopyProgress progress = progressFor(events, client); // one for both: to the user it is one wait
+    const CopyProgress progress = progressFor(events, client, clock); // one for both: to the user it is one wait
     // The attachment first: the movie is the last that the editor waits for.
     if (delivery.attachmentArrived)
         client.post([arrived = delivery.attachmentArrived, path = deliverAttachment(delivery, progress)] {

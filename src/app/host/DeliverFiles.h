@@ -5,6 +5,7 @@
 #include "app/host/DetachedWork.h"
 #include "app/host/HandOver.h"
 #include "app/host/Payload.h"
+#include "base/Clock.h"
 #include "base/Result.h"
 #include "linux/posix/FileDescriptor.h"
 
@@ -33,6 +34,7 @@ struct DeliveryEvents {
 };
 
 /// Keeps the promises and calls the events on the client's thread. Stops when the client does not wait any more.
-void deliverFiles(const FileDelivery& delivery, const DeliveryEvents& events, DetachedWork::Client& client);
+void deliverFiles(const FileDelivery& delivery, const DeliveryEvents& events, DetachedWork::Client& client,
+                  const base::Clock& clock);
 
 } // namespace host

@@ -23,7 +23,6 @@ DetachedWork::DetachedWork(std::function<void(Client& client)> work) : m_client(
 DetachedWork::~DetachedWork()
 {
     m_affinity.assertHere();
-    m_affinity.assertHere();
     cancel();
     std::unique_ptr<QObject> receiver;
     {

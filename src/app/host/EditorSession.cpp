@@ -130,7 +130,7 @@ void EditorSession::State::handFilesOver()
                                     close();
                                 }};
     files.emplace([this, delivery, events, root = place.directoriesRoot](DetachedWork::Client& client) {
-        deliverFiles(*delivery, events, client);
+        deliverFiles(*delivery, events, client, base::SystemClock());
         sweepEditorDirectories(root);
         client.post([this] {
             filesAreDone = true;

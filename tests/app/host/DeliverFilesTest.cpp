@@ -11,10 +11,26 @@
 #include <fcntl.h>
 #include <future>
 #include <optional>
+#include <thread>
+#include <vector>
 
+using testing::ElementsAre;
 using testing::HasSubstr;
+using testing::IsEmpty;
 
 namespace {
+
+/// Time that goes on each time that somebody looks.
+class PassingClock final : public base::Clock {
+public:
+    explicit PassingClock(base::Instant step) : m_step(step) {}
+    base::Instant now() const override { return m_now += m_step; }
+    base::Date date() const override { return {}; }
+
+private:
+    base::Instant m_step;
+    mutable base::Instant m_now{0};
+};
 
 class Delivering : public ::testing::Test {
 protected:
@@ -22,22 +38,36 @@ protected:
     void deliver(const std::string& directory, const std::function<void(host::DetachedWork& work)>& before = {})
     {
         const auto movie = m_directory.write("movie.mp4", "moving pictures");
+        std::filesystem::resize_file(movie, m_size);
         const auto delivery = std::make_shared<host::FileDelivery>();
         delivery->movie = posix::FileDescriptor(::open(movie.c_str(), O_RDONLY | O_CLOEXEC));
         delivery->movieName = "movie.mp4";
         delivery->movieDirectory = directory;
         delivery->movieArrived = std::make_shared<host::Promise>();
         delivery->movieArrived->whenKept([this](const base::Result<runtime::Value>& value) { m_arrived = value; });
-        const host::DeliveryEvents events{[](std::uint64_t) {},
+        if (m_withAttachment) {
+            const auto attachment = m_directory.write("notes.txt", "notes");
+            delivery->attachment = posix::FileDescriptor(::open(attachment.c_str(), O_RDONLY | O_CLOEXEC));
+            delivery->attachmentName = "notes.txt";
+            delivery->attachmentDirectory = m_target.path() / "attachment";
+            delivery->attachmentArrived = std::make_shared<host::Promise>();
+            delivery->attachmentArrived->whenKept([this](const base::Result<runtime::Value>& value) {
+                EXPECT_FALSE(m_arrived) << "the movie is the last that the editor waits for";
+                m_attachmentArrived = value;
+                m_attachmentThread = std::this_thread::get_id();
+            });
+        }
+        const host::DeliveryEvents events{[this](std::uint64_t total) { m_copying.push_back(total); },
                                           [this](const base::ErrorRef& error) { m_failure = error; }};
         bool ended = false;
         std::promise<void> begin;
-        host::DetachedWork work([=, &ended, begun = begin.get_future().share()](host::DetachedWork::Client& client) {
-            tests::refuseSystemCalls({{SYS_linkat, EXDEV}, tests::noReflinks()});
-            begun.wait();
-            host::deliverFiles(*delivery, events, client);
-            client.post([&ended] { ended = true; });
-        });
+        host::DetachedWork work(
+            [=, &ended, step = m_step, begun = begin.get_future().share()](host::DetachedWork::Client& client) {
+                tests::refuseSystemCalls({{SYS_linkat, EXDEV}, tests::noReflinks()});
+                begun.wait();
+                host::deliverFiles(*delivery, events, client, PassingClock(step));
+                client.post([&ended] { ended = true; });
+            });
         if (before)
             before(work);
         begin.set_value();
@@ -48,6 +78,13 @@ protected:
     tests::PrivateDirectory m_target;
     std::optional<base::Result<runtime::Value>> m_arrived;
     base::ErrorRef m_failure;
+    std::vector<std::uint64_t> m_copying;
+    std::optional<base::Result<runtime::Value>> m_attachmentArrived;
+    std::thread::id m_attachmentThread;
+
+    std::uintmax_t m_size = 15;
+    bool m_withAttachment = false;
+    base::Instant m_step{0}; ///< of the clock
 };
 
 TEST_F(Delivering, TellsWhereTheEditorFindsTheMovie)
@@ -57,6 +94,32 @@ TEST_F(Delivering, TellsWhereTheEditorFindsTheMovie)
     EXPECT_EQ(runtime::fromValue<std::string>(m_arrived->value()), "/private/var/mobile/Library/Velkor/movie.mp4");
     EXPECT_EQ(tests::PrivateDirectory::read(m_target.path() / "movie.mp4"), "moving pictures");
     EXPECT_FALSE(m_failure);
+}
+
+TEST_F(Delivering, TellsOnceOfACopyThatTakesLongerThanASecond)
+{
+    m_size = 80 << 20; // some steps of copying
+    m_step = std::chrono::milliseconds(500);
+    deliver(m_target.path());
+    EXPECT_THAT(m_copying, ElementsAre(m_size));
+    m_copying.clear();
+    m_step = std::chrono::milliseconds(200); // to the second, but not over it
+    std::filesystem::remove(m_target.path() / "movie.mp4");
+    deliver(m_target.path());
+    EXPECT_THAT(m_copying, IsEmpty());
+    EXPECT_EQ(std::filesystem::file_size(m_target.path() / "movie.mp4"), m_size);
+}
+
+TEST_F(Delivering, TellsOfAnAttachmentOnItsClientsThreadToo)
+{
+    m_withAttachment = true;
+    deliver(m_target.path());
+    ASSERT_TRUE(m_attachmentArrived);
+    const auto path = runtime::fromValue<std::string>(m_attachmentArrived->value());
+    EXPECT_EQ(path, m_target.path() / "attachment/notes.txt");
+    EXPECT_EQ(tests::PrivateDirectory::read(path), "notes");
+    EXPECT_EQ(m_attachmentThread, std::this_thread::get_id());
+    EXPECT_TRUE(m_arrived);
 }
 
 TEST_F(Delivering, TellsWhyThereIsNoMovie)
