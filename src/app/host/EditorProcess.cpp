@@ -65,10 +65,10 @@ int spawn(const ProcessStart& start, pid_t& pid)
     ::posix_spawn_file_actions_init(&files);
     ::posix_spawn_file_actions_addopen(&files, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
     ::posix_spawn_file_actions_adddup2(&files, STDERR_FILENO, STDOUT_FILENO);
-    if (start.lock >= 0)
-        ::posix_spawn_file_actions_adddup2(&files, start.lock, dbus::kEditorLockDescriptor);
-    if (start.report >= 0)
-        ::posix_spawn_file_actions_adddup2(&files, start.report, dbus::kEditorReportDescriptor);
+    if (start.lock)
+        ::posix_spawn_file_actions_adddup2(&files, *start.lock, dbus::kEditorLockDescriptor);
+    if (start.report)
+        ::posix_spawn_file_actions_adddup2(&files, *start.report, dbus::kEditorReportDescriptor);
 
     posix_spawnattr_t attributes;
     ::posix_spawnattr_init(&attributes);
@@ -112,7 +112,7 @@ struct EditorProcess::State {
     void reap()
     {
         int status = 0;
-        while (::waitpid(pid, &status, 0) < 0 && errno == EINTR) {}
+        static_cast<void>(TEMP_FAILURE_RETRY(::waitpid(pid, &status, 0)));
         running = false;
         ProcessEnd end;
         if (WIFSIGNALED(status))

@@ -7,6 +7,7 @@
 
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -27,8 +28,8 @@ struct ProcessStart {
     std::vector<std::string> arguments;
     std::vector<std::pair<std::string, std::string>> environment; ///< added to ours
     // Nothing but these is inherited, and the standard streams.
-    int lock = -1;   ///< as dbus::kEditorLockDescriptor
-    int report = -1; ///< as dbus::kEditorReportDescriptor; its own number is higher
+    std::optional<int> lock = {};   ///< as dbus::kEditorLockDescriptor
+    std::optional<int> report = {}; ///< as dbus::kEditorReportDescriptor; its own number is higher
 };
 
 class EditorProcess {

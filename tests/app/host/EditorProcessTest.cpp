@@ -5,6 +5,7 @@
 #include "linux/posix/FileDescriptor.h"
 #include "support/Child.h"
 #include "support/EventLoop.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <gmock/gmock.h>
 
@@ -14,6 +15,8 @@
 #include <fstream>
 #include <optional>
 #include <sys/stat.h>
+#include <sys/wait.h>
+#include <thread>
 #include <unistd.h>
 
 namespace {
@@ -199,6 +202,22 @@ TEST_F(AnEditorsProcess, ThatCannotBeStartedSaysWhy)
     ASSERT_FALSE(started);
     EXPECT_EQ(started.error()->code(), ENOENT);
     EXPECT_THAT(started.error()->description(), StartsWith("cannot start " + m_start.program));
+    EXPECT_EQ(m_ends, 0);
+}
+
+TEST_F(AnEditorsProcess, ThatCannotBeWatchedIsEndedAgain)
+{
+    const auto hasChildren = [] { return ::waitpid(-1, nullptr, WNOHANG | WNOWAIT) >= 0; };
+    ASSERT_FALSE(hasChildren());
+    m_start.program = "/bin/sleep";
+    m_start.arguments = {"1000"};
+    std::thread([&] {
+        tests::refuseSystemCalls({{SYS_pidfd_open, EMFILE}});
+        const auto started = host::EditorProcess::start(m_start, [this](host::ProcessEnd) { ++m_ends; });
+        EXPECT_FALSE(started);
+        EXPECT_THAT(started.error()->description(), StartsWith("cannot watch /bin/sleep"));
+    }).join();
+    EXPECT_FALSE(hasChildren());
     EXPECT_EQ(m_ends, 0);
 }
 
