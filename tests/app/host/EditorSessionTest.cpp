@@ -1,0 +1,124 @@
+// One editor's session as its host sees it: what is told, in which order, on which thread.
+#include "app/host/EditorSession.h"
+
+#include "support/EventLoop.h"
+#include "support/Paths.h"
+#include "support/PrivateDirectory.h"
+#include "support/RefusedSystemCalls.h"
+
+#include <QThread>
+
+#include <gmock/gmock.h>
+
+#include <csignal>
+#include <fcntl.h>
+#include <optional>
+#include <thread>
+
+using testing::ElementsAre;
+
+namespace {
+
+class AnEditorsSession : public ::testing::Test {
+protected:
+    /// An editor that does what `script` says; a movie of so many bytes is on its way to it.
+    void start(const std::string& script, std::uintmax_t movieSize = 15)
+    {
+        const auto movie = m_directory.write("race.mp4", "moving pictures");
+        std::filesystem::resize_file(movie, movieSize);
+        dbus::EditRequest request;
+        request.movie = posix::FileDescriptor(::open(movie.c_str(), O_RDONLY | O_CLOEXEC));
+        request.movieName = "race.mp4";
+        request.environment = {{"FAKE_EDITOR", script}};
+        auto started = host::EditorSession::start(
+            std::move(request), m_place,
+            {.noted = [this](const dbus::MovieNote& note) { m_told.push_back("noted " + note.path); },
+             .finished =
+                 [this](const std::vector<std::string>& types) {
+                     m_told.push_back("finished with " + std::to_string(types.size()));
+                 },
+             .copying = [this](std::uint64_t) { m_told.emplace_back("copying"); },
+             .ended =
+                 [this](const host::EditorOutcome& outcome) {
+                     m_outcome = outcome;
+                     m_endedOn = std::this_thread::get_id();
+                     m_told.emplace_back("ended");
+                     m_session.reset(); // as its owners do
+                 }});
+        ASSERT_TRUE(started) << started.error()->description();
+        m_session = std::move(started).value();
+    }
+    void waitForEnd()
+    {
+        ASSERT_TRUE(tests::pumpUntil([this] { return m_outcome.has_value(); }));
+        EXPECT_EQ(m_endedOn, std::this_thread::get_id());
+    }
+
+    tests::PrivateDirectory m_directory;
+    host::EditorSession::Place m_place{.editorProgram = tests::program("fake-editor"),
+                                       .directoriesRoot = m_directory.path() / "clipsa",
+                                       .patience = std::chrono::hours(1),
+                                       .patienceWithFiles = std::chrono::hours(1)};
+    std::vector<std::string> m_told;
+    std::optional<host::EditorOutcome> m_outcome;
+    std::thread::id m_endedOn;
+    std::unique_ptr<host::EditorSession> m_session;
+};
+
+TEST_F(AnEditorsSession, TellsInTheOrderInWhichItHappened)
+{
+    start("saved=/one finish=a,b wait saved=/two");
+    waitForEnd();
+    EXPECT_THAT(m_told, ElementsAre("noted /one", "finished with 2", "noted /two", "ended"));
+    EXPECT_THAT(m_outcome->activityTypes, testing::Optional(ElementsAre("a", "b")));
+    EXPECT_EQ(m_outcome->end.exitStatus, 0);
+    EXPECT_FALSE(m_outcome->closed);
+}
+
+TEST_F(AnEditorsSession, LeavesNothingBehindInItsPlace)
+{
+    start("finish=a wait");
+    waitForEnd();
+    EXPECT_TRUE(std::filesystem::is_empty(m_place.directoriesRoot));
+}
+
+TEST_F(AnEditorsSession, DoesNotWaitForACopyThatNobodyNeedsAnyMore)
+{
+    m_place.editorProgram = "/bin/false";
+    // There is no way but to copy, for this thread.
+    const std::unique_ptr<QThread> thread(QThread::create([this] {
+        tests::refuseSystemCalls({{SYS_linkat, EXDEV}, tests::noReflinks()});
+        start("", std::uintmax_t{4} << 30);
+        waitForEnd();
+    }));
+    thread->start();
+    thread->wait();
+    EXPECT_FALSE(m_outcome->error) << "that the copy was stopped is not why it ended";
+    EXPECT_EQ(m_outcome->words(), "the editor ended early, with exit status 1");
+}
+
+TEST_F(AnEditorsSession, IsClosedByItsOwner)
+{
+    start("wait");
+    m_session->close();
+    waitForEnd();
+    EXPECT_TRUE(m_outcome->closed);
+    EXPECT_FALSE(m_outcome->activityTypes);
+    EXPECT_THAT(m_told, ElementsAre("ended"));
+}
+
+TEST_F(AnEditorsSession, OfAnEditorThatEndedWellWithoutAWordWasClosed)
+{
+    EXPECT_EQ(host::EditorOutcome().words(), "the editor was closed before it showed the recording");
+}
+
+TEST_F(AnEditorsSession, EndsTheEditorThatStaysByForce)
+{
+    m_place.patience = std::chrono::milliseconds(1);
+    start("hang");
+    m_session->close();
+    waitForEnd();
+    EXPECT_TRUE(m_outcome->end.signal == SIGTERM || m_outcome->end.signal == SIGKILL) << m_outcome->end.words();
+}
+
+} // namespace
