@@ -4,6 +4,7 @@
 #include "app/host/MediaTool.h"
 #include "app/host/ProgressBar.h"
 #include "app/host/WholeFile.h"
+#include "base/Affinity.h"
 #include "linux/dbus/EditRequest.h"
 #include "linux/ffmpeg/Png.h"
 
@@ -44,6 +45,7 @@ public:
 
     void take(std::size_t index, const platform::ImageRef& image, const base::ErrorRef& error)
     {
+        m_affinity.assertHere();
         ++m_came;
         if (const auto written = image ? write(index, *image) : base::Result<void>(error); !written) {
             ++m_failed;
@@ -77,6 +79,7 @@ private:
     std::size_t m_came = 0;
     std::size_t m_failed = 0;
     base::ErrorRef m_firstError;
+    base::Affinity m_affinity;
 };
 
 base::ErrorRef cannotWrite(const fs::path& folder, const std::error_code& error)

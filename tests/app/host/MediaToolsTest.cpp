@@ -2,6 +2,7 @@
 #include "app/host/ClipsaProgram.h"
 #include "app/host/JsonObject.h"
 #include "app/host/MakeThumbnails.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <QJsonArray>
 #include <gmock/gmock.h>
@@ -13,12 +14,15 @@
 #include <poll.h>
 #include <pty.h>
 #include <sys/inotify.h>
+#include <thread>
 
 namespace {
 
+using testing::AllOf;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::Not;
 using testing::StartsWith;
 
 using tests::movie;
@@ -79,6 +83,7 @@ TEST(Thumbnails, AreNamedByPlaceAndTime)
     EXPECT_EQ(host::thumbnailName(0, 1, base::MediaTime::make(0, 1000)), "0_00-00-00.000.png");
     EXPECT_EQ(host::thumbnailName(9, 11, base::MediaTime::make(3'599'999, 1000)), "09_00-59-59.999.png");
     EXPECT_EQ(host::thumbnailName(9, 10, base::MediaTime::make(36'061'001, 1000)), "9_10-01-01.001.png");
+    EXPECT_EQ(host::thumbnailName(9, 10, base::MediaTime::make(7'200'000, 1000)), "9_02-00-00.000.png");
 }
 
 class MediaTools : public tests::ClipsaProgram {
@@ -113,6 +118,37 @@ TEST_F(MediaTools, DoNotReplaceThumbnailsUnlessTold)
     EXPECT_EQ(run({"thumbnails", movie("clock.mp4"), "-n", "2", "-o", folder, "--force"}), 0) << errors;
     EXPECT_THAT(files(), ElementsAre("0_00-00-00.000.png", "1_00-00-02.000.png"));
     EXPECT_THAT(tests::PrivateDirectory::read(folder / "1_00-00-02.000.png"), HasSubstr("PNG"));
+}
+
+TEST_F(MediaTools, SayHowManyThumbnailsAreMissingAndWhyTheFirst)
+{
+    const Words words = {"thumbnails", movie("clock.mp4"), "-n", "3", "-o", folder, "--force"};
+    fs::create_directories(folder / "1_00-00-01.333.png/not a picture");
+    EXPECT_EQ(run(words), 1);
+    EXPECT_EQ(lines(errors), 1U);
+    EXPECT_THAT(errors, AllOf(HasSubstr("1_00-00-01.333.png"), Not(HasSubstr("of 3 pictures"))));
+    EXPECT_EQ(files().size(), 3U) << "the others are there";
+    fs::create_directories(folder / "2_00-00-02.666.png.d");
+    fs::remove(folder / "2_00-00-02.666.png");
+    fs::rename(folder / "2_00-00-02.666.png.d", folder / "2_00-00-02.666.png");
+    EXPECT_EQ(run(words), 1);
+    EXPECT_EQ(lines(errors), 1U);
+    EXPECT_THAT(errors,
+                AllOf(HasSubstr("2 of 3 pictures could not be made; the first: "), HasSubstr("1_00-00-01.333.png")));
+}
+
+TEST_F(MediaTools, LeaveNoDirectoryOfTheirsBehindThatIsEmpty)
+{
+    std::thread([this] {
+        // No picture gets its name.
+        tests::refuseSystemCalls({{SYS_renameat2, EROFS}});
+        const Words words = {"thumbnails", movie("clock.mp4"), "-n", "2", "-o", folder};
+        EXPECT_EQ(run(words), 1) << errors;
+        EXPECT_FALSE(fs::exists(folder));
+        fs::create_directory(folder);
+        EXPECT_EQ(run(words), 1) << errors;
+    }).join();
+    EXPECT_TRUE(fs::exists(folder)) << "that was not theirs";
 }
 
 TEST_F(MediaTools, SayInOneLineWhyTheyFail)
