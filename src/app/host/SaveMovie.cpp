@@ -23,9 +23,6 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// How much of the time that a save takes goes into the mix; what is left is copying.
-constexpr double kMixPart = 0.9;
-
 base::ErrorRef interrupted()
 {
     return base::Error::fromErrno(ECANCELED, "cannot save the movie");
@@ -41,7 +38,7 @@ base::ErrorRef mix(MediaTool& tool, const std::shared_ptr<platform::Asset>& asse
     session->setAudioMix(platform::audioMixOfAllTracks(*asset));
 
     // Its file must be gone before its directory, when it is given up.
-    return tool.runExport(*session, [&] { progress.show(kMixPart * session->progress()); });
+    return tool.runExport(*session, [&] { progress.show(partOfSave(session->progress(), 0)); });
 }
 
 /// The first picture, for the file managers; nothing where there is none. It must not keep a save from ending.
@@ -98,7 +95,7 @@ base::Result<std::string> publish(MediaTool& tool, const std::string& path, phot
             main.post([&hasEnded] { hasEnded = true; });
             ended.set_value();
         });
-    const auto showPart = [&] { progress.show(kMixPart + (1 - kMixPart) * works.progress().value_or(0)); };
+    const auto showPart = [&] { progress.show(partOfSave(1, works.progress().value_or(0))); };
     // A signal that comes too late changes nothing: the movie is saved, and that is told.
     if (!tool.runUntil([&] { return hasEnded; }, showPart))
         goOn = false;
@@ -148,6 +145,12 @@ base::Result<std::string> save(MediaTool& tool, const SaveCommand& command, Prog
 }
 
 } // namespace
+
+double partOfSave(double mixed, double copied)
+{
+    constexpr double kMixPart = 0.9; // of the time, as measured; the rest is copying
+    return kMixPart * mixed + (1 - kMixPart) * copied;
+}
 
 int saveMovie(const SaveCommand& command)
 {

@@ -3,6 +3,7 @@
 #include "support/EventLoop.h"
 #include "support/Paths.h"
 #include "support/Program.h"
+#include "support/RefusedSystemCalls.h"
 
 #include <gmock/gmock.h>
 
@@ -13,6 +14,7 @@
 using testing::AllOf;
 using testing::Contains;
 using testing::ElementsAre;
+using testing::EndsWith;
 using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::StartsWith;
@@ -98,6 +100,15 @@ TEST_F(OpeningAMovie, PrintsWhatWasDoneInOrder)
     EXPECT_THAT(clipsa->errors(), IsEmpty());
     EXPECT_THAT(directories(), IsEmpty());
     expectUntouched();
+}
+
+TEST_F(OpeningAMovie, PrintsWhatWasDoneBeforeTheEditorHasGone)
+{
+    const auto held = pipe("held");
+    const auto program = start("finish=a wait tell=" + held.native());
+    tests::readPipe(held); // which the editor opens when its host has heard it
+    EXPECT_EQ(program->output(), "a\n");
+    EXPECT_EQ(program->wait(), 0);
 }
 
 TEST_F(OpeningAMovie, PrintsOneObjectOnRequest)
@@ -375,6 +386,17 @@ TEST_F(OpeningAMovie, AnEditorThatHasSomethingToFinishIsWaitedFor)
     session.reset();
     other.reset();
     EXPECT_THAT(directories(), IsEmpty());
+}
+
+TEST_F(OpeningAMovie, AMovieThatHasNoRoomIsSaidToBeUntouched)
+{
+    tests::whileRefusing({{SYS_linkat, EXDEV}, tests::noReflinks(), {SYS_copy_file_range, ENOSPC}}, [&] {
+        const auto clipsa = start("wait");
+        EXPECT_EQ(clipsa->wait(), 1);
+        EXPECT_THAT(clipsa->errors(), AllOf(StartsWith("clipsa: "), HasSubstr("the disk is full"),
+                                            EndsWith("; your recording is untouched: " + m_movie.native() + "\n")));
+    });
+    expectUntouched();
 }
 
 TEST_F(OpeningAMovie, AMovieThatCannotBeHandedOverIsSaid)

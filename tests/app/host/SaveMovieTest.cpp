@@ -1,4 +1,5 @@
 // `clipsa save`, as a program, on the test movies.
+#include "app/host/SaveMovie.h"
 #include "app/host/ClipsaProgram.h"
 #include "support/ProcessorTime.h"
 #include "support/WithoutPrivileges.h"
@@ -27,6 +28,15 @@ using tests::refusal;
 using tests::Words;
 
 namespace fs = std::filesystem;
+
+TEST(TheSaveCommand, MixesForMostOfItsTimeAndCopiesForTheRest)
+{
+    EXPECT_DOUBLE_EQ(host::partOfSave(0, 0), 0);
+    EXPECT_DOUBLE_EQ(host::partOfSave(0.5, 0), 0.45);
+    EXPECT_DOUBLE_EQ(host::partOfSave(1, 0), 0.9);
+    EXPECT_DOUBLE_EQ(host::partOfSave(1, 0.5), 0.95);
+    EXPECT_DOUBLE_EQ(host::partOfSave(1, 1), 1);
+}
 
 TEST(TheSaveCommand, TakesAMovieAndTheNameOfItsApp)
 {

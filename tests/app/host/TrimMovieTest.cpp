@@ -159,6 +159,10 @@ TEST_F(Trim, NamesTheFileThatItWasToReplaceWhenTheDiskIsFull)
         EXPECT_EQ(run({"trim", movie("clock.mp4"), "--to", "2", "-o", out, "--force"}), 1);
     });
     EXPECT_THAT(errors, HasSubstr("“out.mp4” cannot be written: the disk is full; make room there"));
+    tests::whileRefusing({{SYS_pwrite64, EIO}}, [&] {
+        EXPECT_EQ(run({"trim", movie("clock.mp4"), "--to", "2", "-o", out, "--force"}), 1);
+    });
+    EXPECT_THAT(errors, HasSubstr("“out.mp4” cannot be written: "));
     EXPECT_THAT(namesIn(directory.path()), ElementsAre("out.mp4"));
 }
 

@@ -1,0 +1,69 @@
+// The loop of a command without a window: it sleeps until there is something to do, and then does it.
+#include "app/host/MediaTool.h"
+
+#include <gtest/gtest.h>
+
+#include <csignal>
+#include <optional>
+
+namespace {
+
+class ATool : public ::testing::Test {
+protected:
+    ~ATool() override
+    {
+        m_tool.reset();
+        ::pthread_sigmask(SIG_SETMASK, &m_signals, nullptr);
+    }
+
+    /// How often the loop has looked whether it is done.
+    int looksUntil(const bool& done, const std::function<void()>& meanwhile = {})
+    {
+        int looks = 0;
+        EXPECT_TRUE(m_tool->runUntil([&] { return ++looks, done; }, meanwhile));
+        return looks;
+    }
+
+private:
+    static sigset_t blocked()
+    {
+        sigset_t signals;
+        ::pthread_sigmask(SIG_SETMASK, nullptr, &signals);
+        return signals;
+    }
+
+    /// What the other tests find blocked: a tool blocks some of its process's signals for good.
+    const sigset_t m_signals = blocked();
+
+protected:
+    std::optional<host::MediaTool> m_tool{std::in_place};
+    base::MainQueue& m_main = m_tool->system().mainQueue;
+};
+
+TEST_F(ATool, SleepsUntilWhatIsDue)
+{
+    bool due = false;
+    m_main.postAfter(std::chrono::milliseconds(20), [&] { due = true; });
+    EXPECT_LE(looksUntil(due), 4);
+}
+
+TEST_F(ATool, IsWokenByEachWordFromAWorker)
+{
+    for (int i = 0; i < 3; ++i) {
+        bool came = false;
+        m_tool->system().backgroundQueue.post([&] { m_main.post([&] { came = true; }); });
+        EXPECT_LE(looksUntil(came), 4);
+    }
+    bool due = false;
+    m_main.postAfter(std::chrono::milliseconds(20), [&] { due = true; });
+    EXPECT_LE(looksUntil(due), 4) << "what woke it is over";
+}
+
+TEST_F(ATool, DoesWhatIsToBeDoneMeanwhileNowAndThen)
+{
+    int times = 0;
+    bool enough = false;
+    EXPECT_LE(looksUntil(enough, [&] { enough = ++times == 3; }), 8);
+}
+
+} // namespace
