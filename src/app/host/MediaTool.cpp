@@ -136,9 +136,7 @@ base::ErrorRef MediaTool::runExport(platform::ExportSession& session, const std:
 {
     m_affinity.assertHere();
     session.exportAsynchronously([] {});
-    if (!runUntil([this] { return m_machine->works.isEmpty(); }, meanwhile))
-        session.cancelExport();
-    finishWork();
+    finishWork([&session] { session.cancelExport(); }, meanwhile);
     switch (session.status()) {
     case platform::ExportSession::Status::Completed:
         return nullptr;
@@ -149,10 +147,19 @@ base::ErrorRef MediaTool::runExport(platform::ExportSession& session, const std:
     }
 }
 
-/// Runs the main queue until nothing is under way that uses it, whatever signals come.
-void MediaTool::finishWork()
+base::WorkList& MediaTool::works()
 {
+    m_affinity.assertHere();
+    return m_machine->works;
+}
+
+void MediaTool::finishWork(const std::function<void()>& giveUp, const std::function<void()>& meanwhile)
+{
+    m_affinity.assertHere();
     Machine& machine = *m_machine;
+    if (!runUntil([&machine] { return machine.works.isEmpty(); }, meanwhile))
+        giveUp();
+    // Whatever signals come.
     while (!machine.works.isEmpty()) {
         machine.mainQueue.runDue();
         if (!machine.works.isEmpty())

@@ -5,6 +5,7 @@
 #include "base/Affinity.h"
 #include "base/Result.h"
 #include "base/System.h"
+#include "base/WorkList.h"
 #include "platform/media/MediaFramework.h"
 
 #include <functional>
@@ -33,6 +34,10 @@ public:
     /// Runs the main queue until `done` holds. False when a signal came first, now or in an earlier call: what is under
     /// way must be given up then. `meanwhile`, if there is one, is called about ten times a second.
     bool runUntil(const std::function<bool()>& done, const std::function<void()>& meanwhile = {});
+    /// What keeps a command from ending, for whoever works for it beside the engine.
+    base::WorkList& works();
+    /// Runs the main queue until nothing is under way any more. A signal calls `giveUp`, which should make that soon.
+    void finishWork(const std::function<void()>& giveUp, const std::function<void()>& meanwhile);
     /// Starts `session` and runs the main queue until it has ended and its file is whole or gone. A signal cancels it,
     /// and is told as ECANCELED. Null when the movie is there.
     base::ErrorRef runExport(platform::ExportSession& session, const std::function<void()>& meanwhile);
@@ -45,8 +50,6 @@ public:
 
 private:
     struct Machine;
-
-    void finishWork();
 
     base::Affinity m_affinity;
     std::unique_ptr<Machine> m_machine;

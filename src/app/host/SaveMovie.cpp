@@ -12,7 +12,6 @@
 #include <cerrno>
 #include <cstdio>
 #include <filesystem>
-#include <future>
 #include <optional>
 #include <system_error>
 #include <utility>
@@ -79,27 +78,16 @@ base::Result<std::string> publish(MediaTool& tool, const std::string& path, phot
     std::atomic<bool> goOn{true};
     std::string published;
     base::ErrorRef failure;
-    std::promise<void> ended;
-    auto end = ended.get_future();
     options.published = [&](const std::string& file) { published = file; };
     options.goOn = [&] { return goOn.load(); };
 
-    base::WorkList works;
-    photos::VideoLibrary library(std::move(options), tool.system().log, works);
-    base::MainQueue& main = tool.system().mainQueue;
-    bool hasEnded = false;
+    photos::VideoLibrary library(std::move(options), tool.system().log, tool.works());
     library.performChanges(
         [&](platform::PhotoLibraryChange& change) { change.createAssetFromVideoAtFileURL(base::Url::fromPath(path)); },
-        [&](bool /*the error says it*/, const base::ErrorRef& error) {
-            failure = error;
-            main.post([&hasEnded] { hasEnded = true; });
-            ended.set_value();
-        });
-    const auto showPart = [&] { progress.show(partOfSave(1, works.progress().value_or(0))); };
+        [&failure](bool /*the error says it*/, const base::ErrorRef& error) { failure = error; });
     // A signal that comes too late changes nothing: the movie is saved, and that is told.
-    if (!tool.runUntil([&] { return hasEnded; }, showPart))
-        goOn = false;
-    end.wait();
+    tool.finishWork([&goOn] { goOn = false; },
+                    [&] { progress.show(partOfSave(1, tool.works().progress().value_or(0))); });
     if (failure)
         return failure;
     return published;

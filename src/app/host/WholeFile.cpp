@@ -2,6 +2,7 @@
 
 #include "linux/posix/FileDescriptor.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <fcntl.h>
@@ -29,7 +30,7 @@ int writeAll(int descriptor, const std::vector<std::uint8_t>& bytes)
         const ssize_t count = ::write(descriptor, bytes.data() + written, bytes.size() - written);
         if (count < 0 && errno != EINTR)
             return errno;
-        written += count > 0 ? static_cast<std::size_t>(count) : 0;
+        written += static_cast<std::size_t>(std::max<ssize_t>(count, 0));
     }
     return 0;
 }

@@ -74,6 +74,13 @@ protected:
     std::optional<tests::PrivateBus> m_bus;
 };
 
+TEST_F(Service, SaysThatItNeedsASession)
+{
+    tests::Program program({tests::program("clipsa"), "service"}, {{"DBUS_SESSION_BUS_ADDRESS", "unix:path=/nowhere"}});
+    EXPECT_EQ(program.wait(), 1);
+    EXPECT_THAT(program.errors(), StartsWith("clipsa: there is no session bus; "));
+}
+
 TEST_F(Service, ReadsNobodysFileWhereItServesTheOthers)
 {
     // Looking at a movie's first bytes, to find a name for it.
