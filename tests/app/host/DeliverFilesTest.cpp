@@ -57,7 +57,10 @@ protected:
                 m_attachmentThread = std::this_thread::get_id();
             });
         }
-        const host::DeliveryEvents events{[this](std::uint64_t total) { m_copying.push_back(total); },
+        const host::DeliveryEvents events{[this, here = std::this_thread::get_id()](std::uint64_t total) {
+                                              EXPECT_EQ(std::this_thread::get_id(), here);
+                                              m_copying.push_back(total);
+                                          },
                                           [this](const base::ErrorRef& error) { m_failure = error; }};
         bool ended = false;
         std::promise<void> begin;
@@ -98,8 +101,8 @@ TEST_F(Delivering, TellsWhereTheEditorFindsTheMovie)
 
 TEST_F(Delivering, TellsOnceOfACopyThatTakesLongerThanASecond)
 {
-    m_size = 80 << 20; // some steps of copying
-    m_step = std::chrono::milliseconds(500);
+    m_size = 80 << 20;                       // some steps of copying
+    m_step = std::chrono::milliseconds(250); // after four of them it is one
     deliver(m_target.path());
     EXPECT_THAT(m_copying, ElementsAre(m_size));
     m_copying.clear();

@@ -10,7 +10,6 @@
 
 #include <gmock/gmock.h>
 
-#include <csignal>
 #include <fcntl.h>
 #include <optional>
 #include <thread>
@@ -110,15 +109,6 @@ TEST_F(AnEditorsSession, IsClosedByItsOwner)
 TEST_F(AnEditorsSession, OfAnEditorThatEndedWellWithoutAWordWasClosed)
 {
     EXPECT_EQ(host::EditorOutcome().words(), "the editor was closed before it showed the recording");
-}
-
-TEST_F(AnEditorsSession, EndsTheEditorThatStaysByForce)
-{
-    m_place.patience = std::chrono::milliseconds(1);
-    start("hang");
-    m_session->close();
-    waitForEnd();
-    EXPECT_TRUE(m_outcome->end.signal == SIGTERM || m_outcome->end.signal == SIGKILL) << m_outcome->end.words();
 }
 
 } // namespace
