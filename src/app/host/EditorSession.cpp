@@ -168,7 +168,6 @@ void EditorSession::State::whenTimeIsUp()
 void EditorSession::State::processEnded(ProcessEnd ended)
 {
     processEnd = ended;
-    timer.stop();
     // The last message can still be under way when its sender has ended; the end of the connection comes behind it.
     if (closing)
         end();
@@ -192,7 +191,6 @@ void EditorSession::State::end()
 {
     if (std::exchange(waitsForFiles, true))
         return;
-    timer.stop();
     files->cancel();
     if (filesAreDone)
         leave();

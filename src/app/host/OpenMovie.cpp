@@ -91,6 +91,12 @@ dbus::EditRequest requestFor(const OpenCommand& command)
 
 } // namespace
 
+std::string wordsOfCopy(const std::string& movie, std::uint64_t bytes)
+{
+    return "copying " + movie + " (" + std::to_string(bytes / 1'000'000)
+           + " MB), because the editor's directory is on another file system";
+}
+
 int openMovie(const OpenCommand& command)
 {
     return openMovie(command, {});
@@ -128,10 +134,7 @@ int openMovie(const OpenCommand& command, OpenVariation variation)
         };
     SavedMovies movies;
     handlers.noted = [&](const dbus::MovieNote& note) { take(note, movies); };
-    handlers.copying = [&](std::uint64_t bytes) {
-        complain("copying " + movie + " (" + std::to_string(bytes / 1'000'000)
-                 + " MB), because the editor's directory is on another file system");
-    };
+    handlers.copying = [&](std::uint64_t bytes) { complain(wordsOfCopy(movie, bytes)); };
     handlers.ended = [&](const EditorOutcome& outcome) {
         // Only now it is known what became of a save that was under way when the user finished.
         if (command.json && outcome.activityTypes)

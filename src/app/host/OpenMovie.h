@@ -4,6 +4,7 @@
 #include "app/host/CommandLine.h"
 #include "app/host/ExitStatus.h"
 
+#include <cstdint>
 #include <functional>
 #include <string>
 #include <utility>
@@ -14,6 +15,9 @@ namespace host {
 /// Results go to standard output, all else to standard error. Needs a QCoreApplication, and the only thread. SIGINT,
 /// SIGTERM and SIGHUP close the editor; before there is one they end the process at once.
 int openMovie(const OpenCommand& command);
+
+/// What is said of a copy that takes long.
+std::string wordsOfCopy(const std::string& movie, std::uint64_t bytes);
 
 /// What a tour has differently.
 struct OpenVariation {

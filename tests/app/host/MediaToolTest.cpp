@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <csignal>
+#include <future>
 #include <optional>
 
 namespace {
@@ -57,6 +58,32 @@ TEST_F(ATool, IsWokenByEachWordFromAWorker)
     bool due = false;
     m_main.postAfter(std::chrono::milliseconds(20), [&] { due = true; });
     EXPECT_LE(looksUntil(due), 4) << "what woke it is over";
+}
+
+TEST_F(ATool, WaitsForAllThatIsUnderWayAndForWhatThatHasPosted)
+{
+    bool told = false;
+    m_tool->system().backgroundQueue.post([this, &told, work = m_tool->works().begin()]() mutable {
+        m_main.post([&told] { told = true; });
+        work.reset();
+    });
+    m_tool->finishWork([] { ADD_FAILURE() << "nobody interrupts it"; }, {});
+    EXPECT_TRUE(told);
+    EXPECT_TRUE(m_tool->works().isEmpty());
+}
+
+TEST_F(ATool, IsWokenByTheEndOfWhatIsUnderWay)
+{
+    std::promise<void> looked;
+    m_tool->system().backgroundQueue.post(
+        [gate = looked.get_future().share(), work = m_tool->works().begin()] { gate.wait(); });
+    int looks = 0;
+    EXPECT_TRUE(m_tool->runUntil([&] {
+        if (++looks == 1)
+            looked.set_value();
+        return m_tool->works().isEmpty();
+    }));
+    EXPECT_LE(looks, 4);
 }
 
 TEST_F(ATool, DoesWhatIsToBeDoneMeanwhileNowAndThen)

@@ -1,4 +1,5 @@
 // The program itself, with an editor that does what a test says.
+#include "app/host/OpenMovie.h"
 #include "app/host/EditorSession.h"
 #include "support/EventLoop.h"
 #include "support/Paths.h"
@@ -91,6 +92,12 @@ protected:
     std::filesystem::path m_movie = std::filesystem::canonical(m_directory.write("Tux Racer.mp4", "moving pictures"));
     std::filesystem::path m_cache = m_directory.path() / "cache";
 };
+
+TEST_F(OpeningAMovie, SaysWhatItCopiesAndWhyInMegabytes)
+{
+    EXPECT_EQ(host::wordsOfCopy("/a.mp4", 123'999'999),
+              "copying /a.mp4 (123 MB), because the editor's directory is on another file system");
+}
 
 TEST_F(OpeningAMovie, PrintsWhatWasDoneInOrder)
 {
@@ -393,7 +400,7 @@ TEST_F(OpeningAMovie, AMovieThatHasNoRoomIsSaidToBeUntouched)
     tests::whileRefusing({{SYS_linkat, EXDEV}, tests::noReflinks(), {SYS_copy_file_range, ENOSPC}}, [&] {
         const auto clipsa = start("wait");
         EXPECT_EQ(clipsa->wait(), 1);
-        EXPECT_THAT(clipsa->errors(), AllOf(StartsWith("clipsa: "), HasSubstr("the disk is full"),
+        EXPECT_THAT(clipsa->errors(), AllOf(HasSubstr("clipsa: cannot copy the recording: the disk is full"),
                                             EndsWith("; your recording is untouched: " + m_movie.native() + "\n")));
     });
     expectUntouched();
