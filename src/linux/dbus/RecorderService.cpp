@@ -79,22 +79,21 @@ public:
 
     bool handleMessage(const QDBusMessage& message, const QDBusConnection&) override
     {
-        const QString call = message.interface() + u'.' + message.member();
+        const auto calls = [&](const char* interface, const char* member) {
+            return message.interface() == QLatin1String(interface) && message.member() == QLatin1String(member);
+        };
+        const bool isOurs = message.path() == QLatin1String(kPath);
         const QString signature = message.signature();
         const Session* session = sessionAt(message.path());
-        if (session && call == QLatin1String(kSessionInterface) + QStringLiteral(".Close"))
+        if (session && calls(kSessionInterface, "Close"))
             closeSession(message, *session);
-        else if (message.path() != QLatin1String(kPath))
-            return false;
-        else if (call == QLatin1String(kRecorderInterface) + QStringLiteral(".Edit")
-                 && signature == QLatin1String("ha{sv}"))
+        else if (isOurs && calls(kRecorderInterface, "Edit") && signature == QLatin1String("ha{sv}"))
             edit(message);
-        else if (call == QLatin1String(kApplicationInterface) + QStringLiteral(".Open")
-                 && signature == QLatin1String("asa{sv}"))
+        else if (isOurs && calls(kApplicationInterface, "Open") && signature == QLatin1String("asa{sv}"))
             open(message);
-        else if (call == QLatin1String(kApplicationInterface) + QStringLiteral(".Activate"))
+        else if (isOurs && calls(kApplicationInterface, "Activate"))
             refuse(message, "Clipsa has no window of its own; give it a recording to open");
-        else if (call == QLatin1String(kApplicationInterface) + QStringLiteral(".ActivateAction"))
+        else if (isOurs && calls(kApplicationInterface, "ActivateAction"))
             refuse(message, "Clipsa has no actions");
         else
             return false;

@@ -89,7 +89,7 @@ TEST(Thumbnails, AreNamedByPlaceAndTime)
 class MediaTools : public tests::ClipsaProgram {
 protected:
     Words files() const { return namesIn(folder); }
-    static std::size_t lines(const std::string& text) { return std::count(text.begin(), text.end(), '\n'); }
+    static auto lines(const std::string& text) { return std::count(text.begin(), text.end(), '\n'); }
 
     const fs::path folder = directory.path() / "pictures";
 };
@@ -112,7 +112,7 @@ TEST_F(MediaTools, DoNotReplaceThumbnailsUnlessTold)
     std::ofstream(folder / "1_00-00-02.000.png") << "mine";
     EXPECT_EQ(run({"thumbnails", movie("clock.mp4"), "-n", "2", "-o", folder}), 2);
     EXPECT_THAT(errors, HasSubstr("1_00-00-02.000.png is there already; give --force"));
-    EXPECT_EQ(lines(errors), 1U);
+    EXPECT_EQ(lines(errors), 1);
     EXPECT_THAT(files(), ElementsAre("1_00-00-02.000.png")) << "nothing is begun";
     EXPECT_EQ(tests::PrivateDirectory::read(folder / "1_00-00-02.000.png"), "mine");
     EXPECT_EQ(run({"thumbnails", movie("clock.mp4"), "-n", "2", "-o", folder, "--force"}), 0) << errors;
@@ -125,14 +125,14 @@ TEST_F(MediaTools, SayHowManyThumbnailsAreMissingAndWhyTheFirst)
     const Words words = {"thumbnails", movie("clock.mp4"), "-n", "3", "-o", folder, "--force"};
     fs::create_directories(folder / "1_00-00-01.333.png/not a picture");
     EXPECT_EQ(run(words), 1);
-    EXPECT_EQ(lines(errors), 1U);
+    EXPECT_EQ(lines(errors), 1);
     EXPECT_THAT(errors, AllOf(HasSubstr("1_00-00-01.333.png"), Not(HasSubstr("of 3 pictures"))));
     EXPECT_EQ(files().size(), 3U) << "the others are there";
     fs::create_directories(folder / "2_00-00-02.666.png.d");
     fs::remove(folder / "2_00-00-02.666.png");
     fs::rename(folder / "2_00-00-02.666.png.d", folder / "2_00-00-02.666.png");
     EXPECT_EQ(run(words), 1);
-    EXPECT_EQ(lines(errors), 1U);
+    EXPECT_EQ(lines(errors), 1);
     EXPECT_THAT(errors,
                 AllOf(HasSubstr("2 of 3 pictures could not be made; the first: "), HasSubstr("1_00-00-01.333.png")));
 }
@@ -155,17 +155,17 @@ TEST_F(MediaTools, SayInOneLineWhyTheyFail)
 {
     EXPECT_EQ(run({"thumbnails", movie("audio-only.m4a"), "-n", "2", "-o", folder}), 2);
     EXPECT_THAT(errors, HasSubstr("has no pictures, only sound"));
-    EXPECT_EQ(lines(errors), 1U);
+    EXPECT_EQ(lines(errors), 1);
     EXPECT_EQ(run({"thumbnails", movie("not-a-movie.mp4"), "-n", "2", "-o", folder}), 2);
     EXPECT_THAT(errors, HasSubstr("not-a-movie.mp4” is not a movie"));
-    EXPECT_EQ(lines(errors), 1U);
+    EXPECT_EQ(lines(errors), 1);
     EXPECT_FALSE(fs::exists(folder));
     EXPECT_EQ(run({"probe", movie("nothing.mp4")}), 2);
     EXPECT_THAT(errors, HasSubstr("there is no file"));
     std::ofstream(folder.native()) << "a file";
     EXPECT_EQ(run({"thumbnails", movie("clock.mp4"), "-n", "2", "-o", folder}), 2);
     EXPECT_THAT(errors, StartsWith("clipsa: cannot write pictures into"));
-    EXPECT_EQ(lines(errors), 1U);
+    EXPECT_EQ(lines(errors), 1);
 }
 
 TEST_F(MediaTools, MakeWhatCanBeMadeOfADamagedMovie)

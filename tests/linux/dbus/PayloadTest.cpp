@@ -5,7 +5,6 @@
 #include <future>
 #include <thread>
 
-using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
