@@ -101,12 +101,12 @@ TEST_F(Delivering, TellsWhereTheEditorFindsTheMovie)
 
 TEST_F(Delivering, TellsOnceOfACopyThatTakesLongerThanASecond)
 {
-    m_size = 80 << 20;                       // some steps of copying
-    m_step = std::chrono::milliseconds(250); // after four of them it is one
+    m_size = 112 << 20; // seven steps of copying
+    m_step = std::chrono::milliseconds(250);
     deliver(m_target.path());
     EXPECT_THAT(m_copying, ElementsAre(m_size));
     m_copying.clear();
-    m_step = std::chrono::milliseconds(200); // to the second, but not over it
+    m_step = std::chrono::milliseconds(142); // short of the second
     std::filesystem::remove(m_target.path() / "movie.mp4");
     deliver(m_target.path());
     EXPECT_THAT(m_copying, IsEmpty());
