@@ -32,12 +32,12 @@ private:
 protected:
     std::unique_ptr<app::WorkWatch> watch = std::make_unique<app::WorkWatch>(
         machine.mainQueue, list,
-        app::WorkWatch::Handlers{[this] { m_told.push_back("begun"); }, [this] { m_told.push_back("ended"); },
+        app::WorkWatch::Handlers{[this] { m_told.emplace_back("begun"); }, [this] { m_told.emplace_back("ended"); },
                                  [this](std::optional<double> progress) {
                                      m_told.push_back(progress ? "show " + std::to_string(std::lround(*progress * 100))
                                                                : "show");
                                  },
-                                 [this] { m_told.push_back("hide"); }});
+                                 [this] { m_told.emplace_back("hide"); }});
 };
 
 TEST_F(WorkWatch, WhatIsOverWithinHalfASecondIsNotShown)

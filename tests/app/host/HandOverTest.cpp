@@ -64,7 +64,7 @@ protected:
 
 TEST_F(HandingOver, ACopyHasThePermissionsOfTheMovie)
 {
-    for (const mode_t mode : {0600, 0640, 0644}) {
+    for (const mode_t mode : {0600U, 0640U, 0644U}) {
         ASSERT_EQ(::chmod(m_movie.c_str(), mode), 0);
         ASSERT_TRUE(handOver(host::HandOverWay::Copy));
         EXPECT_EQ(statusOf(m_copy).st_mode & ACCESSPERMS, mode);
@@ -230,13 +230,14 @@ TEST_F(HandingOver, SaysWhyACopyCannotBeMade)
         {{SYS_utimensat, EROFS}, "cannot date "},
         {{SYS_openat, EDQUOT, 2, O_CREAT}, "cannot make "}};
     for (const auto& [refused, words] : kFailures)
-        tests::whileRefusing({{SYS_linkat, EXDEV}, tests::noReflinks(), refused}, [&] {
-            const auto way = handOver();
-            ASSERT_FALSE(way);
-            EXPECT_EQ(way.error()->code(), refused.error);
-            EXPECT_THAT(way.error()->description(), testing::StartsWith(words));
-            EXPECT_FALSE(std::filesystem::exists(m_copy));
-        });
+        tests::whileRefusing({{SYS_linkat, EXDEV}, tests::noReflinks(), refused},
+                             [&, error = refused.error, words = words] {
+                                 const auto way = handOver();
+                                 ASSERT_FALSE(way);
+                                 EXPECT_EQ(way.error()->code(), error);
+                                 EXPECT_THAT(way.error()->description(), testing::StartsWith(words));
+                                 EXPECT_FALSE(std::filesystem::exists(m_copy));
+                             });
     const auto stopped = handOver(host::HandOverWay::Copy, [](std::uint64_t, std::uint64_t) { return false; });
     EXPECT_THAT(stopped.error()->description(), testing::StartsWith("copying the recording was stopped"));
     expectUntouched();

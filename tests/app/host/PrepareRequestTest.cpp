@@ -196,7 +196,7 @@ TEST_F(Preparing, SaysWhatElseKeepsAFileFromBeingOpened)
                                                   {EMFILE, "cannot open "},
                                                   {EIO, "cannot open "}};
     for (const auto& [number, words] : kWords)
-        tests::whileRefusing({{SYS_openat, number, 2, O_NOCTTY}}, [&] {
+        tests::whileRefusing({{SYS_openat, number, 2, O_NOCTTY}}, [&, number = number, words = words] {
             auto asked = request(m_movie);
             const auto prepared = host::prepare(asked);
             ASSERT_FALSE(prepared);
