@@ -5,7 +5,6 @@
 #include <vector>
 
 using namespace tests;
-using testing::IsEmpty;
 using testing::SizeIs;
 
 TEST_F(RealWindow, LooksAsInTheManualUprightAndOnItsSide)

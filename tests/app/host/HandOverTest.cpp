@@ -10,8 +10,6 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 
-using testing::IsEmpty;
-
 namespace {
 
 constexpr timespec kDate = {1'600'000'000, 123'456'789};
