@@ -1,20 +1,24 @@
-// One editor's session as its host sees it: what is told, in which order, on which thread.
+// One editor's session as its host sees it: what is told, in which order, on which thread, and how long is waited.
 #include "app/host/EditorSession.h"
 
 #include "support/EventLoop.h"
 #include "support/Paths.h"
 #include "support/PrivateDirectory.h"
+#include "support/Program.h"
 #include "support/RefusedSystemCalls.h"
 
 #include <QThread>
 
 #include <gmock/gmock.h>
 
+#include <csignal>
 #include <fcntl.h>
 #include <optional>
+#include <sys/stat.h>
 #include <thread>
 
 using testing::ElementsAre;
+using testing::HasSubstr;
 
 namespace {
 
@@ -23,14 +27,8 @@ protected:
     /// An editor that does what `script` says; a movie of so many bytes is on its way to it.
     void start(const std::string& script, std::uintmax_t movieSize = 15)
     {
-        const auto movie = m_directory.write("race.mp4", "moving pictures");
-        std::filesystem::resize_file(movie, movieSize);
-        dbus::EditRequest request;
-        request.movie = posix::FileDescriptor(::open(movie.c_str(), O_RDONLY | O_CLOEXEC));
-        request.movieName = "race.mp4";
-        request.environment = {{"FAKE_EDITOR", script}};
         auto started = host::EditorSession::start(
-            std::move(request), m_place,
+            request(script, movieSize), m_place,
             {.noted = [this](const dbus::MovieNote& note) { m_told.push_back("noted " + note.path); },
              .finished =
                  [this](const std::vector<std::string>& types) {
@@ -47,6 +45,34 @@ protected:
         ASSERT_TRUE(started) << started.error()->description();
         m_session = std::move(started).value();
     }
+    /// One that soon loses its patience; its owner keeps it.
+    std::unique_ptr<host::EditorSession> startImpatiently(const std::string& script,
+                                                          std::optional<host::EditorOutcome>& outcome)
+    {
+        host::EditorSession::Handlers handlers;
+        handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
+        auto session = host::EditorSession::start(
+            request(script), {m_place.editorProgram, m_place.directoriesRoot, std::chrono::milliseconds(20)},
+            std::move(handlers));
+        EXPECT_TRUE(session) << session.error()->description();
+        return session ? std::move(session).value() : nullptr;
+    }
+    dbus::EditRequest request(const std::string& script, std::uintmax_t movieSize = 15)
+    {
+        const auto movie = m_directory.write("race.mp4", "moving pictures");
+        std::filesystem::resize_file(movie, movieSize);
+        dbus::EditRequest request;
+        request.movie = posix::FileDescriptor(::open(movie.c_str(), O_RDONLY | O_CLOEXEC));
+        request.movieName = m_movieName;
+        request.environment = {{"FAKE_EDITOR", script}};
+        return request;
+    }
+    std::filesystem::path pipe(const char* name)
+    {
+        const auto path = m_directory.path() / name;
+        EXPECT_EQ(::mkfifo(path.c_str(), 0600), 0);
+        return path;
+    }
     void waitForEnd()
     {
         ASSERT_TRUE(tests::pumpUntil([this] { return m_outcome.has_value(); }));
@@ -54,6 +80,7 @@ protected:
     }
 
     tests::PrivateDirectory m_directory;
+    std::string m_movieName = "race.mp4";
     host::EditorSession::Place m_place{.editorProgram = tests::program("fake-editor"),
                                        .directoriesRoot = m_directory.path() / "clipsa",
                                        .patience = std::chrono::hours(1),
@@ -92,6 +119,7 @@ TEST_F(AnEditorsSession, DoesNotWaitForACopyThatNobodyNeedsAnyMore)
     }));
     thread->start();
     thread->wait();
+    ASSERT_TRUE(m_outcome);
     EXPECT_FALSE(m_outcome->error) << "that the copy was stopped is not why it ended";
     EXPECT_EQ(m_outcome->words(), "the editor ended early, with exit status 1");
 }
@@ -109,6 +137,59 @@ TEST_F(AnEditorsSession, IsClosedByItsOwner)
 TEST_F(AnEditorsSession, OfAnEditorThatEndedWellWithoutAWordWasClosed)
 {
     EXPECT_EQ(host::EditorOutcome().words(), "the editor was closed before it showed the recording");
+}
+
+TEST_F(AnEditorsSession, MakesAnEditorGoThatDoesNot)
+{
+    const auto there = pipe("there");
+    std::optional<host::EditorOutcome> outcome;
+    auto session = startImpatiently("tell=" + there.native() + " finish=save hang", outcome);
+    EXPECT_THAT(tests::whilePumping([&] { return tests::readPipe(there); }), HasSubstr("MovieURLKey"));
+
+    EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
+    EXPECT_EQ(outcome->end.signal, SIGKILL);
+    EXPECT_THAT(outcome->activityTypes, testing::Optional(ElementsAre("save")));
+    session.reset();
+    EXPECT_TRUE(std::filesystem::is_empty(m_place.directoriesRoot));
+}
+
+TEST_F(AnEditorsSession, MakesAnEditorGoThatHasLeftWithoutAWordAndDoesNotEnd)
+{
+    std::optional<host::EditorOutcome> outcome;
+    auto session = startImpatiently("leave hang", outcome);
+    EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
+    EXPECT_EQ(outcome->end.signal, SIGKILL);
+    EXPECT_EQ(outcome->activityTypes, std::nullopt);
+    EXPECT_FALSE(outcome->closed);
+    session.reset();
+    EXPECT_TRUE(std::filesystem::is_empty(m_place.directoriesRoot));
+}
+
+TEST_F(AnEditorsSession, WaitsForAnEditorThatHasSomethingToFinish)
+{
+    const auto finishing = pipe("finishing");
+    std::optional<host::EditorOutcome> busy, idle;
+    auto session = startImpatiently("busy finish=save wait tell=" + finishing.native(), busy);
+    auto other = startImpatiently("finish= hang", idle);
+    EXPECT_TRUE(tests::pumpUntil([&] { return idle.has_value(); })) << "it was killed, and that takes twice as long";
+    EXPECT_FALSE(busy);
+    EXPECT_THAT(tests::whilePumping([&] { return tests::readPipe(finishing); }), HasSubstr("MovieURLKey"));
+    EXPECT_TRUE(tests::pumpUntil([&] { return busy.has_value(); }));
+    EXPECT_EQ(busy->end.signal, 0);
+    EXPECT_EQ(busy->end.exitStatus, 0);
+    session.reset();
+    other.reset();
+    EXPECT_TRUE(std::filesystem::is_empty(m_place.directoriesRoot));
+}
+
+TEST_F(AnEditorsSession, SaysThatAMovieCannotBeHandedOver)
+{
+    m_movieName = "no/such/place.mp4";
+    start("wait");
+    waitForEnd();
+    ASSERT_TRUE(m_outcome->error);
+    EXPECT_THAT(m_outcome->error->description(), HasSubstr("cannot make"));
+    EXPECT_FALSE(m_outcome->activityTypes);
 }
 
 } // namespace

@@ -1,7 +1,7 @@
 // The program itself, with an editor that does what a test says.
 #include "app/host/OpenMovie.h"
-#include "app/host/EditorSession.h"
-#include "support/EventLoop.h"
+
+#include "linux/posix/FileDescriptor.h"
 #include "support/Paths.h"
 #include "support/Program.h"
 #include "support/RefusedSystemCalls.h"
@@ -35,23 +35,6 @@ protected:
             words, tests::Program::Variables{{"FAKE_EDITOR", script},
                                              {"CLIPSA_EDITOR", tests::program("fake-editor")},
                                              {"XDG_CACHE_HOME", m_cache}});
-    }
-
-    /// A session of the host that soon loses its patience.
-    std::unique_ptr<host::EditorSession> startImpatiently(const std::string& script,
-                                                          std::optional<host::EditorOutcome>& outcome)
-    {
-        ::setenv("FAKE_EDITOR", script.c_str(), 1);
-        dbus::EditRequest request;
-        request.movie = posix::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
-        request.movieName = "movie.mp4";
-        host::EditorSession::Handlers handlers;
-        handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
-        auto session = host::EditorSession::start(
-            std::move(request), {tests::program("fake-editor"), m_cache / "clipsa", std::chrono::milliseconds(20)},
-            std::move(handlers));
-        EXPECT_TRUE(session) << session.error()->description();
-        return session ? std::move(session).value() : nullptr;
     }
 
     std::filesystem::path pipe(const char* name)
@@ -352,49 +335,6 @@ TEST_F(OpeningAMovie, TellsItsVersionAndHelp)
     EXPECT_THAT(help.output(), HasSubstr("clipsa open MOVIE"));
 }
 
-TEST_F(OpeningAMovie, AnEditorThatDoesNotGoIsMadeToGo)
-{
-    const auto there = pipe("there");
-    std::optional<host::EditorOutcome> outcome;
-    auto session = startImpatiently("tell=" + there.native() + " finish=save hang", outcome);
-    EXPECT_THAT(tests::whilePumping([&] { return tests::readPipe(there); }), HasSubstr("MovieURLKey"));
-
-    EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
-    EXPECT_EQ(outcome->end.signal, SIGKILL);
-    EXPECT_THAT(outcome->activityTypes, testing::Optional(ElementsAre("save")));
-    session.reset();
-    EXPECT_THAT(directories(), IsEmpty());
-}
-
-TEST_F(OpeningAMovie, AnEditorThatHasLeftWithoutAWordAndDoesNotEndIsMadeToGo)
-{
-    std::optional<host::EditorOutcome> outcome;
-    auto session = startImpatiently("leave hang", outcome);
-    EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
-    EXPECT_EQ(outcome->end.signal, SIGKILL);
-    EXPECT_EQ(outcome->activityTypes, std::nullopt);
-    EXPECT_FALSE(outcome->closed);
-    session.reset();
-    EXPECT_THAT(directories(), IsEmpty());
-}
-
-TEST_F(OpeningAMovie, AnEditorThatHasSomethingToFinishIsWaitedFor)
-{
-    const auto finishing = pipe("finishing");
-    std::optional<host::EditorOutcome> busy, idle;
-    auto session = startImpatiently("busy finish=save wait tell=" + finishing.native(), busy);
-    auto other = startImpatiently("finish= hang", idle);
-    EXPECT_TRUE(tests::pumpUntil([&] { return idle.has_value(); })) << "it was killed, and that takes twice as long";
-    EXPECT_FALSE(busy);
-    EXPECT_THAT(tests::whilePumping([&] { return tests::readPipe(finishing); }), HasSubstr("MovieURLKey"));
-    EXPECT_TRUE(tests::pumpUntil([&] { return busy.has_value(); }));
-    EXPECT_EQ(busy->end.signal, 0);
-    EXPECT_EQ(busy->end.exitStatus, 0);
-    session.reset();
-    other.reset();
-    EXPECT_THAT(directories(), IsEmpty());
-}
-
 TEST_F(OpeningAMovie, AMovieThatHasNoRoomIsSaidToBeUntouched)
 {
     tests::whileRefusing({{SYS_linkat, EXDEV}, tests::noReflinks(), {SYS_copy_file_range, ENOSPC}}, [&] {
@@ -404,24 +344,6 @@ TEST_F(OpeningAMovie, AMovieThatHasNoRoomIsSaidToBeUntouched)
                                             EndsWith("; your recording is untouched: " + m_movie.native() + "\n")));
     });
     expectUntouched();
-}
-
-TEST_F(OpeningAMovie, AMovieThatCannotBeHandedOverIsSaid)
-{
-    ::setenv("FAKE_EDITOR", "wait", 1);
-    dbus::EditRequest request;
-    request.movie = posix::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
-    request.movieName = "no/such/place.mp4";
-    std::optional<host::EditorOutcome> outcome;
-    host::EditorSession::Handlers handlers;
-    handlers.ended = [&](const host::EditorOutcome& ended) { outcome = ended; };
-    const auto session =
-        host::EditorSession::start(std::move(request), {tests::program("fake-editor"), m_cache / "clipsa"}, handlers);
-    ASSERT_TRUE(session);
-    EXPECT_TRUE(tests::pumpUntil([&] { return outcome.has_value(); }));
-    ASSERT_TRUE(outcome->error);
-    EXPECT_THAT(outcome->error->description(), HasSubstr("cannot make"));
-    EXPECT_FALSE(outcome->activityTypes);
 }
 
 } // namespace

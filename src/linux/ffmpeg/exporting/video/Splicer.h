@@ -1,19 +1,17 @@
-/// Joins copied packets with encoded ones of the same codec under one header. One thread.
+/// Joins copied packets with encoded ones of the same codec under one header. One thread at a time.
 #pragma once
 
-#include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/ffmpeg/Libraries.h"
+#include "linux/ffmpeg/exporting/Detachable.h"
 #include "linux/ffmpeg/exporting/video/PictureEncoder.h"
 
 #include <memory>
 
 namespace ffmpeg {
 
-class Splicer {
+class Splicer : public Detachable {
 public:
-    virtual ~Splicer() = default;
-
     /// For the stream's codec. The error says why its packets cannot be copied, or not be joined with others.
     /// `picture` is one of the stream's.
     static base::Result<std::unique_ptr<Splicer>> make(const AVStream& stream, const AVFrame& picture);
@@ -48,17 +46,6 @@ public:
     virtual base::Result<void> close(AVPacket& /*openJoint*/) { return {}; }
     virtual base::Result<void> adoptCopied(AVPacket& packet) = 0;
     virtual base::Result<void> adoptEncoded(AVPacket& packet) = 0;
-    /// What its owner calls last before another thread goes on with it.
-    void detach() { m_affinity.detach(); }
-
-protected:
-    void assertHere(base::SourceLocation where = base::SourceLocation::current()) const
-    {
-        m_affinity.assertHere(where);
-    }
-
-private:
-    base::Affinity m_affinity;
 };
 
 } // namespace ffmpeg
