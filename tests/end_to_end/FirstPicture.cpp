@@ -112,7 +112,8 @@ TEST(TheScreen, ShowsTheColoursThatWereRecorded)
         ASSERT_EQ(end.exitStatus, 0) << end.err;
         const Screenshot screen(machine.picture("patches.png"));
         for (int i = 0; i < 6; ++i) {
-            const QColor colour = screen.at(coded, 106 + 212 * (i % 3), 50 + 260 * static_cast<double>(i / 3));
+            const int row = i / 3;
+            const QColor colour = screen.at(coded, 106 + 212 * (i % 3), 50 + 260 * row);
             EXPECT_TRUE(isNear(colour, patches[i], 3)) << "patch " << i << " is " << words(colour);
         }
     }

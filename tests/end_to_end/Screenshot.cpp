@@ -52,7 +52,8 @@ int Screenshot::number(const Coded& coded) const
     const int perRow = coded.width >= 640 ? 16 : 8;
     int number = 0;
     for (int i = 0; i < 16; ++i) {
-        const QColor middle = at(coded, 24 + 38 * (i % perRow), 24 + 38 * static_cast<double>(i / perRow));
+        const int row = i / perRow;
+        const QColor middle = at(coded, 24 + 38 * (i % perRow), 24 + 38 * row);
         number |= (qGray(middle.rgb()) > 125) << i;
     }
     return number;

@@ -11,7 +11,6 @@
 #include <utility>
 
 using platform::Button;
-using platform::Touch;
 using platform::View;
 using runtime::Selector;
 

@@ -8,8 +8,6 @@ using testing::HasSubstr;
 
 namespace {
 
-using base::MediaTime;
-
 /// Whether all that is asked for is answered, once, and from where.
 using ImageAnswers = tests::ImageTest;
 

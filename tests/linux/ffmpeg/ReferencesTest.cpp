@@ -9,7 +9,6 @@
 #include <vector>
 
 using testing::Contains;
-using testing::Not;
 using testing::UnorderedElementsAre;
 
 namespace {
@@ -167,7 +166,7 @@ TEST_F(References, LetNothingBeReplacedThatIsNeededHoweverShortTheLookAhead)
     for (const char* name : {"refs-recorder.mp4", "refs-strict.mp4", "refs-deep.mp4", "refs-temporal.mp4"}) {
         const auto pictures = all(name);
         const auto needed = neededForTheLast(pictures, 74);
-        for (const std::size_t enough : {1, 2, 3, 4, 5, 8, 17, 60}) {
+        for (const std::size_t enough : {1U, 2U, 3U, 4U, 5U, 8U, 17U, 60U}) {
             const auto reader = demuxer(name);
             ffmpeg::PacketsAhead ahead(reader->stream(0), enough);
             std::size_t at = 0;
@@ -191,9 +190,9 @@ protected:
     void SetUp() override
     {
         ffmpeg::BitWriter sps;
-        for (const std::uint32_t byte : {0x67, 77, 0, 30})
+        for (const std::uint32_t byte : {0x67U, 77U, 0U, 30U})
             sps.bits(byte, 8);
-        for (const std::uint32_t value : {0, 0, 0, 4, 4}) // 4 bits of numbers, 8 of the order, 4 references
+        for (const std::uint32_t value : {0U, 0U, 0U, 4U, 4U}) // 4 bits of numbers, 8 of the order, 4 references
             sps.ue(value);
         sps.bit(0);
         sps.ue(19);

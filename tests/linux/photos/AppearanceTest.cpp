@@ -158,8 +158,8 @@ TEST_F(ASavedMovie, IsSavedAllTheSameWithoutAPicture)
 
 TEST_F(ASavedMovie, IsSavedAllTheSameWithAPictureThatIsNone)
 {
-    for (auto wrong : {picture(257, 10), picture(10, 257), platform::Bitmap{10, 10, {1, 2, 3}}, platform::Bitmap{},
-                       platform::Bitmap{0, 10, {}}, platform::Bitmap{10, 0, {}}}) {
+    for (const auto& wrong : {picture(257, 10), picture(10, 257), platform::Bitmap{10, 10, {1, 2, 3}},
+                              platform::Bitmap{}, platform::Bitmap{0, 10, {}}, platform::Bitmap{10, 0, {}}}) {
         bitmap = wrong;
         EXPECT_TRUE(saveWithPicture().success);
     }

@@ -12,9 +12,7 @@
 
 namespace {
 
-using testing::ElementsAre;
 using testing::HasSubstr;
-using testing::IsEmpty;
 using tests::namesIn;
 using tests::PrivateDirectory;
 namespace fs = std::filesystem;

@@ -10,8 +10,6 @@
 
 namespace {
 
-using testing::ElementsAre;
-using testing::IsEmpty;
 namespace fs = std::filesystem;
 
 class ASaveThatIsKilled : public tests::LibraryFixture, public testing::WithParamInterface<bool> {

@@ -135,7 +135,7 @@ TEST_F(UnsavedMovie, IsOnTheDiskBeforeItsNameIs)
         std::vector<std::string> flushed;
         tests::systemCalls().flushing = [&](int file) -> std::optional<ssize_t> {
             const std::string open = fs::read_symlink("/proc/self/fd/" + std::to_string(file)).native();
-            flushed.push_back(open == source ? "the movie" : open == first ? "its place" : "a copy");
+            flushed.emplace_back(open == source ? "the movie" : open == first ? "its place" : "a copy");
             return std::nullopt;
         };
         saveKeeping();

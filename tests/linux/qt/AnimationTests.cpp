@@ -153,8 +153,8 @@ TEST_F(Animations, ChildrenBeyondTheirParentFadeWithIt)
         for (int x = 0; x < 200; ++x) {
             const QColor full = before.pixelColor(x, y);
             const QColor shown = half.pixelColor(x, y);
-            ASSERT_NEAR(shown.red(), full.red() / 2, 2) << x << "," << y;
-            ASSERT_NEAR(shown.blue(), full.blue() / 2, 2) << x << "," << y;
+            ASSERT_NEAR(shown.red(), full.red() / 2.0, 2) << x << "," << y;
+            ASSERT_NEAR(shown.blue(), full.blue() / 2.0, 2) << x << "," << y;
         }
     parent->setAlpha(1);
     EXPECT_EQ(look(), before);
@@ -172,7 +172,8 @@ TEST_F(AnimationsAtTwo, AFadeStaysSharp)
     const QImage half = look();
     for (int y = 0; y < 200; ++y)
         for (int x = 0; x < 400; ++x)
-            ASSERT_NEAR(half.pixelColor(x, y).green(), (255 + before.pixelColor(x, y).green()) / 2, 2) << x << "," << y;
+            ASSERT_NEAR(half.pixelColor(x, y).green(), (255 + before.pixelColor(x, y).green()) / 2.0, 2)
+                << x << "," << y;
 }
 
 } // namespace

@@ -11,7 +11,6 @@ using platform::Bitmap;
 using platform::BlendMode;
 using platform::Canvas;
 using platform::Image;
-using testing::ElementsAre;
 using Pixel = std::array<int, 4>;
 
 Pixel at(const platform::ImageRef& image, int x, int y)

@@ -3,7 +3,6 @@
 namespace {
 
 using base::Rect;
-using platform::MovieScrubber;
 using testing::ElementsAre;
 using testing::IsEmpty;
 using tests::Scrubbers;
