@@ -19,6 +19,11 @@ bool isControl(std::string_view character)
 
 } // namespace
 
+char lowercase(char character)
+{
+    return character >= 'A' && character <= 'Z' ? static_cast<char>(character - 'A' + 'a') : character;
+}
+
 std::size_t characterLength(std::string_view text)
 {
     const auto byte = [text](std::size_t i) { return static_cast<unsigned char>(text[i]); };

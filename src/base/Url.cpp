@@ -1,5 +1,7 @@
 #include "base/Url.h"
 
+#include "base/Text.h"
+
 #include <utility>
 
 namespace base {
@@ -15,11 +17,6 @@ bool isLetter(char character)
 bool isLetterOrDigit(char character)
 {
     return isLetter(character) || (character >= '0' && character <= '9');
-}
-
-char lowered(char character)
-{
-    return character >= 'A' && character <= 'Z' ? static_cast<char>(character - 'A' + 'a') : character;
 }
 
 std::string encoded(std::string_view path)
@@ -82,7 +79,7 @@ std::optional<Url> Url::fromString(std::string_view text)
     for (const char character : text.substr(0, colon)) {
         if (!isLetterOrDigit(character) && character != '+' && character != '-' && character != '.')
             return std::nullopt;
-        scheme += lowered(character);
+        scheme += lowercase(character);
     }
     const std::string_view rest = text.substr(colon + 1);
     if (scheme == "file") {

@@ -16,6 +16,14 @@ TEST(Text, PrintsNothingThatATerminalWouldObey)
     EXPECT_EQ(base::printable(std::string_view("a\0b", 3)), "a?b");
 }
 
+TEST(Text, KnowsTheSmallLettersOfAsciiInEveryLocale)
+{
+    for (const auto& [letter, small] :
+         {std::pair('A', 'a'), {'I', 'i'}, {'Z', 'z'}, {'@', '@'}, {'[', '['}, {'z', 'z'}})
+        EXPECT_EQ(base::lowercase(letter), small) << letter;
+    EXPECT_EQ(base::lowercase('\xC4'), '\xC4');
+}
+
 TEST(Text, CountsCharactersAndNotBytes)
 {
     EXPECT_EQ(base::characterCount(""), 0U);

@@ -123,7 +123,7 @@ base::Result<std::string> editorDirectoriesRoot()
     if (const std::string home = environmentPath("HOME"); !home.empty())
         return home + "/.cache/clipsa";
     const passwd* user = ::getpwuid(::geteuid()); // NOLINT(concurrency-mt-unsafe): asked once, before any thread
-    if (user && user->pw_dir && user->pw_dir[0] == '/')
+    if (user && user->pw_dir[0] == '/')
         return std::string(user->pw_dir) + "/.cache/clipsa";
     return base::Error::make(base::kPosixErrorDomain, ENOENT, "there is no home directory; set XDG_CACHE_HOME");
 }

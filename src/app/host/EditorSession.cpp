@@ -38,7 +38,6 @@ struct EditorSession::State final : QObject {
     {
         if (request.attachment || !request.attachmentPath.empty())
             attachment = std::make_shared<Promise>();
-        timer.setSingleShot(true);
         connect(&timer, &QTimer::timeout, this, &State::whenTimeIsUp);
     }
 

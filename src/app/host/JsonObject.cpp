@@ -2,6 +2,7 @@
 
 #include "base/Text.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
 #include <cstddef>
@@ -35,7 +36,7 @@ std::string quoted(std::string_view text)
         } else {
             result += text.substr(at, length);
         }
-        at += length > 0 ? length : 1;
+        at += std::max<std::size_t>(length, 1);
     }
     return result + "\"";
 }

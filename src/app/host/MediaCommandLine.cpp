@@ -1,6 +1,7 @@
 #include "app/host/MediaCommandLine.h"
 
 #include "app/host/Words.h"
+#include "base/Text.h"
 
 #include <algorithm>
 #include <cstdint>
@@ -62,9 +63,7 @@ base::Result<void> expectNameOfMp4(const std::string& command, const std::string
                                                    ".m2ts", ".mka", ".mkv", ".mpeg", ".mpg", ".mts",  ".mxf",
                                                    ".ogg",  ".ogv", ".ts",  ".webm", ".wmv", ".y4m"};
     std::string extension = output.substr(std::min(output.rfind('.'), output.size()));
-    for (char& each : extension)
-        if (each >= 'A' && each <= 'Z')
-            each = static_cast<char>(each - 'A' + 'a');
+    std::transform(extension.begin(), extension.end(), extension.begin(), base::lowercase);
     if (std::find(std::begin(kOthers), std::end(kOthers), extension) == std::end(kOthers))
         return {};
     return usageError(command + " writes an MP4 movie, and " + output

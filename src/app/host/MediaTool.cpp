@@ -6,6 +6,7 @@
 #include "app/host/TerminationSignals.h"
 #include "linux/dbus/EditRequest.h"
 #include "linux/ffmpeg/FFmpegMediaFramework.h"
+#include "linux/posix/Event.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -14,7 +15,6 @@
 #include <filesystem>
 #include <optional>
 #include <poll.h>
-#include <sys/eventfd.h>
 
 namespace host {
 
@@ -33,12 +33,12 @@ int milliseconds(base::Instant time)
 
 struct MediaTool::Machine {
     TerminationWatch signals;
-    posix::FileDescriptor woken{::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)};
+    posix::Event woken;
 
     base::SystemClock clock;
     base::MemoryLog log;
     std::size_t told = 0; ///< lines of it
-    base::MainQueue mainQueue{clock, [this] { ::eventfd_write(woken.get(), 1); }};
+    base::MainQueue mainQueue{clock, [this] { woken.happen(); }};
     base::WorkerQueue background;
     base::WorkerQueue standard;
     base::System system{log, clock, mainQueue, background, standard};
@@ -48,18 +48,17 @@ struct MediaTool::Machine {
 
     Machine()
     {
-        works.setChangeHandler([this] { ::eventfd_write(woken.get(), 1); });
+        works.setChangeHandler([this] { woken.happen(); });
     }
 
     void wait(std::optional<base::Instant> limit)
     {
         // Who was interrupted only finishes what is under way, and is woken by that alone.
         const bool isInterrupted = signals.arrived() != 0;
-        pollfd inputs[] = {{woken.get(), POLLIN, 0}, {isInterrupted ? -1 : signals.descriptor(), POLLIN, 0}};
+        pollfd inputs[] = {{woken.descriptor(), POLLIN, 0}, {isInterrupted ? -1 : signals.descriptor(), POLLIN, 0}};
         if (::poll(inputs, std::size(inputs), limit ? milliseconds(*limit) : -1) <= 0)
             return;
-        eventfd_t ignored = 0;
-        ::eventfd_read(woken.get(), &ignored);
+        woken.forget();
     }
 };
 
@@ -161,9 +160,8 @@ void MediaTool::finishWork(const std::function<void()>& giveUp, const std::funct
         giveUp();
     // Whatever signals come.
     while (!machine.works.isEmpty()) {
+        machine.wait(machine.mainQueue.untilNext());
         machine.mainQueue.runDue();
-        if (!machine.works.isEmpty())
-            machine.wait(machine.mainQueue.untilNext());
     }
     machine.mainQueue.drain();
 }

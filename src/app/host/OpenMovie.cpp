@@ -35,8 +35,7 @@ void printObject(const std::vector<std::string>& activityTypes, const SavedMovie
     JsonObject object;
     object.addTexts("activityTypes", activityTypes).add("movie", movie);
     object.addTexts("saved", movies.saved).addTexts("unsaved", movies.unsaved);
-    std::printf("%s\n", object.text().c_str());
-    std::fflush(stdout);
+    std::puts(object.text().c_str());
 }
 
 void take(const dbus::MovieNote& note, SavedMovies& movies)

@@ -4,9 +4,14 @@
 #include "linux/dbus/EditRequest.h"
 #include "linux/dbus/Protocol.h"
 
+#include <algorithm>
+#include <cstddef>
+
 namespace host {
 
 namespace {
+
+constexpr std::size_t kLongestExtension = 16; // bytes, with the dot: longer ones are none
 
 bool isControl(char character)
 {
@@ -23,7 +28,7 @@ template <typename Replace> std::string rewritten(std::string_view text, std::si
         if (result.size() + piece.size() > limit)
             break;
         result += piece;
-        text.remove_prefix(length == 0 ? 1 : length);
+        text.remove_prefix(std::max<std::size_t>(length, 1));
     }
     return result;
 }
@@ -48,11 +53,11 @@ std::string safeFileName(std::string_view name, std::string_view fallback)
     name.remove_prefix(name.rfind('/') + 1);
     // What does not fit goes from the stem: the extension says what kind of file it is.
     const std::size_t dot = name.rfind('.');
-    const bool hasExtension = dot != std::string_view::npos && name.size() - dot <= 16;
+    const bool hasExtension = dot != std::string_view::npos && name.size() - dot <= kLongestExtension;
     const auto plain = [](std::string_view character) {
         return isControl(character.front()) ? std::string_view("_") : character;
     };
-    const std::string extension = hasExtension ? rewritten(name.substr(dot), 32, plain) : "";
+    const std::string extension = hasExtension ? rewritten(name.substr(dot), kLongestExtension, plain) : "";
     std::string safe = rewritten(hasExtension ? name.substr(0, dot) : name, 255 - extension.size(), plain) + extension;
     return safe.empty() || safe == "." || safe == ".." ? std::string(fallback) : safe;
 }

@@ -93,8 +93,9 @@ base::Result<std::string> publish(MediaTool& tool, const std::string& path, phot
     return published;
 }
 
-base::Result<std::string> save(MediaTool& tool, const SaveCommand& command, ProgressBar& progress)
+base::Result<std::string> save(MediaTool& tool, const SaveCommand& command)
 {
+    ProgressBar progress("Saving");
     const auto asset = tool.open(command.movie);
     if (!asset)
         return asset.error();
@@ -143,9 +144,7 @@ double partOfSave(double mixed, double copied)
 int saveMovie(const SaveCommand& command)
 {
     MediaTool tool;
-    ProgressBar progress("Saving");
-    const auto saved = save(tool, command, progress);
-    progress.clear();
+    const auto saved = save(tool, command);
     if (!saved)
         return tool.fail(saved.error());
     tool.tellLog(base::MemoryLog::Line::Kind::Error); // what the library could not do beside it

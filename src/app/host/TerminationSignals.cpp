@@ -5,7 +5,6 @@
 #include <csignal>
 #include <iterator>
 #include <poll.h>
-#include <sys/eventfd.h>
 #include <sys/signalfd.h>
 #include <unistd.h>
 #include <utility>
@@ -26,23 +25,19 @@ posix::FileDescriptor blockAndOpenSignals()
 
 } // namespace
 
-TerminationWatch::TerminationWatch()
-    : m_signals(blockAndOpenSignals()), m_told(::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)),
-      m_ending(::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)), m_thread([this] { run(); })
-{
-}
+TerminationWatch::TerminationWatch() : m_signals(blockAndOpenSignals()), m_thread([this] { run(); }) {}
 
 TerminationWatch::~TerminationWatch()
 {
     m_affinity.assertHere();
-    ::eventfd_write(m_ending.get(), 1);
+    m_ending.happen();
     m_thread.join();
 }
 
 void TerminationWatch::run()
 {
     for (;;) {
-        pollfd inputs[] = {{m_ending.get(), POLLIN, 0}, {m_signals.get(), POLLIN, 0}};
+        pollfd inputs[] = {{m_ending.descriptor(), POLLIN, 0}, {m_signals.get(), POLLIN, 0}};
         ::poll(inputs, std::size(inputs), -1);
         if (inputs[0].revents != 0)
             return;
@@ -53,7 +48,7 @@ void TerminationWatch::run()
         if (m_arrived != 0)
             ::_exit(128 + number); // whatever the others are waiting for
         m_arrived = number;
-        ::eventfd_write(m_told.get(), 1);
+        m_told.happen();
     }
 }
 

@@ -4,6 +4,7 @@
 #pragma once
 
 #include "base/Affinity.h"
+#include "linux/posix/Event.h"
 #include "linux/posix/FileDescriptor.h"
 
 #include <atomic>
@@ -30,7 +31,7 @@ public:
     int descriptor() const
     {
         m_affinity.assertHere();
-        return m_told.get();
+        return m_told.descriptor();
     }
 
 private:
@@ -39,8 +40,8 @@ private:
     base::Affinity m_affinity;
     std::atomic<int> m_arrived = 0;
     posix::FileDescriptor m_signals;
-    posix::FileDescriptor m_told;
-    posix::FileDescriptor m_ending;
+    posix::Event m_told;
+    posix::Event m_ending;
     std::thread m_thread;
 };
 

@@ -15,8 +15,9 @@ base::ErrorRef usageError(const std::string& text)
 std::optional<std::int32_t> wholeNumber(const std::string& text)
 {
     std::int32_t number = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
-    if (error != std::errc() || end != text.data() + text.size() || number < 0)
+    const char* const end = text.data() + text.size();
+    const auto [rest, error] = std::from_chars(text.data(), end, number);
+    if (error != std::errc() || rest != end || number < 0)
         return std::nullopt;
     return number;
 }

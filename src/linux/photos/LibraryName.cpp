@@ -1,5 +1,7 @@
 #include "linux/photos/LibraryName.h"
 
+#include "base/Text.h"
+
 #include <algorithm>
 #include <array>
 #include <ctime>
@@ -51,7 +53,7 @@ std::string extensionOf(std::string_view path)
     const bool isPlain = std::all_of(extension.begin(), extension.end(), [](char c) { return g_ascii_isalnum(c); });
     if (extension.empty() || extension.size() > kLongestExtension || !isPlain)
         return ".mp4";
-    std::transform(extension.begin(), extension.end(), extension.begin(), [](char c) { return g_ascii_tolower(c); });
+    std::transform(extension.begin(), extension.end(), extension.begin(), base::lowercase);
     return "." + extension;
 }
 

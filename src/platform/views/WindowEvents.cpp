@@ -1,10 +1,10 @@
 // What a window does with fingers, keys and shakes.
 #include "platform/views/Window.h"
 
+#include "base/Text.h"
 #include "platform/views/GestureRecognizer.h"
 
 #include <algorithm>
-#include <cctype>
 #include <utility>
 
 namespace platform {
@@ -47,9 +47,8 @@ bool concernsFocus(Key key)
 
 bool matches(const KeyCommand& command, Key key, char character, bool control)
 {
-    const auto lower = [](char each) { return std::tolower(static_cast<unsigned char>(each)); };
     return command.key == key && command.control == control
-           && (key != Key::Character || lower(command.character) == lower(character));
+           && (key != Key::Character || base::lowercase(command.character) == base::lowercase(character));
 }
 
 } // namespace

@@ -6,6 +6,7 @@
 #include "support/Child.h"
 #include "support/EventLoop.h"
 #include "support/RefusedSystemCalls.h"
+#include "support/SignalMask.h"
 
 #include <gmock/gmock.h>
 
@@ -132,8 +133,8 @@ TEST_F(AnEditorsProcess, IsNotReachedByTheKeysOfItsHostsTerminalAndHearsItsSigna
     sigset_t blocked = {};
     ::sigaddset(&blocked, SIGINT);
     ::sigaddset(&blocked, SIGUSR1);
-    sigset_t before = {};
-    ::pthread_sigmask(SIG_BLOCK, &blocked, &before);
+    std::optional<tests::SignalMask> before(std::in_place);
+    ::pthread_sigmask(SIG_BLOCK, &blocked, nullptr);
     std::vector<sighandler_t> handlers;
     for (const int number : {SIGINT, SIGTERM, SIGHUP, SIGPIPE})
         handlers.push_back(std::signal(number, SIG_IGN));
@@ -141,7 +142,7 @@ TEST_F(AnEditorsProcess, IsNotReachedByTheKeysOfItsHostsTerminalAndHearsItsSigna
         "echo $$ >\"$0/process\"");
     for (std::size_t i = 0; const int number : {SIGINT, SIGTERM, SIGHUP, SIGPIPE})
         std::signal(number, handlers[i++]);
-    ::pthread_sigmask(SIG_SETMASK, &before, nullptr);
+    before.reset();
     const std::string signals = read("signals");
     EXPECT_THAT(signals, StartsWith("SigBlk:\t0000000000000000\nSigIgn:\t"));
     const auto ignored = std::stoull(signals.substr(signals.rfind('\t')), nullptr, 16);

@@ -13,6 +13,7 @@
 
 #include <csignal>
 #include <fcntl.h>
+#include <fstream>
 #include <optional>
 #include <sys/stat.h>
 #include <thread>
@@ -111,6 +112,9 @@ TEST_F(AnEditorsSession, LeavesNothingBehindInItsPlace)
 TEST_F(AnEditorsSession, DoesNotWaitForACopyThatNobodyNeedsAnyMore)
 {
     m_place.editorProgram = "/bin/false";
+    const std::filesystem::path dead = std::filesystem::path(m_place.directoriesRoot) / "editor-dead";
+    std::filesystem::create_directories(dead);
+    std::ofstream(dead / "lock").flush();
     // There is no way but to copy, for this thread.
     const std::unique_ptr<QThread> thread(QThread::create([this] {
         tests::refuseSystemCalls({{SYS_linkat, EXDEV}, tests::noReflinks()});
@@ -122,6 +126,7 @@ TEST_F(AnEditorsSession, DoesNotWaitForACopyThatNobodyNeedsAnyMore)
     ASSERT_TRUE(m_outcome);
     EXPECT_FALSE(m_outcome->error) << "that the copy was stopped is not why it ended";
     EXPECT_EQ(m_outcome->words(), "the editor ended early, with exit status 1");
+    EXPECT_FALSE(std::filesystem::exists(dead)) << "what comes behind the copy is waited for";
 }
 
 TEST_F(AnEditorsSession, IsClosedByItsOwner)

@@ -1,9 +1,10 @@
 // The loop of a command without a window: it sleeps until there is something to do, and then does it.
 #include "app/host/MediaTool.h"
 
+#include "support/SignalMask.h"
+
 #include <gtest/gtest.h>
 
-#include <csignal>
 #include <future>
 #include <optional>
 
@@ -11,12 +12,6 @@ namespace {
 
 class ATool : public ::testing::Test {
 protected:
-    ~ATool() override
-    {
-        m_tool.reset();
-        ::pthread_sigmask(SIG_SETMASK, &m_signals, nullptr);
-    }
-
     /// How often the loop has looked whether it is done.
     int looksUntil(const bool& done, const std::function<void()>& meanwhile = {})
     {
@@ -26,15 +21,7 @@ protected:
     }
 
 private:
-    static sigset_t blocked()
-    {
-        sigset_t signals;
-        ::pthread_sigmask(SIG_SETMASK, nullptr, &signals);
-        return signals;
-    }
-
-    /// What the other tests find blocked: a tool blocks some of its process's signals for good.
-    const sigset_t m_signals = blocked();
+    const tests::SignalMask m_mask;
 
 protected:
     std::optional<host::MediaTool> m_tool{std::in_place};
@@ -90,7 +77,9 @@ TEST_F(ATool, DoesWhatIsToBeDoneMeanwhileNowAndThen)
 {
     int times = 0;
     bool enough = false;
+    const base::Instant begin = m_tool->system().clock.now();
     EXPECT_LE(looksUntil(enough, [&] { enough = ++times == 3; }), 8);
+    EXPECT_GE(m_tool->system().clock.now() - begin, std::chrono::milliseconds(200)) << "ten times a second";
 }
 
 } // namespace

@@ -109,12 +109,16 @@ TEST_F(MediaTools, LeaveThumbnailsInADirectory)
 TEST_F(MediaTools, DoNotReplaceThumbnailsUnlessTold)
 {
     fs::create_directories(folder);
+    for (const std::string mine : {"0_00-00-00.000.png", "1_00-00-02.000.png"}) {
+        std::ofstream(folder / mine) << "mine";
+        EXPECT_EQ(run({"thumbnails", movie("clock.mp4"), "-n", "2", "-o", folder}), 2);
+        EXPECT_THAT(errors, HasSubstr(mine + " is there already; give --force"));
+        EXPECT_EQ(lines(errors), 1);
+        EXPECT_THAT(files(), ElementsAre(mine)) << "nothing is begun";
+        EXPECT_EQ(tests::PrivateDirectory::read(folder / mine), "mine");
+        fs::remove(folder / mine);
+    }
     std::ofstream(folder / "1_00-00-02.000.png") << "mine";
-    EXPECT_EQ(run({"thumbnails", movie("clock.mp4"), "-n", "2", "-o", folder}), 2);
-    EXPECT_THAT(errors, HasSubstr("1_00-00-02.000.png is there already; give --force"));
-    EXPECT_EQ(lines(errors), 1);
-    EXPECT_THAT(files(), ElementsAre("1_00-00-02.000.png")) << "nothing is begun";
-    EXPECT_EQ(tests::PrivateDirectory::read(folder / "1_00-00-02.000.png"), "mine");
     EXPECT_EQ(run({"thumbnails", movie("clock.mp4"), "-n", "2", "-o", folder, "--force"}), 0) << errors;
     EXPECT_THAT(files(), ElementsAre("0_00-00-00.000.png", "1_00-00-02.000.png"));
     EXPECT_THAT(tests::PrivateDirectory::read(folder / "1_00-00-02.000.png"), HasSubstr("PNG"));

@@ -10,6 +10,7 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
+#include <utility>
 
 using testing::HasSubstr;
 using testing::IsEmpty;
@@ -124,6 +125,12 @@ TEST_F(Preparing, LooksAtADescriptorAndNotAtItsName)
     EXPECT_THAT(refusal(descriptor(m_directory.path())), HasSubstr("directory"));
     EXPECT_THAT(refusal(descriptor("/dev/null")), HasSubstr("not a regular file"));
     EXPECT_THAT(refusal(descriptor(m_directory.write("empty", ""))), HasSubstr("empty"));
+    int ends[2] = {};
+    ASSERT_EQ(::pipe2(ends, O_CLOEXEC), 0);
+    const posix::FileDescriptor writing(ends[1]);
+    dbus::EditRequest pipe;
+    pipe.movie = posix::FileDescriptor(ends[0]); // which has no flags at all
+    EXPECT_THAT(refusal(std::move(pipe)), HasSubstr("not a regular file"));
 }
 
 TEST_F(Preparing, NamesADescriptorByItsFirstBytes)
