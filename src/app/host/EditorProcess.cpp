@@ -54,6 +54,20 @@ std::vector<std::string> environmentWith(const std::vector<std::pair<std::string
     return environment;
 }
 
+struct FileActions : posix_spawn_file_actions_t {
+    FileActions() { ::posix_spawn_file_actions_init(this); }
+    ~FileActions() { ::posix_spawn_file_actions_destroy(this); }
+    FileActions(const FileActions&) = delete;
+    FileActions& operator=(const FileActions&) = delete;
+};
+
+struct Attributes : posix_spawnattr_t {
+    Attributes() { ::posix_spawnattr_init(this); }
+    ~Attributes() { ::posix_spawnattr_destroy(this); }
+    Attributes(const Attributes&) = delete;
+    Attributes& operator=(const Attributes&) = delete;
+};
+
 /// 0 or an error number.
 int spawn(const ProcessStart& start, pid_t& pid)
 {
@@ -61,8 +75,7 @@ int spawn(const ProcessStart& start, pid_t& pid)
     arguments.insert(arguments.end(), start.arguments.begin(), start.arguments.end());
     const std::vector<std::string> environment = environmentWith(start.environment);
 
-    posix_spawn_file_actions_t files;
-    ::posix_spawn_file_actions_init(&files);
+    FileActions files;
     ::posix_spawn_file_actions_addopen(&files, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
     ::posix_spawn_file_actions_adddup2(&files, STDERR_FILENO, STDOUT_FILENO);
     if (start.lock)
@@ -70,10 +83,8 @@ int spawn(const ProcessStart& start, pid_t& pid)
     if (start.report)
         ::posix_spawn_file_actions_adddup2(&files, *start.report, dbus::kEditorReportDescriptor);
 
-    posix_spawnattr_t attributes;
-    ::posix_spawnattr_init(&attributes);
+    Attributes attributes; // the process group is a new one unless another is named
     ::posix_spawnattr_setflags(&attributes, POSIX_SPAWN_SETPGROUP | POSIX_SPAWN_SETSIGMASK | POSIX_SPAWN_SETSIGDEF);
-    ::posix_spawnattr_setpgroup(&attributes, 0);
     sigset_t signals;
     ::sigemptyset(&signals);
     ::posix_spawnattr_setsigmask(&attributes, &signals);
@@ -81,11 +92,8 @@ int spawn(const ProcessStart& start, pid_t& pid)
         ::sigaddset(&signals, number);
     ::posix_spawnattr_setsigdefault(&attributes, &signals);
 
-    const int result = ::posix_spawn(&pid, start.program.c_str(), &files, &attributes, pointersTo(arguments).data(),
-                                     pointersTo(environment).data());
-    ::posix_spawnattr_destroy(&attributes);
-    ::posix_spawn_file_actions_destroy(&files);
-    return result;
+    return ::posix_spawn(&pid, start.program.c_str(), &files, &attributes, pointersTo(arguments).data(),
+                         pointersTo(environment).data());
 }
 
 bool isProgram(const std::string& path)
@@ -103,24 +111,28 @@ std::string ProcessEnd::words() const
 }
 
 struct EditorProcess::State {
-    pid_t pid = 0;
-    posix::FileDescriptor descriptor;
+    posix::FileDescriptor descriptor; ///< of the process, and of none that gets its number later
     std::function<void(ProcessEnd)> ended;
     std::optional<QSocketNotifier> notifier;
-    bool running = true;
 
-    void reap()
+    /// Does nothing once it has ended.
+    void signal(int number) const { ::pidfd_send_signal(descriptor.get(), number, nullptr, 0); }
+
+    /// Nothing when that was told before.
+    std::optional<ProcessEnd> waitForEnd() const
     {
-        int status = 0;
-        static_cast<void>(TEMP_FAILURE_RETRY(::waitpid(pid, &status, 0)));
-        running = false;
-        ProcessEnd end;
-        if (WIFSIGNALED(status))
-            end.signal = WTERMSIG(status);
-        else
-            end.exitStatus = WEXITSTATUS(status);
-        if (const auto handler = std::exchange(ended, {}))
-            handler(end); // may destroy us
+        siginfo_t end = {};
+        if (TEMP_FAILURE_RETRY(::waitid(P_PIDFD, static_cast<id_t>(descriptor.get()), &end, WEXITED)) != 0)
+            return std::nullopt;
+        return end.si_code == CLD_EXITED ? ProcessEnd{end.si_status, 0} : ProcessEnd{0, end.si_status};
+    }
+
+    void hasEnded()
+    {
+        notifier.reset();
+        const auto handler = std::exchange(ended, {});
+        if (const auto end = waitForEnd(); end && handler)
+            handler(*end); // may destroy us
     }
 };
 
@@ -129,44 +141,38 @@ EditorProcess::EditorProcess(std::unique_ptr<State> state) : m_state(std::move(s
 EditorProcess::~EditorProcess()
 {
     m_affinity.assertHere();
-    m_state->ended = {};
-    if (m_state->running) {
-        signal(SIGKILL);
-        m_state->reap();
-    }
+    m_state->signal(SIGKILL);
+    m_state->waitForEnd();
 }
 
 base::Result<std::unique_ptr<EditorProcess>> EditorProcess::start(const ProcessStart& start,
                                                                   std::function<void(ProcessEnd)> ended)
 {
-    auto state = std::make_unique<State>();
-    if (const int error = spawn(start, state->pid); error != 0)
+    pid_t pid = 0;
+    if (const int error = spawn(start, pid); error != 0)
         return base::Error::fromErrno(error, "cannot start " + start.program);
+    auto state = std::make_unique<State>();
     state->ended = std::move(ended);
-    state->descriptor = posix::FileDescriptor(::pidfd_open(state->pid, 0));
+    state->descriptor = posix::FileDescriptor(::pidfd_open(pid, 0));
     if (!state->descriptor) {
         const auto error = base::Error::fromErrno(errno, "cannot watch " + start.program);
-        ::kill(state->pid, SIGKILL);
-        ::waitpid(state->pid, nullptr, 0);
+        ::kill(pid, SIGKILL);
+        ::waitpid(pid, nullptr, 0);
         return error;
     }
-    ::fcntl(state->descriptor.get(), F_SETFD, FD_CLOEXEC);
     state->notifier.emplace(state->descriptor.get(), QSocketNotifier::Read);
     State* const plain = state.get();
-    QObject::connect(&*state->notifier, &QSocketNotifier::activated, &*state->notifier, [plain] {
-        plain->notifier->setEnabled(false);
-        // Out of the notifier's own signal, because the handler may destroy it.
-        QMetaObject::invokeMethod(
-            &*plain->notifier, [plain] { plain->reap(); }, Qt::QueuedConnection);
-    });
+    // Out of the notifier's own signal, which ends it.
+    QObject::connect(
+        &*state->notifier, &QSocketNotifier::activated, &*state->notifier, [plain] { plain->hasEnded(); },
+        Qt::QueuedConnection);
     return std::unique_ptr<EditorProcess>(new EditorProcess(std::move(state)));
 }
 
 void EditorProcess::signal(int number)
 {
     m_affinity.assertHere();
-    if (m_state->running)
-        ::pidfd_send_signal(m_state->descriptor.get(), number, nullptr, 0);
+    m_state->signal(number);
 }
 
 base::Result<std::string> findEditorProgram()

@@ -38,6 +38,7 @@ struct EditorSession::State final : QObject {
     {
         if (request.attachment || !request.attachmentPath.empty())
             attachment = std::make_shared<Promise>();
+        timer.setSingleShot(true);
         connect(&timer, &QTimer::timeout, this, &State::whenTimeIsUp);
     }
 
@@ -76,23 +77,23 @@ base::Result<void> EditorSession::State::start()
     const auto socket = directory.socketPath();
     if (!socket)
         return socket.error();
-    auto listening = dbus::HostConnection::listen(
-        socket.value(), payloadItems(request, movie, attachment),
-        {.editorConnected = {},
-         .finished =
-             [this](std::vector<std::string> activityTypes) {
-                 outcome.activityTypes = std::move(activityTypes);
-                 tellNotes();
-                 // Later, because closing destroys what calls us.
-                 QMetaObject::invokeMethod(this, &State::close, Qt::QueuedConnection);
-                 if (handlers.finished)
-                     handlers.finished(*outcome.activityTypes);
-             },
-         .disconnected =
-             [this] {
-                 // Its process should go too, but something can hold it up.
-                 QMetaObject::invokeMethod(this, processEnd ? &State::end : &State::close, Qt::QueuedConnection);
-             }});
+    auto listening =
+        dbus::HostConnection::listen(socket.value(), payloadItems(request, movie, attachment),
+                                     {.editorConnected = {},
+                                      .finished =
+                                          [this](std::vector<std::string> activityTypes) {
+                                              outcome.activityTypes = std::move(activityTypes);
+                                              tellNotes();
+                                              // Later, because closing destroys what calls us.
+                                              QMetaObject::invokeMethod(this, &State::close, Qt::QueuedConnection);
+                                              if (handlers.finished)
+                                                  handlers.finished(*outcome.activityTypes);
+                                          },
+                                      .disconnected =
+                                          [this] {
+                                              // Its process should go too, but something can hold it up.
+                                              QMetaObject::invokeMethod(this, &State::close, Qt::QueuedConnection);
+                                          }});
     if (!listening)
         return listening.error();
     connection = std::move(listening).value();
@@ -155,7 +156,7 @@ void EditorSession::State::whenTimeIsUp()
 {
     if (processEnd) {
         // Not inside the timer that it destroys.
-        QMetaObject::invokeMethod(this, waitsForFiles ? &State::leave : &State::end, Qt::QueuedConnection);
+        QMetaObject::invokeMethod(this, waitsForFiles ? &State::leave : &State::close, Qt::QueuedConnection);
         return;
     }
     // One that has something to finish, a save for example, takes as long as that takes.
@@ -190,7 +191,6 @@ void EditorSession::State::end()
 {
     if (std::exchange(waitsForFiles, true))
         return;
-    files->cancel();
     if (filesAreDone)
         leave();
     else

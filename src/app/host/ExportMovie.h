@@ -12,7 +12,7 @@ struct ExportOrder {
     std::string doing; ///< what the progress bar says: "Trimming"
     std::string movie;
     std::string output;
-    bool force = false; ///< replaces a file that is there
+    bool force; ///< replaces a file that is there
     /// What is exported; called once the movie is open.
     std::function<void(platform::ExportSession& session, const platform::Asset& asset)> setUp;
 };

@@ -211,6 +211,12 @@ TEST_F(EditorDirectories, HaveALockThatNobodyElseCanTake)
 TEST_F(EditorDirectories, ALongPathGetsItsSocketElsewhere)
 {
     EXPECT_EQ(make().socketPath().value().rfind(m_root.native(), 0), 0U);
+    const std::string parent = m_directory.path().native() + "/";
+    const std::size_t rest = make().socketPath().value().size() - m_root.native().size();
+    for (const std::size_t more : {0U, 1U}) {
+        m_root = parent + std::string(dbus::HostConnection::kMaximumPathSize - rest - parent.size() + more, 'x');
+        EXPECT_EQ(make().socketPath().value().starts_with(m_root.native()), more == 0) << "the longest, and one more";
+    }
 
     m_root = m_directory.path() / std::string(120, 'x') / "clipsa";
     tests::PrivateDirectory runtime;

@@ -200,15 +200,18 @@ TEST_F(MediaTools, LeaveNothingHalfWrittenWhenInterrupted)
     }
 }
 
-TEST_F(MediaTools, ShowABarOnATerminal)
+/// What stands on a terminal in the end, with all that was taken away again.
+std::string shownOnATerminal(const Words& words)
 {
     int terminal = -1;
     const pid_t process = ::forkpty(&terminal, nullptr, nullptr, nullptr);
     if (process == 0) {
-        const std::string program = tests::program("clipsa");
+        std::vector<const char*> arguments = {"clipsa"};
+        for (const std::string& word : words)
+            arguments.push_back(word.c_str());
+        arguments.push_back(nullptr);
         ::setenv("TERM", "xterm", 1);
-        ::execl(program.c_str(), "clipsa", "thumbnails", movie("long-gop.mp4").c_str(), "-n", "50", "-o",
-                folder.c_str(), nullptr);
+        ::execv(tests::program("clipsa").c_str(), const_cast<char**>(arguments.data()));
         ::_exit(127);
     }
     std::string shown;
@@ -218,9 +221,16 @@ TEST_F(MediaTools, ShowABarOnATerminal)
     int status = -1;
     ::waitpid(process, &status, 0);
     ::close(terminal);
-    EXPECT_EQ(status, 0);
-    EXPECT_THAT(shown, HasSubstr("Making pictures ["));
-    EXPECT_THAT(shown, testing::EndsWith("\r\033[K")) << "nothing of it is left";
+    EXPECT_EQ(status, 0) << shown;
+    return shown;
+}
+
+TEST_F(MediaTools, ShowABarOnATerminalOfWhichNothingIsLeft)
+{
+    const Words thumbnails = {"thumbnails", movie("long-gop.mp4"), "-n", "50", "-o", folder};
+    EXPECT_THAT(shownOnATerminal(thumbnails), AllOf(HasSubstr("Making pictures ["), testing::EndsWith("\r\033[K")));
+    const Words trim = {"trim", movie("groups.mp4"), "--from", "0.5", "-o", directory.path() / "trimmed.mp4"};
+    EXPECT_THAT(shownOnATerminal(trim), AllOf(HasSubstr("Trimming ["), testing::EndsWith("\r\033[K")));
 }
 
 TEST_F(MediaTools, TellWhatAMovieIsMadeOf)
