@@ -19,7 +19,7 @@ namespace host {
 namespace {
 
 /// How long the last words of a process that has ended can be under way to us.
-constexpr std::chrono::milliseconds kLastWords{500};
+constexpr std::chrono::milliseconds kLastWordsLimit{500};
 
 } // namespace
 
@@ -149,7 +149,7 @@ void EditorSession::State::close()
     if (processEnd)
         QMetaObject::invokeMethod(this, &State::end, Qt::QueuedConnection);
     else
-        timer.start(place.patience);
+        timer.start(place.leavingLimit);
 }
 
 void EditorSession::State::whenTimeIsUp()
@@ -162,7 +162,7 @@ void EditorSession::State::whenTimeIsUp()
     // One that has something to finish, a save for example, takes as long as that takes.
     if (!dbus::BusyMark::isSet(directory.deviceRoot()))
         process->signal(std::exchange(nextSignal, SIGKILL));
-    timer.start(place.patience);
+    timer.start(place.leavingLimit);
 }
 
 void EditorSession::State::processEnded(ProcessEnd ended)
@@ -172,7 +172,7 @@ void EditorSession::State::processEnded(ProcessEnd ended)
     if (closing)
         end();
     else
-        timer.start(kLastWords);
+        timer.start(kLastWordsLimit);
 }
 
 void EditorSession::State::tellNotes()
@@ -194,7 +194,7 @@ void EditorSession::State::end()
     if (filesAreDone)
         leave();
     else
-        timer.start(place.patienceWithFiles);
+        timer.start(place.filesLimit);
 }
 
 void EditorSession::State::leave()

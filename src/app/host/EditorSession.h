@@ -42,10 +42,10 @@ public:
         std::string directoriesRoot; ///< directories of dead editors in it are swept meanwhile
         /// How long an editor that has nothing to finish may take to go after being asked, and after SIGTERM, before
         /// stronger means are used.
-        std::chrono::milliseconds patience = std::chrono::seconds(10);
+        std::chrono::milliseconds leavingLimit = std::chrono::seconds(10);
         /// How long a session that is over waits for its files, which a slow disk can hold up, before it leaves that
         /// work to itself.
-        std::chrono::milliseconds patienceWithFiles = std::chrono::seconds(2);
+        std::chrono::milliseconds filesLimit = std::chrono::seconds(2);
     };
     struct Handlers {
         /// What became of a movie, in order. All of it is told before `ended`, and what is known by then before

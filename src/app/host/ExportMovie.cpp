@@ -95,7 +95,6 @@ base::ErrorRef carryOut(MediaTool& tool, const ExportOrder& order)
     const fs::path written = order.force ? nameBeside(output) : output;
     const auto session = tool.media().exportSessionWithAsset(asset.value(), platform::ExportPreset::HighestQuality);
     session->setOutputURL(base::Url::fromPath(written.native()));
-    session->setOutputFileType(platform::FileType::Mpeg4);
     order.setUp(*session, *asset.value());
     ProgressBar progress(order.doing);
     if (base::ErrorRef failure = tool.runExport(*session, [&] { progress.show(session->progress()); }))

@@ -13,8 +13,10 @@
 #include <chrono>
 #include <cstdint>
 #include <filesystem>
+#include <initializer_list>
 #include <optional>
 #include <poll.h>
+#include <vector>
 
 namespace host {
 
@@ -51,13 +53,13 @@ struct MediaTool::Machine {
         works.setChangeHandler([this] { woken.happen(); });
     }
 
-    void wait(std::optional<base::Instant> limit)
+    /// Until one of `descriptors` can be read from, one of which is `woken`.
+    void wait(std::initializer_list<int> descriptors, std::optional<base::Instant> limit) const
     {
-        // Who was interrupted only finishes what is under way, and is woken by that alone.
-        const bool isInterrupted = signals.arrived() != 0;
-        pollfd inputs[] = {{woken.descriptor(), POLLIN, 0}, {isInterrupted ? -1 : signals.descriptor(), POLLIN, 0}};
-        if (::poll(inputs, std::size(inputs), limit ? milliseconds(*limit) : -1) <= 0)
-            return;
+        std::vector<pollfd> inputs;
+        for (const int descriptor : descriptors)
+            inputs.push_back({descriptor, POLLIN, {}});
+        ::poll(inputs.data(), inputs.size(), limit ? milliseconds(*limit) : -1);
         woken.forget();
     }
 };
@@ -126,7 +128,7 @@ bool MediaTool::runUntil(const std::function<bool()>& done, const std::function<
             const base::Instant left = next - machine.clock.now();
             limit = limit ? std::min(*limit, left) : left;
         }
-        machine.wait(limit);
+        machine.wait({machine.woken.descriptor(), machine.signals.descriptor()}, limit);
     }
     return false;
 }
@@ -158,9 +160,9 @@ void MediaTool::finishWork(const std::function<void()>& giveUp, const std::funct
     Machine& machine = *m_machine;
     if (!runUntil([&machine] { return machine.works.isEmpty(); }, meanwhile))
         giveUp();
-    // Whatever signals come.
+    // Whatever signals come: who was interrupted only finishes what is under way, and is woken by that alone.
     while (!machine.works.isEmpty()) {
-        machine.wait(machine.mainQueue.untilNext());
+        machine.wait({machine.woken.descriptor()}, machine.mainQueue.untilNext());
         machine.mainQueue.runDue();
     }
     machine.mainQueue.drain();

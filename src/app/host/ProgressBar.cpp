@@ -70,7 +70,6 @@ void ProgressBar::show(double part)
         return;
     m_shown = std::move(line);
     std::fprintf(m_stream, "\r\033[K%s", m_shown.c_str());
-    std::fflush(m_stream);
 }
 
 void ProgressBar::clear()
@@ -79,7 +78,6 @@ void ProgressBar::clear()
     if (std::exchange(m_shown, {}).empty())
         return;
     std::fputs("\r\033[K", m_stream);
-    std::fflush(m_stream);
 }
 
 } // namespace host

@@ -1,4 +1,5 @@
 /// A line on a terminal that tells how far work has come; nothing where the stream is no terminal. One thread.
+/// The stream has no buffer, as that for errors.
 #pragma once
 
 #include "base/Affinity.h"

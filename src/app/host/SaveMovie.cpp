@@ -33,7 +33,6 @@ base::ErrorRef mix(MediaTool& tool, const std::shared_ptr<platform::Asset>& asse
 {
     const auto session = tool.media().exportSessionWithAsset(asset, platform::ExportPreset::HighestQuality);
     session->setOutputURL(base::Url::fromPath(output));
-    session->setOutputFileType(platform::FileType::Mpeg4);
     session->setAudioMix(platform::audioMixOfAllTracks(*asset));
 
     // Its file must be gone before its directory, when it is given up.

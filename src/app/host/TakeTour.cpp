@@ -85,7 +85,7 @@ bool sayPictures(const std::vector<ReportLine>& report, const fs::path& folder)
         const std::size_t space = text.find(' ');
         const std::string name = text.substr(0, space);
         std::error_code error;
-        const bool isThere = fs::file_size(folder / name, error) > 0 && !error;
+        const bool isThere = !fs::is_empty(folder / name, error) && !error;
         all &= isThere;
         std::printf("  %-24s%s\n", name.c_str(), isThere ? text.substr(space + 1).c_str() : "is missing");
     }

@@ -37,7 +37,7 @@ TerminationWatch::~TerminationWatch()
 void TerminationWatch::run()
 {
     for (;;) {
-        pollfd inputs[] = {{m_ending.descriptor(), POLLIN, 0}, {m_signals.get(), POLLIN, 0}};
+        pollfd inputs[] = {{m_ending.descriptor(), POLLIN, {}}, {m_signals.get(), POLLIN, {}}};
         ::poll(inputs, std::size(inputs), -1);
         if (inputs[0].revents != 0)
             return;

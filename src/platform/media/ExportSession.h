@@ -25,6 +25,7 @@ public:
 
     /// Where the movie goes. A file that is there already is an error.
     virtual void setOutputURL(std::optional<base::Url> url) = 0;
+    /// MPEG-4 unless another is asked for.
     virtual void setOutputFileType(FileType type) = 0;
     /// From `start` up to its end; what lies outside the movie is left out. All of it when nothing is set.
     virtual void setTimeRange(std::optional<base::MediaTimeRange> range) = 0;

@@ -84,8 +84,8 @@ protected:
     std::string m_movieName = "race.mp4";
     host::EditorSession::Place m_place{.editorProgram = tests::program("fake-editor"),
                                        .directoriesRoot = m_directory.path() / "clipsa",
-                                       .patience = std::chrono::hours(1),
-                                       .patienceWithFiles = std::chrono::hours(1)};
+                                       .leavingLimit = std::chrono::hours(1),
+                                       .filesLimit = std::chrono::hours(1)};
     std::vector<std::string> m_told;
     std::optional<host::EditorOutcome> m_outcome;
     std::thread::id m_endedOn;

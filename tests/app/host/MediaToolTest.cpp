@@ -5,8 +5,11 @@
 
 #include <gtest/gtest.h>
 
+#include <cerrno>
+#include <csignal>
 #include <future>
 #include <optional>
+#include <unistd.h>
 
 namespace {
 
@@ -57,6 +60,53 @@ TEST_F(ATool, WaitsForAllThatIsUnderWayAndForWhatThatHasPosted)
     m_tool->finishWork([] { ADD_FAILURE() << "nobody interrupts it"; }, {});
     EXPECT_TRUE(told);
     EXPECT_TRUE(m_tool->works().isEmpty());
+}
+
+TEST_F(ATool, GivesUpWhatIsUnderWayWhenASignalComesAndWaitsForItsEnd)
+{
+    std::promise<void> givenUp;
+    bool ended = false;
+    m_tool->system().backgroundQueue.post(
+        [this, &ended, gate = givenUp.get_future().share(), work = m_tool->works().begin()]() mutable {
+            gate.wait();
+            m_main.post([&ended] { ended = true; });
+            work.reset();
+        });
+    ::kill(::getpid(), SIGTERM);
+    m_tool->finishWork([&] { givenUp.set_value(); }, {});
+    EXPECT_EQ(m_tool->interruption(), SIGTERM);
+    EXPECT_TRUE(ended);
+}
+
+/// An export that lasts until it is cancelled.
+class EndlessExport final : public platform::ExportSession {
+public:
+    explicit EndlessExport(base::WorkList& works) : m_works(works) {}
+
+    void setOutputURL(std::optional<base::Url>) override {}
+    void setOutputFileType(platform::FileType) override {}
+    void setTimeRange(std::optional<base::MediaTimeRange>) override {}
+    void setAudioMix(std::optional<platform::AudioMix>) override {}
+    void exportAsynchronously(std::function<void()>) override { m_work = m_works.begin(); }
+    void cancelExport() override { m_work.reset(); }
+    Status status() const override { return Status::Cancelled; }
+    base::ErrorRef error() const override { return nullptr; }
+    std::optional<base::Url> outputURL() const override { return std::nullopt; }
+    double progress() const override { return 0; }
+
+private:
+    base::WorkList& m_works;
+    std::shared_ptr<base::Work> m_work;
+};
+
+TEST_F(ATool, CancelsItsExportWhenASignalComes)
+{
+    const auto session = std::make_shared<EndlessExport>(m_tool->works());
+    ::kill(::getpid(), SIGINT);
+    const base::ErrorRef error = m_tool->runExport(*session, {});
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->code(), ECANCELED);
+    EXPECT_EQ(m_tool->fail(error), 128 + SIGINT);
 }
 
 TEST_F(ATool, IsWokenByTheEndOfWhatIsUnderWay)

@@ -231,6 +231,8 @@ TEST_F(MediaTools, ShowABarOnATerminalOfWhichNothingIsLeft)
     EXPECT_THAT(shownOnATerminal(thumbnails), AllOf(HasSubstr("Making pictures ["), testing::EndsWith("\r\033[K")));
     const Words trim = {"trim", movie("groups.mp4"), "--from", "0.5", "-o", directory.path() / "trimmed.mp4"};
     EXPECT_THAT(shownOnATerminal(trim), AllOf(HasSubstr("Trimming ["), testing::EndsWith("\r\033[K")));
+    const std::string saved = shownOnATerminal({"save", movie("long-gop.mp4")});
+    EXPECT_THAT(saved, AllOf(HasSubstr("Saving ["), HasSubstr("]   0 %"), HasSubstr("\r\033[K/")));
 }
 
 TEST_F(MediaTools, TellWhatAMovieIsMadeOf)
