@@ -118,7 +118,7 @@ TEST_F(AnEditorsSession, DoesNotWaitForACopyThatNobodyNeedsAnyMore)
     // There is no way but to copy, for this thread.
     const std::unique_ptr<QThread> thread(QThread::create([this] {
         tests::refuseSystemCalls({{SYS_linkat, EXDEV}, tests::noReflinks()});
-        start("", std::uintmax_t{4} << 30);
+        start("", std::uintmax_t{4} << 40); // which takes hours
         waitForEnd();
     }));
     thread->start();
