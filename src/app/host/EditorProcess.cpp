@@ -83,11 +83,9 @@ int spawn(const ProcessStart& start, pid_t& pid)
     if (start.report)
         ::posix_spawn_file_actions_adddup2(&files, *start.report, dbus::kEditorReportDescriptor);
 
-    Attributes attributes; // the process group is a new one unless another is named
+    Attributes attributes; // with a new process group and no signal blocked, unless others are named
     ::posix_spawnattr_setflags(&attributes, POSIX_SPAWN_SETPGROUP | POSIX_SPAWN_SETSIGMASK | POSIX_SPAWN_SETSIGDEF);
-    sigset_t signals;
-    ::sigemptyset(&signals);
-    ::posix_spawnattr_setsigmask(&attributes, &signals);
+    sigset_t signals = {};
     for (const int number : {SIGINT, SIGTERM, SIGHUP, SIGPIPE})
         ::sigaddset(&signals, number);
     ::posix_spawnattr_setsigdefault(&attributes, &signals);
@@ -131,7 +129,7 @@ struct EditorProcess::State {
     {
         notifier.reset();
         const auto handler = std::exchange(ended, {});
-        if (const auto end = waitForEnd(); end && handler)
+        if (const auto end = waitForEnd())
             handler(*end); // may destroy us
     }
 };

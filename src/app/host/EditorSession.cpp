@@ -199,7 +199,6 @@ void EditorSession::State::end()
 
 void EditorSession::State::leave()
 {
-    timer.stop();
     tellNotes();
     outcome.end = processEnd.value_or(ProcessEnd{});
     if (const auto ended = std::exchange(handlers.ended, {}))

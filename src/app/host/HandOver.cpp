@@ -5,6 +5,7 @@
 
 #include <cerrno>
 #include <fcntl.h>
+#include <filesystem>
 #include <optional>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -25,14 +26,13 @@ base::ErrorRef copyAll(int from, int to, std::uint64_t total, const CopyProgress
 }
 
 /// A hard link that the editor can read; false when there is none.
-bool makeHardLink(int source, const struct stat& status, const std::string& path)
+bool makeHardLink(int source, const std::string& path)
 {
     const std::string open = "/proc/self/fd/" + std::to_string(source);
     if (::linkat(AT_FDCWD, open.c_str(), AT_FDCWD, path.c_str(), AT_SYMLINK_FOLLOW) != 0)
         return false;
-    struct stat linked = {};
-    if (::lstat(path.c_str(), &linked) == 0 && linked.st_ino == status.st_ino && linked.st_dev == status.st_dev
-        && ::access(path.c_str(), R_OK) == 0)
+    std::error_code ignored;
+    if (std::filesystem::equivalent(open, path, ignored) && ::access(path.c_str(), R_OK) == 0)
         return true;
     ::unlink(path.c_str());
     return false;
@@ -47,7 +47,7 @@ base::Result<HandOverWay> handOver(int source, const std::string& directory, con
     if (::fstat(source, &status) != 0)
         return base::Error::fromErrno(errno, "cannot look at the recording");
     const std::string path = directory + "/" + name;
-    if (first == HandOverWay::HardLink && makeHardLink(source, status, path))
+    if (first == HandOverWay::HardLink && makeHardLink(source, path))
         return HandOverWay::HardLink;
 
     const posix::FileDescriptor target(

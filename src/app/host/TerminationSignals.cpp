@@ -15,8 +15,7 @@ namespace {
 
 posix::FileDescriptor blockAndOpenSignals()
 {
-    sigset_t signals;
-    ::sigemptyset(&signals);
+    sigset_t signals = {};
     for (const int number : {SIGINT, SIGTERM, SIGHUP})
         ::sigaddset(&signals, number);
     ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
