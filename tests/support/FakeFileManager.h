@@ -23,7 +23,7 @@
 
 namespace tests {
 
-enum class FileOperation { CreateDirectory, List, Attributes, FileSystem, Remove, Move };
+enum class FileOperation { CreateDirectory, List, Read, Attributes, FileSystem, Remove, Move };
 
 class FakeFileManager final : public platform::FileManager {
 public:
@@ -45,13 +45,18 @@ public:
     void addFile(const std::string& path, std::int64_t size, base::Date date) { addFile(path, size, date, date); }
     void addFile(const std::string& path, std::int64_t size, base::Date modified, base::Date created)
     {
-        add(path, {{size, modified, created, false}, {}});
+        add(path, {{size, modified, created, false}, {}, {}});
+    }
+    void addText(const std::string& path, const std::string& text)
+    {
+        const base::Date now = m_system.clock.date();
+        add(path, {{static_cast<std::int64_t>(text.size()), now, now, false}, {}, text});
     }
     void addDirectory(const std::string& path) { add(path, directory()); }
     void addLink(const std::string& path, const std::string& target)
     {
         const base::Date now = m_system.clock.date();
-        add(path, {{static_cast<std::int64_t>(target.size()), now, now, false}, target});
+        add(path, {{static_cast<std::int64_t>(target.size()), now, now, false}, target, {}});
     }
     /// Whether an item of any kind, dangling links included, has this path.
     bool holds(const std::string& path) const { return find(normalised(path)) != m_items.end(); }
@@ -109,6 +114,24 @@ public:
             if (parentOf(itemPath) == at)
                 names.push_back(itemPath.substr(at.size() + 1));
         return names;
+    }
+
+    base::Result<std::string> contentsOfFile(const std::string& path, std::size_t mostBytes) override
+    {
+        note("read " + path);
+        const std::string at = normalised(path);
+        if (auto error = scripted(FileOperation::Read, at))
+            return error;
+        const auto item = find(at);
+        if (item == m_items.end())
+            return failed(ENOENT, calls.back());
+        if (item->second.attributes.isDirectory)
+            return failed(EISDIR, calls.back());
+        if (!item->second.linkTarget.empty())
+            return contentsOfFile(item->second.linkTarget, mostBytes);
+        if (item->second.attributes.size > static_cast<std::int64_t>(mostBytes))
+            return failed(EFBIG, calls.back());
+        return item->second.text;
     }
 
     base::Result<platform::FileAttributes> attributesOfItem(const std::string& path) override
@@ -176,6 +199,7 @@ private:
     struct Item {
         platform::FileAttributes attributes;
         std::string linkTarget; ///< empty in what is no link
+        std::string text;       ///< empty where only its size matters
     };
     using Items = std::vector<std::pair<std::string, Item>>;
 
@@ -209,7 +233,7 @@ private:
     {
         constexpr std::int64_t kEntrySize = 4096;
         const base::Date now = m_system.clock.date();
-        return {{kEntrySize, now, now, true}, {}};
+        return {{kEntrySize, now, now, true}, {}, {}};
     }
 
     void add(const std::string& path, Item item)

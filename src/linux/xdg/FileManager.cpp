@@ -1,5 +1,6 @@
 #include "linux/xdg/FileManager.h"
 
+#include "linux/posix/FileDescriptor.h"
 #include "linux/xdg/MoveItem.h"
 
 #include <algorithm>
@@ -55,6 +56,32 @@ base::Result<std::vector<std::string>> FileManager::contentsOfDirectory(const st
     if (error)
         return failed("list", path, error.value());
     return names;
+}
+
+base::Result<std::string> FileManager::contentsOfFile(const std::string& path, std::size_t mostBytes)
+{
+    // Without waiting: a pipe that nobody writes to is no file to read either.
+    const posix::FileDescriptor file(::open(resolvedPath(path).c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+    struct stat found = {};
+    if (!file || ::fstat(file.get(), &found) != 0)
+        return failed("read", path, errno);
+    if (!S_ISREG(found.st_mode))
+        return failed("read", path, S_ISDIR(found.st_mode) ? EISDIR : EINVAL);
+    std::string contents(mostBytes + 1, '\0');
+    std::size_t size = 0;
+    while (size < contents.size()) {
+        const ssize_t count = ::read(file.get(), contents.data() + size, contents.size() - size);
+        if (count == 0)
+            break;
+        if (count > 0)
+            size += static_cast<std::size_t>(count);
+        else if (errno != EINTR)
+            return failed("read", path, errno);
+    }
+    if (size > mostBytes)
+        return failed("read", path, EFBIG);
+    contents.resize(size);
+    return contents;
 }
 
 base::Result<platform::FileAttributes> FileManager::attributesOfItem(const std::string& path)

@@ -21,6 +21,7 @@ public:
     bool fileExists(const std::string& path) override;
     base::Result<void> createDirectory(const std::string& path) override;
     base::Result<std::vector<std::string>> contentsOfDirectory(const std::string& path) override;
+    base::Result<std::string> contentsOfFile(const std::string& path, std::size_t mostBytes) override;
     base::Result<platform::FileAttributes> attributesOfItem(const std::string& path) override;
     base::Result<platform::FileSystemAttributes> attributesOfFileSystem(const std::string& path) override;
     /// Roots of mounts are busy and stay.

@@ -7,6 +7,7 @@
 #include "base/System.h"
 #include "base/Url.h"
 
+#include <cstddef>
 #include <cstdint>
 #include <string>
 #include <vector>
@@ -38,6 +39,8 @@ public:
     virtual base::Result<void> createDirectory(const std::string& path) = 0;
     /// Names, without "." and "..", in the file system's order.
     virtual base::Result<std::vector<std::string>> contentsOfDirectory(const std::string& path) = 0;
+    /// Fails (EFBIG) when it has more than `mostBytes`, and when it is no regular file.
+    virtual base::Result<std::string> contentsOfFile(const std::string& path, std::size_t mostBytes) = 0;
     /// Of the item itself: links are not followed.
     virtual base::Result<FileAttributes> attributesOfItem(const std::string& path) = 0;
     virtual base::Result<FileSystemAttributes> attributesOfFileSystem(const std::string& path) = 0;

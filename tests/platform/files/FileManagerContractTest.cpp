@@ -21,6 +21,7 @@ public:
     virtual platform::FileManager& files() = 0;
     /// `path` is below the library.
     virtual void addFile(const std::string& path, std::size_t size) = 0;
+    virtual void addText(const std::string& path, const std::string& text) = 0;
     virtual void addLink(const std::string& path, const std::string& target) = 0;
 };
 
@@ -33,6 +34,10 @@ public:
     void addFile(const std::string& path, std::size_t size) override
     {
         m_files.addFile(std::string(kLibrary) + "/" + path, static_cast<std::int64_t>(size));
+    }
+    void addText(const std::string& path, const std::string& text) override
+    {
+        m_files.addText(std::string(kLibrary) + "/" + path, text);
     }
     void addLink(const std::string& path, const std::string& target) override
     {
@@ -51,6 +56,7 @@ public:
     {
         m_directory.write(path, std::string(size, 'x'));
     }
+    void addText(const std::string& path, const std::string& text) override { m_directory.write(path, text); }
     void addLink(const std::string& path, const std::string& target) override
     {
         std::filesystem::create_symlink(m_files.resolvedPath(target), m_directory.path() / path);
@@ -104,6 +110,21 @@ TYPED_TEST(AFileManager, SeesFilesDirectoriesAndLinksToThemButNotDanglingLinks)
     EXPECT_FALSE(this->files.fileExists(this->at("dangling")));
     EXPECT_FALSE(this->files.fileExists(this->at("nothing")));
     EXPECT_FALSE(this->files.fileExists(""));
+}
+
+TYPED_TEST(AFileManager, ReadsFilesThatAreNotTooLargeForTheirReader)
+{
+    this->world.addText("text", "a text");
+    this->world.addFile("large", 7);
+    this->world.addLink("link", this->at("text"));
+    this->world.addText("empty", "");
+    EXPECT_EQ(this->files.contentsOfFile(this->at("text"), 6).valueOr("?"), "a text");
+    EXPECT_EQ(this->files.contentsOfFile(this->at("text"), 100).valueOr("?"), "a text");
+    EXPECT_EQ(this->files.contentsOfFile(this->at("link"), 6).valueOr("?"), "a text");
+    EXPECT_EQ(this->files.contentsOfFile(this->at("empty"), 0).valueOr("?"), "");
+    EXPECT_EQ(this->codeOf(this->files.contentsOfFile(this->at("large"), 6).error()), EFBIG);
+    EXPECT_EQ(this->codeOf(this->files.contentsOfFile(this->at("nothing"), 6).error()), ENOENT);
+    EXPECT_EQ(this->codeOf(this->files.contentsOfFile(kLibrary, 6).error()), EISDIR);
 }
 
 TYPED_TEST(AFileManager, ReachesItemsThroughDoubledSlashes)
