@@ -131,7 +131,7 @@ void VKVideoEditorViewController::makeVideoOverlay()
 {
     const auto overlay = std::make_shared<View>(view()->bounds());
     overlay->setAutoresizingMask(platform::kFlexibleWidth | platform::kFlexibleHeight);
-    overlay->setAccessibilityLabel("Recording");
+    overlay->setAccessibilityLabel(m_platform.words.text("EDITOR_RECORDING"));
     setVideoOverlay(overlay);
     overlay->addGestureRecognizer(
         std::make_shared<platform::TapGestureRecognizer>(weakSelf<runtime::Object>(), Selector("handleSingleTap:")));
@@ -170,7 +170,7 @@ void VKVideoEditorViewController::makeScrubber()
     setScrubberContainterView(std::make_shared<BackdropView>(BackdropView::kStyleChrome));
     scrubberContainterView()->setTranslatesAutoresizingMaskIntoConstraints(false);
 
-    const auto trimmer = std::make_shared<MovieScrubber>();
+    const auto trimmer = std::make_shared<MovieScrubber>(m_platform.words);
     trimmer->setAutoresizingMask(platform::kFlexibleWidth);
     trimmer->setMinimumTrimLength(kMinimumTrimLength);
     trimmer->setEditable(true);
@@ -183,7 +183,7 @@ void VKVideoEditorViewController::makeBarItems()
 {
     using Kind = BarButtonItem::Kind;
     const auto item = [this](Kind kind, const char* action) {
-        return std::make_shared<BarButtonItem>(kind, weakSelf<runtime::Object>(), Selector(action));
+        return std::make_shared<BarButtonItem>(m_platform.words, kind, weakSelf<runtime::Object>(), Selector(action));
     };
     setShareButton(item(Kind::Action, "shareAction"));
     setUndoButton(item(Kind::Undo, "undoAction"));
@@ -201,15 +201,15 @@ void VKVideoEditorViewController::makeBarItems()
 
 void VKVideoEditorViewController::makeToolbars(const std::optional<Color>& overrideTintColor)
 {
-    const auto toolbar = [this](base::Rect frame, const char* name) {
+    const auto toolbar = [this](base::Rect frame, const char* nameKey) {
         auto bar = std::make_shared<Toolbar>(frame);
         bar->setAutoresizingMask(platform::kFlexibleWidth);
         bar->setDelegate(self<VKVideoEditorViewController>());
-        bar->setAccessibilityLabel(name);
+        bar->setAccessibilityLabel(m_platform.words.text(nameKey));
         return bar;
     };
-    setTopToolBar(toolbar(topToolBarFrame(), "Recording"));
-    setBottomToolBar(toolbar(bottomToolBarFrame(), "Playback"));
+    setTopToolBar(toolbar(topToolBarFrame(), "EDITOR_TOP_BAR"));
+    setBottomToolBar(toolbar(bottomToolBarFrame(), "EDITOR_BOTTOM_BAR"));
     if (overrideTintColor)
         topToolBar()->setTintColor(overrideTintColor);
 }
@@ -267,17 +267,17 @@ std::vector<platform::KeyCommand> VKVideoEditorViewController::keyCommands() con
     assertHere();
     using platform::Key;
     return {
-        {Key::Space, 0, false, Selector("togglePlayback"), "Play or pause"},
-        {Key::Left, 0, false, Selector("seekBackward"), "One second back"},
-        {Key::Right, 0, false, Selector("seekForward"), "One second forward"},
-        {Key::Comma, 0, false, Selector("stepBackward"), "One picture back"},
-        {Key::Period, 0, false, Selector("stepForward"), "One picture forward"},
-        {Key::Home, 0, false, Selector("goToStart"), "To the start"},
-        {Key::End, 0, false, Selector("goToEnd"), "To the end"},
-        {Key::Character, 'i', false, Selector("trimStartHere"), "Start the trim here"},
-        {Key::Character, 'o', false, Selector("trimEndHere"), "End the trim here"},
-        {Key::Return, 0, false, Selector("confirmTrim"), "Trim"},
-        {Key::Escape, 0, false, Selector("leave"), "Leave trim mode, or close"},
+        {Key::Space, 0, false, Selector("togglePlayback")},
+        {Key::Left, 0, false, Selector("seekBackward")},
+        {Key::Right, 0, false, Selector("seekForward")},
+        {Key::Comma, 0, false, Selector("stepBackward")},
+        {Key::Period, 0, false, Selector("stepForward")},
+        {Key::Home, 0, false, Selector("goToStart")},
+        {Key::End, 0, false, Selector("goToEnd")},
+        {Key::Character, 'i', false, Selector("trimStartHere")},
+        {Key::Character, 'o', false, Selector("trimEndHere")},
+        {Key::Return, 0, false, Selector("confirmTrim")},
+        {Key::Escape, 0, false, Selector("leave")},
     };
 }
 

@@ -14,7 +14,7 @@ std::shared_ptr<VKFlatVideoOverlayButton> VKFlatVideoOverlayButton::initWithStyl
     button->m_style = style;
     button->setImage(_normalButtonImage(platform), State::Normal);
     button->setImage(_highlightedButtonImage(platform), State::Highlighted);
-    button->setAccessibilityLabel("Play");
+    button->setAccessibilityLabel(platform.words.text("OVERLAY_PLAY"));
     button->sizeToFit();
     button->setPassesTouchesToSuperviewRecognizers(false);
     button->addTarget(button, Selector("_handleTap:"), platform::kTouchUpInside);

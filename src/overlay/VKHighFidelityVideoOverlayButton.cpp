@@ -13,7 +13,7 @@ VKHighFidelityVideoOverlayButton::initWithStyle(const platform::Platform& platfo
 {
     const auto button = std::make_shared<Button>();
     button->setImage(platform.images.imageNamed(VKVideoOverlayGlyphMaskImageName), Button::State::Normal);
-    button->setAccessibilityLabel("Play");
+    button->setAccessibilityLabel(platform.words.text("OVERLAY_PLAY"));
     button->sizeToFit();
 
     const std::shared_ptr<VKHighFidelityVideoOverlayButton> view(new VKHighFidelityVideoOverlayButton(button->frame()));

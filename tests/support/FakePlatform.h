@@ -4,6 +4,8 @@
 #include "platform/hosting/Platform.h"
 #include "platform/views/Canvas.h"
 #include "platform/views/Window.h"
+#include "support/EnglishWords.h"
+#include "support/FakeBundles.h"
 #include "support/FakeCalendar.h"
 #include "support/FakeFileManager.h"
 #include "support/FakeMedia.h"
@@ -80,6 +82,8 @@ struct FakePlatform {
     std::shared_ptr<platform::Window> window;
     FakeImages images;
     FakeFileManager files;
+    FakeBundles bundles;
+    EnglishWords words;
     FakeCalendar calendar;
     FakeMediaFramework media;
     FakePhotoLibrary photos;
@@ -88,8 +92,9 @@ struct FakePlatform {
     explicit FakePlatform(base::Size size = kPhone, double scale = 1)
         : window(std::make_shared<platform::Window>(machine.mainQueue, size, scale)), images(*window),
           files(machine.system),
-          media(machine.mainQueue, notifications), platform{machine.system, notifications, device, *window, images,
-                                                            files,          calendar,      media,  photos}
+          media(machine.mainQueue, notifications), platform{machine.system, notifications, device,  *window,
+                                                            images,         files,         bundles, words,
+                                                            calendar,       media,         photos}
     {
     }
 };

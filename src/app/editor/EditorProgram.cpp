@@ -69,13 +69,17 @@ base::Size firstWindowSize(const EditorOptions& options)
     return {std::min<double>(wanted.width, room.width()), std::min<double>(wanted.height, room.height())};
 }
 
+/// Where the programs are installed, their resources are beside them.
+std::string resourceDirectory()
+{
+    return QCoreApplication::applicationDirPath().toStdString() + "/../share/clipsa";
+}
+
 xdg::MountTable mounts(const EditorOptions& options)
 {
     xdg::MountTable table;
     table.mount(xdg::kPrivateLibraryPrefix, options.deviceRoot);
-    // Where the programs are installed, their resources are beside them.
-    table.mount(xdg::kSystemLibraryPrefix,
-                QCoreApplication::applicationDirPath().toStdString() + "/../share/clipsa/System/Library");
+    table.mount(xdg::kSystemLibraryPrefix, resourceDirectory() + "/System/Library");
     return table;
 }
 
@@ -95,12 +99,15 @@ EditorProgram::EditorProgram(const EditorOptions& options)
       m_window(std::make_shared<platform::Window>(m_mainQueue, firstWindowSize(options), 1.0)),
       m_device(deviceValues(options), [this] { return m_window->bounds().width(); }),
       m_images([this] { return m_window->scale(); }), m_files(m_system, mounts(options)),
+      m_bundles(m_files, m_languages, xdg::BundlePlaces::ofUser()),
+      m_words(m_bundles, resourceDirectory() + "/Clipsa.bundle"),
       m_media(m_system, m_notifications,
               {[this](const std::string& path) { return m_files.resolvedPath(path); }, ffmpeg::cubebOutput(m_log),
                &m_works, kImageNiceness}),
-      m_photos(libraryOptions(), m_log, m_works), m_platform{m_system, m_notifications, m_device, *m_window, m_images,
-                                                             m_files,  m_calendar,      m_media,  m_photos},
-      m_presenter(m_window, m_clock), m_connection(std::make_shared<dbus::ExtensionConnection>(m_mainQueue)),
+      m_photos(libraryOptions(), m_log, m_works), m_platform{m_system,   m_notifications, m_device,  *m_window,
+                                                             m_images,   m_files,         m_bundles, m_words,
+                                                             m_calendar, m_media,         m_photos},
+      m_presenter(m_window, m_clock, m_words), m_connection(std::make_shared<dbus::ExtensionConnection>(m_mainQueue)),
       m_payload(m_mainQueue, [this] { openMovie(); }), m_busy(options.deviceRoot),
       m_workWatch(m_mainQueue, m_works,
                   {[this] {
@@ -183,20 +190,20 @@ void EditorProgram::waitForPayload()
 {
     if (m_shown || !m_extension.principal)
         return;
-    showNotice("Waiting for the recording…");
+    showNotice(m_words.text("NOTICE_WAITING"));
     m_presenter.showWork(std::nullopt);
     if (m_script && m_script->beginsWithWaiting())
         m_script->start();
 }
 
 /// In place of the extension, which has not appeared then or disappears.
-void EditorProgram::showNotice(const std::string& words)
+void EditorProgram::showNotice(const std::string& text)
 {
     m_waiting = true;
     const bool hasHomeButton = m_device.integerAnswer(platform::kDeviceHomeButtonKey, 0) != kNoHomeButton;
     // The extension's view follows the window, as its editors are as large as it is.
     m_window->setRootViewController(std::make_shared<NoticeScreen>(
-        words, hasHomeButton,
+        m_words, text, hasHomeButton,
         NoticeScreen::Handlers{
             [this] { m_mainQueue.post([this] { closeRequested(); }); }, // not inside the tap on what goes then
             [view = m_extension.principal->view()](base::Rect bounds) { view->setFrame(bounds); }}));
@@ -240,7 +247,7 @@ void EditorProgram::refuse(const std::string& why)
     }
     m_shown = true; // there is nothing else to be shown
     m_presenter.hideWork();
-    showNotice("There is no movie in this file.\n" + why);
+    showNotice(m_words.text("NOTICE_NO_MOVIE") + "\n" + why);
 }
 
 void EditorProgram::show()

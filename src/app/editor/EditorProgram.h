@@ -17,10 +17,13 @@
 #include "linux/dbus/ExtensionConnection.h"
 #include "linux/ffmpeg/FFmpegMediaFramework.h"
 #include "linux/icu/Calendar.h"
+#include "linux/icu/Languages.h"
+#include "linux/icu/MessageCatalog.h"
 #include "linux/photos/VideoLibrary.h"
 #include "linux/qt/MainLoop.h"
 #include "linux/qt/Presenter.h"
 #include "linux/qt/SvgImageCatalog.h"
+#include "linux/xdg/Bundles.h"
 #include "linux/xdg/DeviceProfile.h"
 #include "linux/xdg/FileManager.h"
 #include "platform/hosting/ExtensionContext.h"
@@ -82,7 +85,7 @@ public:
 private:
     base::Result<void> start();
     void waitForPayload();
-    void showNotice(const std::string& words);
+    void showNotice(const std::string& text);
     void openMovie();
     void refuse(const std::string& why);
     void show();
@@ -113,6 +116,9 @@ private:
     xdg::DeviceProfile m_device;
     qtui::SvgImageCatalog m_images;
     xdg::FileManager m_files;
+    intl::Languages m_languages;
+    xdg::Bundles m_bundles;
+    intl::MessageCatalog m_words;
     intl::Calendar m_calendar;
     ffmpeg::FFmpegMediaFramework m_media;
     photos::VideoLibrary m_photos;

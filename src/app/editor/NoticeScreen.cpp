@@ -43,8 +43,9 @@ std::vector<std::string> linesOf(const std::string& words)
 
 } // namespace
 
-NoticeScreen::NoticeScreen(std::string words, bool hasHomeButton, Handlers handlers)
-    : m_words(std::move(words)), m_barHeight(hasHomeButton ? kBarHeight : kBarHeightWithoutHomeButton),
+NoticeScreen::NoticeScreen(const platform::MessageCatalog& words, std::string text, bool hasHomeButton,
+                           Handlers handlers)
+    : m_words(words), m_text(std::move(text)), m_barHeight(hasHomeButton ? kBarHeight : kBarHeightWithoutHomeButton),
       m_handlers(std::move(handlers))
 {
 }
@@ -63,7 +64,7 @@ void NoticeScreen::loadView()
     assertHere();
     ViewController::loadView();
     view()->setBackgroundColor(platform::Color::black());
-    for (const std::string& line : linesOf(m_words)) {
+    for (const std::string& line : linesOf(m_text)) {
         const auto label = std::make_shared<Label>();
         label->setText(line);
         label->setFontSize(kFontSize);
@@ -73,9 +74,9 @@ void NoticeScreen::loadView()
         m_lines.push_back(label);
     }
     m_bar = std::make_shared<platform::Toolbar>();
-    m_bar->setItems(
-        {std::make_shared<BarButtonItem>(BarButtonItem::Kind::Cancel, weakSelf<runtime::Object>(), Selector("close")),
-         BarButtonItem::flexibleSpace()});
+    m_bar->setItems({std::make_shared<BarButtonItem>(m_words, BarButtonItem::Kind::Cancel, weakSelf<runtime::Object>(),
+                                                     Selector("close")),
+                     BarButtonItem::flexibleSpace()});
     view()->addSubview(m_bar);
 }
 
@@ -104,7 +105,7 @@ void NoticeScreen::viewDidLayoutSubviews()
 std::vector<platform::KeyCommand> NoticeScreen::keyCommands() const
 {
     assertHere();
-    return {{platform::Key::Escape, 0, false, Selector("close"), "Close"}};
+    return {{platform::Key::Escape, 0, false, Selector("close")}};
 }
 
 void NoticeScreen::close()

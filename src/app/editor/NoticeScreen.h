@@ -19,7 +19,8 @@ public:
         std::function<void(base::Rect)> resized; ///< the view's bounds, whenever they were laid out; may be empty
     };
 
-    NoticeScreen(std::string words, bool hasHomeButton, Handlers handlers);
+    /// Shows `text`; `words`, which outlive it, are those of its button.
+    NoticeScreen(const platform::MessageCatalog& words, std::string text, bool hasHomeButton, Handlers handlers);
 
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override { return classObject(); }
@@ -33,7 +34,8 @@ public:
     void close();
 
 private:
-    const std::string m_words;
+    const platform::MessageCatalog& m_words;
+    const std::string m_text;
     const double m_barHeight;
     Handlers m_handlers;
     std::shared_ptr<platform::Toolbar> m_bar;

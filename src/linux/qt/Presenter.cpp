@@ -13,8 +13,9 @@
 
 namespace qtui {
 
-Presenter::Presenter(std::shared_ptr<platform::Window> window, const base::Clock& clock)
-    : m_window(std::move(window)), m_clock(clock), m_stage(std::make_unique<Stage>())
+Presenter::Presenter(std::shared_ptr<platform::Window> window, const base::Clock& clock,
+                     const platform::MessageCatalog& words)
+    : m_window(std::move(window)), m_clock(clock), m_stage(std::make_unique<Stage>(words))
 {
     if (!hasFonts())
         qWarning("There is no font on this system: every letter will be an empty box");

@@ -7,6 +7,7 @@
 #include "base/Affinity.h"
 #include "base/Clock.h"
 #include "linux/qt/Theme.h"
+#include "platform/files/MessageCatalog.h"
 #include "platform/views/Window.h"
 
 #include <QImage>
@@ -29,8 +30,10 @@ struct Statistics;
 
 class Presenter {
 public:
-    /// Takes the window's size and gives it the screen's scale. `clock` moves the animations.
-    Presenter(std::shared_ptr<platform::Window> window, const base::Clock& clock);
+    /// Takes the window's size and gives it the screen's scale. `clock` moves the animations; `words` are what it says
+    /// itself. Both outlive it.
+    Presenter(std::shared_ptr<platform::Window> window, const base::Clock& clock,
+              const platform::MessageCatalog& words);
     ~Presenter();
 
     void setTitle(const std::string& title);

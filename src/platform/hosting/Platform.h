@@ -3,8 +3,10 @@
 
 #include "base/System.h"
 #include "platform/device/Device.h"
+#include "platform/files/Bundles.h"
 #include "platform/files/DateFormatter.h"
 #include "platform/files/FileManager.h"
+#include "platform/files/MessageCatalog.h"
 #include "platform/media/MediaFramework.h"
 #include "platform/photos/PhotoLibrary.h"
 #include "platform/views/Image.h"
@@ -20,6 +22,8 @@ struct Platform {
     Screen& mainScreen;
     ImageCatalog& images; ///< of the bundle that contains the program
     FileManager& files;
+    Bundles& bundles;
+    const MessageCatalog& words;
     Calendar& calendar;
     MediaFramework& media;
     PhotoLibrary& photos;

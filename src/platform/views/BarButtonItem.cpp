@@ -15,7 +15,7 @@ const runtime::Selector& triggerSelector()
 /// What the standard items look like, and how they are called.
 struct Looks {
     const char* glyph;
-    const char* name;
+    const char* nameKey;
     bool emphasized = false;
 };
 
@@ -24,19 +24,19 @@ Looks looksOf(BarButtonItem::Kind kind)
     using Kind = BarButtonItem::Kind;
     switch (kind) {
     case Kind::Action:
-        return {"share", "Share"};
+        return {"share", "BAR_SHARE"};
     case Kind::Play:
-        return {"play", "Play"};
+        return {"play", "BAR_PLAY"};
     case Kind::Pause:
-        return {"pause", "Pause"};
+        return {"pause", "BAR_PAUSE"};
     case Kind::Undo:
-        return {"", "Undo"};
+        return {"", "BAR_UNDO"};
     case Kind::Done:
-        return {"", "Done", true};
+        return {"", "BAR_DONE", true};
     case Kind::Save:
-        return {"", "Save", true};
+        return {"", "BAR_SAVE", true};
     case Kind::Cancel:
-        return {"", "Cancel"};
+        return {"", "BAR_CANCEL"};
     case Kind::FlexibleSpace:
     case Kind::FixedSpace:
     case Kind::Custom:
@@ -47,8 +47,9 @@ Looks looksOf(BarButtonItem::Kind kind)
 
 } // namespace
 
-BarButtonItem::BarButtonItem(Kind kind, std::weak_ptr<runtime::Object> target, runtime::Selector action)
-    : m_kind(kind), m_targetAction(std::move(target), std::move(action))
+BarButtonItem::BarButtonItem(const MessageCatalog& words, Kind kind, std::weak_ptr<runtime::Object> target,
+                             runtime::Selector action)
+    : m_words(&words), m_kind(kind), m_targetAction(std::move(target), std::move(action))
 {
 }
 
@@ -68,20 +69,19 @@ const runtime::Class& BarButtonItem::isa() const
 
 std::shared_ptr<BarButtonItem> BarButtonItem::flexibleSpace()
 {
-    return std::make_shared<BarButtonItem>(Kind::FlexibleSpace, std::weak_ptr<runtime::Object>(), runtime::Selector());
+    return std::shared_ptr<BarButtonItem>(new BarButtonItem(Kind::FlexibleSpace));
 }
 
 std::shared_ptr<BarButtonItem> BarButtonItem::fixedSpace(double width)
 {
-    auto space =
-        std::make_shared<BarButtonItem>(Kind::FixedSpace, std::weak_ptr<runtime::Object>(), runtime::Selector());
+    std::shared_ptr<BarButtonItem> space(new BarButtonItem(Kind::FixedSpace));
     space->setWidth(width);
     return space;
 }
 
 std::shared_ptr<BarButtonItem> BarButtonItem::withCustomView(std::shared_ptr<View> view)
 {
-    auto item = std::make_shared<BarButtonItem>(Kind::Custom, std::weak_ptr<runtime::Object>(), runtime::Selector());
+    std::shared_ptr<BarButtonItem> item(new BarButtonItem(Kind::Custom));
     item->m_view = std::move(view);
     return item;
 }
@@ -113,9 +113,9 @@ std::shared_ptr<View> BarButtonItem::view()
     const auto made = std::make_shared<Button>();
     if (*looks.glyph) {
         made->setGlyph(looks.glyph);
-        made->setAccessibilityLabel(looks.name);
+        made->setAccessibilityLabel(m_words->text(looks.nameKey));
     } else {
-        made->setTitle(looks.name);
+        made->setTitle(m_words->text(looks.nameKey));
     }
     made->setEmphasized(looks.emphasized);
     made->setImageInsets(m_imageInsets);

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "base/Geometry.h"
+#include "platform/files/MessageCatalog.h"
 #include "platform/views/Button.h"
 
 #include <memory>
@@ -12,7 +13,9 @@ class BarButtonItem final : public runtime::Object {
 public:
     enum class Kind { Action, Undo, Pause, Play, Done, Save, Cancel, FlexibleSpace, FixedSpace, Custom };
 
-    BarButtonItem(Kind kind, std::weak_ptr<runtime::Object> target, runtime::Selector action);
+    /// A standard item; `words`, which outlive it, have its name.
+    BarButtonItem(const MessageCatalog& words, Kind kind, std::weak_ptr<runtime::Object> target,
+                  runtime::Selector action);
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
@@ -42,8 +45,11 @@ public:
     void trigger();
 
 private:
+    explicit BarButtonItem(Kind kind) : m_kind(kind) {}
+
     std::shared_ptr<Button> button() const;
 
+    const MessageCatalog* m_words = nullptr; ///< of standard items
     Kind m_kind;
     runtime::TargetAction m_targetAction;
     double m_width = 0;

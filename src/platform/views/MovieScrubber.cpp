@@ -4,7 +4,6 @@
 
 #include <algorithm>
 #include <cmath>
-#include <cstdio>
 
 namespace platform {
 
@@ -17,20 +16,9 @@ constexpr double kOutOfSight = 60;
 /// Over what is to be cut away.
 constexpr Color kShade{0, 0, 0, 0.62};
 
-std::string clockText(double seconds)
-{
-    const auto whole = static_cast<long long>(seconds);
-    char text[48];
-    if (whole >= 3600)
-        std::snprintf(text, sizeof text, "%lld:%02lld:%02lld", whole / 3600, whole / 60 % 60, whole % 60);
-    else
-        std::snprintf(text, sizeof text, "%lld:%02lld", whole / 60, whole % 60);
-    return text;
-}
-
 } // namespace
 
-MovieScrubber::MovieScrubber() : Control({{0, 0}, {0, kHeight}})
+MovieScrubber::MovieScrubber(const MessageCatalog& words) : Control({{0, 0}, {0, kHeight}}), m_words(words)
 {
     setClipsToBounds(true);
 }
@@ -291,8 +279,9 @@ Accessibility MovieScrubber::accessibility() const
     Accessibility description = Control::accessibility();
     description.role = AccessibilityRole::Slider;
     if (description.name.empty())
-        description.name = "Position";
-    description.value = clockText(m_value) + " of " + clockText(m_duration);
+        description.name = m_words.text("SCRUBBER_POSITION");
+    description.value = m_words.text("SCRUBBER_POSITION_VALUE", {{"position", m_words.duration(m_value, 0)},
+                                                                 {"duration", m_words.duration(m_duration, 0)}});
     description.enabled = isEnabled() && m_duration > 0;
     description.maximum = m_duration;
     description.number = m_value;

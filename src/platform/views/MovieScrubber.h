@@ -7,6 +7,7 @@
 /// Split by concern: values, pictures and places here, what fingers and keys do in MovieScrubberTouches.cpp.
 #pragma once
 
+#include "platform/files/MessageCatalog.h"
 #include "platform/views/Control.h"
 #include "platform/views/Image.h"
 #include "platform/views/ScrubberParts.h"
@@ -66,10 +67,13 @@ public:
     /// How long the frame takes to where it belongs.
     static constexpr base::Instant kFrameDuration = std::chrono::milliseconds(250);
 
-    MovieScrubber();
+    /// `words` outlive it.
+    explicit MovieScrubber(const MessageCatalog& words);
 
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
+
+    const MessageCatalog& words() const { return here(m_words); }
 
     void setDelegate(std::weak_ptr<MovieScrubberDelegate> delegate) { here(m_delegate) = std::move(delegate); }
     std::shared_ptr<MovieScrubberDelegate> delegate() const { return here(m_delegate).lock(); }
@@ -178,6 +182,7 @@ private:
     /// Asks for the timestamps, then for the pictures: all of them, or those that are not here yet.
     void requestThumbnails(bool all);
 
+    const MessageCatalog& m_words;
     std::weak_ptr<MovieScrubberDelegate> m_delegate;
     std::weak_ptr<MovieScrubberDataSource> m_dataSource;
     double m_minimumTrimLength = 0;

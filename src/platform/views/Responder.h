@@ -4,7 +4,6 @@
 #include "runtime/Object.h"
 
 #include <memory>
-#include <string>
 #include <vector>
 
 namespace platform {
@@ -26,7 +25,6 @@ struct KeyCommand {
     char character = 0; ///< for Key::Character: a lower-case letter
     bool control = false;
     runtime::Selector action;
-    std::string title; ///< what it does, for help and assistive technology
 };
 
 class Responder : public runtime::Object {

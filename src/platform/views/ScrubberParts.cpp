@@ -12,21 +12,9 @@ namespace {
 constexpr double kLargestStep = 1;    // seconds, of a long movie's handle
 constexpr double kSmallestStep = 0.1; // seconds, of a short one's
 constexpr double kStepsInAMovie = 100;
+constexpr int kDecimals = 2; // of the seconds where a handle stands
 
 /// To a hundredth, cut off: what is not reached yet is not shown.
-std::string exactClockText(double seconds)
-{
-    // A hair more, as a time that was added up may fall short of what it means.
-    const auto hundredths = static_cast<long long>(std::max(0.0, seconds) * 100 + 1e-6);
-    const long long whole = hundredths / 100;
-    char text[64];
-    if (whole >= 3600)
-        std::snprintf(text, sizeof text, "%lld:%02lld:%02lld.%02lld", whole / 3600, whole / 60 % 60, whole % 60,
-                      hundredths % 100);
-    else
-        std::snprintf(text, sizeof text, "%lld:%02lld.%02lld", whole / 60, whole % 60, hundredths % 100);
-    return text;
-}
 
 } // namespace
 
@@ -115,13 +103,13 @@ Accessibility TrimHandleView::accessibility() const
     const bool isStart = m_handle == ScrubberHandle::Start;
     const double least = whole->leastRange();
     description.role = AccessibilityRole::Slider;
-    description.name = isStart ? "Trim start" : "Trim end";
+    description.name = whole->words().text(isStart ? "SCRUBBER_TRIM_START" : "SCRUBBER_TRIM_END");
     description.enabled = whole->isEnabled();
     description.minimum = isStart ? 0 : whole->editingStartValue() + least;
     description.maximum = isStart ? whole->editingEndValue() - least : whole->duration();
     description.number = isStart ? whole->editingStartValue() : whole->editingEndValue();
     description.step = std::clamp(whole->duration() / kStepsInAMovie, kSmallestStep, kLargestStep);
-    description.value = exactClockText(description.number);
+    description.value = whole->words().duration(description.number, kDecimals);
     return description;
 }
 

@@ -1,14 +1,17 @@
 #include "app/editor/NoticeScreen.h"
 
+#include "support/EnglishWords.h"
+
 #include <gmock/gmock.h>
 
 using testing::ElementsAre;
 
 namespace {
 
-std::vector<std::string> linesOf(const std::string& words)
+std::vector<std::string> linesOf(const std::string& text)
 {
-    const auto screen = std::make_shared<app::NoticeScreen>(words, true, app::NoticeScreen::Handlers{});
+    const tests::EnglishWords words;
+    const auto screen = std::make_shared<app::NoticeScreen>(words, text, true, app::NoticeScreen::Handlers{});
     std::vector<std::string> lines;
     for (const auto& view : screen->view()->subviews())
         if (const auto label = std::dynamic_pointer_cast<platform::Label>(view))

@@ -23,7 +23,7 @@ protected:
         button->addTarget(target, Target::action(), platform::kTouchUpInside);
         bar->addSubview(button);
         const auto holder = add<platform::View>(base::Rect::make(0, 50, 200, 50));
-        scrubber = std::make_shared<platform::MovieScrubber>();
+        scrubber = std::make_shared<platform::MovieScrubber>(words);
         scrubber->setFrame(base::Rect::make(0, 10, 200, 38));
         scrubber->setDataSource(movie);
         scrubber->setDelegate(movie);
@@ -98,7 +98,7 @@ TEST_F(Accessible, PressingRunsTheAction)
 TEST_F(Accessible, ASliderHasAValueAndMoves)
 {
     QAccessibleInterface* slider = interfaceOf(*scrubber);
-    EXPECT_EQ(slider->text(QAccessible::Value), "0:00 of 0:10");
+    EXPECT_EQ(slider->text(QAccessible::Value), "0 s of 10 s");
     QAccessibleValueInterface* value = slider->valueInterface();
     ASSERT_TRUE(value);
     EXPECT_EQ(value->maximumValue().toDouble(), 10);

@@ -30,7 +30,7 @@ public:
     void motionEnded_withEvent(platform::MotionSubtype, const platform::MotionEvent&) override { ++shakes; }
     void hit() { ++hits; }
 
-    platform::KeyCommand command{Key::Space, 0, false, runtime::Selector("hit"), ""};
+    platform::KeyCommand command{Key::Space, 0, false, runtime::Selector("hit")};
     int hits = 0;
     int shakes = 0;
 };
@@ -166,7 +166,7 @@ TEST_F(Input, KeysArriveByTheirMeaning)
 TEST_F(Input, LettersArriveWithControl)
 {
     const auto keyboard = addKeyboard();
-    keyboard->command = {Key::Character, 's', true, runtime::Selector("hit"), ""};
+    keyboard->command = {Key::Character, 's', true, runtime::Selector("hit")};
     hit(Qt::Key_S);
     EXPECT_EQ(keyboard->hits, 0);
     hit(Qt::Key_S, Qt::ControlModifier);

@@ -333,7 +333,7 @@ TEST_F(Looks, TheSamePictureIsTheSameBytes)
     label->setText("Again");
     add<platform::Toolbar>(base::Rect::make(0, 0, 200, 30));
     const QImage first = look();
-    presenter = std::make_unique<qtui::Presenter>(window, clock);
+    presenter = std::make_unique<qtui::Presenter>(window, clock, words);
     presenter->setScheme(qtui::Scheme::Light);
     presenter->show();
     settle();

@@ -62,7 +62,7 @@ protected:
     }
     std::shared_ptr<BarButtonItem> item(Kind kind)
     {
-        return std::make_shared<BarButtonItem>(kind, target, Target::action());
+        return std::make_shared<BarButtonItem>(words, kind, target, Target::action());
     }
     void addBars(base::Size size, bool wide)
     {
@@ -98,7 +98,7 @@ protected:
         const auto backdrop = std::make_shared<platform::BackdropView>(platform::BackdropView::kStyleChrome,
                                                                        base::Rect::make(0, y, size.width, 38));
         window->addSubview(backdrop);
-        scrubber = std::make_shared<platform::MovieScrubber>();
+        scrubber = std::make_shared<platform::MovieScrubber>(words);
         scrubber->setFrame(base::Rect::make(0, 0, size.width, 38));
         scrubber->setEdgeInset(10);
         scrubber->setEditable(true);

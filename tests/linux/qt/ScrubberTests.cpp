@@ -16,7 +16,7 @@ class Strip : public Stage {
 protected:
     explicit Strip(double itsScale = 1) : Stage(itsScale)
     {
-        scrubber = add<platform::MovieScrubber>(base::Rect::make(0, 30, 200, 38));
+        scrubber = add<platform::MovieScrubber>(base::Rect::make(0, 30, 200, 38), words);
         scrubber->setEdgeInset(10);
         scrubber->setEditable(true);
         scrubber->setMinimumTrimLength(1);
@@ -200,7 +200,7 @@ TEST_F(Strip, EachHandleIsASliderOfItsOwnToAssistiveTechnology)
     EXPECT_EQ(start->rect(), QRect(strip.left() + 10, strip.top(), 16, 38));
     start->valueInterface()->setCurrentValue(4);
     EXPECT_TRUE(scrubber->isEditing());
-    EXPECT_EQ(start->text(QAccessible::Value), "0:04.00");
+    EXPECT_EQ(start->text(QAccessible::Value), "4.00 s");
     EXPECT_EQ(start->valueInterface()->maximumValue().toDouble(), 9);
     start->actionInterface()->doAction(QAccessibleActionInterface::increaseAction());
     EXPECT_NEAR(scrubber->editingStartValue(), 4.1, 1e-9);

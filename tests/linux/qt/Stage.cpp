@@ -90,7 +90,7 @@ Stage::Stage(double wantedScale) : scale(wantedScale)
 {
     haveApplication(scale);
     window = std::make_shared<platform::Window>(mainQueue, base::Size{200, 100}, scale);
-    presenter = std::make_unique<qtui::Presenter>(window, clock);
+    presenter = std::make_unique<qtui::Presenter>(window, clock, words);
     presenter->setScheme(qtui::Scheme::Light);
     presenter->show();
     settle();

@@ -11,6 +11,7 @@
 #include "platform/views/Label.h"
 #include "platform/views/MovieScrubber.h"
 #include "platform/views/Toolbar.h"
+#include "support/EnglishWords.h"
 #include "support/FakeMedia.h"
 
 #include <QColor>
@@ -130,6 +131,7 @@ protected:
     base::ManualClock clock;
     base::MainQueue mainQueue{clock};
     runtime::NotificationCenter center;
+    EnglishWords words;
     std::shared_ptr<platform::Window> window;
     std::unique_ptr<qtui::Presenter> presenter;
 };

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "platform/views/MovieScrubber.h"
+#include "support/EnglishWords.h"
 
 #include "Fixture.h"
 
@@ -65,7 +66,8 @@ struct Movie final : platform::MovieScrubberDataSource, platform::MovieScrubberD
 
 struct Scrubbers : WindowFixture {
     std::shared_ptr<Movie> movie = std::make_shared<Movie>();
-    std::shared_ptr<platform::MovieScrubber> scrubber = std::make_shared<platform::MovieScrubber>();
+    EnglishWords words;
+    std::shared_ptr<platform::MovieScrubber> scrubber = std::make_shared<platform::MovieScrubber>(words);
 
     Scrubbers()
     {

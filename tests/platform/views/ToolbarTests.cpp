@@ -1,6 +1,7 @@
 #include "platform/views/Toolbar.h"
 
 #include "platform/views/Label.h"
+#include "support/EnglishWords.h"
 
 #include "Fixture.h"
 
@@ -16,6 +17,7 @@ using testing::IsEmpty;
 using Kind = BarButtonItem::Kind;
 
 struct Bars : tests::WindowFixture {
+    tests::EnglishWords words;
     std::shared_ptr<tests::Target> target = std::make_shared<tests::Target>();
     std::shared_ptr<Toolbar> bar = add<Toolbar>(Rect::make(0, 0, 400, 60), window);
     std::shared_ptr<BarButtonItem> flex = BarButtonItem::flexibleSpace();
@@ -29,7 +31,7 @@ struct Bars : tests::WindowFixture {
 
     std::shared_ptr<BarButtonItem> item(Kind kind)
     {
-        return std::make_shared<BarButtonItem>(kind, target, tests::Target::action());
+        return std::make_shared<BarButtonItem>(words, kind, target, tests::Target::action());
     }
     void show(Toolbar::Items items)
     {
@@ -170,7 +172,7 @@ TEST_F(Bars, ATapSendsTheItemsActionWithTheItemAsSender)
 
 TEST_F(Bars, AnItemThatNobodyAnswersIsDisabledUntilSomebodyDoes)
 {
-    const auto lost = std::make_shared<BarButtonItem>(Kind::Save, target, runtime::Selector("unknown:"));
+    const auto lost = std::make_shared<BarButtonItem>(words, Kind::Save, target, runtime::Selector("unknown:"));
     show({lost, cancel});
     EXPECT_FALSE(std::dynamic_pointer_cast<Button>(lost->view())->isEnabled());
     EXPECT_TRUE(std::dynamic_pointer_cast<Button>(cancel->view())->isEnabled());

@@ -275,7 +275,7 @@ TEST_F(Trims, EachHandleIsASlider)
     const auto start = scrubber->startHandle()->accessibility();
     EXPECT_EQ(start.role, platform::AccessibilityRole::Slider);
     EXPECT_EQ(start.name, "Trim start");
-    EXPECT_EQ(start.value, "0:00.00");
+    EXPECT_EQ(start.value, "0.00 s");
     EXPECT_EQ(start.minimum, 0);
     EXPECT_EQ(start.maximum, 29);
     EXPECT_DOUBLE_EQ(start.step, 0.3);

@@ -199,9 +199,9 @@ TEST_F(Focus, KeysReachTheCommandsOfTheChainOfTheFirstResponder)
     window->setRootViewController(root);
     root->addChildViewController(child);
     root->view()->addSubview(child->view());
-    root->commands = {{Key::Character, 's', true, runtime::Selector("command"), "Save"},
-                      {Key::Space, 0, false, runtime::Selector("command"), "Play"},
-                      {Key::Escape, 0, false, runtime::Selector("unknown"), "Nothing"}};
+    root->commands = {{Key::Character, 's', true, runtime::Selector("command")},
+                      {Key::Space, 0, false, runtime::Selector("command")},
+                      {Key::Escape, 0, false, runtime::Selector("unknown")}};
     taken();
     EXPECT_FALSE(window->keyDown(Key::Space));
     child->becomeFirstResponder();
@@ -211,7 +211,7 @@ TEST_F(Focus, KeysReachTheCommandsOfTheChainOfTheFirstResponder)
     EXPECT_FALSE(window->keyDown(Key::Character, 'q', true));
     EXPECT_FALSE(window->keyDown(Key::Escape));
     EXPECT_THAT(taken(), ElementsAre("root command", "root command"));
-    child->commands = {{Key::Space, 0, false, runtime::Selector("command"), "Play"}};
+    child->commands = {{Key::Space, 0, false, runtime::Selector("command")}};
     EXPECT_TRUE(window->keyDown(Key::Space));
     EXPECT_THAT(taken(), ElementsAre("child command"));
 }

@@ -17,10 +17,8 @@ public:
     QString text(QAccessible::Text kind) const override
     {
         if (kind == QAccessible::Name)
-            return QStringLiteral("Working on the movie");
-        if (kind == QAccessible::Value && m_line.percent())
-            return QStringLiteral("%1 %").arg(*m_line.percent());
-        return {};
+            return m_line.name();
+        return kind == QAccessible::Value ? m_line.percentText() : QString();
     }
     QAccessible::Role role() const override { return QAccessible::ProgressBar; }
     QAccessible::State state() const override

@@ -4,6 +4,7 @@
 #include "base/Geometry.h"
 #include "linux/qt/Icons.h"
 #include "linux/qt/Theme.h"
+#include "platform/files/MessageCatalog.h"
 
 #include <QRectF>
 
@@ -31,6 +32,9 @@ struct Statistics {
 };
 
 struct Stage {
+    explicit Stage(const platform::MessageCatalog& messages) : words(messages) {}
+
+    const platform::MessageCatalog& words;
     Theme theme = Theme::forScheme(Scheme::Light);
     double scale = 1; ///< pixels per point
     bool liveBlur = true;

@@ -45,6 +45,20 @@ std::optional<int> WorkLine::percent() const
     return m_progress ? std::optional(static_cast<int>(std::lround(*m_progress * 100))) : std::nullopt;
 }
 
+QString WorkLine::name() const
+{
+    assertHere();
+    return QString::fromStdString(stage().words.text("WORK_NAME"));
+}
+
+QString WorkLine::percentText() const
+{
+    assertHere();
+    if (!m_progress)
+        return {};
+    return QString::fromStdString(stage().words.text("WORK_PERCENT", {{"part", *percent() / 100.0}}));
+}
+
 void WorkLine::showIn(const QRectF& window)
 {
     assertHere();

@@ -19,8 +19,10 @@ public:
 
     bool isUnderWay() const { return here(m_underWay); }
     std::optional<double> progress() const { return here(m_progress); }
-    /// The progress as people are told of it.
+    // As people are told of it: what is under way, and how far it is, in whole percents and in words.
+    QString name() const;
     std::optional<int> percent() const;
+    QString percentText() const;
 
     /// Draws itself along the upper edge of `window`, if something is under way.
     void showIn(const QRectF& window);

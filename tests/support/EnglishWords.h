@@ -1,0 +1,55 @@
+/// The program's own words in English, as they stand in its table: places are filled with what stands there, numbers without
+/// any form. Any thread.
+#pragma once
+
+#include "platform/files/MessageCatalog.h"
+#include "platform/files/StringsTable.h"
+#include "support/Paths.h"
+#include "support/PrivateDirectory.h"
+
+#include <string>
+
+namespace tests {
+
+class EnglishWords final : public platform::MessageCatalog {
+public:
+    bool rightToLeft = false;
+
+    std::string text(std::string_view key) const override
+    {
+        const auto found = m_table.find(key);
+        return found == m_table.end() ? std::string(key) : found->second;
+    }
+    std::string text(std::string_view key, std::initializer_list<platform::MessageArgument> arguments) const override
+    {
+        std::string message = text(key);
+        for (const platform::MessageArgument& each : arguments)
+            if (const std::size_t at = message.find(std::string("{") + each.name); at != std::string::npos)
+                message.replace(at, message.find('}', at) - at + 1, written(each.value));
+        return message;
+    }
+    std::string duration(double seconds, int decimals) const override
+    {
+        const std::string number = std::to_string(seconds);
+        const std::size_t dot = number.find('.');
+        return number.substr(0, decimals == 0 ? dot : dot + 1 + static_cast<std::size_t>(decimals)) + " s";
+    }
+    bool isRightToLeft() const override { return rightToLeft; }
+
+private:
+    static std::string written(const std::variant<std::string, std::int64_t, double>& value)
+    {
+        if (const auto* text = std::get_if<std::string>(&value))
+            return *text;
+        const auto* whole = std::get_if<std::int64_t>(&value);
+        return whole ? std::to_string(*whole) : std::to_string(std::get<double>(value));
+    }
+
+    const platform::StringsTable m_table =
+        platform::parseStrings(
+            PrivateDirectory::read(sourceFile("resources/bundles/Clipsa.bundle/en.lproj/Localizable.strings")),
+            "the English table")
+            .table;
+};
+
+} // namespace tests
