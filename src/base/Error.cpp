@@ -16,6 +16,13 @@ ErrorRef Error::make(std::string domain, std::int64_t code, std::string descript
     return std::make_shared<const Error>(std::move(domain), code, UserInfo{{kDescriptionKey, std::move(description)}});
 }
 
+ErrorRef Error::withMessage(const ErrorRef& error, std::string key, UserInfo places)
+{
+    places.insert_or_assign(kDescriptionKey, error->description());
+    places.insert_or_assign(kMessageKey, std::move(key));
+    return std::make_shared<const Error>(error->domain(), error->code(), std::move(places));
+}
+
 std::string Error::meaningOf(int number)
 {
     switch (number) {

@@ -23,8 +23,15 @@ public:
 
     Error(std::string domain, std::int64_t code, UserInfo userInfo = {});
 
+    /// The user-info key of a message for people in their own language: what its table calls it. The other entries fill its
+    /// places, by name.
+    static constexpr const char* kMessageKey = "message";
+
     /// The usual way to make one: code for the caller, `description` for the reader.
     static ErrorRef make(std::string domain, std::int64_t code, std::string description);
+
+    /// The same error, with a message for people beside its description.
+    static ErrorRef withMessage(const ErrorRef& error, std::string key, UserInfo places);
 
     /// An error of the operating system (`errno`), with what was being done to which file. Its description
     /// goes on with what that number means, in plain words.

@@ -8,6 +8,7 @@
 #include "support/PrivateDirectory.h"
 
 #include <string>
+#include <vector>
 
 namespace tests {
 
@@ -20,7 +21,7 @@ public:
         const auto found = m_table.find(key);
         return found == m_table.end() ? std::string(key) : found->second;
     }
-    std::string text(std::string_view key, std::initializer_list<platform::MessageArgument> arguments) const override
+    std::string text(std::string_view key, const std::vector<platform::MessageArgument>& arguments) const override
     {
         std::string message = text(key);
         for (const platform::MessageArgument& each : arguments)

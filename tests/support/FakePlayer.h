@@ -48,7 +48,7 @@ struct FakeMovie {
     base::MediaTime duration = base::MediaTime::indefinite();
     std::vector<platform::AssetTrack> tracks;
     base::ErrorRef error;
-    std::string missing; ///< of a movie that was cut off
+    std::optional<platform::CutOff> cutOff; ///< of a movie that was cut off
 
     static FakeMovie lasting(double seconds, base::Size size = {1080, 1920}, int soundTracks = 1)
     {
@@ -78,7 +78,7 @@ public:
     base::ErrorRef error() const override { return movie.error; }
     base::MediaTime duration() const override { return movie.duration; }
     std::vector<platform::AssetTrack> tracks() const override { return movie.tracks; }
-    std::string whatIsMissing() const override { return movie.missing; }
+    std::optional<platform::CutOff> cutOff() const override { return movie.cutOff; }
     void whenLoaded(std::function<void()> then) override
     {
         if (!movie.error && movie.tracks.empty()) {

@@ -226,7 +226,7 @@ void EditorProgram::openMovie()
     asset->whenLoaded([this, weak = std::weak_ptr(asset)] {
         const auto opened = weak.lock();
         if (opened && opened->error())
-            refuse(opened->error()->description());
+            refuse(*opened->error());
         else
             show();
     });
@@ -236,18 +236,18 @@ void EditorProgram::openMovie()
     });
 }
 
-void EditorProgram::refuse(const std::string& why)
+void EditorProgram::refuse(const base::Error& error)
 {
     if (!m_extension.principal)
         return;
-    m_report.add({dbus::MovieNote::Kind::Refused, {}, why});
+    m_report.add({dbus::MovieNote::Kind::Refused, {}, error.description()});
     if (!m_options.explain) {
         disconnected();
         return;
     }
     m_shown = true; // there is nothing else to be shown
     m_presenter.hideWork();
-    showNotice(m_words.text("NOTICE_NO_MOVIE") + "\n" + why);
+    showNotice(platform::wordsFor(error, m_words));
 }
 
 void EditorProgram::show()

@@ -87,7 +87,7 @@ private:
     void waitForPayload();
     void showNotice(const std::string& text);
     void openMovie();
-    void refuse(const std::string& why);
+    void refuse(const base::Error& error);
     void show();
     void openWindow();
     void closeRequested();

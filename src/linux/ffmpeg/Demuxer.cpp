@@ -1,6 +1,7 @@
 #include "linux/ffmpeg/Demuxer.h"
 
 #include "linux/ffmpeg/FileMarks.h"
+#include "linux/ffmpeg/Words.h"
 
 #include <algorithm>
 #include <string_view>
@@ -45,14 +46,19 @@ bool isKnown(const AVStream& stream)
 }
 
 /// Why it cannot be opened, and what to do.
-std::string whyNot(const OpenFile& file, int error)
+base::ErrorRef whyNot(const OpenFile& file, int error)
 {
+    const auto explained = [error](const std::string& why, const char* key) {
+        return base::Error::withMessage(base::Error::make("ffmpeg", error, why), key, {});
+    };
     if (error == kTooManyTracks)
-        return "it has more than " + std::to_string(kMostTracks) + " tracks, as no recording has";
+        return explained("it has more than " + std::to_string(kMostTracks) + " tracks, as no recording has",
+                         "MOVIE_TOO_MANY_TRACKS");
     if (error == AVERROR_INVALIDDATA && lacksIndex(file))
-        return "its index is missing, because its recorder was stopped before the end or only a part of it was copied; "
-               "copy it again, or have it repaired";
-    return textOf(error);
+        return explained("its index is missing, because its recorder was stopped before the end or only a part of it "
+                         "was copied; copy it again, or have it repaired",
+                         "MOVIE_WITHOUT_INDEX");
+    return base::Error::make("ffmpeg", error, textOf(error));
 }
 
 bool isOfKind(const AVFormatContext& context, std::string_view kind)
@@ -117,10 +123,8 @@ base::Result<std::unique_ptr<Demuxer>> Demuxer::open(std::shared_ptr<OpenFile> f
 {
     std::unique_ptr<Demuxer> demuxer(new Demuxer(std::move(file), std::move(cancelled)));
     if (const int error = demuxer->begin(); error < 0)
-        return base::Error::make("ffmpeg", error,
-                                 "“" + demuxer->m_file->name() + "” is not a movie that can be opened: "
-                                     + whyNot(*demuxer->m_file, demuxer->m_readError ? demuxer->m_readError : error)
-                                     + ".");
+        return notAMovie(demuxer->m_file->name(),
+                         whyNot(*demuxer->m_file, demuxer->m_readError ? demuxer->m_readError : error));
     return demuxer;
 }
 

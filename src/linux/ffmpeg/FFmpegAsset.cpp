@@ -1,4 +1,5 @@
 #include "linux/ffmpeg/FFmpegAsset.h"
+#include "linux/ffmpeg/Words.h"
 
 #include <utility>
 
@@ -52,12 +53,14 @@ void FFmpegAsset::load()
         });
     };
     if (!m_url) {
-        deliver(base::Error::make("ffmpeg", AVERROR(EINVAL), "There is no movie to open."));
+        deliver(base::Error::withMessage(base::Error::make("ffmpeg", AVERROR(EINVAL), "There is no movie to open."),
+                                         "MOVIE_MISSING", {}));
         return;
     }
     if (!m_url->isFile()) {
-        deliver(base::Error::make("ffmpeg", AVERROR(EINVAL),
-                                  "“" + m_url->string() + "” is not a movie that can be opened: it is not a file."));
+        deliver(notAMovie(m_url->string(),
+                          base::Error::withMessage(base::Error::make("ffmpeg", AVERROR(EINVAL), "it is not a file"),
+                                                   "MOVIE_NOT_A_FILE", {})));
         return;
     }
     // The opener belongs to the engine and is joined before that goes, so the pointer is good while the task runs.
@@ -79,10 +82,10 @@ void FFmpegAsset::finish(base::Result<std::shared_ptr<Movie>> movie)
         then();
 }
 
-std::string FFmpegAsset::whatIsMissing() const
+std::optional<platform::CutOff> FFmpegAsset::cutOff() const
 {
     assertHere();
-    return m_movie ? m_movie->whatIsMissing("This recording").value_or("") : "";
+    return m_movie ? m_movie->cutOff() : std::nullopt;
 }
 
 void FFmpegAsset::whenLoaded(std::function<void()> then)

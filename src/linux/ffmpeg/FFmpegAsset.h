@@ -19,7 +19,7 @@ public:
     base::ErrorRef error() const override { return here(m_error); }
     base::MediaTime duration() const override;
     std::vector<platform::AssetTrack> tracks() const override;
-    std::string whatIsMissing() const override;
+    std::optional<platform::CutOff> cutOff() const override;
     void whenLoaded(std::function<void()> then) override;
 
     /// Null while loading, and when it failed. Everything that reads the movie starts here: see Movie::demuxer.

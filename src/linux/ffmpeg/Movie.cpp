@@ -2,6 +2,7 @@
 
 #include "linux/ffmpeg/FileMarks.h"
 #include "linux/ffmpeg/VideoDecoder.h"
+#include "linux/ffmpeg/Words.h"
 
 #include <algorithm>
 #include <cmath>
@@ -61,6 +62,11 @@ std::string nameOf(const AVStream& stream)
 constexpr double kPicturesASecond = 61;
 constexpr double kSoundPacketsASecond = 102;
 
+base::ErrorRef explained(int code, const char* why, const char* messageKey)
+{
+    return Error::withMessage(Error::make("ffmpeg", code, why), messageKey, {});
+}
+
 } // namespace
 
 base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file, const Cancelled& cancelled)
@@ -72,14 +78,10 @@ base::Result<std::shared_ptr<Movie>> Movie::open(std::shared_ptr<OpenFile> file,
     movie->m_file = std::move(file);
     movie->m_spare = std::move(demuxer).value();
 
-    const auto failed = [&](const base::ErrorRef& why) {
-        const std::string& name = movie->m_file->name();
-        return Error::make("ffmpeg", why->code(),
-                           "“" + name + "” is not a movie that can be opened: " + why->description() + ".");
-    };
+    const auto failed = [&](const base::ErrorRef& why) { return notAMovie(movie->m_file->name(), why); };
     movie->describe();
     if (!movie->m_video && movie->m_audioStreams.empty())
-        return failed(Error::make("ffmpeg", AVERROR_STREAM_NOT_FOUND, "it has neither pictures nor sound"));
+        return failed(explained(AVERROR_STREAM_NOT_FOUND, "it has neither pictures nor sound", "MOVIE_WITHOUT_TRACKS"));
     if (movie->m_video) {
         if (const auto decoded = movie->decodeFirstFrame(cancelled); !decoded)
             return failed(decoded.error());
@@ -163,7 +165,7 @@ base::Result<void> Movie::decodeFirstFrame(const Cancelled& cancelled)
     if (!m_firstFrame) {
         const int why = m_spare->readError() != 0 ? m_spare->readError() : error;
         const bool isItsFault = why == 0 || why == AVERROR_EOF || why == AVERROR_INVALIDDATA;
-        return isItsFault ? Error::make("ffmpeg", AVERROR_INVALIDDATA, "it holds no picture")
+        return isItsFault ? explained(AVERROR_INVALIDDATA, "it holds no picture", "MOVIE_WITHOUT_PICTURE")
                           : Error::make("ffmpeg", why, textOf(why));
     }
 
@@ -219,12 +221,12 @@ base::Result<void> Movie::findDuration(const Cancelled& cancelled)
         || announced > m_file->size()) {
         const auto index = packetIndex(cancelled);
         if (!index)
-            return Error::make("ffmpeg", AVERROR_EXIT, "it cannot be read to its end");
+            return explained(AVERROR_EXIT, "it cannot be read to its end", "MOVIE_UNREADABLE");
         if (m_video && index->packets().empty())
-            return Error::make(
-                "ffmpeg", AVERROR_INVALIDDATA,
-                "it does not say when its pictures are shown, as a bare stream of them; have it put into "
-                "a file that does, MP4 or Matroska for example");
+            return explained(AVERROR_INVALIDDATA,
+                             "it does not say when its pictures are shown, as a bare stream of them; have it put into "
+                             "a file that does, MP4 or Matroska for example",
+                             "MOVIE_WITHOUT_TIMES");
         const std::int64_t said = length == AV_NOPTS_VALUE ? 0 : length - std::max<std::int64_t>(0, m_origin);
         length = std::max<std::int64_t>(0, index->end().value_or(m_origin) - m_origin);
         noteCut(announced - m_file->size(), said, length);
@@ -273,13 +275,24 @@ void Movie::noteCut(std::int64_t missing, std::int64_t said, std::int64_t length
         m_durationBeforeCut = MediaTime::indefinite();
 }
 
-std::optional<std::string> Movie::whatIsMissing(const std::string& subject) const
+std::optional<platform::CutOff> Movie::cutOff() const
 {
     if (!m_durationBeforeCut)
         return std::nullopt;
-    const std::string of =
-        m_durationBeforeCut->isNumeric() ? "of " + lengthInWords(m_durationBeforeCut->seconds()) + " " : "";
-    return subject + " was cut off: " + of + "only the first " + lengthInWords(m_duration.seconds()) + " are there.";
+    platform::CutOff cut{m_duration.seconds()};
+    if (m_durationBeforeCut->isNumeric())
+        cut.secondsBefore = m_durationBeforeCut->seconds();
+    return cut;
+}
+
+std::optional<std::string> Movie::whatIsMissing() const
+{
+    const auto cut = cutOff();
+    if (!cut)
+        return std::nullopt;
+    const std::string of = cut->secondsBefore ? "of " + lengthInWords(*cut->secondsBefore) + " " : "";
+    return "“" + m_file->name() + "” was cut off: " + of + "only the first " + lengthInWords(cut->seconds)
+           + " are there.";
 }
 
 void Movie::findLikelyPackets()

@@ -29,8 +29,9 @@ public:
     /// How long it was, as its header says, before its file was cut off; indefinite when that is not known, and
     /// nothing when it is whole as far as one can see.
     const std::optional<base::MediaTime>& durationBeforeCut() const { return m_durationBeforeCut; }
-    /// The same in a sentence, which begins with what the movie shall be called.
-    std::optional<std::string> whatIsMissing(const std::string& subject) const;
+    std::optional<platform::CutOff> cutOff() const;
+    /// The same in a sentence, for logs.
+    std::optional<std::string> whatIsMissing() const;
     /// Ticks a second of all times that are told.
     std::int32_t timescale() const { return m_video ? m_video->timescale : kSoundTimescale; }
     /// Nothing when there is only sound.

@@ -1,29 +1,40 @@
 #include "linux/ffmpeg/OpenFile.h"
 
+#include "linux/ffmpeg/Libraries.h"
+#include "linux/ffmpeg/Words.h"
+
 #include <cerrno>
 #include <fcntl.h>
 #include <unistd.h>
 
 namespace ffmpeg {
 
-using base::Error;
+namespace {
+
+base::ErrorRef cannotOpen(const std::string& name, int number)
+{
+    const bool isNoFile = number == EISDIR || number == EINVAL;
+    return base::Error::withMessage(base::Error::fromErrno(number, "“" + name + "” cannot be opened"),
+                                    isNoFile ? "MOVIE_NOT_A_FILE" : messageKeyOf(AVERROR(number)), {{"name", name}});
+}
+
+} // namespace
 
 base::Result<std::shared_ptr<OpenFile>> OpenFile::open(const std::string& path)
 {
     const std::string name = path.substr(path.find_last_of('/') + 1);
-    const std::string doing = "“" + name + "” cannot be opened";
     // Without O_NONBLOCK a pipe would wait for somebody to write to it.
     const int descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
     if (descriptor < 0)
-        return Error::fromErrno(errno, doing);
+        return cannotOpen(name, errno);
     std::shared_ptr<OpenFile> file(new OpenFile(descriptor, name));
     struct stat about {};
     if (fstat(descriptor, &about) != 0)
-        return Error::fromErrno(errno, doing);
+        return cannotOpen(name, errno);
     if (S_ISDIR(about.st_mode))
-        return Error::fromErrno(EISDIR, doing);
+        return cannotOpen(name, EISDIR);
     if (!S_ISREG(about.st_mode))
-        return Error::fromErrno(EINVAL, doing);
+        return cannotOpen(name, EINVAL);
     file->m_identity = identityOf(about);
     file->m_permissions = about.st_mode & ACCESSPERMS;
     return file;
@@ -33,7 +44,7 @@ base::Result<std::shared_ptr<OpenFile>> OpenFile::of(int descriptor, const std::
 {
     const int own = fcntl(descriptor, F_DUPFD_CLOEXEC, 0);
     if (own < 0)
-        return Error::fromErrno(errno, "“" + name + "” cannot be opened");
+        return cannotOpen(name, errno);
     std::shared_ptr<OpenFile> file(new OpenFile(own, name));
     struct stat about {};
     if (fstat(own, &about) == 0)

@@ -41,6 +41,38 @@ std::string textOf(int avError)
     return "something unexpected happened (" + std::to_string(avError) + ")";
 }
 
+const char* messageKeyOf(int avError)
+{
+    switch (avError) {
+    case AVERROR_INVALIDDATA:
+        return "MOVIE_DAMAGED";
+    case AVERROR_EOF:
+        return "MOVIE_TOO_SHORT";
+    case AVERROR_DECODER_NOT_FOUND:
+    case AVERROR_PATCHWELCOME:
+    case AVERROR(ENOSYS):
+        return "MOVIE_WITHOUT_DECODER";
+    case AVERROR(ENOENT):
+        return "MOVIE_GONE";
+    case AVERROR(EACCES):
+    case AVERROR(EPERM):
+        return "MOVIE_NOT_ALLOWED";
+    case AVERROR(EIO):
+        return "MOVIE_UNREADABLE";
+    default:
+        return "MOVIE_UNKNOWN";
+    }
+}
+
+base::ErrorRef notAMovie(const std::string& name, const base::ErrorRef& why)
+{
+    const auto known = why->userInfo().find(base::Error::kMessageKey);
+    return base::Error::withMessage(
+        base::Error::make(why->domain(), why->code(),
+                          "“" + name + "” is not a movie that can be opened: " + why->description() + "."),
+        known != why->userInfo().end() ? known->second : messageKeyOf(static_cast<int>(why->code())), {{"name", name}});
+}
+
 std::string lengthInWords(double seconds)
 {
     char text[32];

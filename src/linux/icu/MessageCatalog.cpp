@@ -74,7 +74,7 @@ std::string MessageCatalog::text(std::string_view key) const
     return std::string(key);
 }
 
-std::string MessageCatalog::text(std::string_view key, std::initializer_list<platform::MessageArgument> arguments) const
+std::string MessageCatalog::text(std::string_view key, const std::vector<platform::MessageArgument>& arguments) const
 {
     const std::string pattern = text(key);
     std::vector<icu::UnicodeString> names;

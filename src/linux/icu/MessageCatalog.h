@@ -5,6 +5,7 @@
 #include "platform/files/MessageCatalog.h"
 
 #include <string>
+#include <vector>
 
 namespace intl {
 
@@ -14,7 +15,7 @@ public:
     MessageCatalog(platform::Bundles& bundles, const std::string& path);
 
     std::string text(std::string_view key) const override;
-    std::string text(std::string_view key, std::initializer_list<platform::MessageArgument> arguments) const override;
+    std::string text(std::string_view key, const std::vector<platform::MessageArgument>& arguments) const override;
     std::string duration(double seconds, int decimals) const override;
     bool isRightToLeft() const override { return m_isRightToLeft; }
 

@@ -4,11 +4,13 @@
 /// as ICU's message patterns have them: `{count, plural, one {# movie} other {# movies}}`.
 #pragma once
 
+#include "base/Error.h"
+
 #include <cstdint>
-#include <initializer_list>
 #include <string>
 #include <string_view>
 #include <variant>
+#include <vector>
 
 namespace platform {
 
@@ -25,12 +27,15 @@ public:
     /// In English where the user's language has none, and the key itself where that has none either.
     virtual std::string text(std::string_view key) const = 0;
     /// The same with its places filled; a place that is not named here stays as it is.
-    virtual std::string text(std::string_view key, std::initializer_list<MessageArgument> arguments) const = 0;
+    virtual std::string text(std::string_view key, const std::vector<MessageArgument>& arguments) const = 0;
     /// How long something is: "1 minute, 5.25 seconds" with two decimals, cut off, as what is not reached yet is not said.
     /// What is no such time is 0 seconds.
     virtual std::string duration(double seconds, int decimals) const = 0;
     /// Whether the words run from right to left.
     virtual bool isRightToLeft() const = 0;
 };
+
+/// What a person reads of an error: its message in their language, else its description.
+std::string wordsFor(const base::Error& error, const MessageCatalog& words);
 
 } // namespace platform

@@ -29,6 +29,14 @@ struct AssetTrack {
     base::MediaTimeRange timeRange;
 };
 
+/// Of a movie whose end is missing.
+struct CutOff {
+    double seconds = 0;                       ///< that are there
+    std::optional<double> secondsBefore = {}; ///< that there were, where the file tells
+
+    friend bool operator==(const CutOff&, const CutOff&) = default;
+};
+
 class Asset : public runtime::Object {
 public:
     /// Nothing when the asset was made without a URL.
@@ -41,8 +49,8 @@ public:
     /// In the file's order; empty until known.
     virtual std::vector<AssetTrack> tracks() const = 0;
     std::vector<AssetTrack> tracksWithMediaType(MediaType type) const;
-    /// What the user should know of a movie that was cut off, in a sentence; empty when it is whole, or not known yet.
-    virtual std::string whatIsMissing() const { return {}; }
+    /// What is left of a movie that was cut off; nothing when it is whole, or not known yet.
+    virtual std::optional<CutOff> cutOff() const { return std::nullopt; }
     /// Calls `then` on the main queue, not before this returns, when the above is known or the error is.
     /// Not when the asset goes first.
     virtual void whenLoaded(std::function<void()> then) = 0;

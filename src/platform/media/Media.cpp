@@ -80,21 +80,25 @@ void PlayerLayer::observeValueForKeyPath_ofObject_change_context(std::string_vie
     setNeedsDisplay();
 }
 
-std::string PlayerLayer::failureText() const
+bool PlayerLayer::hasFailed() const
 {
     assertHere();
-    if (!m_item || m_item->status() != PlayerItem::Status::Failed)
-        return {};
-    return m_item->error() ? m_item->error()->description() : "This movie cannot be played.";
+    return m_item && m_item->status() == PlayerItem::Status::Failed;
 }
 
-std::string PlayerLayer::noticeText() const
+base::ErrorRef PlayerLayer::failure() const
+{
+    assertHere();
+    return hasFailed() ? m_item->error() : nullptr;
+}
+
+std::optional<CutOff> PlayerLayer::notice() const
 {
     assertHere();
     if (!m_item || m_item->status() != PlayerItem::Status::ReadyToPlay || !m_item->asset())
         return {};
     const bool isAtStart = !m_player->isPlaying() && m_player->currentTime().seconds() == 0;
-    return isAtStart ? m_item->asset()->whatIsMissing() : std::string();
+    return isAtStart ? m_item->asset()->cutOff() : std::nullopt;
 }
 
 base::Rect PlayerLayer::videoRect(base::Rect bounds) const

@@ -4,7 +4,7 @@
 #include "platform/media/Player.h"
 #include "platform/views/Layer.h"
 
-#include <string>
+#include <optional>
 #include <string_view>
 
 namespace platform {
@@ -20,10 +20,12 @@ public:
 
     /// Null when there is no player, or no picture yet.
     VideoFrameRef currentFrame() const { return here(m_player) ? m_player->currentFrame() : nullptr; }
-    /// What to tell the user in place of a picture: why the item cannot be played. Empty while there is nothing to tell.
-    std::string failureText() const;
-    /// What to tell the user over the first picture: that the movie was cut off. Empty elsewhere, and while it plays.
-    std::string noticeText() const;
+    // What to tell the user.
+    /// In place of a picture: that the item cannot be played, and why, where that is known.
+    bool hasFailed() const;
+    base::ErrorRef failure() const;
+    /// Over the first picture: that the movie was cut off. Nothing elsewhere, and while it plays.
+    std::optional<CutOff> notice() const;
     /// Where the picture stands inside `bounds`; empty without a picture.
     base::Rect videoRect(base::Rect bounds) const;
 

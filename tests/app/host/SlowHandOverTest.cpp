@@ -208,7 +208,7 @@ TEST_F(ASlowHandOver, OfWhatIsNoMovieIsExplainedWhereNobodyElseWill)
     start(R"(
         wait waiting
         print waiting
-        tap There is no movie in this file.
+        tap “not-a-movie.mp4” is damaged, or is no
         print explained
         picture refused.png
         tap Cancel)",

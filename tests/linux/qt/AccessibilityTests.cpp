@@ -154,12 +154,14 @@ TEST_F(Accessible, WhatCannotBeSeenIsNotThere)
     EXPECT_EQ(root()->child(0)->childCount(), 0);
 }
 
+constexpr const char* kCutOff = "This recording was cut off: only the first 1.0 s are there.";
+
 class SaidOfAVideo : public Stage {
 protected:
     SaidOfAVideo()
     {
         add<platform::Toolbar>(base::Rect::make(0, 0, 200, 44));
-        movie.missing = "It was cut off.";
+        movie.cutOff = platform::CutOff{1, {}};
     }
 
     QAccessibleInterface* root() { return QAccessible::queryAccessibleInterface(&presenter->quickWindow()); }
@@ -203,7 +205,7 @@ TEST_F(SaidOfAVideo, IsAMessageOfTheWindowBeforeItsViews)
     ASSERT_EQ(root()->childCount(), 2);
     QAccessibleInterface* message = root()->child(0);
     EXPECT_EQ(message->role(), QAccessible::AlertMessage);
-    EXPECT_EQ(message->text(QAccessible::Name), "It was cut off.");
+    EXPECT_EQ(message->text(QAccessible::Name), kCutOff);
     EXPECT_EQ(message->parent(), root());
     EXPECT_EQ(message->rect().size(), QSize(200, 100));
     EXPECT_FALSE(message->state().invisible);
@@ -230,8 +232,7 @@ TEST_F(SaidOfAVideo, IsToldOnceAndGoesWhenItPlays)
     const auto player = addVideo(base::Rect::make(0, 0, 200, 100));
     EXPECT_TRUE(told().empty());
     item->becomeReady(movie);
-    EXPECT_EQ(told(), (std::vector<Event>{{QAccessible::ObjectShow, "It was cut off."},
-                                          {QAccessible::Alert, "It was cut off."}}));
+    EXPECT_EQ(told(), (std::vector<Event>{{QAccessible::ObjectShow, kCutOff}, {QAccessible::Alert, kCutOff}}));
     EXPECT_TRUE(told().empty()) << "once";
     player->play();
     player->show(white);

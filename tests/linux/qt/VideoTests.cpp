@@ -94,7 +94,7 @@ TEST_F(Video, AMovieThatWasCutOffSaysSoOverItsFirstPictureBelowTheBar)
     };
     EXPECT_THAT(darkRows(), ::testing::IsEmpty());
     FakeMovie movie = FakeMovie::lasting(10);
-    movie.missing = "It was cut off.";
+    movie.cutOff = platform::CutOff{1, {}};
     item->becomeReady(movie);
     const auto plate = darkRows();
     ASSERT_GT(plate.size(), 20U);

@@ -55,29 +55,31 @@ TEST_F(Layers, TellWhyAMovieCannotBePlayedAndAskToBeDrawnThen)
         playerOf(tests::FakeMovie::failing(base::Error::make("test", 1, "movie.mp4 is no movie."))));
     int drawings = 0;
     layer->setDisplayHandler([&] { ++drawings; });
-    EXPECT_EQ(layer->failureText(), "");
+    EXPECT_FALSE(layer->hasFailed());
+    EXPECT_EQ(layer->failure(), nullptr);
     mainQueue.drain();
-    EXPECT_EQ(layer->failureText(), "movie.mp4 is no movie.");
+    EXPECT_TRUE(layer->hasFailed());
+    EXPECT_EQ(layer->failure()->description(), "movie.mp4 is no movie.");
     EXPECT_GE(drawings, 1);
 }
 
 TEST_F(Layers, TellThatAMovieWasCutOffWhereItBeginsAndRests)
 {
     auto movie = tests::FakeMovie::lasting(10);
-    movie.missing = "This recording was cut off.";
+    movie.cutOff = platform::CutOff{10, 20};
     const auto player = playerOf(movie);
     const auto layer = PlayerLayer::withPlayer(player);
     mainQueue.drain();
-    EXPECT_EQ(layer->noticeText(), "This recording was cut off.");
+    EXPECT_EQ(layer->notice(), (platform::CutOff{10, 20}));
     player->play();
-    EXPECT_EQ(layer->noticeText(), "");
+    EXPECT_EQ(layer->notice(), std::nullopt);
     player->pause();
     player->seekToTime(base::MediaTime::fromSeconds(3, 600));
     mainQueue.drain();
-    EXPECT_EQ(layer->noticeText(), "");
+    EXPECT_EQ(layer->notice(), std::nullopt);
     layer->setPlayer(playerOf(tests::FakeMovie::lasting(5)));
     mainQueue.drain();
-    EXPECT_EQ(layer->noticeText(), "") << "this one is whole";
+    EXPECT_EQ(layer->notice(), std::nullopt) << "this one is whole";
 }
 
 TEST_F(Layers, LetGoOfAFormerPlayer)
@@ -87,6 +89,6 @@ TEST_F(Layers, LetGoOfAFormerPlayer)
     EXPECT_EQ(former->currentItem()->observerCount(), 1U);
     layer->setPlayer(nullptr);
     EXPECT_EQ(former->currentItem()->observerCount(), 0U);
-    EXPECT_EQ(layer->failureText(), "");
+    EXPECT_FALSE(layer->hasFailed());
     EXPECT_EQ(layer->currentFrame(), nullptr);
 }

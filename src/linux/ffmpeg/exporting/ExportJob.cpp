@@ -160,7 +160,7 @@ base::ErrorRef whyNotWhole(const OpenFile& file, int failedReadsBefore)
 Result<void> ExportJob::run() const
 {
     const int failedReads = movie->file()->failedReads();
-    if (const auto missing = movie->whatIsMissing("“" + movie->file()->name() + "”"))
+    if (const auto missing = movie->whatIsMissing())
         log->message(*missing);
     const auto found = rangeIn(*movie, range);
     if (!found)

@@ -27,6 +27,27 @@ constexpr double kNoticePadding = 10;
 constexpr double kNoticeRounding = 10;
 const QColor kPlateColor(0, 0, 0, 190); // white is readable on it also where the picture is white
 
+std::string failureText(const platform::PlayerLayer& layer, const platform::MessageCatalog& words)
+{
+    if (!layer.hasFailed())
+        return {};
+    const base::ErrorRef why = layer.failure();
+    return why ? platform::wordsFor(*why, words) : words.text("NOTICE_CANNOT_PLAY");
+}
+
+std::string noticeText(const platform::PlayerLayer& layer, const platform::MessageCatalog& words)
+{
+    constexpr int kDecimals = 1; // of the seconds
+    const auto cut = layer.notice();
+    if (!cut)
+        return {};
+    const std::string rest = words.duration(cut->seconds, kDecimals);
+    if (!cut->secondsBefore)
+        return words.text("NOTICE_CUT_OFF", {{"rest", rest}});
+    return words.text("NOTICE_CUT_OFF_FROM",
+                      {{"duration", words.duration(*cut->secondsBefore, kDecimals)}, {"rest", rest}});
+}
+
 } // namespace
 
 void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
@@ -45,8 +66,8 @@ void VideoItem::refresh(platform::PlayerLayer& layer, bool visible)
     const bool showable = frame && !size.isEmpty();
     // A picture that rests is worth converting again when it was converted in haste.
     const bool good = m_frame == frame && m_picture.size() == size && m_quality >= quality;
-    const QString words = frame ? QString() : QString::fromStdString(layer.failureText());
-    const QString notice = frame ? QString::fromStdString(layer.noticeText()) : QString();
+    const QString words = frame ? QString() : QString::fromStdString(failureText(layer, stage().words));
+    const QString notice = frame ? QString::fromStdString(noticeText(layer, stage().words)) : QString();
     if (good && m_pictureRect == rect && m_shownSize == shownSize() && m_words == words && m_notice == notice)
         return;
     if (!good) {
