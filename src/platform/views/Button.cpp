@@ -13,10 +13,19 @@ constexpr double kFontSize = 17;
 constexpr double kLetterWidth = 0.6;
 constexpr double kTitlePadding = 16;
 
-std::size_t letters(const std::string& text)
+/// Han, kana and Hangul: U+3000 to U+D7FF, and a few behind that.
+constexpr double kWideLetterWidth = 1;
+
+/// By the font's size.
+double estimatedWidth(const std::string& text)
 {
-    return static_cast<std::size_t>(std::count_if(
-        text.begin(), text.end(), [](char each) { return (static_cast<unsigned char>(each) & 0xC0U) != 0x80U; }));
+    double width = 0;
+    for (const char each : text) {
+        const auto byte = static_cast<unsigned char>(each);
+        if ((byte & 0xC0U) != 0x80U) // the first of a letter
+            width += byte >= 0xE3U && byte <= 0xEDU ? kWideLetterWidth : kLetterWidth;
+    }
+    return width;
 }
 
 } // namespace
@@ -99,8 +108,7 @@ base::Size Button::sizeThatFits() const
         return {kTouchSize, kTouchSize};
     if (m_title.empty())
         return View::sizeThatFits();
-    const double text = kLetterWidth * kFontSize * static_cast<double>(letters(m_title));
-    return {std::max(kTouchSize, text + kTitlePadding), kTouchSize};
+    return {std::max(kTouchSize, estimatedWidth(m_title) * kFontSize + kTitlePadding), kTouchSize};
 }
 
 bool Button::activate()

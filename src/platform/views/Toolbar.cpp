@@ -1,5 +1,7 @@
 #include "platform/views/Toolbar.h"
 
+#include "platform/views/Window.h"
+
 #include <algorithm>
 #include <cstddef>
 #include <utility>
@@ -141,6 +143,11 @@ void Toolbar::layoutSubviews()
     }
     if (titles.size() == 1)
         centerTitle(spans, m_items, titles.front(), barWidth);
+
+    const auto itsWindow = window();
+    if (itsWindow && itsWindow->isRightToLeft())
+        for (Span& span : spans)
+            span.start = barWidth - span.end();
 
     m_shrunk.clear();
     for (const std::size_t title : titles)

@@ -34,7 +34,7 @@ public:
     void setDelegate(std::weak_ptr<ToolbarDelegate> delegate) { here(m_delegate) = std::move(delegate); }
 
     /// Places the items: the row's title (a custom view between flexible spaces) is centred in the bar itself as long
-    /// as it does not meet its neighbours.
+    /// as it does not meet its neighbours. In a window that runs from right to left the first item is the rightmost.
     void layoutSubviews() override;
     Accessibility accessibility() const override;
 

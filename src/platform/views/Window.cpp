@@ -33,6 +33,18 @@ const runtime::Class& Window::isa() const
     return classObject();
 }
 
+void Window::setRightToLeft(bool rightToLeft)
+{
+    assertHere();
+    m_isRightToLeft = rightToLeft;
+    const std::function<void(View&)> mark = [&mark](View& view) {
+        view.setNeedsLayout();
+        for (const auto& each : view.subviews())
+            mark(*each);
+    };
+    mark(*this);
+}
+
 void Window::setScale(double scale)
 {
     assertHere();

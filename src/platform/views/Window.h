@@ -27,6 +27,10 @@ public:
     double scale() const override { return here(m_scale); }
     void setScale(double scale);
 
+    /// Where words run from right to left, rows begin at the right: bars are mirrored, and so is the way of the focus.
+    bool isRightToLeft() const { return here(m_isRightToLeft); }
+    void setRightToLeft(bool rightToLeft);
+
     std::shared_ptr<Window> window() const override;
     std::shared_ptr<Responder> nextResponder() const override { return nullptr; }
 
@@ -92,6 +96,7 @@ private:
     double m_scale;
     std::shared_ptr<ViewController> m_root;
     bool m_visible = false;
+    bool m_isRightToLeft = false;
     std::optional<base::Size> m_requestedSize;
     std::uint64_t m_transitions = 0;
     std::map<int, Tracking> m_touches;

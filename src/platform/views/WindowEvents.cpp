@@ -178,7 +178,9 @@ std::vector<std::shared_ptr<View>> Window::focusableViews() const
     for (auto row = views.begin(); row != views.end();) {
         const double middle = top(*row) + (*row)->bounds().height() / 2;
         const auto end = std::find_if(row, views.end(), [&](const auto& view) { return top(view) >= middle; });
-        std::stable_sort(row, end, [&](const auto& a, const auto& b) { return left(a) < left(b); });
+        std::stable_sort(row, end, [&](const auto& a, const auto& b) {
+            return isRightToLeft() ? left(b) < left(a) : left(a) < left(b);
+        });
         row = end;
     }
     return views;

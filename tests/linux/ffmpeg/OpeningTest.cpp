@@ -156,6 +156,26 @@ TEST_F(Opening, WhatIsNoMovieFailsInPlainWords)
     EXPECT_EQ(open(movie("others.mkv")), Status::ReadyToPlay);
 }
 
+TEST_F(Opening, WhatIsNoMovieFailsWithAMessageForPeopleToo)
+{
+    const auto message = [&](const std::string& path) {
+        EXPECT_EQ(open(path), Status::Failed) << path;
+        if (!item->error())
+            return std::string();
+        const auto& places = item->error()->userInfo();
+        const auto name = places.find("name");
+        const auto key = places.find(base::Error::kMessageKey);
+        return (key == places.end() ? "" : key->second) + " " + (name == places.end() ? "" : name->second);
+    };
+    EXPECT_EQ(message(movie("not-a-movie.mp4")), "MOVIE_DAMAGED not-a-movie.mp4");
+    EXPECT_EQ(message(movie("no-moov.mp4")), "MOVIE_WITHOUT_INDEX no-moov.mp4");
+    EXPECT_EQ(message(movie("many-tracks.mp4")), "MOVIE_TOO_MANY_TRACKS many-tracks.mp4");
+    EXPECT_EQ(message(movie("bare.h264")), "MOVIE_WITHOUT_TIMES bare.h264");
+    EXPECT_EQ(message(movie("no-such-file.mp4")), "MOVIE_GONE no-such-file.mp4");
+    EXPECT_EQ(message("/dev/null"), "MOVIE_NOT_A_FILE null");
+    EXPECT_EQ(message(movie("")), "MOVIE_NOT_A_FILE ");
+}
+
 TEST_F(Opening, APipeDoesNotHoldAnybodyUp)
 {
     const tests::PrivateDirectory directory;

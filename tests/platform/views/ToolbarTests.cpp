@@ -49,6 +49,37 @@ TEST_F(Bars, TheTitleStandsInTheMiddleAndButtonsAtTheEnds)
     EXPECT_EQ(frame(title), Rect::make(140, 21.5, 120, 17));
 }
 
+TEST_F(Bars, BeginAtTheRightWhereWordsDo)
+{
+    show({cancel, flex, title, flex, play, fix, save});
+    std::vector<Rect> mirrored;
+    for (const auto& item : {cancel, title, play, save})
+        mirrored.push_back(
+            Rect::make(400 - frame(item).maxX(), frame(item).minY(), frame(item).width(), frame(item).height()));
+    window->setRightToLeft(true);
+    bar->layoutIfNeeded();
+    for (std::size_t i = 0; const auto& item : {cancel, title, play, save})
+        EXPECT_EQ(frame(item), mirrored[i++]);
+    EXPECT_EQ(frame(cancel).maxX(), 400 - Toolbar::kEndMargin);
+    window->setRightToLeft(false);
+    bar->layoutIfNeeded();
+    EXPECT_EQ(frame(cancel).minX(), Toolbar::kEndMargin);
+}
+
+TEST_F(Bars, AButtonIsAsWideAsItsLettersWhateverTheAlphabet)
+{
+    const auto width = [](const char* text) {
+        const auto button = std::make_shared<Button>();
+        button->setTitle(text);
+        return button->sizeThatFits().width;
+    };
+    EXPECT_NEAR(width("Cancel"), 6 * 0.6 * 17 + 16, 1e-9);
+    EXPECT_NEAR(width("Отмена"), 6 * 0.6 * 17 + 16, 1e-9);
+    EXPECT_NEAR(width("キャンセル"), 5 * 17 + 16, 1e-9);
+    EXPECT_NEAR(width("취소하기요"), 5 * 17 + 16, 1e-9);
+    EXPECT_EQ(width("Ok"), 44) << "a finger's width at least";
+}
+
 TEST_F(Bars, TheTitleMakesWayForNeighboursOnOneSide)
 {
     bar->setFrame(Rect::make(0, 0, 340, 60));

@@ -159,6 +159,17 @@ TEST_F(Focus, GoesFromTopToBottomAndFromLeftToRightAndAround)
     EXPECT_EQ(window->focusedView(), bottom);
 }
 
+TEST_F(Focus, GoesFromRightToLeftWhereWordsDo)
+{
+    window->setRightToLeft(true);
+    std::vector<std::shared_ptr<View>> order;
+    for (int i = 0; i < 3; ++i) {
+        window->moveFocus(true);
+        order.push_back(window->focusedView());
+    }
+    EXPECT_THAT(order, ElementsAre(right, left, bottom));
+}
+
 TEST_F(Focus, SkipsWhatIsDisabledOrHidden)
 {
     left->setEnabled(false);
