@@ -15,11 +15,15 @@ namespace tests {
 class EnglishWords final : public platform::MessageCatalog {
 public:
     bool rightToLeft = false;
+    /// As in a language whose words are 40 % longer.
+    bool stretched = false;
 
     std::string text(std::string_view key) const override
     {
         const auto found = m_table.find(key);
-        return found == m_table.end() ? std::string(key) : found->second;
+        if (found == m_table.end())
+            return std::string(key);
+        return stretched ? found->second + std::string((found->second.size() * 2 + 4) / 5, 'n') : found->second;
     }
     std::string text(std::string_view key, const std::vector<platform::MessageArgument>& arguments) const override
     {

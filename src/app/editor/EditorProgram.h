@@ -68,6 +68,11 @@ public:
         m_affinity.assertHere();
         return *m_window;
     }
+    const platform::MessageCatalog& words() const
+    {
+        m_affinity.assertHere();
+        return m_words;
+    }
     qtui::Presenter& presenter()
     {
         m_affinity.assertHere();

@@ -250,7 +250,7 @@ bool Script::waitForFrame(const Words& words)
 
 std::optional<base::Point> Script::middleOf(const std::string& name) const
 {
-    const auto view = viewNamed(m_program.window().rootViewController()->view(), name);
+    const auto view = viewNamed(m_program.window().rootViewController()->view(), m_program.words().text(name));
     if (!view)
         return std::nullopt;
     return view->convertToRoot({view->bounds().width() / 2, view->bounds().height() / 2});

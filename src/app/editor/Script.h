@@ -13,7 +13,8 @@
 ///                          more, where the recording stands still), or that of SECONDS or a later one
 ///   wait fine              until that picture is as fine as the recording's: one that is dragged past is not at first
 ///   wait file PATH         until that file is there
-///   tap NAME  |  tap X Y   touch a control by its accessible name, or a place in points
+///   tap NAME  |  tap X Y   touch a control by its accessible name, or a place in points;
+///                          a key of the program's words stands for the name in every language
 ///   drag X1 Y1 X2 Y2       touch, move in small steps, lift
 ///   drag NAME DX           the same from a control's middle, DX points to the right
 ///   hold …                 the same without lifting; `lift` does that

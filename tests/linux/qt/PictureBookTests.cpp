@@ -1,6 +1,7 @@
 // The whole screen as people see it: on a phone and on a tablet, light and dark. CLIPSA_GRABS names a directory for the
 // pictures.
 #include "Stage.h"
+#include "linux/qt/items/Text.h"
 
 #include "linux/qt/SvgImageCatalog.h"
 
@@ -166,6 +167,47 @@ class PictureBookAtTwo : public PictureBook {
 protected:
     PictureBookAtTwo() : PictureBook(2) {}
 };
+
+TEST_F(PictureBookAtTwo, APhoneInALanguageOfLongWords)
+{
+    words.stretched = true;
+    fill({360, 640}, false);
+    const auto title = top->items()[2];
+    const auto flexible = BarButtonItem::flexibleSpace();
+    const std::vector<platform::Toolbar::Items> rows = {
+        {item(Kind::Cancel), flexible, title, flexible, item(Kind::Save)},
+        {item(Kind::Cancel), flexible, title, flexible, item(Kind::Done)},
+        {item(Kind::Undo), flexible, title, flexible, item(Kind::Save)}};
+    for (const auto& row : rows) {
+        top->setItems(row);
+        settle();
+        for (const auto& each : row) {
+            const auto button = std::dynamic_pointer_cast<platform::Button>(each->view());
+            if (!button)
+                continue;
+            const auto weight = button->isEmphasized() ? QFont::DemiBold : QFont::Normal;
+            const QString text = QString::fromStdString(button->title());
+            const double room = button->bounds().width();
+            const qtui::TextLine line = qtui::squeezed({text, qtui::systemFont(17, weight)}, room);
+            EXPECT_EQ(line.text, text) << "it is cut off in " << room << " points";
+            EXPECT_LE(button->frame().maxX(), 360);
+        }
+        EXPECT_GE(title->view()->bounds().width(), 100) << "there is room for the title";
+    }
+    keep("phone-long-words");
+}
+
+TEST_F(PictureBookAtTwo, APhoneFromRightToLeft)
+{
+    window->setRightToLeft(true);
+    fill({360, 720}, false);
+    look();
+    const auto cancel = top->items().front()->view();
+    EXPECT_GT(cancel->frame().minX(), 180);
+    EXPECT_LT(scrubber->playHeadX(), 180) << "time runs as it does everywhere";
+    expectWhole();
+    keep("phone-right-to-left");
+}
 
 TEST_F(PictureBookAtTwo, APhone)
 {
