@@ -1,10 +1,8 @@
 #include "app/editor/NoticeScreen.h"
 
-#include "base/Text.h"
+#include "linux/icu/LineBreaking.h"
 #include "platform/views/Color.h"
 
-#include <cstddef>
-#include <sstream>
 #include <utility>
 
 namespace app {
@@ -15,31 +13,14 @@ using runtime::Selector;
 
 namespace {
 
-constexpr std::size_t kLettersInALine = 38; // as many as fit on a narrow phone
-constexpr double kFontSize = 15;            // points
-constexpr double kLineHeight = 24;          // points
-constexpr double kMargin = 16;              // points, on either side of a line
+constexpr int kColumns = 38;       // of letters, as many as fit on a narrow phone
+constexpr double kFontSize = 15;   // points
+constexpr double kLineHeight = 24; // points
+constexpr double kMargin = 16;     // points, on either side of a line
 constexpr platform::Color kWordsColor{1, 1, 1, 1};
 // Points; as high as the editor's own upper bar, so that its button stays where it is.
 constexpr double kBarHeight = 60;
 constexpr double kBarHeightWithoutHomeButton = 85;
-
-std::vector<std::string> linesOf(const std::string& words)
-{
-    std::vector<std::string> lines;
-    std::istringstream paragraphs(words);
-    for (std::string paragraph; std::getline(paragraphs, paragraph);) {
-        lines.emplace_back();
-        std::istringstream stream(paragraph);
-        for (std::string word; stream >> word;) {
-            if (!lines.back().empty()
-                && base::characterCount(lines.back()) + 1 + base::characterCount(word) > kLettersInALine)
-                lines.emplace_back();
-            lines.back() += (lines.back().empty() ? "" : " ") + word;
-        }
-    }
-    return lines;
-}
 
 } // namespace
 
@@ -64,7 +45,7 @@ void NoticeScreen::loadView()
     assertHere();
     ViewController::loadView();
     view()->setBackgroundColor(platform::Color::black());
-    for (const std::string& line : linesOf(m_text)) {
+    for (const std::string& line : intl::brokenIntoLines(m_text, kColumns)) {
         const auto label = std::make_shared<Label>();
         label->setText(line);
         label->setFontSize(kFontSize);

@@ -208,7 +208,7 @@ TEST_F(ASlowHandOver, OfWhatIsNoMovieIsExplainedWhereNobodyElseWill)
     start(R"(
         wait waiting
         print waiting
-        tap “not-a-movie.mp4” is damaged, or is no
+        tap “clock.mp4” is damaged, or is no movie
         print explained
         picture refused.png
         tap Cancel)",
