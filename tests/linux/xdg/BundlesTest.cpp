@@ -19,7 +19,6 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::Pair;
-using testing::UnorderedElementsAre;
 
 class TheBundlesOfAMachine : public testing::Test {
 protected:

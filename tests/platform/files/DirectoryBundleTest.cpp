@@ -15,7 +15,6 @@ namespace {
 using platform::DirectoryBundle;
 using testing::Contains;
 using testing::ElementsAre;
-using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::Pair;
 
