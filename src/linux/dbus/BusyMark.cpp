@@ -15,7 +15,10 @@ std::string markPath(const std::string& deviceRoot)
 /// A lock of the open file, not of the process: it can be asked for from where it was set, too.
 struct flock wholeFile(short kind)
 {
-    return {.l_type = kind, .l_whence = SEEK_SET, .l_start = 0, .l_len = 0, .l_pid = 0};
+    struct flock lock = {};
+    lock.l_type = kind;
+    lock.l_whence = SEEK_SET;
+    return lock;
 }
 
 } // namespace

@@ -86,11 +86,12 @@ bool ExtensionLink::send(const QDBusMessage& message, std::function<void(const b
         const std::lock_guard lock(m_mutex);
         if (m_hasEnded)
             return false;
-        ++m_underWay;
     }
-    if (!m_connection.send(message)) {
-        messageArrived();
+    if (!m_connection.send(message))
         return false;
+    {
+        const std::lock_guard lock(m_mutex);
+        ++m_underWay;
     }
     const auto ping = QDBusMessage::createMethodCall(
         QString(), QLatin1String(kHostPath), QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"));

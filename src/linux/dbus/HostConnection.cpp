@@ -51,7 +51,6 @@ HostAttachment HostAttachment::of(runtime::Value value, std::string type)
 struct HostConnection::State final : QDBusVirtualObject {
     State(const QString& address, std::vector<HostItem> hostItems, Handlers hostHandlers)
         : items(std::move(hostItems)), handlers(std::move(hostHandlers)), server(address), watch([this] {
-              peer->setValue(std::nullopt);
               if (const auto disconnected = std::exchange(handlers.disconnected, {}))
                   disconnected();
           })

@@ -28,7 +28,7 @@ TEST_F(Connection, TellsTheHostWhatTheUserDidInOrder)
 
     EXPECT_TRUE(tests::pumpUntil(m_mainQueue, [&] { return !m_finished.empty(); }));
     EXPECT_THAT(m_finished, ElementsAre(ElementsAre("b", "ä", "b", "")));
-    EXPECT_TRUE(tests::whilePumping([&] { return m_extension->flush(); }));
+    EXPECT_TRUE(tests::whilePumping([&] { return m_extension->flush(std::chrono::hours(1)); })) << "woken";
     m_mainQueue.drain();
     EXPECT_THAT(m_errors, IsEmpty());
 }

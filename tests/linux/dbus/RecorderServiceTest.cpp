@@ -165,6 +165,20 @@ TEST_F(Recorders, AWrongSignatureIsNoCall)
     EXPECT_THAT(m_editors, IsEmpty());
 }
 
+TEST_F(Recorders, ARightSignatureIsNoCallElsewhere)
+{
+    serve();
+    Caller caller;
+    const QVariantList edit = {QVariant::fromValue(movie()), QVariantMap{}};
+    const QVariantList open = {QStringList{QStringLiteral("file:///race.mp4")}, QVariantMap{}};
+    const QString elsewhere = kPath + QStringLiteral("/session/99");
+    EXPECT_EQ(caller.call("org.clipsa.Recorder1", "Edit", edit, elsewhere).type(), QDBusMessage::ErrorMessage);
+    EXPECT_EQ(caller.call("org.freedesktop.Application", "Open", open, elsewhere).type(), QDBusMessage::ErrorMessage);
+    EXPECT_EQ(caller.call("org.clipsa.Recorder1", "Explode", edit).type(), QDBusMessage::ErrorMessage);
+    EXPECT_EQ(caller.call("org.freedesktop.Application", "Explode", open).type(), QDBusMessage::ErrorMessage);
+    EXPECT_THAT(m_editors, IsEmpty());
+}
+
 TEST_F(Recorders, CanAskWhatThereIsToCall)
 {
     serve();
