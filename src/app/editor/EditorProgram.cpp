@@ -69,10 +69,17 @@ base::Size firstWindowSize(const EditorOptions& options)
     return {std::min<double>(wanted.width, room.width()), std::min<double>(wanted.height, room.height())};
 }
 
-/// Where the programs are installed, their resources are beside them.
+/// Where the programs are installed, their resources are beside them: beside bin/, or beside libexec/clipsa/.
 std::string resourceDirectory()
 {
-    return QCoreApplication::applicationDirPath().toStdString() + "/../share/clipsa";
+    const std::string programs = QCoreApplication::applicationDirPath().toStdString();
+    const std::string nested = programs + "/../../share/clipsa";
+    return std::filesystem::exists(nested) ? nested : programs + "/../share/clipsa";
+}
+
+std::string wordsPath()
+{
+    return resourceDirectory() + "/Clipsa.bundle";
 }
 
 xdg::MountTable mounts(const EditorOptions& options)
@@ -99,8 +106,7 @@ EditorProgram::EditorProgram(const EditorOptions& options)
       m_window(std::make_shared<platform::Window>(m_mainQueue, firstWindowSize(options), 1.0)),
       m_device(deviceValues(options), [this] { return m_window->bounds().width(); }),
       m_images([this] { return m_window->scale(); }), m_files(m_system, mounts(options)),
-      m_bundles(m_files, m_languages, xdg::BundlePlaces::ofUser()),
-      m_words(m_bundles, resourceDirectory() + "/Clipsa.bundle"),
+      m_bundles(m_files, m_languages, xdg::BundlePlaces::ofUser()), m_words(m_bundles, wordsPath()),
       m_media(m_system, m_notifications,
               {[this](const std::string& path) { return m_files.resolvedPath(path); }, ffmpeg::cubebOutput(m_log),
                &m_works, kImageNiceness}),
@@ -169,6 +175,8 @@ base::Result<void> EditorProgram::start()
     m_connection->setDisconnectedHandler([this] { disconnected(); });
     m_connection->setSentHandler([this] { m_mainQueue.postAfter(kFarewellLimit, [this] { disconnected(); }); });
 
+    if (!m_bundles.bundleWithPath(wordsPath()))
+        m_log.error("there are no words at " + wordsPath() + "; install Clipsa again");
     m_presenter.setTitle("Clipsa");
     m_presenter.setCloseHandler([this] { closeRequested(); });
     m_presenter.setLiveBlur(m_device.graphicsQuality() != VKVideoOverlayButton::kGraphicsQualityWithoutBlur);
