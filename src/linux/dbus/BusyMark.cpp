@@ -15,9 +15,8 @@ std::string markPath(const std::string& deviceRoot)
 /// A lock of the open file, not of the process: it can be asked for from where it was set, too.
 struct flock wholeFile(short kind)
 {
-    struct flock lock = {};
+    struct flock lock = {}; // from the start, and to the end
     lock.l_type = kind;
-    lock.l_whence = SEEK_SET;
     return lock;
 }
 

@@ -134,8 +134,9 @@ TEST_F(ASlowHost, IsToldWhatItRefusesAndSoIsTheSenderOnce)
 {
     sendTwo();
     EXPECT_FALSE(m_extension->flush(std::chrono::milliseconds(0))) << "nobody knows yet whether it has them";
-    m_slow.refuse("no room");
-    EXPECT_TRUE(m_extension->flush(std::chrono::hours(1)));
+    std::thread refusing([this] { m_slow.refuse("no room"); });
+    EXPECT_TRUE(m_extension->flush(std::chrono::hours(1))) << "woken when it has";
+    refusing.join();
     EXPECT_THAT(m_errors, IsEmpty()) << "told on the main queue";
     EXPECT_TRUE(tests::pumpUntil(m_mainQueue, [&] { return m_errors.size() >= 2; }));
     EXPECT_THAT(m_errors, ElementsAre(testing::HasSubstr("no room"), testing::HasSubstr("no room")));
