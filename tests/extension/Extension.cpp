@@ -129,6 +129,28 @@ TEST_F(Extension, TheContextDeclaresBothProtocolsAndKnowsItsController)
     EXPECT_EQ(context->videoEditorExtensionViewController(), controller);
 }
 
+TEST_F(Extension, ItsPropertiesAreWhatTheyWereSetTo)
+{
+    VKVideoEditorExtensionViewController plain;
+    const auto movie = base::Url::fromPath("/movie.mp4");
+    const auto attachment = base::Url::fromPath("/save.dat");
+    plain.setBundleIdentifier("org.tux");
+    plain.setAppName("Tux");
+    plain.setMovieURL(movie);
+    plain.setFileAttachmentURL(attachment);
+    plain.setOverrideShareMessage("Look!");
+    plain.setOverrideTintColor(platform::Color::white(0.5));
+    EXPECT_EQ(plain.bundleIdentifier(), "org.tux");
+    EXPECT_EQ(plain.appName(), "Tux");
+    EXPECT_EQ(plain.movieURL(), movie);
+    EXPECT_EQ(plain.fileAttachmentURL(), attachment);
+    EXPECT_EQ(plain.overrideShareMessage(), "Look!");
+    EXPECT_EQ(plain.overrideTintColor(), platform::Color::white(0.5));
+    plain.setAppName(std::nullopt);
+    EXPECT_EQ(plain.appName(), std::nullopt);
+    EXPECT_EQ(plain.bundleIdentifier(), "org.tux") << "each by itself";
+}
+
 TEST_F(Extension, AnUnknownClassStartsNothing)
 {
     EXPECT_EQ(platform::instantiateExtension({"NoSuchContext", "NoSuchController"}).principal, nullptr);
