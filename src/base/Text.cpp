@@ -24,6 +24,17 @@ char lowercase(char character)
     return character >= 'A' && character <= 'Z' ? static_cast<char>(character - 'A' + 'a') : character;
 }
 
+int hexadecimalDigit(char character)
+{
+    if (character >= '0' && character <= '9')
+        return character - '0';
+    if (character >= 'a' && character <= 'f')
+        return character - 'a' + 10;
+    if (character >= 'A' && character <= 'F')
+        return character - 'A' + 10;
+    return -1;
+}
+
 std::size_t characterLength(std::string_view text)
 {
     const auto byte = [text](std::size_t i) { return static_cast<unsigned char>(text[i]); };
@@ -44,16 +55,6 @@ std::size_t characterLength(std::string_view text)
         || (byte(0) == 0xF0 && byte(1) < 0x90) || (byte(0) == 0xF4 && byte(1) > 0x8F))
         return 0;
     return length;
-}
-
-std::size_t characterCount(std::string_view text)
-{
-    std::size_t count = 0;
-    for (; !text.empty(); ++count) {
-        const std::size_t length = characterLength(text);
-        text.remove_prefix(length == 0 ? 1 : length);
-    }
-    return count;
 }
 
 std::string printable(std::string_view text)

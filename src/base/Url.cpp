@@ -37,24 +37,14 @@ std::string encoded(std::string_view path)
     return text;
 }
 
-int hexDigit(char character)
-{
-    if (character >= '0' && character <= '9')
-        return character - '0';
-    if (character >= 'a' && character <= 'f')
-        return character - 'a' + 10;
-    if (character >= 'A' && character <= 'F')
-        return character - 'A' + 10;
-    return -1;
-}
-
 std::string decoded(std::string_view text)
 {
     std::string path;
     for (std::size_t i = 0; i < text.size(); ++i) {
-        const bool escape =
-            text[i] == '%' && i + 2 < text.size() && hexDigit(text[i + 1]) >= 0 && hexDigit(text[i + 2]) >= 0;
-        path += escape ? static_cast<char>(hexDigit(text[i + 1]) * 16 + hexDigit(text[i + 2])) : text[i];
+        const bool escape = text[i] == '%' && i + 2 < text.size() && hexadecimalDigit(text[i + 1]) >= 0
+                            && hexadecimalDigit(text[i + 2]) >= 0;
+        path +=
+            escape ? static_cast<char>(hexadecimalDigit(text[i + 1]) * 16 + hexadecimalDigit(text[i + 2])) : text[i];
         i += escape ? 2 : 0;
     }
     return path;

@@ -24,11 +24,21 @@ TEST(Text, KnowsTheSmallLettersOfAsciiInEveryLocale)
     EXPECT_EQ(base::lowercase('\xC4'), '\xC4');
 }
 
-TEST(Text, CountsCharactersAndNotBytes)
+TEST(Text, KnowsHexadecimalDigits)
 {
-    EXPECT_EQ(base::characterCount(""), 0U);
-    EXPECT_EQ(base::characterCount("Träumerei 日本 😀"), 14U);
-    EXPECT_EQ(base::characterCount("caf\xE9 \xF0\x9F"), 7U) << "each odd byte counts";
+    for (const auto& [digit, number] : {std::pair('0', 0),
+                                        {'9', 9},
+                                        {'a', 10},
+                                        {'f', 15},
+                                        {'A', 10},
+                                        {'F', 15},
+                                        {'/', -1},
+                                        {':', -1},
+                                        {'@', -1},
+                                        {'G', -1},
+                                        {'`', -1},
+                                        {'g', -1}})
+        EXPECT_EQ(base::hexadecimalDigit(digit), number) << digit;
 }
 
 TEST(Text, KnowsWhereACharacterEnds)

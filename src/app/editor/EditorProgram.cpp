@@ -73,8 +73,8 @@ base::Size firstWindowSize(const EditorOptions& options)
 std::string resourceDirectory()
 {
     const std::string programs = QCoreApplication::applicationDirPath().toStdString();
-    const std::string nested = programs + "/../../share/clipsa";
-    return std::filesystem::exists(nested) ? nested : programs + "/../share/clipsa";
+    const std::string beside = programs + "/../share/clipsa"; // first: another Clipsa's may be further away
+    return std::filesystem::exists(beside) ? beside : programs + "/../../share/clipsa";
 }
 
 std::string wordsPath()

@@ -22,17 +22,6 @@ bool isBare(char character)
            || (character >= '0' && character <= '9') || character == '_' || character == '.' || character == '-';
 }
 
-int digitOf(char character)
-{
-    if (character >= '0' && character <= '9')
-        return character - '0';
-    if (character >= 'a' && character <= 'f')
-        return character - 'a' + 10;
-    if (character >= 'A' && character <= 'F')
-        return character - 'A' + 10;
-    return -1;
-}
-
 std::string utf8Of(std::uint32_t character)
 {
     const auto byte = [](std::uint32_t bits) { return static_cast<char>(bits); };
@@ -169,7 +158,7 @@ private:
         constexpr std::size_t kDigits = 4;
         std::uint32_t character = 0;
         for (std::size_t i = 1; i <= kDigits; ++i) {
-            const int digit = m_at + i < m_text.size() ? digitOf(m_text[m_at + i]) : -1;
+            const int digit = m_at + i < m_text.size() ? base::hexadecimalDigit(m_text[m_at + i]) : -1;
             if (digit < 0)
                 return refused("a character has four hexadecimal digits");
             character = character * kHexadecimal + static_cast<std::uint32_t>(digit);
