@@ -19,8 +19,8 @@
 #include "linux/icu/Calendar.h"
 #include "linux/icu/Languages.h"
 #include "linux/icu/MessageCatalog.h"
+#include "linux/loop/MainLoop.h"
 #include "linux/photos/VideoLibrary.h"
-#include "linux/qt/MainLoop.h"
 #include "linux/qt/Presenter.h"
 #include "linux/qt/SvgImageCatalog.h"
 #include "linux/xdg/Bundles.h"
@@ -107,7 +107,7 @@ private:
     ScriptClock m_clock;
     base::StreamLog m_log;
     base::MainQueue m_mainQueue;
-    qtui::MainLoop m_loop;
+    loop::MainLoop m_loop;
     // They end before the main queue that they post to, and before the loop that it wakes.
     base::WorkerQueue m_backgroundQueue;
     base::WorkerQueue m_defaultQueue;

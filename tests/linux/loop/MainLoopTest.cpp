@@ -1,10 +1,12 @@
 // The main queue inside Qt's event loop.
-#include "Stage.h"
+#include "linux/loop/MainLoop.h"
 
-#include "linux/qt/MainLoop.h"
-
+#include <QCoreApplication>
 #include <QElapsedTimer>
 #include <QEventLoop>
+#include <QTimer>
+
+#include <gmock/gmock.h>
 
 #include <chrono>
 #include <thread>
@@ -15,8 +17,7 @@ namespace {
 
 using namespace std::chrono_literals;
 
-/// Needs the application, not the window.
-class Loop : public Stage {
+class Loop : public ::testing::Test {
 protected:
     /// Runs Qt's loop until `quit` is posted, or too long.
     void run()
@@ -34,7 +35,7 @@ TEST_F(Loop, RunsWhatWasPostedBeforeAndAfterItWasMade)
 {
     std::vector<int> order;
     queue.post([&] { order.push_back(1); });
-    qtui::MainLoop loop(queue);
+    loop::MainLoop mainLoop(queue);
     queue.post([&] { order.push_back(2); });
     queue.post([&] { events.quit(); });
     EXPECT_TRUE(order.empty());
@@ -44,7 +45,7 @@ TEST_F(Loop, RunsWhatWasPostedBeforeAndAfterItWasMade)
 
 TEST_F(Loop, RunsOnItsThreadWhatOthersPost)
 {
-    qtui::MainLoop loop(queue);
+    loop::MainLoop mainLoop(queue);
     std::thread::id ran;
     std::thread other([&] {
         queue.post([&] {
@@ -59,7 +60,7 @@ TEST_F(Loop, RunsOnItsThreadWhatOthersPost)
 
 TEST_F(Loop, RunsDelayedTasksWhenTheyAreDue)
 {
-    qtui::MainLoop loop(queue);
+    loop::MainLoop mainLoop(queue);
     const base::Instant start = time.now();
     std::vector<int> order;
     queue.postAfter(30ms, [&] {
@@ -74,7 +75,7 @@ TEST_F(Loop, RunsDelayedTasksWhenTheyAreDue)
 
 TEST_F(Loop, TasksThatPostEachOtherLeaveRoomForEvents)
 {
-    qtui::MainLoop loop(queue);
+    loop::MainLoop mainLoop(queue);
     int rounds = 0;
     const std::function<void()> again = [&] {
         if (++rounds < 1'000'000)
@@ -92,7 +93,7 @@ TEST_F(Loop, StopsRunningWhenItEnds)
 {
     bool ran = false;
     {
-        qtui::MainLoop loop(queue);
+        loop::MainLoop mainLoop(queue);
         queue.post([&] { ran = true; });
     }
     QCoreApplication::processEvents();

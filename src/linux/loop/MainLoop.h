@@ -1,4 +1,4 @@
-/// Runs the main queue inside Qt's event loop. Made, used and ended on the GUI thread, after the QGuiApplication.
+/// Runs the main queue inside Qt's event loop. Made, used and ended on the main thread, after the QCoreApplication.
 #pragma once
 
 #include "base/Affinity.h"
@@ -7,7 +7,7 @@
 #include <QObject>
 #include <QTimer>
 
-namespace qtui {
+namespace loop {
 
 /// Each wake becomes one posted event, however often the queue is woken before it arrives. Every turn runs what is due
 /// and no more, so input and pictures get their turn between tasks that post each other.
@@ -29,4 +29,4 @@ private:
     base::Affinity m_affinity;
 };
 
-} // namespace qtui
+} // namespace loop

@@ -1,11 +1,11 @@
-#include "linux/qt/MainLoop.h"
+#include "linux/loop/MainLoop.h"
 
 #include <QCoreApplication>
 #include <QEvent>
 
 #include <algorithm>
 
-namespace qtui {
+namespace loop {
 
 namespace {
 
@@ -29,7 +29,6 @@ MainLoop::MainLoop(base::MainQueue& queue) : m_queue(queue)
 
 MainLoop::~MainLoop()
 {
-    m_affinity.assertHere();
     m_affinity.assertHere();
     m_queue.setWake({});
 }
@@ -56,4 +55,4 @@ void MainLoop::runDue()
     m_timer.start(std::chrono::ceil<std::chrono::milliseconds>(std::max(*next, base::Instant(0))));
 }
 
-} // namespace qtui
+} // namespace loop
