@@ -30,6 +30,15 @@ std::string EditorOutcome::words() const
     return "the editor ended early, " + end.words();
 }
 
+std::string EditorOutcome::failure() const
+{
+    if (activityTypes)
+        return {};
+    if (error)
+        return error->description();
+    return closed ? "the editor was closed" : words();
+}
+
 struct EditorSession::State final : QObject {
     State(dbus::EditRequest editRequest, EditorDirectory editorDirectory, dbus::EditorReport editorReport,
           const Place& editorPlace, Handlers callbacks)

@@ -33,6 +33,8 @@ struct EditorOutcome {
 
     /// For who did not ask for it: "the editor ended early, by signal 9 (Killed)".
     std::string words() const;
+    /// Why the user did not get to finish, whoever is to blame; empty when they did.
+    std::string failure() const;
 };
 
 class EditorSession {

@@ -6,6 +6,7 @@
 #include "app/host/PrepareRequest.h"
 #include "app/host/Streams.h"
 #include "app/host/TerminationSignals.h"
+#include "linux/dbus/SessionResult.h"
 
 #include <QCoreApplication>
 
@@ -23,45 +24,62 @@ void printLines(const std::vector<std::string>& activityTypes)
     std::fflush(stdout);
 }
 
-/// What became of the movies that the user saved, by where they are.
-struct SavedMovies {
-    std::vector<std::string> saved;
-    std::vector<std::string> unsaved;
-    bool isComplete = true; ///< whether all that was to be saved was
-};
-
-void printObject(const std::vector<std::string>& activityTypes, const SavedMovies& movies, const std::string& movie)
+std::string objectOf(const dbus::SessionResult& result)
 {
     JsonObject object;
-    object.addTexts("activityTypes", activityTypes).add("movie", movie);
-    object.addTexts("saved", movies.saved).addTexts("unsaved", movies.unsaved);
+    for (const auto& [name, text] : result)
+        object.add(name, text);
+    return object.text();
+}
+
+/// What became of what the user did.
+struct Results {
+    std::vector<std::string> saved;   ///< where movies are
+    std::vector<std::string> unsaved; ///< where they are kept
+    std::vector<std::string> objects; ///< of all results, in order
+    bool isComplete = true;           ///< whether all that was to be saved was
+};
+
+void printObject(const EditorOutcome& outcome, Results results, const std::string& movie)
+{
+    JsonObject object;
+    if (outcome.activityTypes)
+        object.addTexts("activityTypes", *outcome.activityTypes);
+    else
+        results.objects.push_back(objectOf(dbus::resultOfFailure(outcome.failure())));
+    object.add("movie", movie).addTexts("saved", results.saved).addTexts("unsaved", results.unsaved);
+    object.addList("results", results.objects);
     std::puts(object.text().c_str());
 }
 
-void take(const dbus::MovieNote& note, SavedMovies& movies)
+void take(const dbus::MovieNote& note, Results& results)
 {
+    if (const auto result = dbus::resultOf(note); !result.empty())
+        results.objects.push_back(objectOf(result));
     switch (note.kind) {
     case dbus::MovieNote::Kind::Saved:
-        movies.saved.push_back(note.path);
+        results.saved.push_back(note.path);
         break;
     case dbus::MovieNote::Kind::Unsaved:
-        movies.isComplete = false;
+        results.isComplete = false;
         if (note.path.empty()) {
             complain("the movie is not in your videos, and could not be kept elsewhere: " + note.why);
             break;
         }
-        movies.unsaved.push_back(note.path);
+        results.unsaved.push_back(note.path);
         complain("the movie is not in your videos; it is kept as " + note.path);
         break;
-    case dbus::MovieNote::Kind::Refused:
-        break; // the outcome has it
+    case dbus::MovieNote::Kind::Refused: // the outcome has it
+    case dbus::MovieNote::Kind::Shared:
+    case dbus::MovieNote::Kind::Unshared: // which the user has read
+        break;
     }
 }
 
-int exitStatus(const EditorOutcome& outcome, const SavedMovies& movies, const std::string& movie)
+int exitStatus(const EditorOutcome& outcome, const Results& results, const std::string& movie)
 {
     if (outcome.activityTypes)
-        return movies.isComplete ? kExitDone : kExitFailed;
+        return results.isComplete ? kExitDone : kExitFailed;
     if (outcome.closed)
         return kExitEditorEnded; // whoever interrupted us knows
     if (outcome.error && outcome.error->domain() == dbus::kBadInputDomain)
@@ -131,14 +149,14 @@ int openMovie(const OpenCommand& command, OpenVariation variation)
             if (!command.json)
                 printLines(types);
         };
-    SavedMovies movies;
-    handlers.noted = [&](const dbus::MovieNote& note) { take(note, movies); };
+    Results results;
+    handlers.noted = [&](const dbus::MovieNote& note) { take(note, results); };
     handlers.copying = [&](std::uint64_t bytes) { complain(wordsOfCopy(movie, bytes)); };
     handlers.ended = [&](const EditorOutcome& outcome) {
         // Only now it is known what became of a save that was under way when the user finished.
-        if (command.json && outcome.activityTypes)
-            printObject(*outcome.activityTypes, movies, movie);
-        status = exitStatus(outcome, movies, movie);
+        if (command.json)
+            printObject(outcome, results, movie);
+        status = exitStatus(outcome, results, movie);
         QCoreApplication::exit();
     };
     auto started = EditorSession::start(std::move(request), {program.value(), root.value()}, std::move(handlers));

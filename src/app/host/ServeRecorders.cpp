@@ -21,15 +21,6 @@ namespace host {
 
 namespace {
 
-std::string failureOf(const EditorOutcome& outcome)
-{
-    if (outcome.activityTypes)
-        return {};
-    if (outcome.error)
-        return outcome.error->description();
-    return outcome.closed ? "the editor was closed" : outcome.words();
-}
-
 /// First its request is made ready on a thread of its own, because a recorder's files may lie on a slow disk; then it
 /// is a session.
 class RecordersEditor final : public dbus::RecorderService::Editor {
@@ -77,7 +68,7 @@ private:
         EditorSession::Handlers handlers;
         handlers.noted = m_events.noted;
         handlers.finished = m_events.completed;
-        handlers.ended = [ended = m_events.ended](const EditorOutcome& outcome) { ended(failureOf(outcome)); };
+        handlers.ended = [ended = m_events.ended](const EditorOutcome& outcome) { ended(outcome.failure()); };
         auto session = EditorSession::start(std::move(request), {program.value(), root.value()}, std::move(handlers));
         if (!session)
             return session.error();

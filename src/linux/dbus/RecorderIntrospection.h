@@ -27,6 +27,7 @@ inline constexpr const char* kSessionIntrospection = R"XML(
     <method name="Close"/>
     <signal name="Saved"><arg type="s" name="path"/></signal>
     <signal name="SaveFailed"><arg type="s" name="path"/><arg type="s" name="message"/></signal>
+    <signal name="Result"><arg type="a{sv}" name="result"/></signal>
     <signal name="Completed"><arg type="as" name="activityTypes"/></signal>
     <signal name="Failed"><arg type="s" name="message"/></signal>
     <signal name="Ended"/>

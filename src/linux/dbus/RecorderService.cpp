@@ -7,6 +7,7 @@
 #include "linux/dbus/Protocol.h"
 #include "linux/dbus/RecorderIntrospection.h"
 #include "linux/dbus/Reply.h"
+#include "linux/dbus/SessionResult.h"
 #include "linux/dbus/Wire.h"
 
 #include <QDBusConnection>
@@ -242,12 +243,24 @@ private:
             tell(number, QStringLiteral("Saved"), {toQt(note.path)});
         else if (note.kind == MovieNote::Kind::Unsaved)
             tell(number, QStringLiteral("SaveFailed"), {toQt(note.path), toQt(note.why)});
+        tellResult(number, resultOf(note));
+    }
+
+    void tellResult(std::uint64_t number, const SessionResult& result)
+    {
+        QVariantMap members;
+        for (const auto& [name, text] : result)
+            members.insert(toQt(name), toQt(text));
+        if (!members.isEmpty())
+            tell(number, QStringLiteral("Result"), {members});
     }
 
     void tellEnded(std::uint64_t number, const std::string& failure)
     {
-        if (!failure.empty())
+        if (!failure.empty()) {
             tell(number, QStringLiteral("Failed"), {toQt(failure)});
+            tellResult(number, resultOfFailure(failure));
+        }
         tell(number, QStringLiteral("Ended"), {});
         forgetLater(number);
     }

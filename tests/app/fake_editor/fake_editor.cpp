@@ -9,6 +9,7 @@
 //   tell=PIPE          writes the same into a named pipe, once somebody reads
 //   remove-movie       removes the movie that was handed over, as saving does
 //   saved=FILE unsaved=FILE   reports a movie that was saved, or could not be
+//   shared=TYPE,RECEIVER unshared=TYPE,RECEIVER   reports that it was shared, or could not be
 //   refuse             reports that what was handed over is no movie
 //   busy               has something to finish from now on
 //   leave              closes the connection
@@ -171,6 +172,15 @@ int main(int argc, char* argv[])
             report.add({dbus::MovieNote::Kind::Saved, value, ""});
         } else if (word == "unsaved") {
             report.add({dbus::MovieNote::Kind::Unsaved, value, "the disk is full"});
+        } else if (word == "shared" || word == "unshared") {
+            const std::vector<std::string> parts = split(value + ",", ',');
+            if (word == "shared")
+                report.add({.kind = dbus::MovieNote::Kind::Shared, .type = parts.at(0), .receiver = parts.at(1)});
+            else
+                report.add({.kind = dbus::MovieNote::Kind::Unshared,
+                            .why = "it went away",
+                            .type = parts.at(0),
+                            .receiver = parts.at(1)});
         } else if (word == "refuse") {
             report.add({dbus::MovieNote::Kind::Refused, "", "it is no movie"});
         } else if (word == "busy") {

@@ -105,8 +105,8 @@ TEST_F(OpeningAMovie, PrintsOneObjectOnRequest)
 {
     const auto clipsa = start("finish=a,b wait", {"--json"});
     EXPECT_EQ(clipsa->wait(), 0);
-    EXPECT_EQ(clipsa->output(),
-              "{\"activityTypes\":[\"a\",\"b\"],\"movie\":\"" + m_movie.native() + "\",\"saved\":[],\"unsaved\":[]}\n");
+    EXPECT_EQ(clipsa->output(), "{\"activityTypes\":[\"a\",\"b\"],\"movie\":\"" + m_movie.native()
+                                    + "\",\"saved\":[],\"unsaved\":[],\"results\":[]}\n");
 }
 
 TEST_F(OpeningAMovie, ASaveThatFailedIsSaidWithThePlaceWhereTheMovieIsKept)
@@ -152,7 +152,50 @@ TEST_F(OpeningAMovie, TheObjectSaysWhatWasSavedAlsoBehindAClosedWindow)
 {
     const auto clipsa = start("finish=save wait saved=/videos/a.mp4 unsaved=/data/b.mp4", {"--json"});
     EXPECT_EQ(clipsa->wait(), 1);
-    EXPECT_THAT(clipsa->output(), HasSubstr("\"saved\":[\"/videos/a.mp4\"],\"unsaved\":[\"/data/b.mp4\"]}\n"));
+    EXPECT_THAT(clipsa->output(), HasSubstr("\"saved\":[\"/videos/a.mp4\"],\"unsaved\":[\"/data/b.mp4\"],"));
+}
+
+TEST_F(OpeningAMovie, TheObjectHasTheResultsInOrder)
+{
+    const auto clipsa = start("shared=KDEConnect,\"Phone\" saved=/videos/a.mp4 finish=KDEConnect wait unshared=Mail, "
+                              "unsaved=/data/b.mp4 unsaved=",
+                              {"--json"});
+    EXPECT_EQ(clipsa->wait(), 1);
+    EXPECT_THAT(clipsa->output(),
+                EndsWith(R"(,"results":[{"outcome":"shared","type":"KDEConnect","receiver":"\"Phone\""},)"
+                         R"({"outcome":"saved","path":"/videos/a.mp4"},)"
+                         R"({"outcome":"not-shared","type":"Mail","reason":"it went away"},)"
+                         R"({"outcome":"not-saved","path":"/data/b.mp4","reason":"the disk is full"},)"
+                         R"({"outcome":"not-saved","reason":"the disk is full"}]})"
+                         "\n"));
+}
+
+TEST_F(OpeningAMovie, TheObjectOfAUserWhoCouldNotFinishSaysWhatWasDoneAndWhyNot)
+{
+    const auto clipsa = start("shared=Mail,\u202E saved=/videos/a.mp4 crash", {"--json"});
+    EXPECT_EQ(clipsa->wait(), 3);
+    EXPECT_THAT(clipsa->output(), StartsWith("{\"movie\":\"/")) << "that nothing was done would be another thing";
+    EXPECT_THAT(clipsa->output(),
+                EndsWith(R"j("saved":["/videos/a.mp4"],"unsaved":[],"results":[)j"
+                         "{\"outcome\":\"shared\",\"type\":\"Mail\",\"receiver\":\"\u202E\"},"
+                         R"j({"outcome":"saved","path":"/videos/a.mp4"},)j"
+                         R"j({"outcome":"failed","reason":"the editor ended early, by signal 6 (Aborted)"}]})j"
+                         "\n"));
+}
+
+TEST_F(OpeningAMovie, TheObjectOfARefusedMovieSaysWhy)
+{
+    const auto clipsa = start("refuse exit=0", {"--json"});
+    EXPECT_EQ(clipsa->wait(), 2);
+    EXPECT_THAT(clipsa->output(), HasSubstr(R"("results":[{"outcome":"failed","reason":"it is no movie"}]})"));
+}
+
+TEST_F(OpeningAMovie, SharesAreNotPrintedAmongTheLines)
+{
+    const auto clipsa = start("shared=Mail,Anna unshared=Bluetooth,Phone finish=Mail wait");
+    EXPECT_EQ(clipsa->wait(), 0) << "the user has read what could not be shared";
+    EXPECT_EQ(clipsa->output(), "Mail\n");
+    EXPECT_THAT(clipsa->errors(), IsEmpty());
 }
 
 TEST_F(OpeningAMovie, TheObjectHasNothingThatATerminalWouldObey)

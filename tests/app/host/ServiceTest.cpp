@@ -109,8 +109,15 @@ TEST_F(Service, TellsEachRecorderOfItsOwnSessionsAlone)
 
 TEST_F(Service, TellsOfAnEditorThatEndedEarly)
 {
-    startBus("exit=9");
+    startBus("shared=Bluetooth,Phone exit=9");
     expectScenario("failed");
+}
+
+TEST_F(Service, TellsWhatWasSavedAndWithWhomItWasShared)
+{
+    startBus(
+        "shared=Bluetooth,Phone saved=/videos/a.mp4 unshared=Mail, unsaved=/data/b.mp4 finish=Bluetooth,save wait");
+    expectScenario("results");
 }
 
 TEST_F(Service, TellsWhatBecameOfSavedMoviesBeforeAndBehindTheUsersLastWord)

@@ -28,6 +28,9 @@ class Recorder:
         self.ended = []
         self.bus.add_signal_receiver(lambda path: self.ended.append(path), "Ended", "org.clipsa.RecorderSession1",
                                      path_keyword="path")
+        self.results = []
+        self.bus.add_signal_receiver(lambda result: self.results.append(result), "Result",
+                                     "org.clipsa.RecorderSession1")
         for member in ("Saved", "SaveFailed", "Completed", "Failed"):
             self.bus.add_signal_receiver(self.arrived, member, "org.clipsa.RecorderSession1", path_keyword="path",
                                          member_keyword="member")
@@ -72,6 +75,23 @@ def saves():
                                 (session, "SaveFailed", "/data/b.mp4", "the disk is full")], recorder.signals
 
 
+def results():
+    """What has become known is told beside the older signals, with a receiver where there is one."""
+    asker, bystander = Recorder(), Recorder()
+    asker.edit()
+    until(lambda: asker.ended)
+    assert asker.results == [
+        {"outcome": "shared", "type": "Bluetooth", "receiver": "Phone"},
+        {"outcome": "saved", "path": "/videos/a.mp4"},
+        {"outcome": "not-shared", "type": "Mail", "reason": "it went away"},
+        {"outcome": "not-saved", "path": "/data/b.mp4", "reason": "the disk is full"},
+    ], asker.results
+    assert asker.results[0].signature == "sv"
+    assert [member for _, member, *_ in asker.signals] == ["Saved", "SaveFailed", "Completed"], asker.signals
+    bystander.round_trip()
+    assert bystander.results == [], bystander.results
+
+
 def completed():
     """Each session is told of its own end, and nobody else is."""
     asker, bystander = Recorder(), Recorder()
@@ -90,6 +110,8 @@ def failed():
     assert asker.signals == [(session, "Failed", "the editor ended early, with exit status 9")], asker.signals
     until(lambda: asker.ended)
     assert asker.ended == [session], asker.ended
+    assert asker.results == [{"outcome": "shared", "type": "Bluetooth", "receiver": "Phone"},
+                             {"outcome": "failed", "reason": "the editor ended early, with exit status 9"}]
     bystander.round_trip()
     assert bystander.signals == [] and bystander.ended == []
 

@@ -86,11 +86,67 @@ TEST_F(AnEditorsReport, IsNotReadFurtherThanAnybodySaves)
 
 TEST_F(AnEditorsReport, MayTellWhatThisHostDoesNotKnow)
 {
-    ASSERT_EQ(::write(editor.descriptor(), "shared\0/a\0", 11), 11);
+    ASSERT_EQ(::write(editor.descriptor(), "printed\0/a\0", 12), 12);
     editor.add({Kind::Saved, "/videos/a.mp4", ""});
     const auto notes = host.notes();
     ASSERT_THAT(notes, SizeIs(1));
     EXPECT_EQ(notes[0].path, "/videos/a.mp4");
+}
+
+TEST_F(AnEditorsReport, TellsWithWhomSomethingWasShared)
+{
+    editor.add({.kind = Kind::Shared, .type = "Bluetooth", .receiver = "Anna’s\nphone"});
+    editor.add({.kind = Kind::Unshared, .why = "it went\naway", .type = "KDEConnect", .receiver = "Tablet"});
+    editor.add({.kind = Kind::Shared});
+    const auto notes = host.notes();
+    ASSERT_THAT(notes, SizeIs(3));
+    EXPECT_EQ(notes[0].kind, Kind::Shared);
+    EXPECT_EQ(notes[0].type, "Bluetooth");
+    EXPECT_EQ(notes[0].receiver, "Anna’s\nphone");
+    EXPECT_EQ(notes[0].why, "");
+    EXPECT_EQ(notes[0].path, "") << "it is no movie's place";
+    EXPECT_EQ(notes[1].kind, Kind::Unshared);
+    EXPECT_EQ(notes[1].type, "KDEConnect");
+    EXPECT_EQ(notes[1].receiver, "Tablet");
+    EXPECT_EQ(notes[1].why, "it went\naway");
+    EXPECT_EQ(notes[2].type + notes[2].receiver + notes[2].why, "");
+}
+
+TEST_F(AnEditorsReport, IsPassedOverWhereAHostKnowsNoShares)
+{
+    editor.add({.kind = Kind::Unshared, .why = "b", .type = "c", .receiver = "d"});
+    std::string bytes(64, '\0');
+    bytes.resize(static_cast<std::size_t>(::pread(host.descriptor(), bytes.data(), bytes.size(), 0)));
+    EXPECT_EQ(bytes, std::string("unshared\0d\0c\nb\0", 15)) << "three texts, as every entry has";
+}
+
+TEST_F(AnEditorsReport, TakesNoTextForMoreThanOne)
+{
+    editor.add(
+        {.kind = Kind::Unshared, .why = "why\0saved", .type = "Mail\nsaved", .receiver = std::string("a\0b", 3)});
+    editor.add({.kind = Kind::Shared, .type = std::string("a\0b\nc", 5), .receiver = "d"});
+    const auto notes = host.notes();
+    ASSERT_THAT(notes, SizeIs(2));
+    EXPECT_EQ(notes[0].type, "Mail");
+    EXPECT_EQ(notes[0].receiver, "a");
+    EXPECT_EQ(notes[0].why, "why");
+    EXPECT_EQ(notes[1].type, "a");
+}
+
+TEST_F(AnEditorsReport, ShortensWhatIsLongerThanATextMayBe)
+{
+    const std::string most(dbus::EditorReport::kLongestText, 'x');
+    editor.add({.kind = Kind::Unshared, .why = most + "y", .type = most + "y", .receiver = most});
+    editor.add({Kind::Unsaved, most.substr(1) + "€", most.substr(3) + "€"});
+    editor.add({Kind::Saved, std::string(std::size_t{1024} * 1024, '\x80')});
+    const auto notes = host.notes();
+    ASSERT_THAT(notes, SizeIs(3));
+    EXPECT_EQ(notes[0].why, most);
+    EXPECT_EQ(notes[0].type, most);
+    EXPECT_EQ(notes[0].receiver, most);
+    EXPECT_EQ(notes[1].path, most.substr(1)) << "not within a character";
+    EXPECT_EQ(notes[1].why, most.substr(3) + "€") << "it fits";
+    EXPECT_EQ(notes[2].path, "") << "there is no character to end at";
 }
 
 TEST_F(AnEditorsReport, MovesAsideForTheNumbersThatEditorsInherit)
