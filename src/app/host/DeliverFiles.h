@@ -3,7 +3,6 @@
 #pragma once
 
 #include "app/host/DetachedWork.h"
-#include "app/host/HandOver.h"
 #include "app/host/Payload.h"
 #include "base/Clock.h"
 #include "base/Result.h"

@@ -5,7 +5,6 @@
 #pragma once
 
 #include "app/host/EditorProcess.h"
-#include "app/host/HandOver.h"
 #include "base/Affinity.h"
 #include "base/Result.h"
 #include "linux/dbus/EditRequest.h"

@@ -1,6 +1,7 @@
 #include "linux/photos/LibraryName.h"
 
 #include "base/Text.h"
+#include "linux/posix/FileName.h"
 
 #include <algorithm>
 #include <array>
@@ -16,24 +17,6 @@ namespace {
 /// Bytes. With a date, a number and an extension this stays below 143, the longest name in an encrypted home directory.
 constexpr std::size_t kLongestAppName = 96;
 constexpr std::size_t kLongestExtension = 5;
-
-/// What the file systems of cards and other systems refuse in a name.
-constexpr std::u32string_view kRefused = U"/\\:*?\"<>|";
-
-enum class Kind { Plain, Space, Refused, Nothing };
-
-Kind kindOf(gunichar character)
-{
-    if (g_unichar_isspace(character))
-        return Kind::Space;
-    // The joiners belong to words and faces; other marks without a width only turn text around, or hide.
-    if (character == 0x200C || character == 0x200D)
-        return Kind::Plain;
-    const GUnicodeType type = g_unichar_type(character);
-    if (type == G_UNICODE_FORMAT || type == G_UNICODE_CONTROL)
-        return Kind::Nothing;
-    return kRefused.find(static_cast<char32_t>(character)) == std::u32string_view::npos ? Kind::Plain : Kind::Refused;
-}
 
 std::string localTime(base::Date date)
 {
@@ -90,29 +73,7 @@ LibraryName libraryName(std::string_view appName, base::Date date, std::string_v
 
 std::string fileNameSafe(std::string_view text)
 {
-    const std::unique_ptr<char, decltype(&g_free)> valid(
-        g_utf8_make_valid(text.data(), static_cast<gssize>(text.size())), &g_free);
-    std::string safe;
-    bool needsSpace = false;
-    for (const char* at = valid.get(); *at != 0; at = g_utf8_next_char(at)) {
-        std::string_view character(at, static_cast<std::size_t>(g_utf8_next_char(at) - at));
-        const Kind kind = kindOf(g_utf8_get_char(at));
-        if (kind == Kind::Refused)
-            character = "-";
-        // A dot in front hides a file, a dash in front makes it look like an option.
-        if (kind == Kind::Nothing || (safe.empty() && (character == "." || character == "-")))
-            continue;
-        if (kind == Kind::Space) {
-            needsSpace = !safe.empty();
-            continue;
-        }
-        if (safe.size() + (needsSpace ? 1 : 0) + character.size() > kLongestAppName)
-            break;
-        if (std::exchange(needsSpace, false))
-            safe += ' ';
-        safe += character;
-    }
-    return safe.empty() ? "Recording" : safe;
+    return posix::fileNameSafe(text, kLongestAppName);
 }
 
 } // namespace photos

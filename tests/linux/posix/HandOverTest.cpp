@@ -1,4 +1,4 @@
-#include "app/host/HandOver.h"
+#include "linux/posix/HandOver.h"
 
 #include "linux/posix/FileDescriptor.h"
 #include "support/PrivateDirectory.h"
@@ -22,11 +22,15 @@ protected:
         ::utimensat(AT_FDCWD, m_movie.c_str(), dates, 0);
     }
 
-    base::Result<host::HandOverWay> handOver(host::HandOverWay first = host::HandOverWay::HardLink,
-                                             const host::CopyProgress& goOn = {})
+    base::Result<posix::HandOverWay> handOver(posix::HandOverWay first = posix::HandOverWay::HardLink,
+                                              const posix::CopyProgress& goOn = {})
     {
         const posix::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
-        return host::handOver(source.get(), m_target.path(), "movie.mp4", goOn, first);
+        std::vector<posix::HandOverWay> ways;
+        for (const auto way : {posix::HandOverWay::HardLink, posix::HandOverWay::Reflink, posix::HandOverWay::Copy})
+            if (way >= first)
+                ways.push_back(way);
+        return posix::handOver(source.get(), m_target.path(), "movie.mp4", goOn, ways);
     }
 
     static struct stat statusOf(const std::filesystem::path& path)
@@ -64,7 +68,7 @@ TEST_F(HandingOver, ACopyHasThePermissionsOfTheMovie)
 {
     for (const mode_t mode : {0600U, 0640U, 0644U}) {
         ASSERT_EQ(::chmod(m_movie.c_str(), mode), 0);
-        ASSERT_TRUE(handOver(host::HandOverWay::Copy));
+        ASSERT_TRUE(handOver(posix::HandOverWay::Copy));
         EXPECT_EQ(statusOf(m_copy).st_mode & ACCESSPERMS, mode);
         std::filesystem::remove(m_copy);
     }
@@ -73,7 +77,7 @@ TEST_F(HandingOver, ACopyHasThePermissionsOfTheMovie)
 TEST_F(HandingOver, CopiesToWhereFilesHaveNoPermissions)
 {
     tests::whileRefusing({{SYS_fchmod, EPERM}}, [&] {
-        const auto way = handOver(host::HandOverWay::Copy);
+        const auto way = handOver(posix::HandOverWay::Copy);
         ASSERT_TRUE(way) << way.error()->description();
     });
     EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
@@ -84,7 +88,7 @@ TEST_F(HandingOver, GivesASecondNameWithinAFileSystem)
 {
     const auto way = handOver();
     ASSERT_TRUE(way) << way.error()->description();
-    EXPECT_EQ(way.value(), host::HandOverWay::HardLink);
+    EXPECT_EQ(way.value(), posix::HandOverWay::HardLink);
     EXPECT_EQ(statusOf(m_copy).st_ino, statusOf(m_movie).st_ino);
 
     std::filesystem::remove(m_copy);
@@ -93,7 +97,7 @@ TEST_F(HandingOver, GivesASecondNameWithinAFileSystem)
 
 TEST_F(HandingOver, CopiesWhereNothingElseWorks)
 {
-    ASSERT_EQ(handOver(host::HandOverWay::Copy).value(), host::HandOverWay::Copy);
+    ASSERT_EQ(handOver(posix::HandOverWay::Copy).value(), posix::HandOverWay::Copy);
     EXPECT_NE(statusOf(m_copy).st_ino, statusOf(m_movie).st_ino);
     EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
     EXPECT_EQ(statusOf(m_copy).st_mtim.tv_sec, kDate.tv_sec) << "the recording's date";
@@ -107,9 +111,9 @@ TEST_F(HandingOver, CopiesWhereNothingElseWorks)
 
 TEST_F(HandingOver, ReflinksOrCopiesWhenAHardLinkIsNotWanted)
 {
-    const auto way = handOver(host::HandOverWay::Reflink);
+    const auto way = handOver(posix::HandOverWay::Reflink);
     ASSERT_TRUE(way);
-    EXPECT_NE(way.value(), host::HandOverWay::HardLink);
+    EXPECT_NE(way.value(), posix::HandOverWay::HardLink);
     EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
     EXPECT_EQ(statusOf(m_copy).st_mtim.tv_nsec, kDate.tv_nsec);
     expectUntouched();
@@ -125,9 +129,9 @@ TEST_F(HandingOver, CopiesFromOneFileSystemToAnother)
         const auto source = intoMemory ? m_movie : memory.write("source.mp4", m_bytes);
         const auto target = intoMemory ? memory.path() : m_target.path();
         const posix::FileDescriptor file(::open(source.c_str(), O_RDONLY | O_CLOEXEC));
-        const auto way = host::handOver(file.get(), target, "movie.mp4");
+        const auto way = posix::handOver(file.get(), target, "movie.mp4");
         ASSERT_TRUE(way) << way.error()->description();
-        EXPECT_EQ(way.value(), host::HandOverWay::Copy);
+        EXPECT_EQ(way.value(), posix::HandOverWay::Copy);
         EXPECT_EQ(tests::PrivateDirectory::read(target / "movie.mp4"), m_bytes);
     }
     expectUntouched();
@@ -139,7 +143,7 @@ TEST_F(HandingOver, TakesASourceThatMayOnlyBeRead)
     ASSERT_TRUE(handOver());
     EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
     std::filesystem::remove(m_copy);
-    ASSERT_TRUE(handOver(host::HandOverWay::Copy));
+    ASSERT_TRUE(handOver(posix::HandOverWay::Copy));
     EXPECT_EQ(statusOf(m_movie).st_mode & 07777, 0400U);
     expectUntouched();
 }
@@ -148,7 +152,7 @@ TEST_F(HandingOver, TakesAFileThatHasLostItsName)
 {
     const posix::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
     std::filesystem::remove(m_movie);
-    const auto way = host::handOver(source.get(), m_target.path(), "movie.mp4");
+    const auto way = posix::handOver(source.get(), m_target.path(), "movie.mp4");
     ASSERT_TRUE(way);
     EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
 }
@@ -157,7 +161,7 @@ TEST_F(HandingOver, LeavesThePositionOfTheDescriptorAlone)
 {
     const posix::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
     ASSERT_EQ(::lseek(source.get(), 1000, SEEK_SET), 1000);
-    ASSERT_TRUE(host::handOver(source.get(), m_target.path(), "movie.mp4", {}, host::HandOverWay::Copy));
+    ASSERT_TRUE(posix::handOver(source.get(), m_target.path(), "movie.mp4", {}, {posix::HandOverWay::Copy}));
     EXPECT_EQ(::lseek(source.get(), 0, SEEK_CUR), 1000);
     EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
 }
@@ -165,14 +169,14 @@ TEST_F(HandingOver, LeavesThePositionOfTheDescriptorAlone)
 TEST_F(HandingOver, NeverWritesOverWhatIsThere)
 {
     m_target.write("movie.mp4", "somebody's");
-    for (const auto first : {host::HandOverWay::HardLink, host::HandOverWay::Reflink, host::HandOverWay::Copy}) {
+    for (const auto first : {posix::HandOverWay::HardLink, posix::HandOverWay::Reflink, posix::HandOverWay::Copy}) {
         EXPECT_FALSE(handOver(first));
         EXPECT_EQ(tests::PrivateDirectory::read(m_copy), "somebody's");
     }
     std::filesystem::remove(m_copy);
     const auto precious = m_directory.write("precious", "bytes");
     std::filesystem::create_symlink(precious, m_copy);
-    EXPECT_FALSE(handOver(host::HandOverWay::Copy));
+    EXPECT_FALSE(handOver(posix::HandOverWay::Copy));
     EXPECT_EQ(tests::PrivateDirectory::read(precious), "bytes");
     expectUntouched();
 }
@@ -180,7 +184,7 @@ TEST_F(HandingOver, NeverWritesOverWhatIsThere)
 TEST_F(HandingOver, LeavesNothingBehindWhenItIsStopped)
 {
     std::uint64_t total = 0;
-    const auto way = handOver(host::HandOverWay::Copy, [&](std::uint64_t, std::uint64_t all) {
+    const auto way = handOver(posix::HandOverWay::Copy, [&](std::uint64_t, std::uint64_t all) {
         total = all;
         return false;
     });
@@ -194,8 +198,8 @@ TEST_F(HandingOver, LeavesNothingBehindWhenItIsStopped)
 TEST_F(HandingOver, SaysWhenItCannot)
 {
     const posix::FileDescriptor source(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
-    EXPECT_FALSE(host::handOver(source.get(), m_target.path() / "nowhere", "movie.mp4"));
-    EXPECT_FALSE(host::handOver(-1, m_target.path(), "movie.mp4"));
+    EXPECT_FALSE(posix::handOver(source.get(), m_target.path() / "nowhere", "movie.mp4"));
+    EXPECT_FALSE(posix::handOver(-1, m_target.path(), "movie.mp4"));
 }
 
 TEST_F(HandingOver, CopiesWhatTheEditorCouldNotReadUnderASecondName)
@@ -203,7 +207,7 @@ TEST_F(HandingOver, CopiesWhatTheEditorCouldNotReadUnderASecondName)
     tests::whileRefusing({{SYS_access, EACCES}}, [&] {
         const auto way = handOver();
         ASSERT_TRUE(way) << way.error()->description();
-        EXPECT_NE(way.value(), host::HandOverWay::HardLink);
+        EXPECT_NE(way.value(), posix::HandOverWay::HardLink);
     });
     EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
     expectUntouched();
@@ -213,10 +217,10 @@ TEST_F(HandingOver, SharesTheBlocksWhereFileSystemsCan)
 {
     // One that says so is believed; this one has done nothing.
     tests::whileRefusing({{SYS_linkat, EXDEV}, {SYS_ioctl, 0, 1, FICLONE, true}}, [&] {
-        EXPECT_EQ(handOver().value(), host::HandOverWay::Reflink);
+        EXPECT_EQ(handOver().value(), posix::HandOverWay::Reflink);
         EXPECT_EQ(statusOf(m_copy).st_size, 0);
         std::filesystem::remove(m_copy);
-        EXPECT_EQ(handOver(host::HandOverWay::Copy).value(), host::HandOverWay::Copy);
+        EXPECT_EQ(handOver(posix::HandOverWay::Copy).value(), posix::HandOverWay::Copy);
     });
     EXPECT_EQ(tests::PrivateDirectory::read(m_copy), m_bytes);
 }
@@ -236,7 +240,7 @@ TEST_F(HandingOver, SaysWhyACopyCannotBeMade)
                                  EXPECT_THAT(way.error()->description(), testing::StartsWith(words));
                                  EXPECT_FALSE(std::filesystem::exists(m_copy));
                              });
-    const auto stopped = handOver(host::HandOverWay::Copy, [](std::uint64_t, std::uint64_t) { return false; });
+    const auto stopped = handOver(posix::HandOverWay::Copy, [](std::uint64_t, std::uint64_t) { return false; });
     EXPECT_THAT(stopped.error()->description(), testing::StartsWith("copying the recording was stopped"));
     expectUntouched();
 }
