@@ -1,5 +1,7 @@
 #include "base/Text.h"
 
+#include <algorithm>
+
 namespace base {
 
 namespace {
@@ -55,6 +57,35 @@ std::size_t characterLength(std::string_view text)
         || (byte(0) == 0xF0 && byte(1) < 0x90) || (byte(0) == 0xF4 && byte(1) > 0x8F))
         return 0;
     return length;
+}
+
+std::string formatted(std::string_view format, const std::vector<std::string>& arguments)
+{
+    std::string text;
+    std::size_t next = 0;
+    while (!format.empty()) {
+        const std::size_t percent = std::min(format.find('%'), format.size());
+        text += format.substr(0, percent);
+        format.remove_prefix(percent);
+        if (format.starts_with("%%")) {
+            text += '%';
+            format.remove_prefix(2);
+        } else if (format.starts_with("%@")) {
+            if (next < arguments.size())
+                text += arguments[next];
+            ++next;
+            format.remove_prefix(2);
+        } else if (format.size() >= 4 && format[1] >= '1' && format[1] <= '9' && format.substr(2, 2) == "$@") {
+            const auto place = static_cast<std::size_t>(format[1] - '1');
+            if (place < arguments.size())
+                text += arguments[place];
+            format.remove_prefix(4);
+        } else if (!format.empty()) {
+            text += '%';
+            format.remove_prefix(1);
+        }
+    }
+    return text;
 }
 
 std::string printable(std::string_view text)

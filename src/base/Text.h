@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace base {
 
@@ -15,6 +16,10 @@ char lowercase(char character);
 
 /// What a hexadecimal digit stands for; -1 when it is none.
 int hexadecimalDigit(char character);
+
+/// `format` with its places filled: "%@" by the next of `arguments`, "%2$@" by the second. "%%" is a percent sign; what has no
+/// argument is left out, and all else stays as it is.
+std::string formatted(std::string_view format, const std::vector<std::string>& arguments);
 
 /// `text` as one line for a terminal or a log: control characters, those that turn text around, and bytes that are no
 /// UTF-8 become question marks.

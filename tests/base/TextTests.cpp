@@ -41,6 +41,25 @@ TEST(Text, KnowsHexadecimalDigits)
         EXPECT_EQ(base::hexadecimalDigit(digit), number) << digit;
 }
 
+TEST(Text, FillsThePlacesOfAFormatInTheirOrderOrByNumber)
+{
+    EXPECT_EQ(base::formatted("%@ by %@", {"Tux Racer", "Tux"}), "Tux Racer by Tux");
+    EXPECT_EQ(base::formatted("%2$@: %1$@!", {"Tux Racer", "Tux"}), "Tux: Tux Racer!");
+    EXPECT_EQ(base::formatted("%@", {"%@ %2$@"}), "%@ %2$@") << "what is filled in is no format";
+}
+
+TEST(Text, LeavesOutOfAFormatWhatHasNoArgument)
+{
+    EXPECT_EQ(base::formatted("%@ and %@", {"one"}), "one and ");
+    EXPECT_EQ(base::formatted("[%3$@]", {"one", "two"}), "[]");
+    EXPECT_EQ(base::formatted("", {"one"}), "");
+}
+
+TEST(Text, KeepsInAFormatWhatIsNoPlace)
+{
+    EXPECT_EQ(base::formatted("100 %% of %d, %0$@, %1$d, 5 %", {"one"}), "100 % of %d, %0$@, %1$d, 5 %");
+}
+
 TEST(Text, KnowsWhereACharacterEnds)
 {
     EXPECT_EQ(base::characterLength(""), 0U);

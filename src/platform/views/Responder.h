@@ -25,6 +25,7 @@ struct KeyCommand {
     char character = 0; ///< for Key::Character: a lower-case letter
     bool control = false;
     runtime::Selector action;
+    bool shift = false; ///< counts only together with control
 };
 
 class Responder : public runtime::Object {

@@ -57,7 +57,7 @@ public:
     void touchCancel(const Touch& touch);
     void motion(MotionSubtype subtype);
     /// Offers a key to the focused view and the responder chain; true when somebody took it.
-    bool keyDown(Key key, char character = 0, bool control = false);
+    bool keyDown(Key key, char character = 0, bool control = false, bool shift = false);
 
     // First responder.
     std::shared_ptr<Responder> firstResponder() const { return here(m_firstResponder).lock(); }

@@ -45,9 +45,9 @@ bool concernsFocus(Key key)
     return key == Key::Return || key == Key::Space || isArrow(key);
 }
 
-bool matches(const KeyCommand& command, Key key, char character, bool control)
+bool matches(const KeyCommand& command, Key key, char character, bool control, bool shift)
 {
-    return command.key == key && command.control == control
+    return command.key == key && command.control == control && (!control || command.shift == shift)
            && (key != Key::Character || base::lowercase(command.character) == base::lowercase(character));
 }
 
@@ -141,7 +141,7 @@ void Window::motion(MotionSubtype subtype)
         responder->motionEnded_withEvent(subtype, {subtype});
 }
 
-bool Window::keyDown(Key key, char character, bool control)
+bool Window::keyDown(Key key, char character, bool control, bool shift)
 {
     assertHere();
     const auto keepAlive = shared_from_this();
@@ -153,7 +153,7 @@ bool Window::keyDown(Key key, char character, bool control)
     }
     for (auto responder = firstResponder(); responder; responder = responder->nextResponder())
         for (const KeyCommand& command : responder->keyCommands())
-            if (matches(command, key, character, control) && responder->respondsTo(command.action)) {
+            if (matches(command, key, character, control, shift) && responder->respondsTo(command.action)) {
                 responder->perform(command.action);
                 return true;
             }

@@ -227,4 +227,19 @@ TEST_F(Focus, KeysReachTheCommandsOfTheChainOfTheFirstResponder)
     EXPECT_THAT(taken(), ElementsAre("child command"));
 }
 
+TEST_F(Focus, ShiftCountsTogetherWithControlAlone)
+{
+    const auto root = controller("root");
+    window->setRootViewController(root);
+    root->becomeFirstResponder();
+    root->commands = {{Key::Character, 's', true, runtime::Selector("command"), true},
+                      {Key::Character, 'i', false, runtime::Selector("command")}};
+    taken();
+    EXPECT_FALSE(window->keyDown(Key::Character, 's', true, false));
+    EXPECT_TRUE(window->keyDown(Key::Character, 's', true, true));
+    EXPECT_TRUE(window->keyDown(Key::Character, 'i', false, false));
+    EXPECT_TRUE(window->keyDown(Key::Character, 'i', false, true)) << "as with Caps Lock";
+    EXPECT_EQ(taken().size(), 3U);
+}
+
 } // namespace

@@ -154,16 +154,17 @@ bool InputFeed::key(const QKeyEvent& event)
 {
     const Qt::KeyboardModifiers modifiers = event.modifiers() & ~Qt::KeypadModifier;
     const bool control = modifiers.testFlag(Qt::ControlModifier);
+    const bool shift = modifiers.testFlag(Qt::ShiftModifier);
     if (modifiers & (Qt::AltModifier | Qt::MetaModifier))
         return false;
     if (event.key() == Qt::Key_Tab || event.key() == Qt::Key_Backtab) {
-        m_window.moveFocus(event.key() == Qt::Key_Tab && !modifiers.testFlag(Qt::ShiftModifier));
+        m_window.moveFocus(event.key() == Qt::Key_Tab && !shift);
         return true;
     }
     if (const auto meaning = meaningOf(event.key())) {
         if (event.isAutoRepeat() && !repeats(*meaning))
             return true;
-        return m_window.keyDown(*meaning, 0, control);
+        return m_window.keyDown(*meaning, 0, control, shift);
     }
     if (event.key() < Qt::Key_A || event.key() > Qt::Key_Z || event.isAutoRepeat())
         return false;
@@ -172,7 +173,7 @@ bool InputFeed::key(const QKeyEvent& event)
         m_window.motion(platform::MotionSubtype::Shake);
         return true;
     }
-    if (m_window.keyDown(platform::Key::Character, letter, control))
+    if (m_window.keyDown(platform::Key::Character, letter, control, shift))
         return true;
     if (control && (letter == 'w' || letter == 'q') && m_close) {
         const auto close = m_close; // may end us
