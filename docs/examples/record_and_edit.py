@@ -3,7 +3,7 @@
 
     record_and_edit.py MOVIE [APP-NAME]
 
-Prints the activity types, one a line. Needs python3-dbus and python3-gi.
+Prints the activity types, one a line, and what became of shares on standard error. Needs python3-dbus and python3-gi.
 """
 
 import sys
@@ -32,6 +32,15 @@ def save_failed(path, message):
     where = f"it is kept as {path}" if path else "it could not be kept elsewhere"
     print(f"the movie is not in your videos ({message}); {where}", file=sys.stderr)
     save_status = 1
+
+
+def told(result):
+    # Of saves and of the session we hear by signals of their own.
+    receiver = f" with {result['receiver']}" if "receiver" in result else ""
+    if result["outcome"] == "shared":
+        print(f"shared{receiver} by {result['type']}", file=sys.stderr)
+    elif result["outcome"] == "not-shared":
+        print(f"not shared{receiver} by {result['type']}: {result['reason']}", file=sys.stderr)
 
 
 def failed(message):
@@ -65,6 +74,7 @@ try:
     # Listened to before the call, so that no answer can be missed; they come to us alone.
     bus.add_signal_receiver(completed, "Completed", SESSION)
     bus.add_signal_receiver(save_failed, "SaveFailed", SESSION)
+    bus.add_signal_receiver(told, "Result", SESSION)
     bus.add_signal_receiver(failed, "Failed", SESSION)
     bus.add_signal_receiver(ended, "Ended", SESSION)
     recorder = dbus.Interface(bus.get_object("org.clipsa.Clipsa", "/org/clipsa/Clipsa"), "org.clipsa.Recorder1")

@@ -38,6 +38,8 @@ base::Result<void> takeText(const std::string& key, const std::string& text, Edi
         if (!text.starts_with('/'))
             return badOption(key, "a path that starts with a slash, or a file descriptor");
         request.attachmentPath = text;
+    } else if (key == "attachment-name") {
+        request.attachmentName = text;
     } else if (key == "message") {
         request.message = text;
     } else if (key == "tint") {
@@ -59,7 +61,8 @@ posix::FileDescriptor descriptorFrom(const QVariant& value)
 
 base::Result<void> takeOptions(const QVariantMap& options, EditRequest& request)
 {
-    static constexpr std::string_view kTexts[] = {"name", "app-name", "bundle-id", "attachment", "message", "tint"};
+    static constexpr std::string_view kTexts[] = {"name",    "app-name", "bundle-id", "attachment", "attachment-name",
+                                                  "message", "tint"};
     for (auto option = options.begin(); option != options.end(); ++option) {
         const std::string key = fromQt(option.key());
         const QVariant& value = option.value();

@@ -2,9 +2,11 @@
 /// files. Nothing in it has been checked before the host has prepared it; what is empty then gets its default.
 #pragma once
 
+#include "linux/dbus/Asker.h"
 #include "linux/posix/FileDescriptor.h"
 #include "platform/views/Color.h"
 
+#include <memory>
 #include <optional>
 #include <string>
 #include <utility>
@@ -14,8 +16,12 @@ namespace dbus {
 
 /// The domain of errors that are the asker's, as opposed to the machine's.
 inline constexpr const char* kBadInputDomain = "org.clipsa.input";
+/// The user-info key of what the asker is not told of an error, as it would tell of files that may not be theirs to know.
+inline constexpr const char* kUntoldKey = "untold";
 
 struct EditRequest {
+    /// Who names paths by the bus; null for whoever runs us, whose right to files is ours.
+    std::shared_ptr<const Asker> asker;
     /// The movie: where it is, or an open file.
     std::string moviePath;
     posix::FileDescriptor movie;
@@ -25,7 +31,7 @@ struct EditRequest {
     /// A file to share with the movie: where it is, or an open file.
     std::string attachmentPath;
     posix::FileDescriptor attachment;
-    std::string attachmentName;
+    std::string attachmentName; ///< of an open file
     std::optional<std::string> message;
     std::optional<platform::Color> tint;
     std::vector<std::string> editorArguments;

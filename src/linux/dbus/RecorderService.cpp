@@ -1,23 +1,21 @@
 #include "linux/dbus/RecorderService.h"
 
-#include "base/Text.h"
 #include "base/Url.h"
+#include "linux/dbus/AskWho.h"
+#include "linux/dbus/CallerWatch.h"
 #include "linux/dbus/DisconnectWatch.h"
 #include "linux/dbus/EditOptions.h"
 #include "linux/dbus/Protocol.h"
+#include "linux/dbus/RecorderAnswers.h"
 #include "linux/dbus/RecorderIntrospection.h"
-#include "linux/dbus/Reply.h"
-#include "linux/dbus/SessionResult.h"
 #include "linux/dbus/Wire.h"
 
 #include <QDBusConnection>
 #include <QDBusMessage>
-#include <QDBusServiceWatcher>
 #include <QDBusVirtualObject>
 #include <QTimer>
 
 #include <algorithm>
-#include <cstdio>
 #include <map>
 #include <optional>
 #include <utility>
@@ -29,10 +27,7 @@ namespace {
 const char* const kName = "org.clipsa.Clipsa";
 const char* const kPath = "/org/clipsa/Clipsa";
 const char* const kRecorderInterface = "org.clipsa.Recorder1";
-const char* const kSessionInterface = "org.clipsa.RecorderSession1";
 const char* const kApplicationInterface = "org.freedesktop.Application";
-const char* const kBadInput = "org.clipsa.Error.BadInput";
-const char* const kFailed = "org.clipsa.Error.Failed";
 
 } // namespace
 
@@ -44,9 +39,6 @@ public:
         m_idle.setSingleShot(true);
         m_idle.setInterval(idle);
         connect(&m_idle, &QTimer::timeout, this, &Bus::leave);
-        m_callers.setConnection(m_connection);
-        m_callers.setWatchMode(QDBusServiceWatcher::WatchForUnregistration);
-        connect(&m_callers, &QDBusServiceWatcher::serviceUnregistered, this, &Bus::callerLeft);
     }
 
     ~Bus() override { QDBusConnection::disconnectFromBus(m_connection.name()); }
@@ -67,7 +59,7 @@ public:
             return;
         for (const auto& [number, session] : m_sessions)
             session.editor->close();
-        if (m_sessions.empty())
+        if (isIdle())
             leave();
     }
 
@@ -93,9 +85,9 @@ public:
         else if (isOurs && calls(kApplicationInterface, "Open") && signature == QLatin1String("asa{sv}"))
             open(message);
         else if (isOurs && calls(kApplicationInterface, "Activate"))
-            refuse(message, "Clipsa has no window of its own; give it a recording to open");
+            refuse(m_connection, message, "Clipsa has no window of its own; give it a recording to open");
         else if (isOurs && calls(kApplicationInterface, "ActivateAction"))
-            refuse(message, "Clipsa has no actions");
+            refuse(m_connection, message, "Clipsa has no actions");
         else
             return false;
         return true;
@@ -125,48 +117,58 @@ private:
         return nullptr;
     }
 
-    void answer(const QDBusMessage& message, const QVariantList& values = {})
-    {
-        if (message.isReplyRequired())
-            m_connection.send(message.createReply(values));
-    }
-
-    void refuse(const QDBusMessage& message, const std::string& why, const char* error = kBadInput)
-    {
-        std::fprintf(stderr, "clipsa: %s\n", base::printable(why).c_str());
-        if (message.isReplyRequired())
-            m_connection.send(message.createErrorReply(QLatin1String(error), toQt(why)));
-    }
-
-    void refuse(const QDBusMessage& message, const base::ErrorRef& error)
-    {
-        refuse(message, error->description(), error->domain() == kBadInputDomain ? kBadInput : kFailed);
-    }
-
     void edit(const QDBusMessage& message)
     {
         const QVariantList arguments = message.arguments();
         EditRequest request;
         request.movie = descriptorFrom(arguments.at(0));
         if (const auto taken = takeOptions(qdbus_cast<QVariantMap>(arguments.at(1)), request); !taken) {
-            refuse(message, taken.error()->description());
+            refuse(m_connection, message, taken.error());
             return;
         }
-        launch(std::move(request), fromQt(message.service()), true,
-               [=, this](const base::Result<std::uint64_t>& session) {
-                   if (session)
-                       answer(message, {QVariant::fromValue(QDBusObjectPath(pathOf(session.value())))});
-                   else
-                       refuse(message, session.error());
-               });
+        const auto whenStarted = [=, this](const base::Result<std::uint64_t>& session) {
+            if (session)
+                answer(m_connection, message, {QVariant::fromValue(QDBusObjectPath(pathOf(session.value())))});
+            else
+                refuse(m_connection, message, session.error());
+        };
+        if (request.attachmentPath.empty()) {
+            launch(std::move(request), fromQt(message.service()), true, whenStarted);
+            return;
+        }
+        // Shared, because a function can be copied and a request cannot.
+        const auto shared = std::make_shared<EditRequest>(std::move(request));
+        whenKnown(message.service(), [=, this](std::shared_ptr<const Asker> asker) {
+            shared->asker = std::move(asker);
+            launch(std::move(*shared), fromQt(message.service()), true, whenStarted);
+        });
+    }
+
+    /// Whoever names files has a right to them, or not.
+    void whenKnown(const QString& caller, std::function<void(std::shared_ptr<const Asker> asker)> then)
+    {
+        ++m_questions;
+        m_idle.stop();
+        askWho(m_connection, caller, *this, [this, then = std::move(then)](std::shared_ptr<const Asker> asker) {
+            --m_questions;
+            then(std::move(asker));
+            rest(); // unless it was launched
+        });
     }
 
     void open(const QDBusMessage& message)
     {
+        if (message.arguments().at(0).toStringList().isEmpty())
+            answer(m_connection, message);
+        else
+            whenKnown(message.service(),
+                      [=, this](const std::shared_ptr<const Asker>& asker) { open(message, asker); });
+    }
+
+    void open(const QDBusMessage& message, const std::shared_ptr<const Asker>& asker)
+    {
         const auto data = qdbus_cast<QVariantMap>(message.arguments().at(1));
         const QStringList uris = message.arguments().at(0).toStringList();
-        if (uris.isEmpty())
-            answer(message);
         struct Answers {
             qsizetype missing;
             base::ErrorRef error;
@@ -175,6 +177,7 @@ private:
         for (const QString& uri : uris) {
             const auto url = base::Url::fromString(fromQt(uri));
             EditRequest request;
+            request.asker = asker;
             request.moviePath = url && url->isFile() ? url->path() : fromQt(uri);
             request.editorArguments = {"--explain"}; // file managers do not wait for how it ends
             takePlatformData(data, request);
@@ -185,9 +188,9 @@ private:
                        if (--answers->missing > 0)
                            return;
                        if (answers->error)
-                           refuse(message, answers->error);
+                           refuse(m_connection, message, answers->error);
                        else
-                           answer(message);
+                           answer(m_connection, message);
                    });
         }
     }
@@ -213,15 +216,25 @@ private:
         const std::uint64_t number = ++m_lastSession;
         EditorEvents events{
             .started = [this, number](const base::Result<void>& started) { tellStarted(number, started); },
-            .noted = [this, number](const MovieNote& note) { tellNoted(number, note); },
+            .noted =
+                [this, number](const MovieNote& note) {
+                    if (const auto session = listenerOf(number))
+                        tellNote(m_connection, *session, note);
+                },
             .completed =
                 [this, number](const std::vector<std::string>& activityTypes) {
-                    tell(number, QStringLiteral("Completed"), {toQt(activityTypes)});
+                    if (const auto session = listenerOf(number))
+                        tellCompleted(m_connection, *session, activityTypes);
                 },
-            .ended = [this, number](const std::string& failure) { tellEnded(number, failure); }};
+            .ended =
+                [this, number](const std::string& failure) {
+                    if (const auto session = listenerOf(number))
+                        tellEnded(m_connection, *session, failure);
+                    forgetLater(number);
+                }};
         m_idle.stop();
         if (isCallers)
-            watch(caller);
+            m_callers.watch(toQt(caller));
         auto editor = m_launcher(std::move(request), std::move(events));
         m_sessions.emplace(number, Session{std::move(caller), isCallers, std::move(whenStarted), std::move(editor)});
     }
@@ -237,34 +250,6 @@ private:
         forgetLater(number);
     }
 
-    void tellNoted(std::uint64_t number, const MovieNote& note)
-    {
-        if (note.kind == MovieNote::Kind::Saved)
-            tell(number, QStringLiteral("Saved"), {toQt(note.path)});
-        else if (note.kind == MovieNote::Kind::Unsaved)
-            tell(number, QStringLiteral("SaveFailed"), {toQt(note.path), toQt(note.why)});
-        tellResult(number, resultOf(note));
-    }
-
-    void tellResult(std::uint64_t number, const SessionResult& result)
-    {
-        QVariantMap members;
-        for (const auto& [name, text] : result)
-            members.insert(toQt(name), toQt(text));
-        if (!members.isEmpty())
-            tell(number, QStringLiteral("Result"), {members});
-    }
-
-    void tellEnded(std::uint64_t number, const std::string& failure)
-    {
-        if (!failure.empty()) {
-            tell(number, QStringLiteral("Failed"), {toQt(failure)});
-            tellResult(number, resultOfFailure(failure));
-        }
-        tell(number, QStringLiteral("Ended"), {});
-        forgetLater(number);
-    }
-
     /// The editor that calls us is destroyed with its session.
     void forgetLater(std::uint64_t number)
     {
@@ -272,15 +257,13 @@ private:
             this, [this, number] { forget(number); }, Qt::QueuedConnection);
     }
 
-    void tell(std::uint64_t number, const QString& signal, const QVariantList& values)
+    /// Nothing where nobody wants to know.
+    std::optional<SessionAddress> listenerOf(std::uint64_t number) const
     {
         const auto session = m_sessions.find(number);
         if (session == m_sessions.end() || !session->second.isCallers)
-            return;
-        auto message = QDBusMessage::createTargetedSignal(toQt(session->second.caller), pathOf(number),
-                                                          QLatin1String(kSessionInterface), signal);
-        message.setArguments(values);
-        m_connection.send(message);
+            return std::nullopt;
+        return SessionAddress{toQt(session->second.caller), pathOf(number)};
     }
 
     void forget(std::uint64_t number)
@@ -293,29 +276,20 @@ private:
         for (const auto& [other, living] : m_sessions)
             watched |= living.isCallers && living.caller == caller;
         if (!watched)
-            m_callers.removeWatchedService(toQt(caller));
-        if (!m_sessions.empty())
+            m_callers.forget(toQt(caller));
+        rest();
+    }
+
+    bool isIdle() const { return m_sessions.empty() && m_questions == 0; }
+
+    void rest()
+    {
+        if (!isIdle())
             return;
         if (m_closing)
             leave();
         else
             m_idle.start();
-    }
-
-    void watch(const std::string& caller)
-    {
-        if (m_callers.watchedServices().contains(toQt(caller)))
-            return;
-        m_callers.addWatchedService(toQt(caller));
-        // It may have left before we watched; then nobody says so any more.
-        auto question = QDBusMessage::createMethodCall(
-            QStringLiteral("org.freedesktop.DBus"), QStringLiteral("/org/freedesktop/DBus"),
-            QStringLiteral("org.freedesktop.DBus"), QStringLiteral("NameHasOwner"));
-        whenAnswered(m_connection.asyncCall(question << toQt(caller)), *this,
-                     [this, caller](const QDBusMessage& reply) {
-                         if (reply.arguments() == QVariantList{false})
-                             callerLeft(toQt(caller));
-                     });
     }
 
     void callerLeft(const QString& name)
@@ -328,11 +302,11 @@ private:
     void closeSession(const QDBusMessage& message, const Session& session)
     {
         if (!session.isCallers || session.caller != fromQt(message.service())) {
-            refuse(message, "only the recorder that asked for a session can close it");
+            refuse(m_connection, message, "only the recorder that asked for a session can close it");
             return;
         }
         session.editor->close();
-        answer(message);
+        answer(m_connection, message);
     }
 
     /// Calls that reached us while we had the name are answered before we go; and what we sent has left when the bus
@@ -343,7 +317,7 @@ private:
         QMetaObject::invokeMethod(
             this,
             [this] {
-                if (m_sessions.empty())
+                if (isIdle())
                     m_whenIdle();
                 else
                     m_connection.registerService(QLatin1String(kName));
@@ -355,9 +329,10 @@ private:
     Launcher m_launcher;
     std::function<void()> m_whenIdle;
     QTimer m_idle;
-    QDBusServiceWatcher m_callers;
+    CallerWatch m_callers{m_connection, [this](const QString& name) { callerLeft(name); }};
     DisconnectWatch m_busWatch{[this] { close(); }}; // without a bus there is nobody to serve
     std::uint64_t m_lastSession = 0;
+    int m_questions = 0; ///< about callers, which are still to be answered
     bool m_closing = false;
     std::map<std::uint64_t, Session> m_sessions;
 };

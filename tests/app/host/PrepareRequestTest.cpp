@@ -3,15 +3,19 @@
 #include "app/host/RequestText.h"
 #include "support/PrivateDirectory.h"
 #include "support/RefusedSystemCalls.h"
+#include "support/WithoutPrivileges.h"
 
 #include <gmock/gmock.h>
 
 #include <cerrno>
 #include <fcntl.h>
+#include <sys/inotify.h>
+#include <sys/socket.h>
 #include <sys/stat.h>
 #include <unistd.h>
 #include <utility>
 
+using testing::AllOf;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
@@ -177,6 +181,146 @@ TEST_F(Preparing, ChecksAnAttachment)
     asked = request(m_movie);
     asked.attachmentPath = m_directory.write("\xFF.txt", "x");
     EXPECT_THAT(refusal(std::move(asked)), HasSubstr("not UTF-8"));
+}
+
+/// A request with an attachment that somebody on the bus has named.
+class PreparingForAnAsker : public Preparing {
+protected:
+    /// What is wrong with it: what the asker is told, and what not.
+    std::pair<std::string, std::string> refused(const std::string& attachment)
+    {
+        auto asked = request(m_movie);
+        asked.asker = std::make_shared<const dbus::Asker>();
+        asked.attachmentPath = attachment;
+        const auto prepared = host::prepare(asked, m_isConfined);
+        if (prepared)
+            return {"(accepted)", asked.attachmentPath};
+        EXPECT_EQ(prepared.error()->domain(), dbus::kBadInputDomain);
+        EXPECT_EQ(prepared.error()->code(), EACCES) << "one error";
+        return {prepared.error()->description(), prepared.error()->userInfo().at(dbus::kUntoldKey)};
+    }
+
+    const std::string m_words = "the file of the option \"attachment\" cannot be had by its path; give an open file";
+    host::Confinement m_isConfined = [](const dbus::Asker&) { return false; };
+};
+
+TEST_F(PreparingForAnAsker, TakesAFileThatCanBeHad)
+{
+    const auto log = std::filesystem::canonical(m_directory.write("log.txt", ""));
+    EXPECT_EQ(refused(log), std::pair(std::string("(accepted)"), log.native()));
+}
+
+TEST_F(PreparingForAnAsker, HasOneAnswerToAllThatCannotBeHad)
+{
+    const auto missing = m_directory.path() / "missing.txt";
+    const auto pipe = m_directory.path() / "pipe";
+    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
+    const auto loop = m_directory.path() / "loop";
+    std::filesystem::create_symlink(loop, loop);
+    const auto dangling = m_directory.path() / "dangling";
+    std::filesystem::create_symlink(missing, dangling);
+    const auto log = m_directory.write("log.txt", "x");
+    const auto unreadable = m_directory.write("unreadable.txt", "x");
+    ::chmod(unreadable.c_str(), 0);
+    const std::pair<std::string, std::string> paths[] = {
+        {missing, "there is no file"},
+        {dangling, "there is no file"},
+        {log / "below", "there is no file"},
+        {log.native() + "/", "there is no file"},
+        {m_directory.path(), "is a directory"},
+        {"/", "is a directory"},
+        {pipe, "not a regular file"},
+        {"/dev/null", "not a regular file"},
+        {"/dev/tty", ""},
+        {loop, "round in circles"},
+        {log.native() + std::string("\0", 1), "not UTF-8"},
+        {m_directory.write("caf\xE9", "x"), "not UTF-8"},
+        {"/" + std::string(std::size_t{1024} * 1024 - 1, 'x'), "cannot open"},
+        {"/" + std::string(std::size_t{1024} * 1024, 'x'), "longer than 1 MiB"}};
+    for (const auto& [path, reason] : paths) {
+        const auto [told, untold] = refused(path);
+        EXPECT_EQ(told, m_words) << path.substr(0, 200);
+        EXPECT_NE(untold.find(reason), std::string::npos) << untold.substr(0, 200);
+    }
+    const tests::WithoutPrivileges withoutPrivileges;
+    EXPECT_EQ(refused(unreadable).first, m_words);
+    EXPECT_THAT(refused(unreadable).second, HasSubstr("may not be read"));
+}
+
+TEST_F(PreparingForAnAsker, FollowsNoPathForASandbox)
+{
+    m_isConfined = [](const dbus::Asker&) { return true; };
+    const auto log = m_directory.write("log.txt", "x");
+    const posix::FileDescriptor watch(::inotify_init1(IN_CLOEXEC | IN_NONBLOCK));
+    ASSERT_GE(::inotify_add_watch(watch.get(), m_directory.path().c_str(), IN_OPEN), 0);
+    const auto isOpened = [&](std::string_view name) {
+        char events[4096] = {};
+        const ssize_t count = ::read(watch.get(), events, sizeof events);
+        return std::string_view(events, count > 0 ? static_cast<std::size_t>(count) : 0).find(name)
+               != std::string_view::npos;
+    };
+    EXPECT_EQ(refused(log).first, m_words) << "the same words";
+    EXPECT_FALSE(isOpened("log.txt"));
+    EXPECT_EQ(refused(m_directory.path() / "missing.txt"), refused(log));
+    m_isConfined = [](const dbus::Asker&) { return false; };
+    EXPECT_EQ(refused(log).first, "(accepted)");
+    EXPECT_TRUE(isOpened("log.txt")) << "it would have been noticed";
+}
+
+TEST_F(PreparingForAnAsker, AsksOfNobodyWhoGivesAnOpenFile)
+{
+    bool isAsked = false;
+    auto asked = descriptor(m_movie);
+    asked.asker = std::make_shared<const dbus::Asker>();
+    asked.attachment = posix::FileDescriptor(::open(m_movie.c_str(), O_RDONLY | O_CLOEXEC));
+    asked.attachmentName = "log.txt";
+    ASSERT_TRUE(host::prepare(asked, [&](const dbus::Asker&) { return isAsked = true; }));
+    EXPECT_EQ(asked.attachmentName, "log.txt");
+    EXPECT_FALSE(isAsked);
+}
+
+TEST_F(PreparingForAnAsker, CountsWhoIsNotKnownAsConfined)
+{
+    auto asked = request(m_movie);
+    asked.asker = std::make_shared<const dbus::Asker>();
+    asked.attachmentPath = m_movie;
+    EXPECT_EQ(refusal(std::move(asked)), m_words);
+}
+
+TEST_F(PreparingForAnAsker, TellsASandboxOnlyThatAMovieCannotBeHad)
+{
+    const auto told = [&](const std::string& movie, bool isConfined) {
+        auto asked = request(movie);
+        asked.asker = std::make_shared<const dbus::Asker>();
+        const auto prepared = host::prepare(asked, [=](const dbus::Asker&) { return isConfined; });
+        return prepared ? "(accepted)" : prepared.error()->description();
+    };
+    const std::string one = "the recording cannot be had by its path; call org.clipsa.Recorder1.Edit with an open file";
+    const std::string missing = m_directory.path() / "missing.mp4";
+    EXPECT_EQ(told(missing, true), one);
+    EXPECT_EQ(told(m_directory.path(), true), one);
+    EXPECT_EQ(told(m_directory.write("empty.mp4", ""), true), one);
+    EXPECT_THAT(told(missing, false), HasSubstr("there is no file"));
+    EXPECT_EQ(told(m_movie, true), "(accepted)");
+}
+
+TEST_F(Preparing, LooksAtAnAttachmentsDescriptorAsAtTheMovies)
+{
+    int ends[2] = {};
+    ASSERT_EQ(::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
+    const posix::FileDescriptor other(ends[1]);
+    const std::pair<int, const char*> wrong[] = {
+        {ends[0], "not a regular file"},
+        {::open(m_movie.c_str(), O_WRONLY | O_CLOEXEC), "not opened for reading"},
+        {::open(m_movie.c_str(), O_PATH | O_CLOEXEC), "not opened for reading"},
+        {::open("/", O_RDONLY | O_CLOEXEC), "directory"},
+        {::open("/dev/null", O_RDONLY | O_CLOEXEC), "not a regular file"},
+        {1'000'000, "cannot look at"}};
+    for (const auto& [number, words] : wrong) {
+        auto asked = request(m_movie);
+        asked.attachment = posix::FileDescriptor(number);
+        EXPECT_THAT(refusal(std::move(asked)), AllOf(HasSubstr("the attachment"), HasSubstr(words)));
+    }
 }
 
 TEST_F(Preparing, KeepsTheNameThatAMovieCameWith)

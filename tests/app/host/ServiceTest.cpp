@@ -149,7 +149,33 @@ TEST_F(Service, TakesFilesThatHaveNoNameAnyMore)
     const std::string told = tests::PrivateDirectory::read(report);
     EXPECT_THAT(told, HasSubstr("MovieURLKey=/private/var/mobile/Library/Velkor/a.webm\n"));
     EXPECT_THAT(told, StartsWith("VKVideoEditorExtensionFileAttachmentKey=" + m_cache.native()));
-    EXPECT_THAT(told, HasSubstr("/attachment/attachment\n"));
+    EXPECT_THAT(told, HasSubstr("/attachment/log.txt\n"));
+}
+
+TEST_F(Service, TakesAttachmentsByTheirPathsAndHasOneAnswerToTheRest)
+{
+    const auto report = m_directory.path() / "report";
+    startBus("report=" + report.native() + " finish= wait");
+    expectScenario("attachments");
+    EXPECT_THAT(tests::PrivateDirectory::read(report),
+                StartsWith("VKVideoEditorExtensionFileAttachmentKey="
+                           + std::filesystem::canonical(m_directory.path() / "log.txt").native() + "\n"));
+}
+
+TEST_F(Service, FollowsNoPathOfARecorderWithAnotherRoot)
+{
+    startBus("finish= wait");
+    expectScenario("other_root");
+    if (m_output.starts_with("SKIPPED"))
+        GTEST_SKIP() << m_output;
+}
+
+TEST_F(Service, FollowsNoPathOfARecorderWithOtherMounts)
+{
+    startBus("finish= wait");
+    expectScenario("other_mounts");
+    if (m_output.starts_with("SKIPPED"))
+        GTEST_SKIP() << m_output;
 }
 
 TEST_F(Service, OpensWhatAFileManagerGivesIt)
@@ -167,6 +193,17 @@ TEST_F(Service, AnswersTheExampleInPython)
     expectSuccess({kPython, tests::sourceFile("docs/examples/record_and_edit.py"), m_movie, "Tux Racer"});
     EXPECT_EQ(m_output, "save\nshare\n");
     EXPECT_THAT(tests::PrivateDirectory::read(report), HasSubstr("AppNameKey=Tux Racer\n"));
+}
+
+TEST_F(Service, TellsTheExampleInPythonWithWhomItWasShared)
+{
+    startBus("shared=Bluetooth,Phone unshared=KDEConnect,Tablet shared=Mail, finish=Bluetooth,Mail wait");
+    tests::Program example({kPython, tests::sourceFile("docs/examples/record_and_edit.py"), m_movie}, {});
+    EXPECT_EQ(example.wait(), 0);
+    EXPECT_EQ(example.output(), "Bluetooth\nMail\n");
+    EXPECT_EQ(example.errors(), "shared with Phone by Bluetooth\n"
+                                "not shared with Tablet by KDEConnect: it went away\n"
+                                "shared by Mail\n");
 }
 
 TEST_F(Service, TellsTheExampleInPythonWhatIsWrong)

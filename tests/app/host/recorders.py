@@ -5,6 +5,7 @@
 Fails with a traceback when the service does not keep a promise.
 """
 
+import ctypes
 import os
 import select
 import signal
@@ -150,7 +151,6 @@ def refused():
     assert recorder.error("/dev/null")[0] == bad
     assert recorder.error(tint="reddish")[0] == bad
     assert recorder.error(app_name=1)[0] == bad
-    assert recorder.error(attachment="/nowhere")[0] == bad
     assert recorder.error(message="x" * (1024 * 1024 + 1))[0] == bad
     write_only = os.open(MOVIE, os.O_WRONLY)
     for descriptor in (write_only, os.open(directory, os.O_RDONLY), os.pipe()[0]):
@@ -160,6 +160,81 @@ def refused():
             assert error.get_dbus_name() == bad, error
         else:
             raise AssertionError("was accepted")
+
+
+BAD_PATH = ("org.clipsa.Error.BadInput",
+            'the file of the option "attachment" cannot be had by its path; give an open file')
+
+
+def edit_with_attachment(recorder, movie, attachment):
+    """Whether it was taken; else the error."""
+    try:
+        recorder.recorder.Edit(dbus.types.UnixFd(movie), dbus.Dictionary({"attachment": attachment}, signature="sv"))
+    except dbus.DBusException as error:
+        return error.get_dbus_name(), error.get_dbus_message()
+    return True
+
+
+def attachments():
+    """Files by their paths, for who may read them; one answer where there is nothing to be had."""
+    recorder = Recorder()
+    directory = os.path.dirname(MOVIE)
+    loop_ = os.path.join(directory, "loop")
+    os.symlink(loop_, loop_)
+    fifo = os.path.join(directory, "fifo")
+    os.mkfifo(fifo)
+    for path in (directory, loop_, fifo, "/dev/null", "/nowhere", MOVIE + "/", "/" + "x" * (1024 * 1024 - 1)):
+        assert recorder.error(attachment=path) == BAD_PATH, path[:100]
+    log = os.path.join(directory, "log.txt")
+    with open(log, "w") as file:
+        file.write("log")
+    session = recorder.edit(attachment=log)
+    until(lambda: recorder.ended)
+    assert recorder.ended == [session] and recorder.signals[0][1] == "Completed", recorder.signals
+
+
+def confined_by(step):
+    """A recorder that goes into a sandbox: no path of its is followed, and its open files are taken."""
+    recorder = Recorder()
+    movie, attachment = os.open(MOVIE, os.O_RDONLY), os.open(MOVIE, os.O_RDONLY)
+    root = os.path.dirname(MOVIE)
+    open(os.path.join(root, ".flatpak-info"), "w").close()
+    # Whatever the bindings load late, they have loaded.
+    assert edit_with_attachment(recorder, movie, "/nowhere") == BAD_PATH
+    assert edit_with_attachment(recorder, movie, MOVIE) is True
+    until(lambda: recorder.ended)
+    try:
+        step(root)
+    except OSError as error:
+        print("SKIPPED: no sandbox can be made here:", error.strerror)
+        return
+    for path in (MOVIE, "/" + os.path.basename(MOVIE), "/nowhere", "/"):
+        assert edit_with_attachment(recorder, movie, path) == BAD_PATH, path
+    assert edit_with_attachment(recorder, movie, dbus.types.UnixFd(attachment)) is True
+    until(lambda: len(recorder.ended) == 2)
+
+
+NEW_USER, NEW_MOUNTS = 0x10000000, 0x00020000
+
+
+def unshare(what):
+    """As the super-user or, in a world of our own, as if we were."""
+    libc = ctypes.CDLL(None, use_errno=True)
+    if libc.unshare(what if os.geteuid() == 0 else NEW_USER | what) != 0:
+        raise OSError(ctypes.get_errno(), os.strerror(ctypes.get_errno()))
+
+
+def other_root():
+    def step(root):
+        unshare(0)
+        os.chroot(root)
+        os.chdir("/")
+
+    confined_by(step)
+
+
+def other_mounts():
+    confined_by(lambda _: unshare(NEW_MOUNTS))
 
 
 def nameless():
@@ -172,8 +247,8 @@ def nameless():
     os.unlink(path)
     with open(MOVIE, "rb") as attachment:
         recorder.recorder.Edit(dbus.types.UnixFd(movie),
-                               dbus.Dictionary({"attachment": dbus.types.UnixFd(attachment), "name": "../a.webm"},
-                                               signature="sv"))
+                               dbus.Dictionary({"attachment": dbus.types.UnixFd(attachment), "name": "../a.webm",
+                                                "attachment-name": "../log.txt"}, signature="sv"))
     until(lambda: recorder.signals)
     assert recorder.signals[0][1] == "Completed", recorder.signals
 

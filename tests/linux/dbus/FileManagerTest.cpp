@@ -22,6 +22,8 @@ TEST_F(Recorders, AFileManagerOpensSeveralFiles)
     ASSERT_EQ(m_editors.size(), 2U);
     EXPECT_EQ(m_editors[0]->request.moviePath, "/tmp/a b.mp4");
     EXPECT_EQ(m_editors[1]->request.moviePath, "/c.webm");
+    for (const auto& editor : m_editors)
+        EXPECT_TRUE(editor->request.asker && editor->request.asker->process) << "who names files is known";
     EXPECT_THAT(m_editors[0]->request.editorArguments, ElementsAre("--explain")) << "nobody else is told";
     EXPECT_THAT(m_editors[1]->request.environment,
                 ElementsAre(std::pair<std::string, std::string>("DESKTOP_STARTUP_ID", "id")));

@@ -60,6 +60,52 @@ TEST_F(Recorders, CanSendAnAttachmentAsAnOpenFile)
     ASSERT_EQ(m_editors.size(), 1U);
     EXPECT_TRUE(m_editors[0]->request.attachment);
     EXPECT_THAT(m_editors[0]->request.attachmentPath, IsEmpty());
+    EXPECT_FALSE(m_editors[0]->request.asker) << "whose open files are theirs to give";
+}
+
+TEST_F(Recorders, WhoNamesAFileIsKnown)
+{
+    serve();
+    Caller caller;
+    edit(caller, {{QStringLiteral("attachment"), QStringLiteral("/notes.txt")},
+                  {QStringLiteral("attachment-name"), QStringLiteral("notes")}});
+    ASSERT_EQ(m_editors.size(), 1U);
+    const auto asker = m_editors[0]->request.asker;
+    ASSERT_TRUE(asker);
+    struct stat theirs = {};
+    struct stat ours = {};
+    ASSERT_EQ(::fstat(asker->process.get(), &theirs), 0);
+    ASSERT_EQ(::stat(("/proc/" + std::to_string(::getpid())).c_str(), &ours), 0);
+    EXPECT_EQ(theirs.st_ino, ours.st_ino);
+    EXPECT_EQ(m_editors[0]->request.attachmentName, "notes");
+}
+
+TEST_F(Recorders, WhoHasLeftBeforeTheyAreKnownLeavesNoEditorBehind)
+{
+    serve();
+    {
+        Caller caller;
+        const QDBusPendingCall nobodyWaits = caller.start(
+            "org.clipsa.Recorder1", "Edit",
+            {QVariant::fromValue(movie()), QVariantMap{{QStringLiteral("attachment"), QStringLiteral("/notes.txt")}}});
+        caller.bus.interface()->isServiceRegistered(kService); // the bus has passed it on when it answers this
+    }
+    ASSERT_TRUE(tests::pumpUntil([&] { return !m_editors.empty(); }));
+    ASSERT_TRUE(m_editors[0]->request.asker);
+    EXPECT_FALSE(m_editors[0]->request.asker->process);
+    EXPECT_TRUE(tests::pumpUntil([&] { return m_editors[0]->askedToGo; }));
+}
+
+TEST_F(Recorders, AreToldNothingThatIsForTheLog)
+{
+    serve();
+    Caller caller;
+    m_refusal = std::make_shared<base::Error>(
+        dbus::kBadInputDomain, 1,
+        base::Error::UserInfo{{"description", "not to be had"}, {dbus::kUntoldKey, "\n" + std::string(1000, 'x')}});
+    testing::internal::CaptureStderr();
+    EXPECT_EQ(edit(caller).errorMessage().toStdString(), "not to be had");
+    EXPECT_EQ(testing::internal::GetCapturedStderr(), "clipsa: not to be had (?" + std::string(500 - 16, 'x') + "\n");
 }
 
 TEST_F(Recorders, AreToldWhichOptionIsWrong)
@@ -319,6 +365,23 @@ TEST_F(Recorders, ClosingTheServiceClosesItsEditorsFirst)
     EXPECT_EQ(edit(caller).errorName().toStdString(), "org.clipsa.Error.Failed");
     m_editors[0]->events.ended({});
     EXPECT_TRUE(tests::pumpUntil([&] { return m_idle > 0; }));
+}
+
+TEST_F(Recorders, AreAnsweredByAServiceThatIsAboutToLeave)
+{
+    serve();
+    Caller caller;
+    edit(caller);
+    m_service->close();
+    const QVariantMap options = {{QStringLiteral("attachment"), QStringLiteral("/notes.txt")}};
+    QDBusPendingCallWatcher reply(
+        caller.start("org.clipsa.Recorder1", "Edit", {QVariant::fromValue(movie()), options}));
+    caller.bus.interface()->isServiceRegistered(kService); // the bus has passed it on when it answers this
+    m_editors[0]->events.ended({});
+    EXPECT_TRUE(tests::pumpUntil([&] { return m_idle > 0; }));
+    EXPECT_TRUE(tests::pumpUntil([&] { return reply.isFinished(); }));
+    EXPECT_EQ(reply.error().message().toStdString(), "Clipsa is being closed");
+    EXPECT_EQ(m_editors.size(), 1U);
 }
 
 TEST_F(Recorders, OnlyOneServiceHasTheName)
