@@ -26,6 +26,7 @@ Presenter::Presenter(std::shared_ptr<platform::Window> window, const base::Clock
     m_announcer = std::make_unique<Announcer>();
     m_workLine = std::make_unique<WorkLine>(*m_stage);
     m_workLine->setParentItem(&m_quickWindow->root());
+    m_window->setTextMeasuring(&m_measuring);
     m_window->setNeedsCommitHandler([this] {
         m_needsCommit = true;
         scheduleFrame();
@@ -39,6 +40,7 @@ Presenter::~Presenter()
 {
     m_affinity.assertHere();
     m_window->setNeedsCommitHandler({});
+    m_window->setTextMeasuring(nullptr);
     m_quickWindow->hide();
     // The items go before the window that they are in.
     m_workLine.reset();

@@ -6,6 +6,7 @@
 
 #include "base/Affinity.h"
 #include "base/Clock.h"
+#include "linux/qt/FontMeasuring.h"
 #include "linux/qt/Theme.h"
 #include "platform/files/MessageCatalog.h"
 #include "platform/views/Window.h"
@@ -93,6 +94,7 @@ private:
 
     std::shared_ptr<platform::Window> m_window;
     const base::Clock& m_clock;
+    FontMeasuring m_measuring;
     std::unique_ptr<Stage> m_stage;
     std::unique_ptr<StageWindow> m_quickWindow;
     std::unique_ptr<Mirror> m_mirror;

@@ -27,6 +27,13 @@ Theme Theme::forScheme(Scheme scheme)
     const bool dark = scheme == Scheme::Dark;
     theme.text = dark ? QColor(0xF2, 0xF2, 0xF5) : QColor(0x0B, 0x0B, 0x0E);
     theme.accent = dark ? QColor(0x9D, 0xBB, 0xFF) : QColor(0x1F, 0x4F, 0xD1);
+    theme.destructive = dark ? QColor(0xFF, 0x9A, 0x90) : QColor(0xB3, 0x26, 0x1E);
+    theme.surface = dark ? QColor(0x28, 0x28, 0x2E) : QColor(0xFC, 0xFC, 0xFE);
+    theme.edge = dark ? QColor(255, 255, 255, 48) : QColor(0, 0, 0, 40);
+    theme.shadow = QColor(0, 0, 0, dark ? 16 : 7);
+    theme.pressed = dark ? QColor(255, 255, 255, 30) : QColor(0, 0, 0, 20);
+    theme.mark = dark ? QColor(255, 255, 255, 112) : QColor(0, 0, 0, 112);
+    theme.track = dark ? QColor(255, 255, 255, 52) : QColor(0, 0, 0, 40);
     theme.bar = dark ? QColor(0x1B, 0x1B, 0x20, 222) : QColor(0xFA, 0xFA, 0xFC, 232);
     theme.chrome = dark ? QColor(0x1B, 0x1B, 0x20, 168) : QColor(0xF4, 0xF4, 0xF8, 180);
     theme.disc = QColor(0xFF, 0xFF, 0xFF, 150);

@@ -20,6 +20,13 @@ struct Theme {
     Scheme scheme = Scheme::Light;
     QColor text;        ///< titles and labels
     QColor accent;      ///< what can be pressed, unless it has a tint colour
+    QColor destructive; ///< the same, where it cannot be taken back
+    QColor surface;     ///< of sheets, popovers and alerts: nothing shines through
+    QColor edge;        ///< around them
+    QColor shadow;      ///< of one of the rings that make up a shadow
+    QColor pressed;     ///< under a row that is pressed
+    QColor mark;        ///< grabbers and scrollers
+    QColor track;       ///< of progress, where nothing is done yet
     QColor bar;         ///< over the blur behind a bar: opaque enough for text on any picture
     QColor chrome;      ///< over the blur behind the scrubber's strip
     QColor disc;        ///< over the blur of a masked backdrop; light in both schemes, as its glyph is dark

@@ -1,5 +1,7 @@
 #include "platform/views/Button.h"
 
+#include "platform/views/TextMeasuring.h"
+
 #include <algorithm>
 #include <utility>
 
@@ -9,24 +11,7 @@ namespace {
 
 constexpr double kTouchSize = 44;
 constexpr double kFontSize = 17;
-/// An average letter of the system font, by its size: an estimate, since fonts are the presenter's.
-constexpr double kLetterWidth = 0.6;
 constexpr double kTitlePadding = 16;
-
-/// Han, kana and Hangul: U+3000 to U+D7FF, and a few behind that.
-constexpr double kWideLetterWidth = 1;
-
-/// By the font's size.
-double estimatedWidth(const std::string& text)
-{
-    double width = 0;
-    for (const char each : text) {
-        const auto byte = static_cast<unsigned char>(each);
-        if ((byte & 0xC0U) != 0x80U) // the first of a letter
-            width += byte >= 0xE3U && byte <= 0xEDU ? kWideLetterWidth : kLetterWidth;
-    }
-    return width;
-}
 
 } // namespace
 
@@ -108,7 +93,18 @@ base::Size Button::sizeThatFits() const
         return {kTouchSize, kTouchSize};
     if (m_title.empty())
         return View::sizeThatFits();
-    return {std::max(kTouchSize, estimatedWidth(m_title) * kFontSize + kTitlePadding), kTouchSize};
+    // An estimate: bars ask before their items are in a window.
+    return {std::max(kTouchSize, EstimatedText().widthOf(m_title, {kFontSize, m_emphasized}) + kTitlePadding),
+            kTouchSize};
+}
+
+void Button::setDestructive(bool destructive)
+{
+    assertHere();
+    if (m_destructive == destructive)
+        return;
+    m_destructive = destructive;
+    setNeedsDisplay();
 }
 
 bool Button::activate()

@@ -34,6 +34,9 @@ public:
     /// A bold title marks what confirms.
     void setEmphasized(bool emphasized);
     bool isEmphasized() const { return here(m_emphasized); }
+    /// A title in the colour of warning marks what cannot be taken back.
+    void setDestructive(bool destructive);
+    bool isDestructive() const { return here(m_destructive); }
 
     base::Size sizeThatFits() const override;
     bool activate() override;
@@ -46,6 +49,7 @@ private:
     std::string m_title;
     base::EdgeInsets m_imageInsets;
     bool m_emphasized = false;
+    bool m_destructive = false;
 };
 
 } // namespace platform

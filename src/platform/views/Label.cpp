@@ -1,5 +1,7 @@
 #include "platform/views/Label.h"
 
+#include "platform/views/Window.h"
+
 #include <utility>
 
 namespace platform {
@@ -27,10 +29,40 @@ void Label::setText(std::string text)
 void Label::setFontSize(double points)
 {
     assertHere();
-    if (m_fontSize == points)
+    if (m_style.fontSize == points)
         return;
-    m_fontSize = points;
+    m_style.fontSize = points;
     setNeedsDisplay();
+}
+
+void Label::setEmphasized(bool emphasized)
+{
+    assertHere();
+    if (m_style.emphasized == emphasized)
+        return;
+    m_style.emphasized = emphasized;
+    setNeedsDisplay();
+}
+
+void Label::setNumberOfLines(int lines)
+{
+    assertHere();
+    if (m_lines == lines)
+        return;
+    m_lines = lines;
+    setNeedsDisplay();
+}
+
+double Label::widthThatFits() const
+{
+    assertHere();
+    return textMeasuringFor(*this).widthOf(m_text, m_style);
+}
+
+double Label::heightThatFits(double width) const
+{
+    assertHere();
+    return textMeasuringFor(*this).heightOf(m_text, m_style, width, m_lines);
 }
 
 void Label::setTextColor(Color color)

@@ -17,7 +17,7 @@ struct MotionEvent {
 };
 
 /// Keys by meaning, not by place on the keyboard.
-enum class Key { Space, Escape, Return, Left, Right, Home, End, Comma, Period, Character };
+enum class Key { Space, Escape, Return, Left, Right, Up, Down, Home, End, Comma, Period, Character };
 
 /// A key that a responder answers while it stands in the chain of the first responder.
 struct KeyCommand {

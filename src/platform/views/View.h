@@ -116,6 +116,10 @@ public:
     virtual void touchMoved(const Touch&) {}
     virtual void touchEnded(const Touch&) {}
     virtual void touchCancelled(const Touch&) {}
+    /// Moves what is shown by so many points, up if positive; false when it does not scroll, or is at its end.
+    virtual bool scrollBy(double /*points*/) { return false; }
+    /// Scrolls so that `view`, which stands below this, can be seen.
+    virtual void reveal(const View& /*view*/) {}
 
     // Keyboard focus and assistive technology.
     virtual bool canBecomeFocused() const { return false; }

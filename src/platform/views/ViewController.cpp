@@ -35,6 +35,7 @@ void TransitionCoordinator::runCompletions()
 ViewController::~ViewController()
 {
     assertHere();
+    abandonPresented();
 }
 
 const runtime::Class& ViewController::classObject()

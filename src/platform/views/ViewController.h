@@ -9,6 +9,8 @@
 
 #include <functional>
 #include <memory>
+#include <string>
+#include <utility>
 #include <vector>
 
 namespace platform {
@@ -37,6 +39,16 @@ private:
     base::Instant m_duration;
     std::vector<Block> m_alongside;
     std::vector<Block> m_completions;
+};
+
+class BarButtonItem;
+class Presentation;
+
+/// How a controller is shown above the others.
+enum class ModalPresentationStyle {
+    Sheet = 0,   ///< slides up from the bottom
+    Alert = 1,   ///< stands in the middle, and does not go away by a tap beside it
+    Popover = 7, ///< stands at what it came from, with an arrow
 };
 
 class ViewController : public Responder {
@@ -76,9 +88,44 @@ public:
     virtual void viewWillTransitionToSize_withTransitionCoordinator(base::Size size,
                                                                     TransitionCoordinator& coordinator);
 
+    // Presentation.
+    /// Shows `controller` above all that stands in the window, as its style says. `completion` runs on the main queue when
+    /// it is fully on screen. A controller that presents already, or is in no window, only says so in the log.
+    void present(const std::shared_ptr<ViewController>& controller, bool animated,
+                 std::function<void()> completion = {});
+    /// Takes away what this presents or, if that is nothing, this itself from who presents it. What is still on its way up
+    /// comes first. `completion` runs on the main queue when it is gone.
+    void dismiss(bool animated, std::function<void()> completion = {});
+    /// Null when there is none. Both stay until all is off the screen.
+    std::shared_ptr<ViewController> presentedViewController() const;
+    std::shared_ptr<ViewController> presentingViewController() const { return here(m_presenting).lock(); }
+
+    ModalPresentationStyle modalPresentationStyle() const { return here(m_modalStyle); }
+    void setModalPresentationStyle(ModalPresentationStyle style) { here(m_modalStyle) = style; }
+    /// What a popover's arrow points at; the popover stands in the middle while that is nowhere on the screen. Weak.
+    std::shared_ptr<BarButtonItem> popoverSource() const { return here(m_popoverSource).lock(); }
+    void setPopoverSource(const std::weak_ptr<BarButtonItem>& source) { here(m_popoverSource) = source; }
+    /// What assistive technology calls it while it is presented.
+    const std::string& title() const { return here(m_title); }
+    void setTitle(std::string title) { here(m_title) = std::move(title); }
+    /// How large it would like to be where there is so much room; all of it by default. Asked with each layout.
+    virtual base::Size contentSizeThatFits(base::Size room);
+    /// Said to the presented one before the completion: it is fully on screen.
+    virtual void presentationDidShow() {}
+    /// The user wants it away, by Esc, a swipe or a tap beside it. Whoever says no may dismiss itself later.
+    virtual bool presentationShouldClose() { return true; }
+    /// Said to the presented one when it is gone, whoever wanted it so, and then to who presented it.
+    virtual void presentationDidEnd() {}
+    virtual void presentedViewControllerDidEnd(ViewController& /*presented*/) {}
+
     bool hasAppeared() const { return here(m_appeared); }
     std::shared_ptr<Responder> nextResponder() const override;
     std::shared_ptr<Window> window() const override;
+
+    // For presentations, and for windows whose root goes.
+    void forgetPresentation(const Presentation& presentation);
+    /// Takes away at once what this presents, and tells nobody.
+    void abandonPresented();
 
     // For views and windows.
     /// Calls what is due of this controller and of those whose views stand in its view; nothing when that is so already.
@@ -96,6 +143,11 @@ private:
     bool m_moving = false; ///< between what it is told before and what after
     std::vector<std::shared_ptr<ViewController>> m_children;
     bool m_appeared = false;
+    std::shared_ptr<Presentation> m_presentation; ///< of what this presents
+    std::weak_ptr<ViewController> m_presenting;
+    ModalPresentationStyle m_modalStyle = ModalPresentationStyle::Sheet;
+    std::weak_ptr<BarButtonItem> m_popoverSource;
+    std::string m_title;
 };
 
 } // namespace platform

@@ -1,5 +1,7 @@
 #include "platform/views/Window.h"
 
+#include "platform/views/Presentation.h"
+
 #include <cassert>
 #include <utility>
 
@@ -15,7 +17,26 @@ bool isHiddenInTree(std::shared_ptr<View> view)
     return false;
 }
 
+void setNeedsLayoutInTree(View& view)
+{
+    view.setNeedsLayout();
+    for (const auto& each : view.subviews())
+        setNeedsLayoutInTree(*each);
+}
+
+const TextMeasuring& estimate()
+{
+    static const EstimatedText instance;
+    return instance;
+}
+
 } // namespace
+
+const TextMeasuring& textMeasuringFor(const View& view)
+{
+    const auto window = view.window();
+    return window ? window->textMeasuring() : estimate();
+}
 
 Window::Window(base::MainQueue& mainQueue, base::Size size, double scale)
     : View({{0, 0}, size}), m_mainQueue(mainQueue), m_scale(scale)
@@ -37,12 +58,20 @@ void Window::setRightToLeft(bool rightToLeft)
 {
     assertHere();
     m_isRightToLeft = rightToLeft;
-    const std::function<void(View&)> mark = [&mark](View& view) {
-        view.setNeedsLayout();
-        for (const auto& each : view.subviews())
-            mark(*each);
-    };
-    mark(*this);
+    setNeedsLayoutInTree(*this);
+}
+
+const TextMeasuring& Window::textMeasuring() const
+{
+    assertHere();
+    return m_textMeasuring ? *m_textMeasuring : estimate();
+}
+
+void Window::setTextMeasuring(const TextMeasuring* measuring)
+{
+    assertHere();
+    m_textMeasuring = measuring;
+    setNeedsLayoutInTree(*this);
 }
 
 void Window::setScale(double scale)
@@ -68,12 +97,37 @@ void Window::setRootViewController(const std::shared_ptr<ViewController>& contro
     if (m_root == controller)
         return;
     const auto keepAlive = shared_from_this();
-    if (const auto previous = std::exchange(m_root, controller))
+    if (const auto previous = std::exchange(m_root, controller)) {
+        previous->abandonPresented();
         previous->view()->removeFromSuperview();
+    }
     if (!controller)
         return;
     controller->view()->setFrame(bounds());
-    addSubview(controller->view());
+    insertSubview_belowSubview(controller->view(), m_presentations.empty() ? nullptr : m_presentations.front().lock());
+}
+
+std::shared_ptr<Presentation> Window::topPresentation() const
+{
+    assertHere();
+    return m_presentations.empty() ? nullptr : m_presentations.back().lock();
+}
+
+void Window::pushPresentation(const std::shared_ptr<Presentation>& presentation)
+{
+    assertHere();
+    m_presentations.push_back(presentation);
+    for (const auto& [id, tracking] : std::map(m_touches))
+        cancelTouch(id); // a finger that is down behind it would go on there
+}
+
+void Window::popPresentation(const Presentation& presentation)
+{
+    assertHere();
+    std::erase_if(m_presentations, [&](const std::weak_ptr<Presentation>& each) {
+        const auto locked = each.lock();
+        return !locked || locked.get() == &presentation;
+    });
 }
 
 void Window::setVisible(bool visible)
@@ -119,6 +173,9 @@ void Window::transitionToSize(base::Size size)
     ++m_transitions;
     if (root)
         root->viewWillTransitionToSize_withTransitionCoordinator(size, *coordinator);
+    for (const auto& each : std::vector(m_presentations))
+        if (const auto presentation = each.lock())
+            presentation->presented()->viewWillTransitionToSize_withTransitionCoordinator(size, *coordinator);
     const auto changes = [&] {
         setFrame({{0, 0}, size});
         if (root)
@@ -150,6 +207,9 @@ void Window::commit()
     const auto keepAlive = shared_from_this();
     m_needsCommit = true; // what the layout changes is part of this picture
     layoutIfNeeded();
+    for (const auto& each : std::vector(m_presentations))
+        if (const auto presentation = each.lock())
+            presentation->followSource();
     m_needsCommit = false;
 }
 

@@ -2,8 +2,10 @@
 /// changes of size into transitions. Main queue only.
 #pragma once
 
+#include "base/Log.h"
 #include "base/Queue.h"
 #include "platform/views/Screen.h"
+#include "platform/views/TextMeasuring.h"
 #include "platform/views/View.h"
 #include "platform/views/ViewController.h"
 
@@ -11,6 +13,8 @@
 #include <map>
 
 namespace platform {
+
+class Presentation;
 
 class Window final : public View, public Screen {
 public:
@@ -36,6 +40,13 @@ public:
 
     /// For views that let time pass.
     base::MainQueue& mainQueue() const { return here(m_mainQueue); }
+    /// For what a program asks for in vain; it outlives the window. Without one nothing is said.
+    void setLog(base::Log& log) { here(m_log) = &log; }
+    base::Log* log() const { return here(m_log); }
+    /// The presenter's fonts, or an estimate while there is no presenter.
+    const TextMeasuring& textMeasuring() const;
+    /// It outlives the window, or is taken back with null before it goes.
+    void setTextMeasuring(const TextMeasuring* measuring);
 
     /// Its view fills the window.
     void setRootViewController(const std::shared_ptr<ViewController>& controller);
@@ -58,15 +69,29 @@ public:
     void motion(MotionSubtype subtype);
     /// Offers a key to the focused view and the responder chain; true when somebody took it.
     bool keyDown(Key key, char character = 0, bool control = false, bool shift = false);
+    /// A wheel or two fingers over a place; up if positive. True when something moved.
+    bool scroll(base::Point position, double points);
+    /// From now on the touch is `recognizer`'s alone, which is one of `view`'s: whoever else follows it is told that it was
+    /// cancelled.
+    void claimTouch(int id, const std::shared_ptr<GestureRecognizer>& recognizer, const std::shared_ptr<View>& view);
 
     // First responder.
     std::shared_ptr<Responder> firstResponder() const { return here(m_firstResponder).lock(); }
     void setFirstResponder(const std::shared_ptr<Responder>& responder);
 
+    // What is presented above all else. Touches, keys, the focus and assistive technology stay in the topmost.
+    /// Null when nothing is presented.
+    std::shared_ptr<Presentation> topPresentation() const;
+    /// For presentations: the window's list, the topmost last.
+    void pushPresentation(const std::shared_ptr<Presentation>& presentation);
+    void popPresentation(const Presentation& presentation);
+
     // Keyboard focus: Tab order is the order of drawing, top to bottom, leading to trailing.
     std::shared_ptr<View> focusedView() const;
     void moveFocus(bool forward);
     void clearFocus();
+    /// Back to a view that had it; nowhere when it cannot be reached any more.
+    void restoreFocus(const std::shared_ptr<View>& view);
 
     // For the presenter.
     /// Called once when the tree stops being what was last committed; again only after `commit()`.
@@ -91,6 +116,10 @@ private:
     void forgetStrays();
     void focus(const std::shared_ptr<View>& view);
     std::vector<std::shared_ptr<View>> focusableViews() const;
+    bool isReachable(const std::shared_ptr<View>& view) const;
+    /// Where keys and shakes begin their way: the first responder, unless something is presented that it is not a part of.
+    std::shared_ptr<Responder> responderForKeys() const;
+    bool moveFocusByArrow(Key key);
 
     base::MainQueue& m_mainQueue;
     double m_scale;
@@ -99,11 +128,17 @@ private:
     bool m_isRightToLeft = false;
     std::optional<base::Size> m_requestedSize;
     std::uint64_t m_transitions = 0;
+    base::Log* m_log = nullptr;
+    const TextMeasuring* m_textMeasuring = nullptr;
+    std::vector<std::weak_ptr<Presentation>> m_presentations; ///< the topmost last
     std::map<int, Tracking> m_touches;
     std::weak_ptr<Responder> m_firstResponder;
     std::weak_ptr<View> m_focusedView;
     std::function<void()> m_needsCommitHandler;
     bool m_needsCommit = true;
 };
+
+/// Of the window that `view` is in, or an estimate outside of one.
+const TextMeasuring& textMeasuringFor(const View& view);
 
 } // namespace platform

@@ -3,6 +3,7 @@
 
 #include "base/Text.h"
 #include "platform/views/GestureRecognizer.h"
+#include "platform/views/Presentation.h"
 
 #include <algorithm>
 #include <utility>
@@ -38,6 +39,18 @@ void collectFocusable(const std::shared_ptr<View>& view, std::vector<std::shared
 bool isArrow(Key key)
 {
     return key == Key::Left || key == Key::Right;
+}
+
+/// Where the view's upper edge can be seen: what is scrolled out of sight stands at the edge behind which it is.
+double visibleTop(const View& view)
+{
+    double top = view.convertToRoot({}).y;
+    for (auto above = view.superview(); above; above = above->superview())
+        if (above->clipsToBounds()) {
+            const double edge = above->convertToRoot({}).y;
+            top = std::clamp(top, edge, edge + above->bounds().height());
+        }
+    return top;
 }
 
 bool concernsFocus(Key key)
@@ -118,6 +131,35 @@ void Window::touchCancel(const Touch& touch)
     cancelTouch(touch.id);
 }
 
+void Window::claimTouch(int id, const std::shared_ptr<GestureRecognizer>& recognizer, const std::shared_ptr<View>& view)
+{
+    assertHere();
+    const auto keepAlive = shared_from_this();
+    const auto found = m_touches.find(id);
+    if (found == m_touches.end())
+        return;
+    const Touch last = found->second.last;
+    const auto previous = found->second.view.lock();
+    const auto others = locked(found->second.recognizers);
+    found->second.view = view;
+    found->second.recognizers = {recognizer};
+    if (previous && previous != view)
+        previous->touchCancelled(last);
+    for (const auto& other : others)
+        if (other != recognizer)
+            other->touchCancelled(last);
+}
+
+bool Window::scroll(base::Point position, double points)
+{
+    assertHere();
+    const auto keepAlive = shared_from_this();
+    for (auto view = hitTest(position); view; view = view->superview())
+        if (view->scrollBy(points))
+            return true;
+    return false;
+}
+
 void Window::cancelTouch(int id)
 {
     const auto found = m_touches.find(id);
@@ -137,7 +179,7 @@ void Window::motion(MotionSubtype subtype)
 {
     assertHere();
     const auto keepAlive = shared_from_this();
-    if (const auto responder = firstResponder())
+    if (const auto responder = responderForKeys())
         responder->motionEnded_withEvent(subtype, {subtype});
 }
 
@@ -145,19 +187,43 @@ bool Window::keyDown(Key key, char character, bool control, bool shift)
 {
     assertHere();
     const auto keepAlive = shared_from_this();
-    if (const auto view = focusedView(); view && !control && concernsFocus(key)) {
-        const auto reachable = focusableViews();
-        if (std::find(reachable.begin(), reachable.end(), view) != reachable.end()
-            && (isArrow(key) ? view->adjust(key == Key::Right ? 1 : -1) : view->activate()))
+    if (const auto view = focusedView(); view && !control && concernsFocus(key))
+        if (isReachable(view) && (isArrow(key) ? view->adjust(key == Key::Right ? 1 : -1) : view->activate()))
             return true;
-    }
-    for (auto responder = firstResponder(); responder; responder = responder->nextResponder())
+    for (auto responder = responderForKeys(); responder; responder = responder->nextResponder())
         for (const KeyCommand& command : responder->keyCommands())
             if (matches(command, key, character, control, shift) && responder->respondsTo(command.action)) {
                 responder->perform(command.action);
                 return true;
             }
-    return false;
+    return !control && moveFocusByArrow(key);
+}
+
+std::shared_ptr<Responder> Window::responderForKeys() const
+{
+    const auto first = firstResponder();
+    const auto presentation = topPresentation();
+    if (!presentation)
+        return first;
+    for (auto responder = first; responder; responder = responder->nextResponder())
+        if (responder == presentation)
+            return first;
+    return presentation;
+}
+
+bool Window::moveFocusByArrow(Key key)
+{
+    // What is presented is a list of things to do; on the screen behind, up and down mean nothing.
+    if (!topPresentation() || (key != Key::Up && key != Key::Down))
+        return false;
+    moveFocus(key == Key::Down);
+    return true;
+}
+
+bool Window::isReachable(const std::shared_ptr<View>& view) const
+{
+    const auto reachable = focusableViews();
+    return std::find(reachable.begin(), reachable.end(), view) != reachable.end();
 }
 
 std::shared_ptr<View> Window::focusedView() const
@@ -169,9 +235,12 @@ std::shared_ptr<View> Window::focusedView() const
 std::vector<std::shared_ptr<View>> Window::focusableViews() const
 {
     std::vector<std::shared_ptr<View>> views;
-    for (const auto& view : subviews())
-        collectFocusable(view, views);
-    const auto top = [](const std::shared_ptr<View>& view) { return view->convertToRoot({}).y; };
+    if (const auto presentation = topPresentation())
+        collectFocusable(presentation, views);
+    else
+        for (const auto& view : subviews())
+            collectFocusable(view, views);
+    const auto top = [](const std::shared_ptr<View>& view) { return visibleTop(*view); };
     const auto left = [](const std::shared_ptr<View>& view) { return view->convertToRoot({}).x; };
     std::stable_sort(views.begin(), views.end(), [&](const auto& a, const auto& b) { return top(a) < top(b); });
     // A row is what begins above the middle of its first view: buttons of one bar do not all begin at the same height.
@@ -209,6 +278,12 @@ void Window::clearFocus()
     focus(nullptr);
 }
 
+void Window::restoreFocus(const std::shared_ptr<View>& view)
+{
+    assertHere();
+    focus(view && isReachable(view) ? view : nullptr);
+}
+
 void Window::focus(const std::shared_ptr<View>& view)
 {
     const auto previous = m_focusedView.lock();
@@ -219,6 +294,8 @@ void Window::focus(const std::shared_ptr<View>& view)
         if (changed)
             changed->setNeedsDisplay();
     noteChange();
+    for (auto above = view ? view->superview() : nullptr; above; above = above->superview())
+        above->reveal(*view);
 }
 
 } // namespace platform

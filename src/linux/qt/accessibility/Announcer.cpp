@@ -2,6 +2,7 @@
 #include "linux/qt/Mirror.h"
 #include "linux/qt/StageWindow.h"
 #include "linux/qt/accessibility/ViewAccessible.h"
+#include "platform/views/Presentation.h"
 
 #include <algorithm>
 #include <utility>
@@ -30,7 +31,21 @@ void Announcer::announce(StageWindow& window)
 {
     m_affinity.assertHere();
     announceMessages(window);
+    announceDialog(window);
     announceFocus(window);
+}
+
+void Announcer::announceDialog(StageWindow& window)
+{
+    const auto presentation = window.views().topPresentation();
+    const std::shared_ptr<platform::View> dialog = presentation ? presentation->surface() : nullptr;
+    const bool isNew = dialog && dialog != m_dialog.lock();
+    m_dialog = dialog;
+    ViewItem* item = isNew ? window.mirror().itemFor(*dialog) : nullptr;
+    if (!item)
+        return;
+    tellOf(*item, QAccessible::ObjectShow);
+    tellOf(*item, QAccessible::Alert);
 }
 
 void Announcer::announceMessages(StageWindow& window)

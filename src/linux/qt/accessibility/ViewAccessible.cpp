@@ -5,6 +5,7 @@
 #include "linux/qt/accessibility/MessageAccessible.h"
 #include "linux/qt/accessibility/WorkAccessible.h"
 #include "linux/qt/items/WorkLine.h"
+#include "platform/views/Presentation.h"
 
 #include <QAccessible>
 #include <QAccessibleActionInterface>
@@ -34,6 +35,10 @@ QAccessible::Role toQt(AccessibilityRole role)
         return QAccessible::Slider;
     case AccessibilityRole::Video:
         return QAccessible::Animation;
+    case AccessibilityRole::Progress:
+        return QAccessible::ProgressBar;
+    case AccessibilityRole::Dialog:
+        return QAccessible::Dialog;
     case AccessibilityRole::Group:
     case AccessibilityRole::None:
         break;
@@ -128,7 +133,9 @@ public:
         state.disabled = !shown.enabled;
         state.focusable = view()->canBecomeFocused();
         state.focused = stage()->views().focusedView() == view();
-        state.readOnly = shown.role == AccessibilityRole::Label;
+        state.readOnly = shown.role == AccessibilityRole::Label || shown.role == AccessibilityRole::Progress;
+        state.busy = shown.role == AccessibilityRole::Progress;
+        state.modal = shown.role == AccessibilityRole::Dialog;
         return state;
     }
 
@@ -136,7 +143,9 @@ public:
     {
         if (type == QAccessible::ActionInterface && !actionNames().isEmpty())
             return static_cast<QAccessibleActionInterface*>(this);
-        if (type == QAccessible::ValueInterface && description().role == AccessibilityRole::Slider)
+        const auto role = description().role;
+        if (type == QAccessible::ValueInterface
+            && (role == AccessibilityRole::Slider || role == AccessibilityRole::Progress))
             return static_cast<QAccessibleValueInterface*>(this);
         return nullptr;
     }
@@ -225,11 +234,11 @@ public:
         if (index < 0)
             return nullptr;
         auto at = static_cast<std::size_t>(index);
-        const auto& messages = m_window.mirror().messages();
+        const auto messages = saidByVideos();
         if (at < messages.size())
             return QAccessible::queryAccessibleInterface(messages[at]);
         at -= messages.size();
-        const auto below = accessibleChildren(m_window.views());
+        const auto below = shownViews();
         if (at < below.size())
             return interfaceFor(m_window, *below[at]);
         return at == below.size() && m_window.workLine().isUnderWay()
@@ -239,8 +248,7 @@ public:
     /// First comes what videos say, which are drawn behind the views; last what is under way, if anything is.
     int childCount() const override
     {
-        return static_cast<int>(m_window.mirror().messages().size() + accessibleChildren(m_window.views()).size())
-               + m_window.workLine().isUnderWay();
+        return static_cast<int>(saidByVideos().size() + shownViews().size()) + m_window.workLine().isUnderWay();
     }
     int indexOfChild(const QAccessibleInterface* child) const override { return indexOf(*this, child); }
     QAccessibleInterface* childAt(int x, int y) const override { return deepestAt(*this, x, y); }
@@ -265,6 +273,17 @@ public:
     }
 
 private:
+    /// While something is presented, what is behind it is out of reach, and so it is not there.
+    std::vector<std::shared_ptr<View>> shownViews() const
+    {
+        const auto presentation = m_window.views().topPresentation();
+        return accessibleChildren(presentation ? *presentation : static_cast<const View&>(m_window.views()));
+    }
+    std::vector<VideoItem*> saidByVideos() const
+    {
+        return m_window.views().topPresentation() ? std::vector<VideoItem*>() : m_window.mirror().messages();
+    }
+
     StageWindow& m_window;
 };
 

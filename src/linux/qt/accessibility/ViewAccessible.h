@@ -41,6 +41,7 @@ private:
     };
 
     void announceFocus(StageWindow& window);
+    void announceDialog(StageWindow& window);
     void announceMessages(StageWindow& window);
     void tellOf(QObject& item, QAccessible::Event kind) const;
 
@@ -49,6 +50,7 @@ private:
     std::weak_ptr<platform::View> m_focused;
     double m_number = 0; ///< of the focused view, where it has one
     std::vector<Message> m_messages;
+    std::weak_ptr<platform::View> m_dialog; ///< the topmost one
 };
 
 /// Tell who listens that an item has come, or is about to go. Nothing when nobody listens.

@@ -3,6 +3,7 @@
 #include <QKeyEvent>
 #include <QMouseEvent>
 #include <QTouchEvent>
+#include <QWheelEvent>
 
 #include <optional>
 #include <utility>
@@ -35,6 +36,10 @@ std::optional<platform::Key> meaningOf(int key)
         return Key::Left;
     case Qt::Key_Right:
         return Key::Right;
+    case Qt::Key_Up:
+        return Key::Up;
+    case Qt::Key_Down:
+        return Key::Down;
     case Qt::Key_Home:
         return Key::Home;
     case Qt::Key_End:
@@ -52,7 +57,8 @@ std::optional<platform::Key> meaningOf(int key)
 bool repeats(platform::Key key)
 {
     using platform::Key;
-    return key == Key::Left || key == Key::Right || key == Key::Comma || key == Key::Period;
+    return key == Key::Left || key == Key::Right || key == Key::Up || key == Key::Down || key == Key::Comma
+           || key == Key::Period;
 }
 
 } // namespace
@@ -76,6 +82,10 @@ bool InputFeed::handle(QEvent& event)
     case QEvent::MouseMove:
     case QEvent::MouseButtonRelease:
         mouse(static_cast<const QMouseEvent&>(event));
+        event.accept();
+        return true;
+    case QEvent::Wheel:
+        wheel(static_cast<const QWheelEvent&>(event));
         event.accept();
         return true;
     case QEvent::KeyPress:
@@ -128,6 +138,16 @@ void InputFeed::mouse(const QMouseEvent& event)
         up(kMouse, position);
     else
         down(kMouse, position);
+}
+
+void InputFeed::wheel(const QWheelEvent& event)
+{
+    // Touchpads say how far in pixels; a wheel's notch is 120, and moves about three lines of text.
+    constexpr double kPointsPerNotch = 56;
+    const double points =
+        event.pixelDelta().isNull() ? event.angleDelta().y() / 120.0 * kPointsPerNotch : event.pixelDelta().y();
+    if (points != 0)
+        m_window.scroll(toPoint(event.position()), points);
 }
 
 void InputFeed::down(int id, base::Point position)

@@ -15,6 +15,7 @@ class QEvent;
 class QKeyEvent;
 class QMouseEvent;
 class QTouchEvent;
+class QWheelEvent;
 
 namespace qtui {
 
@@ -40,6 +41,7 @@ public:
 private:
     void touch(const QTouchEvent& event);
     void mouse(const QMouseEvent& event);
+    void wheel(const QWheelEvent& event);
     bool key(const QKeyEvent& event);
 
     void down(int id, base::Point position);

@@ -23,6 +23,9 @@ QColor faded(QColor color, double opacity)
 
 QColor ButtonItem::tint(const platform::View& view) const
 {
+    const auto* button = dynamic_cast<const platform::Button*>(&view);
+    if (button && button->isDestructive())
+        return stage().theme.destructive;
     const auto own = view.effectiveTintColor();
     return own ? toQColor(*own) : stage().theme.accent;
 }

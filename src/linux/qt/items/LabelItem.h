@@ -1,4 +1,4 @@
-/// Shows a label: one line, in the middle of its frame's height. GUI thread.
+/// Shows a label: one line in the middle of its frame's height, or several from its top. GUI thread.
 #pragma once
 
 #include "linux/qt/items/ViewItem.h"
@@ -11,6 +11,11 @@ public:
 
 protected:
     std::vector<Sprite> draw(platform::View& view) override;
+    /// Where rows begin is the window's.
+    bool needsDrawing(platform::View& view, bool visible) override;
+
+private:
+    bool m_drawnRightToLeft = false;
 };
 
 } // namespace qtui

@@ -3,15 +3,42 @@
 #include <QFontDatabase>
 #include <QFontMetricsF>
 #include <QPainter>
+#include <QStringList>
+#include <QTextLayout>
 
 #include <algorithm>
 #include <cmath>
+#include <limits>
 
 namespace qtui {
 
 namespace {
 
 constexpr double kSmallest = 0.8;
+constexpr char16_t kEllipsis = 0x2026;
+/// Marks that have no width and give a line its direction: cut out of a paragraph, it may begin with words of the other.
+constexpr char16_t kLeftToRight = 0x200E;
+constexpr char16_t kRightToLeft = 0x200F;
+
+/// Where in `paragraph` its lines begin; no more of them than asked for.
+std::vector<int> lineStarts(const QString& paragraph, const QFont& font, double width, std::size_t most)
+{
+    QTextLayout layout(paragraph, font);
+    QTextOption option;
+    option.setWrapMode(QTextOption::WrapAtWordBoundaryOrAnywhere);
+    layout.setTextOption(option);
+    std::vector<int> starts;
+    layout.beginLayout();
+    while (starts.size() < most) {
+        QTextLine line = layout.createLine();
+        if (!line.isValid())
+            break;
+        line.setLineWidth(width);
+        starts.push_back(line.textStart());
+    }
+    layout.endLayout();
+    return starts;
+}
 
 } // namespace
 
@@ -38,6 +65,36 @@ TextLine squeezed(TextLine line, double width)
     while (line.font.pixelSize() > smallest && QFontMetricsF(line.font).horizontalAdvance(line.text) > width)
         line.font.setPixelSize(line.font.pixelSize() - 1);
     return fitted(std::move(line), width);
+}
+
+std::vector<QString> wrapped(const QString& text, const QFont& font, double width, int mostLines)
+{
+    const auto most = static_cast<std::size_t>(mostLines > 0 ? mostLines : std::numeric_limits<int>::max());
+    const QFontMetricsF metrics(font);
+    std::vector<QString> lines;
+    const QStringList paragraphs = text.split(QLatin1Char('\n'));
+    for (qsizetype at = 0; at < paragraphs.size() && lines.size() < most; ++at) {
+        const QString& paragraph = paragraphs[at];
+        const QChar mark(paragraph.isRightToLeft() ? kRightToLeft : kLeftToRight);
+        // One more than fits tells whether something is left over.
+        const auto starts = lineStarts(paragraph, font, width, most - lines.size() + 1);
+        for (std::size_t i = 0; i < std::max<std::size_t>(1, starts.size()) && lines.size() < most; ++i) {
+            const int start = starts.empty() ? 0 : starts[i];
+            const bool hasNext = i + 1 < starts.size();
+            const bool isLast = lines.size() + 1 == most;
+            QString line = paragraph.mid(start, hasNext && !isLast ? starts[i + 1] - start : -1).trimmed();
+            if (isLast && !hasNext && at + 1 < paragraphs.size())
+                line += QChar(kEllipsis);
+            line.prepend(mark);
+            lines.push_back(metrics.elidedText(line, Qt::ElideRight, isLast ? width : 2 * width));
+        }
+    }
+    return lines;
+}
+
+double lineHeight(const QFont& font)
+{
+    return std::ceil(QFontMetricsF(font).height());
 }
 
 QRectF textArea(const TextLine& line, const QRectF& frame)

@@ -1,9 +1,11 @@
-/// One line of text in the system's font. GUI thread.
+/// Lines of text in the system's font. GUI thread.
 #pragma once
 
 #include <QFont>
 #include <QRectF>
 #include <QString>
+
+#include <vector>
 
 class QPainter;
 class QColor;
@@ -23,6 +25,12 @@ QFont systemFont(double size, QFont::Weight weight = QFont::Normal);
 TextLine fitted(TextLine line, double width);
 /// Set smaller, down to four fifths, before anything is cut off.
 TextLine squeezed(TextLine line, double width);
+
+/// The lines that `text` takes where there is so much room across, at most `mostLines` of them (0: any number), the last
+/// one with an ellipsis where more would follow. Each reads in the direction of its paragraph.
+std::vector<QString> wrapped(const QString& text, const QFont& font, double width, int mostLines);
+/// From one line to the next, in whole points.
+double lineHeight(const QFont& font);
 
 /// What the line covers when it stands in `frame`; can be higher than the frame, as letters are not cut off.
 QRectF textArea(const TextLine& line, const QRectF& frame);

@@ -1,0 +1,25 @@
+#include "platform/views/ListRow.h"
+
+namespace platform {
+
+const runtime::Class& ListRow::classObject()
+{
+    static const runtime::Class& instance = runtime::ClassBuilder<ListRow>("ListRow", &Button::classObject()).build();
+    return instance;
+}
+
+const runtime::Class& ListRow::isa() const
+{
+    return classObject();
+}
+
+void ListRow::setTrailingInset(double inset)
+{
+    assertHere();
+    if (m_trailingInset == inset)
+        return;
+    m_trailingInset = inset;
+    setNeedsDisplay();
+}
+
+} // namespace platform

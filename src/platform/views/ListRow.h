@@ -1,0 +1,31 @@
+/// A button that is a row of a list: a glyph or an image where rows begin, and a title beside it, on up to two lines.
+/// Main queue only.
+#pragma once
+
+#include "platform/views/Button.h"
+
+namespace platform {
+
+class ListRow final : public Button {
+public:
+    static constexpr double kHeight = 56;
+    /// The square that holds the glyph or the image, and where it begins.
+    static constexpr double kIconSize = 28;
+    static constexpr double kMargin = 16;
+    /// Where the title begins.
+    static constexpr double kTitleStart = kMargin + kIconSize + 16;
+
+    using Button::Button;
+
+    static const runtime::Class& classObject();
+    const runtime::Class& isa() const override;
+
+    /// Kept free where the row ends, for what stands on it there; the title takes one line beside it.
+    double trailingInset() const { return here(m_trailingInset); }
+    void setTrailingInset(double inset);
+
+private:
+    double m_trailingInset = 0;
+};
+
+} // namespace platform
