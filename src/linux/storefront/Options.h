@@ -1,0 +1,40 @@
+/// Where the store looks, and in which languages.
+#pragma once
+
+#include <filesystem>
+#include <functional>
+#include <string>
+#include <vector>
+
+namespace storefront {
+
+struct Options {
+    /// Languages as locales without a codeset ("de_AT", "sr@latin"), most preferred first, and "C" for texts as they were
+    /// written. Never empty.
+    std::vector<std::string> locales = {"C"};
+    /// Directories of the files that installed applications describe themselves with, most important first.
+    std::vector<std::filesystem::path> metainfo;
+    /// Catalogues beside the machine's: directories with `xml` or `yaml` in them.
+    std::vector<std::filesystem::path> catalogues;
+    /// The machine's own catalogues, and those of its Flatpak remotes.
+    bool usesMachineCatalogues = true;
+    /// Where catalogues are kept in a form that is quick to search; where everybody keeps them when empty.
+    std::filesystem::path cache;
+    /// The library that reads all of these, as dlopen() wants it.
+    std::string library = "libclipsa-linux-appstream.so";
+
+    /// As the user's environment has them.
+    static Options ofUser();
+};
+
+/// The value of a variable of the environment; empty where it is not set.
+using Environment = std::function<std::string(const char* name)>;
+
+/// The locales of LANGUAGE, then of the first of LC_ALL, LC_MESSAGES and LANG that is set: without codesets, each once,
+/// and none behind English, in which texts are written. A language goes without saying behind one of its own locales.
+std::vector<std::string> preferredLocales(const Environment& environment);
+
+/// Whether texts that were not translated to a locale are in its language all the same.
+bool isEnglish(const std::string& locale);
+
+} // namespace storefront

@@ -1,0 +1,69 @@
+// Which languages the store is asked in.
+#include "linux/storefront/Options.h"
+
+#include <gmock/gmock.h>
+
+#include <map>
+#include <string>
+#include <vector>
+
+namespace {
+
+using testing::ElementsAre;
+
+std::vector<std::string> localesOf(const std::map<std::string, std::string>& environment)
+{
+    return storefront::preferredLocales([&](const char* name) {
+        const auto found = environment.find(name);
+        return found == environment.end() ? std::string() : found->second;
+    });
+}
+
+TEST(StoreLocales, ComeFromLanguageInItsOrderAndThenFromTheLocale)
+{
+    EXPECT_THAT(localesOf({{"LANGUAGE", "fr_CA:es"}, {"LANG", "de_AT.UTF-8"}}), ElementsAre("fr_CA", "es", "de_AT"));
+}
+
+TEST(StoreLocales, TheFirstVariableThatIsSetNamesTheLocale)
+{
+    EXPECT_THAT(localesOf({{"LC_ALL", "fr_FR"}, {"LC_MESSAGES", "es_ES"}, {"LANG", "de_DE"}}), ElementsAre("fr_FR"));
+    EXPECT_THAT(localesOf({{"LC_ALL", ""}, {"LC_MESSAGES", "es_ES"}, {"LANG", "de_DE"}}), ElementsAre("es_ES"));
+    EXPECT_THAT(localesOf({{"LANG", "de_DE"}}), ElementsAre("de_DE"));
+}
+
+TEST(StoreLocales, HaveNoCodesetButKeepTheirModifier)
+{
+    EXPECT_THAT(localesOf({{"LANG", "sr_RS.UTF-8@latin"}}), ElementsAre("sr_RS@latin"));
+    EXPECT_THAT(localesOf({{"LANG", "de_DE.UTF-8"}}), ElementsAre("de_DE"));
+}
+
+TEST(StoreLocales, EndWithEnglishInWhichTextsAreWritten)
+{
+    EXPECT_THAT(localesOf({{"LANGUAGE", "fr:en_GB:de"}, {"LANG", "es_ES"}}), ElementsAre("fr", "en_GB"));
+    EXPECT_THAT(localesOf({{"LANGUAGE", "C:de"}}), ElementsAre("C"));
+    EXPECT_THAT(localesOf({{"LANG", "POSIX"}}), ElementsAre("C"));
+    EXPECT_THAT(localesOf({{"LANG", "C.UTF-8"}}), ElementsAre("C"));
+    EXPECT_THAT(localesOf({}), ElementsAre("C"));
+}
+
+TEST(StoreLocales, ComeOnceAndALanguageNotBehindOneOfItsOwn)
+{
+    EXPECT_THAT(localesOf({{"LANGUAGE", "de_AT:de:de_AT:fr"}, {"LANG", "de_AT.UTF-8"}}), ElementsAre("de_AT", "fr"));
+    EXPECT_THAT(localesOf({{"LANGUAGE", "de:de_CH"}}), ElementsAre("de", "de_CH"));
+}
+
+TEST(StoreLocales, AreNamesAndNoPaths)
+{
+    EXPECT_THAT(localesOf({{"LANGUAGE", "../../de::/fr:nl"}, {"LANG", "a b"}}), ElementsAre("nl"));
+    EXPECT_THAT(localesOf({{"LANG", "/usr/lib/locale/x"}}), ElementsAre("C"));
+}
+
+TEST(StoreLocales, OnlyEnglishNeedsNoTranslation)
+{
+    for (const char* locale : {"C", "en", "en_GB", "en@shaw"})
+        EXPECT_TRUE(storefront::isEnglish(locale)) << locale;
+    for (const char* locale : {"de", "enm", "fr_FR"})
+        EXPECT_FALSE(storefront::isEnglish(locale)) << locale;
+}
+
+} // namespace
