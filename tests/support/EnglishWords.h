@@ -39,6 +39,20 @@ public:
         const std::size_t dot = number.find('.');
         return number.substr(0, decimals == 0 ? dot : dot + 1 + static_cast<std::size_t>(decimals)) + " s";
     }
+    std::string clock(double seconds) const override
+    {
+        const auto whole = static_cast<long>(seconds);
+        const std::string rest = std::to_string(whole % 60);
+        return std::to_string(whole / 60) + (rest.size() < 2 ? ":0" : ":") + rest;
+    }
+    std::string fileSize(std::int64_t bytes) const override { return std::to_string(bytes) + " bytes"; }
+    std::string list(const std::vector<std::string>& names) const override
+    {
+        std::string all;
+        for (const std::string& name : names)
+            all += (all.empty() ? "" : ", ") + name;
+        return all;
+    }
     bool isRightToLeft() const override { return rightToLeft; }
 
 private:

@@ -2,15 +2,9 @@
 
 #include <unicode/fmtable.h>
 #include <unicode/locid.h>
-#include <unicode/measfmt.h>
-#include <unicode/measunit.h>
-#include <unicode/measure.h>
 #include <unicode/msgfmt.h>
-#include <unicode/numfmt.h>
 #include <unicode/unistr.h>
 
-#include <algorithm>
-#include <cmath>
 #include <vector>
 
 namespace intl {
@@ -19,8 +13,6 @@ namespace {
 
 constexpr const char* kTable = "Localizable";
 constexpr const char* kEnglish = "en";
-constexpr double kSecondsInAMinute = 60;
-constexpr double kMinutesInAnHour = 60;
 
 std::string baseOf(const std::string& language)
 {
@@ -91,39 +83,6 @@ std::string MessageCatalog::text(std::string_view key, const std::vector<platfor
         return pattern; // the table is broken; its words are better than none
     std::string result;
     return message.toUTF8String(result);
-}
-
-std::string MessageCatalog::duration(double seconds, int decimals) const
-{
-    constexpr double kLongest = 1e9; // seconds
-    constexpr double kHair = 1e-6;   // a time that was added up may fall short of what it means
-    const double scale = std::pow(10, decimals);
-    const double whole = std::isfinite(seconds) ? std::clamp(seconds, 0.0, kLongest) : 0;
-    const double reached = std::floor(whole * scale + kHair) / scale;
-    const double minutes = std::floor(reached / kSecondsInAMinute);
-    const double hours = std::floor(minutes / kMinutesInAnHour);
-
-    UErrorCode status = U_ZERO_ERROR;
-    std::vector<icu::Measure> measures;
-    const auto add = [&](double number, icu::MeasureUnit* unit) {
-        measures.emplace_back(icu::Formattable(number), unit, status);
-    };
-    if (hours > 0)
-        add(hours, icu::MeasureUnit::createHour(status));
-    if (minutes > 0)
-        add(minutes - hours * kMinutesInAnHour, icu::MeasureUnit::createMinute(status));
-    add(reached - minutes * kSecondsInAMinute, icu::MeasureUnit::createSecond(status));
-
-    const icu::Locale locale = localeOf(m_locale);
-    icu::NumberFormat* numbers = icu::NumberFormat::createInstance(locale, status);
-    if (numbers)
-        numbers->setMaximumFractionDigits(decimals);
-    const icu::MeasureFormat format(locale, UMEASFMT_WIDTH_WIDE, numbers, status); // owns the numbers
-    icu::UnicodeString text;
-    icu::FieldPosition nowhere;
-    format.formatMeasures(measures.data(), static_cast<std::int32_t>(measures.size()), text, nowhere, status);
-    std::string result;
-    return text.toUTF8String(result);
 }
 
 } // namespace intl

@@ -17,6 +17,9 @@ public:
     std::string text(std::string_view key) const override;
     std::string text(std::string_view key, const std::vector<platform::MessageArgument>& arguments) const override;
     std::string duration(double seconds, int decimals) const override;
+    std::string clock(double seconds) const override;
+    std::string fileSize(std::int64_t bytes) const override;
+    std::string list(const std::vector<std::string>& names) const override;
     bool isRightToLeft() const override { return m_isRightToLeft; }
 
 private:

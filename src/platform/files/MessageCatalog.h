@@ -31,6 +31,12 @@ public:
     /// How long something is: "1 minute, 5.25 seconds" with two decimals, cut off, as what is not reached yet is not said.
     /// What is no such time is 0 seconds.
     virtual std::string duration(double seconds, int decimals) const = 0;
+    /// The same as clocks show it, in whole seconds, cut off: "0:42", "1:02:03".
+    virtual std::string clock(double seconds) const = 0;
+    /// How large a file is, a thousand bytes to the kilobyte: "12.4 MB".
+    virtual std::string fileSize(std::int64_t bytes) const = 0;
+    /// Several names as one text: "a, b, and c".
+    virtual std::string list(const std::vector<std::string>& names) const = 0;
     /// Whether the words run from right to left.
     virtual bool isRightToLeft() const = 0;
 };

@@ -112,4 +112,39 @@ TEST_F(ACatalog, KnowsWhereItsWordsBegin)
     EXPECT_FALSE(catalog({"he"}).isRightToLeft()) << "it speaks English then";
 }
 
+TEST_F(ACatalog, ShowsTimesAsClocksDo)
+{
+    const auto english = catalog({"en"});
+    EXPECT_EQ(english.clock(0), "0:00");
+    EXPECT_EQ(english.clock(42.99), "0:42");
+    EXPECT_EQ(english.clock(605), "10:05");
+    EXPECT_EQ(english.clock(3723), "1:02:03");
+    EXPECT_EQ(english.clock(-5), "0:00");
+    EXPECT_EQ(english.clock(std::numeric_limits<double>::quiet_NaN()), "0:00");
+    EXPECT_EQ(catalog({"ar-EG"}).clock(42), "٠:٤٢");
+}
+
+TEST_F(ACatalog, SaysHowLargeFilesAre)
+{
+    const auto english = catalog({"en"});
+    EXPECT_EQ(english.fileSize(0), "0 byte");
+    EXPECT_EQ(english.fileSize(999), "999 byte");
+    EXPECT_EQ(english.fileSize(1000), "1 kB");
+    EXPECT_EQ(english.fileSize(12'400'000), "12.4 MB");
+    EXPECT_EQ(english.fileSize(999'950), "1 MB") << "not 1,000 kB";
+    EXPECT_EQ(english.fileSize(345'678'901), "346 MB");
+    EXPECT_EQ(english.fileSize(2'500'000'000), "2.5 GB");
+    EXPECT_EQ(english.fileSize(-3), "0 byte");
+    EXPECT_EQ(english.fileSize(std::numeric_limits<std::int64_t>::max()), "9,223,372 TB");
+    EXPECT_EQ(catalog({"de-DE"}).fileSize(12'400'000), "12,4 MB");
+}
+
+TEST_F(ACatalog, ListsNamesAsTheLanguageDoes)
+{
+    EXPECT_EQ(catalog({"en"}).list({"a", "b", "c"}), "a, b, and c");
+    EXPECT_EQ(catalog({"de"}).list({"a", "b"}), "a und b");
+    EXPECT_EQ(catalog({"de"}).list({"a"}), "a");
+    EXPECT_EQ(catalog({"de"}).list({}), "");
+}
+
 } // namespace
