@@ -1,0 +1,55 @@
+#include "platform/sharing/ActivityList.h"
+
+#include <algorithm>
+#include <utility>
+
+namespace platform {
+
+void ActivityList::setExcludedTypes(std::vector<std::string> types)
+{
+    m_affinity.assertHere();
+    m_excluded = std::move(types);
+    std::erase_if(m_activities, [this](const std::shared_ptr<Activity>& activity) {
+        return std::find(m_excluded.begin(), m_excluded.end(), activity->activityType()) != m_excluded.end();
+    });
+}
+
+void ActivityList::setTypeOrder(std::vector<std::string> types)
+{
+    m_affinity.assertHere();
+    m_order = std::move(types);
+    sort();
+}
+
+void ActivityList::add(const Activities& activities)
+{
+    m_affinity.assertHere();
+    for (const auto& activity : activities) {
+        const bool isExcluded =
+            std::find(m_excluded.begin(), m_excluded.end(), activity->activityType()) != m_excluded.end();
+        if (!isExcluded && activity->canPerformWithActivityItems(m_items))
+            m_activities.push_back(activity);
+    }
+    sort();
+}
+
+void ActivityList::freeze()
+{
+    m_affinity.assertHere();
+    m_isFrozen = true;
+}
+
+std::size_t ActivityList::rankOf(const Activity& activity) const
+{
+    const auto found = std::find(m_order.begin(), m_order.end(), activity.activityType());
+    return static_cast<std::size_t>(found - m_order.begin());
+}
+
+void ActivityList::sort()
+{
+    if (!m_isFrozen)
+        std::stable_sort(m_activities.begin(), m_activities.end(),
+                         [this](const auto& a, const auto& b) { return rankOf(*a) < rankOf(*b); });
+}
+
+} // namespace platform

@@ -1,0 +1,56 @@
+// Texts of unknown origin, as a sheet shows them.
+#include "platform/sharing/QuietText.h"
+
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <string>
+
+namespace {
+
+using platform::quietName;
+using platform::quietText;
+
+TEST(AQuietText, KeepsWordsAndLines)
+{
+    EXPECT_EQ(quietText("A race\nhttps://example.org/ä?b=日本"), "A race\nhttps://example.org/ä?b=日本");
+    EXPECT_EQ(quietText(""), "");
+}
+
+TEST(AQuietText, HasNeitherControlCharactersNorMarksOfDirection)
+{
+    EXPECT_EQ(quietText("a\u202Eb\u2066c\u200Fd\u061Ce\uFEFF"), "abcde");
+    EXPECT_EQ(quietText(std::string("a\0b\x1B[31mc\x7F", 10)), "a b [31mc");
+    EXPECT_EQ(quietText("a\u009Bb"), "a b");
+    EXPECT_EQ(quietText("bad \xFF\xC3 bytes"), "bad bytes");
+}
+
+TEST(AQuietText, HasNoEmptyLines)
+{
+    EXPECT_EQ(quietText("\n\n a \r\n \u2028\n b\n\n"), "a\nb");
+}
+
+TEST(AQuietText, EndsInAnEllipsisWhereItIsCutOff)
+{
+    EXPECT_EQ(quietText("abcdef", 3), "abc…");
+    EXPECT_EQ(quietText("ääää", 2), "ää…");
+    EXPECT_EQ(quietText("abc", 3), "abc");
+}
+
+TEST(AQuietText, CostsNothingHoweverLongTheTextIs)
+{
+    const auto begin = std::chrono::steady_clock::now();
+    EXPECT_LT(quietText(std::string(100'000'000, 'x')).size(), 500U);
+    std::string marks;
+    while (marks.size() < 30'000'000)
+        marks += "\u202E";
+    EXPECT_EQ(quietText(marks), "…");
+    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(2)) << "making them, too";
+}
+
+TEST(AQuietName, IsOneLineSetApart)
+{
+    EXPECT_EQ(quietName("a\nb\u202E.mp4"), "\u2068a b.mp4\u2069");
+}
+
+} // namespace

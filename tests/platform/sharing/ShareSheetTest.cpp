@@ -1,0 +1,396 @@
+// The share sheet: what it offers, in which order, how an activity goes on and how all of it ends.
+#include "SharingFixture.h"
+
+namespace tests {
+
+namespace {
+
+using platform::AlertController;
+using platform::Key;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+base::ErrorRef error(const std::string& why)
+{
+    return base::Error::make("test", 1, why);
+}
+
+TEST_F(Sharing, ItOffersWhatCanBePerformedInTheOrderWanted)
+{
+    const auto own = activity("own");
+    const auto impossible = activity("mail");
+    impossible->canPerform = false;
+    make({own}).setActivityTypeOrder({"mail", "message", "copy"});
+    sheet->setExcludedActivityTypes({"copy"});
+    begin();
+    EXPECT_EQ(provider.asked.size(), 1U);
+    provider.found({activity("folder"), activity("message"), impossible}, false);
+    provider.found({activity("copy"), activity("mail")}, true);
+    EXPECT_THAT(titles(), ElementsAre("mail", "message", "own", "folder"));
+}
+
+TEST_F(Sharing, WhatComesLateGoesToTheEndAndMovesNothing)
+{
+    make().setActivityTypeOrder({"mail", "message"});
+    begin();
+    provider.found({activity("folder"), activity("message")}, false);
+    EXPECT_THAT(titles(), ElementsAre("message", "folder"));
+    settle();
+    std::vector<base::Rect> before;
+    for (const auto& each : sheet->list()->rows())
+        before.push_back({each->convertToRoot({}), each->bounds().size});
+    std::vector<std::shared_ptr<platform::Activity>> many;
+    for (int i = 0; i < 10; ++i)
+        many.push_back(activity("mail"));
+    provider.found(many, true);
+    settle();
+    EXPECT_THAT(titles().front(), "message");
+    for (std::size_t i = 0; i < before.size(); ++i)
+        EXPECT_EQ((base::Rect{row(i)->convertToRoot({}), row(i)->bounds().size}), before[i]);
+}
+
+TEST_F(Sharing, ItSaysThatItIsLookingUntilTheLastHasCome)
+{
+    make();
+    begin();
+    settle();
+    EXPECT_EQ(sheet->list()->footerLabel()->text(), "Looking for more…");
+    EXPECT_FALSE(sheet->list()->footerLabel()->isHidden());
+    provider.found({activity("mail")}, false);
+    EXPECT_FALSE(sheet->list()->footerLabel()->isHidden());
+    provider.found({}, true);
+    EXPECT_TRUE(sheet->list()->footerLabel()->isHidden());
+}
+
+TEST_F(Sharing, ItSaysWhenThereIsNothing)
+{
+    open({});
+    EXPECT_EQ(sheet->list()->footerLabel()->text(), "Nothing on this device can take this recording.");
+    EXPECT_FALSE(sheet->list()->footerLabel()->isHidden());
+}
+
+TEST_F(Sharing, ItShowsTheMovieWithoutWaitingForIt)
+{
+    items = {"A race", base::Url::fromPath("/tmp/race.mp4"), base::Url::fromPath("/tmp/no\u202Etes.txt")};
+    make();
+    begin();
+    const auto& summary = *sheet->summary();
+    EXPECT_EQ(summary.nameLabel()->text(), "race.mp4");
+    EXPECT_EQ(summary.textLabel()->text(), "A race");
+    EXPECT_EQ(summary.filesLabel()->text(), "With \u2068notes.txt\u2069");
+    EXPECT_TRUE(summary.detailsLabel()->isHidden());
+    const double height = summary.frame().height();
+    settle();
+    EXPECT_EQ(summary.detailsLabel()->text(), "0:42 · 12400000 bytes");
+    EXPECT_EQ(summary.detailsLabel()->accessibility().name, "42 s, 12400000 bytes");
+    ASSERT_EQ(media.imageGenerator()->requests.size(), 1U);
+    EXPECT_EQ(media.imageGenerator()->requests[0].time, base::MediaTime::zero());
+    media.imageGenerator()->succeed(0, std::make_shared<platform::Image>(platform::Bitmap::transparent(160, 288), 1));
+    machine.drain();
+    ASSERT_TRUE(summary.picture());
+    EXPECT_EQ(summary.picture()->frame(), base::Rect::make(0, (72 - 129.6) / 2, 72, 129.6)) << "it fills its square";
+    window->commit();
+    EXPECT_EQ(summary.frame().height(), height);
+}
+
+TEST_F(Sharing, WhatIsNotKnownOfTheMovieIsNotSaid)
+{
+    media.movies["/tmp/race.mp4"] = FakeMovie::failing();
+    open({});
+    EXPECT_EQ(sheet->summary()->detailsLabel()->text(), "12400000 bytes");
+    media.imageGenerator()->fail(0);
+    machine.drain();
+    EXPECT_FALSE(sheet->summary()->picture());
+}
+
+TEST_F(Sharing, APictureThatComesAfterTheSheetHasGoneIsNobodys)
+{
+    open({});
+    const auto generator = media.imageGenerator();
+    root->dismiss(false);
+    settle();
+    sheet.reset();
+    generator->succeed(0, std::make_shared<platform::Image>(platform::Bitmap::transparent(10, 10), 1));
+    machine.drain();
+}
+
+TEST_F(Sharing, ATextOfAMegabyteTakesThreeLines)
+{
+    items[0] = std::string(1'000'000, 'w');
+    open({activity("mail")});
+    EXPECT_LT(sheet->summary()->textLabel()->text().size(), 1000U);
+    EXPECT_LE(sheet->summary()->textLabel()->frame().height(), 60);
+}
+
+TEST_F(Sharing, WhatCompletesClosesTheSheetAndIsTold)
+{
+    const auto mail = activity("mail");
+    open({mail});
+    tapRow(0);
+    EXPECT_EQ(mail->prepared, items);
+    EXPECT_EQ(mail->performed, 1);
+    EXPECT_THAT(results, IsEmpty());
+    mail->activityDidFinish(true);
+    EXPECT_THAT(results, IsEmpty()) << "not before it is gone";
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_THAT(results, ElementsAre("mail yes"));
+    EXPECT_EQ(sheet->performedActivity(), mail);
+}
+
+TEST_F(Sharing, WhatEndsAtOnceDoesSo)
+{
+    const auto folder = activity("folder");
+    folder->endsAtOnce = true;
+    open({folder});
+    tapRow(0);
+    settle();
+    EXPECT_THAT(results, ElementsAre("folder yes"));
+}
+
+TEST_F(Sharing, WhatTheUserCancelsInItsOwnDialogueLeadsBackToTheList)
+{
+    const auto mail = activity("mail");
+    open({mail, activity("folder")});
+    tapRow(0);
+    mail->activityDidFinish(false);
+    settle();
+    EXPECT_FALSE(isGone());
+    EXPECT_TRUE(row(0)->row()->isEnabled());
+    EXPECT_TRUE(row(1)->row()->isEnabled());
+    EXPECT_FALSE(sheet->presentedViewController());
+    tapOn(*sheet->closeButton());
+    settle();
+    EXPECT_THAT(results, ElementsAre(" no"));
+}
+
+TEST_F(Sharing, WhatFailsSaysWhyAndLeadsBackToTheList)
+{
+    const auto mail = activity("mail");
+    open({mail});
+    tapRow(0);
+    mail->activityDidFail(base::Error::withMessage(error("for the log"), "MOVIE_GONE", {{"name", "race.mp4"}}));
+    settle();
+    const auto alert = std::dynamic_pointer_cast<AlertController>(sheet->presentedViewController());
+    ASSERT_TRUE(alert);
+    EXPECT_EQ(alert->title(), "“mail” did not work");
+    EXPECT_EQ(alert->message(), "“race.mp4” cannot be opened: it is no longer there.");
+    window->keyDown(Key::Return);
+    settle();
+    EXPECT_FALSE(sheet->presentedViewController());
+    EXPECT_FALSE(isGone());
+    EXPECT_TRUE(row(0)->row()->isEnabled());
+    EXPECT_THAT(results, IsEmpty());
+}
+
+TEST_F(Sharing, WhileOneIsPerformedTheOthersWait)
+{
+    const auto send = activity("device");
+    const auto mail = activity("mail");
+    open({send, mail});
+    tapRow(0);
+    window->commit();
+    EXPECT_FALSE(row(0)->progressView()->isHidden());
+    EXPECT_FALSE(row(0)->cancelButton()->isHidden());
+    EXPECT_EQ(row(0)->progressView()->progress(), std::nullopt);
+    EXPECT_GE(row(0)->cancelButton()->frame().width(), 44);
+    EXPECT_EQ(row(0)->cancelButton()->frame().height(), 44);
+    send->tell(0.404);
+    EXPECT_EQ(row(0)->progressView()->progress(), 0.4);
+    tapRow(1);
+    EXPECT_EQ(mail->performed, 0);
+    provider.found({activity("late")}, true);
+    EXPECT_FALSE(row(2)->row()->isEnabled()) << "what comes meanwhile waits, too";
+    tapOn(*row(0)->cancelButton());
+    settle();
+    EXPECT_EQ(send->cancelled, 1);
+    EXPECT_FALSE(isGone());
+    EXPECT_TRUE(row(0)->cancelButton()->isHidden());
+    EXPECT_TRUE(row(0)->progressView()->isHidden());
+    tapRow(1);
+    EXPECT_EQ(mail->performed, 1);
+}
+
+TEST_F(Sharing, ClosingItWhileOneIsPerformedCancelsThatFirst)
+{
+    const auto send = activity("device");
+    send->endsWhenCancelled = false;
+    open({send});
+    tapRow(0);
+    window->keyDown(Key::Escape);
+    machine.advance(std::chrono::milliseconds(500));
+    EXPECT_EQ(send->cancelled, 1);
+    EXPECT_FALSE(isGone());
+    window->keyDown(Key::Escape);
+    EXPECT_EQ(send->cancelled, 1);
+    send->activityDidFinish(false);
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_THAT(results, ElementsAre("device no"));
+}
+
+TEST_F(Sharing, OneThatEndsAsSoonAsItIsCancelledLetsItCloseAtOnce)
+{
+    const auto send = activity("device");
+    open({send});
+    tapRow(0);
+    tapOn(*sheet->closeButton());
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_THAT(results, ElementsAre("device no"));
+}
+
+TEST_F(Sharing, ItDoesNotWaitForeverForOneThatDoesNotEnd)
+{
+    const auto send = activity("device");
+    send->endsWhenCancelled = false;
+    open({send});
+    tapRow(0);
+    window->keyDown(Key::Escape);
+    machine.advance(std::chrono::milliseconds(999));
+    EXPECT_EQ(sheet->presentingViewController(), root);
+    machine.advance(std::chrono::milliseconds(1));
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_THAT(results, ElementsAre(" no"));
+    send->activityDidFinish(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre(" no")) << "too late";
+}
+
+TEST_F(Sharing, WhatCompletesWhileItClosesStillCounts)
+{
+    const auto send = activity("device");
+    send->endsWhenCancelled = false;
+    open({send});
+    tapRow(0);
+    window->keyDown(Key::Escape);
+    machine.advance(std::chrono::seconds(1));
+    EXPECT_THAT(results, IsEmpty());
+    send->activityDidFinish(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre("device yes"));
+}
+
+TEST_F(Sharing, ItIsToldOnceHoweverItGoes)
+{
+    open({activity("mail")});
+    root->dismiss(true);
+    root->dismiss(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre(" no"));
+}
+
+TEST_F(Sharing, WhatAnActivityShowsStandsAboveTheSheet)
+{
+    const auto upload = activity("upload");
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    EXPECT_EQ(sheet->presentedViewController(), upload->controller);
+    EXPECT_EQ(upload->performed, 0) << "it is shown in place of being performed";
+    upload->activityDidFinish(true);
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_FALSE(upload->controller->window());
+    EXPECT_THAT(results, ElementsAre("upload yes"));
+}
+
+TEST_F(Sharing, WhatAnActivityShowsGoesBeforeItsErrorIsTold)
+{
+    const auto upload = activity("upload");
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    upload->activityDidFail(error("no network"));
+    settle();
+    settle();
+    const auto alert = std::dynamic_pointer_cast<AlertController>(sheet->presentedViewController());
+    ASSERT_TRUE(alert);
+    EXPECT_EQ(alert->message(), "no network");
+}
+
+TEST_F(Sharing, ClosingWhatAnActivityShowsCancelsIt)
+{
+    const auto upload = activity("upload");
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    window->keyDown(Key::Escape);
+    settle();
+    EXPECT_EQ(upload->cancelled, 1);
+    EXPECT_FALSE(isGone());
+    EXPECT_FALSE(sheet->isPerforming());
+    EXPECT_TRUE(row(0)->row()->isEnabled());
+}
+
+TEST_F(Sharing, KeysGoThroughTheRowsAndPick)
+{
+    const auto mail = activity("mail");
+    const auto folder = activity("folder");
+    open({mail, folder});
+    window->keyDown(Key::Down);
+    EXPECT_EQ(window->focusedView(), sheet->closeButton());
+    window->keyDown(Key::Down);
+    EXPECT_EQ(window->focusedView(), row(0)->row());
+    window->moveFocus(true);
+    EXPECT_EQ(window->focusedView(), row(1)->row());
+    window->keyDown(Key::Up);
+    EXPECT_TRUE(window->keyDown(Key::Return));
+    EXPECT_EQ(mail->performed, 1);
+    EXPECT_EQ(window->focusedView(), row(0)->cancelButton()) << "who steers by keys can cancel by them";
+    EXPECT_TRUE(window->keyDown(Key::Return));
+    EXPECT_EQ(mail->cancelled, 1);
+    EXPECT_EQ(window->focusedView(), row(0)->row());
+}
+
+TEST_F(Sharing, ItIsMirroredWhereWordsRunFromRightToLeft)
+{
+    window->setRightToLeft(true);
+    open({activity("mail")});
+    EXPECT_LT(sheet->closeButton()->frame().minX(), 10);
+    EXPECT_GT(sheet->summary()->nameLabel()->frame().minX(), 40);
+    EXPECT_EQ(sheet->summary()->nameLabel()->frame().maxX(), 400 - 16 - 72 - 12);
+    tapRow(0);
+    window->commit();
+    EXPECT_LT(row(0)->cancelButton()->frame().minX(), 10);
+}
+
+TEST_F(Sharing, OnALowScreenTheListIsScrolled)
+{
+    std::vector<std::shared_ptr<platform::Activity>> many;
+    for (int i = 0; i < 12; ++i)
+        many.push_back(activity("device"));
+    open(many);
+    window->transitionToSize({720, 360});
+    settle();
+    const auto& scroll = *sheet->list()->scrollView();
+    EXPECT_GT(scroll.maximumOffset(), 0);
+    EXPECT_LE(scroll.convertToRoot({0, scroll.bounds().height()}).y, 360);
+    for (int i = 0; i < 13; ++i)
+        window->moveFocus(true);
+    window->commit();
+    EXPECT_EQ(window->focusedView(), row(11)->row());
+    EXPECT_EQ(scroll.contentOffset(), scroll.maximumOffset());
+}
+
+TEST_F(Sharing, AnAnswerAfterTheSheetHasGoneChangesNothing)
+{
+    make();
+    begin();
+    settle();
+    root->dismiss(true);
+    settle();
+    const auto found = provider.found;
+    found({activity("mail")}, false);
+    sheet.reset();
+    found({activity("mail")}, true);
+    EXPECT_THAT(results, ElementsAre(" no"));
+}
+
+} // namespace
+
+} // namespace tests
