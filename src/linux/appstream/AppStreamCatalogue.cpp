@@ -2,22 +2,39 @@
 
 #include "linux/appstream/PublicPage.h"
 
+#include <functional>
+#include <map>
 #include <string>
+#include <utility>
 
 namespace appstream {
 
 namespace {
 
-/// One source of what is known of one application, in any language.
-using Source = std::function<std::optional<Component>(const std::string& locale)>;
+/// What one source knows of one application, asked once for each language.
+class Source {
+public:
+    using Find = std::function<std::optional<Component>(const std::string& locale)>;
+    explicit Source(Find find) : m_find(std::move(find)) {}
+
+    const std::optional<Component>& in(const std::string& locale)
+    {
+        const auto known = m_known.find(locale);
+        return (known != m_known.end() ? known : m_known.emplace(locale, m_find(locale)).first)->second;
+    }
+
+private:
+    Find m_find;
+    std::map<std::string, std::optional<Component>> m_known;
+};
 
 /// The text in the first of the languages to which it was translated, else as it was written. A source gives the latter
 /// also where there is no translation, and does not say which it gave: they are compared.
-Component::Text translated(const Source& source, Component::Text (Component::*text)() const,
+Component::Text translated(Source& source, Component::Text (Component::*text)() const,
                            const std::vector<std::string>& locales)
 {
     const auto in = [&](const std::string& locale) {
-        const auto component = source(locale);
+        const auto& component = source.in(locale);
         return component ? ((*component).*text)() : std::nullopt;
     };
     for (const std::string& locale : locales) {
@@ -53,21 +70,21 @@ std::optional<platform::StoreItem> AppStreamCatalogue::find(const std::string& i
     m_affinity.assertHere();
     const std::vector<std::string> locales = inUsersLanguages ? m_options.locales : std::vector<std::string>{"C"};
     const Genres genres(inUsersLanguages);
-    const Source installed = [&](const std::string& locale) { return m_metainfo.find(identifier, locale); };
-    const Source published = [&](const std::string& locale) { return m_pools.find(identifier, locale); };
+    Source installed([&](const std::string& locale) { return m_metainfo.find(identifier, locale); });
+    Source published([&](const std::string& locale) { return m_pools.find(identifier, locale); });
 
     platform::StoreItem item;
     Component::Text page, homepage;
     bool isKnown = false;
-    for (const Source& source : {installed, published}) {
-        const auto component = source(locales.front());
+    for (Source* const source : {&installed, &published}) {
+        const auto& component = source->in(locales.front());
         if (!component)
             continue;
         isKnown = true;
         if (!item.displayName)
-            item.displayName = translated(source, &Component::name, locales);
+            item.displayName = translated(*source, &Component::name, locales);
         if (!item.artistName)
-            item.artistName = translated(source, &Component::developer, locales);
+            item.artistName = translated(*source, &Component::developer, locales);
         if (!item.genreNames)
             item.genreNames = genres.namesOf(component->categories());
         if (!page)

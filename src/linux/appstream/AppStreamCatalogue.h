@@ -9,8 +9,8 @@
 #include "linux/appstream/Pools.h"
 #include "linux/storefront/Catalogue.h"
 
-#include <functional>
-#include <vector>
+#include <optional>
+#include <string>
 
 namespace appstream {
 

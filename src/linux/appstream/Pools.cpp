@@ -79,13 +79,14 @@ std::optional<Component> Pools::find(const std::string& identifier, const std::s
             if (const Component component(each); !best || rank(component, identifier) < rank(*best, identifier))
                 best = component;
     }
+    m_hasMissed = m_hasMissed || !best;
     return best;
 }
 
 void Pools::review()
 {
     m_affinity.assertHere();
-    if (m_reviewed)
+    if (m_reviewed || !m_hasMissed)
         return;
     for (const auto& [locale, pool] : m_pools) {
         if (!pool)

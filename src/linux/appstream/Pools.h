@@ -31,7 +31,7 @@ public:
     /// anything else, what is called so before what only provides it, one with a public page, the higher priority in its
     /// catalogue, and then the name of the origin, so that it is the same each time.
     std::optional<Component> find(const std::string& identifier, const std::string& locale);
-    /// Says on the log when there are files, and nothing in what was read.
+    /// Says on the log, once something was not found, when there are files and nothing in what was read.
     void review();
 
 private:
@@ -41,6 +41,7 @@ private:
     const storefront::Options& m_options;
     base::Log& m_log;
     std::map<std::string, Owned<AsPool>> m_pools; ///< by locale; null when there is too much
+    bool m_hasMissed = false;
     bool m_reviewed = false;
     base::Affinity m_affinity;
 };

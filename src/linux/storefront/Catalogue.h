@@ -20,7 +20,8 @@ public:
     virtual void load() = 0;
     /// Nothing when nobody knows the application. Texts are in the user's languages, or else as they were written.
     virtual std::optional<platform::StoreItem> find(const std::string& identifier, bool inUsersLanguages) = 0;
-    /// Says on the log, once, when there are catalogues of which nothing could be read.
+    /// Says on the log, once, when something was not found and there are catalogues of which nothing could be read. It
+    /// takes a while: for the time behind an answer.
     virtual void review() = 0;
 };
 
