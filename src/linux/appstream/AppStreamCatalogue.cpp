@@ -39,7 +39,7 @@ Component::Text translated(Source& source, Component::Text (Component::*text)() 
     };
     for (const std::string& locale : locales) {
         Component::Text known = in(locale);
-        if (&locale == &locales.back() || storefront::isEnglish(locale) || known != in("C"))
+        if (&locale == &locales.back() || known != in("C"))
             return known;
     }
     return std::nullopt;

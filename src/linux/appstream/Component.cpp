@@ -16,13 +16,10 @@ Component::Text nameOf(const char* text)
 {
     if (!text)
         return std::nullopt;
-    std::string_view name = text;
-    constexpr const char* kSpaces = " \t\r\n";
-    name.remove_prefix(std::min(name.find_first_not_of(kSpaces), name.size()));
-    name.remove_suffix(name.size() - (name.find_last_not_of(kSpaces) + 1));
+    std::string name = text;
     if (name.empty() || name.size() > kLongestName || base::printable(name) != name)
         return std::nullopt;
-    return std::string(name);
+    return name;
 }
 
 std::string orEmpty(const char* text)

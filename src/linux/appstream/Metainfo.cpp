@@ -1,9 +1,12 @@
 #include "linux/appstream/Metainfo.h"
 
+#include "linux/appstream/DeveloperElement.h"
 #include "linux/appstream/GObjects.h"
 
 #include <appstream.h>
+#include <fstream>
 #include <gio/gio.h>
+#include <iterator>
 #include <system_error>
 #include <utility>
 
@@ -36,9 +39,8 @@ std::optional<fs::path> Metainfo::fileOf(const std::string& identifier) const
         // The second is what such files were called before.
         for (const char* ending : {".metainfo.xml", ".appdata.xml", ".desktop.metainfo.xml", ".desktop.appdata.xml"}) {
             std::error_code error;
-            // Only plain files end.
-            if (fs::path file = directory / (plain + ending);
-                fs::is_regular_file(file, error) && fs::file_size(file, error) <= kLargestFile)
+            // Only plain files have a size, and an end.
+            if (fs::path file = directory / (plain + ending); fs::file_size(file, error) <= kLargestFile && !error)
                 return file;
         }
     return std::nullopt;
@@ -60,6 +62,12 @@ std::optional<Component> Metainfo::find(const std::string& identifier, const std
         return std::nullopt;
     }
     AsComponent* const component = as_metadata_get_component(metadata.get());
+    if (component && !as_component_get_developer_name(component)) {
+        std::ifstream stream(*path, std::ios::binary);
+        const std::string xml{std::istreambuf_iterator<char>(stream), {}};
+        if (const auto developer = developerElement(xml))
+            as_component_set_developer_name(component, developer->c_str(), "C");
+    }
     return component ? std::optional<Component>(component) : std::nullopt;
 }
 

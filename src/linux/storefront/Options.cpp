@@ -32,12 +32,12 @@ bool isServedBy(const std::string& locale, const std::string& other)
     return other == locale || other.starts_with(locale + "_");
 }
 
-} // namespace
-
 bool isEnglish(const std::string& locale)
 {
     return locale == "C" || locale == "en" || locale.starts_with("en_") || locale.starts_with("en@");
 }
+
+} // namespace
 
 std::vector<std::string> preferredLocales(const Environment& environment)
 {

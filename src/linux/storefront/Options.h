@@ -31,10 +31,7 @@ struct Options {
 using Environment = std::function<std::string(const char* name)>;
 
 /// The locales of LANGUAGE, then of the first of LC_ALL, LC_MESSAGES and LANG that is set: without codesets, each once,
-/// and none behind English, in which texts are written. A language goes without saying behind one of its own locales.
+/// and none behind English, in which texts are written: they need no translation to it. A language goes without saying behind one of its own locales.
 std::vector<std::string> preferredLocales(const Environment& environment);
-
-/// Whether texts that were not translated to a locale are in its language all the same.
-bool isEnglish(const std::string& locale);
 
 } // namespace storefront

@@ -66,6 +66,8 @@ INSTANTIATE_TEST_SUITE_P(
                   "https://painter.example"},
         Published{"OfARuntimeNothing", kFlathub, "org.example.Painter",
                   "<bundle type=\"flatpak\">runtime/org.example.Painter/x86_64/stable</bundle>", std::nullopt},
+        Published{"OfNoKnownReferenceNothing", kFlathub, "org.example.Painter",
+                  "<bundle type=\"flatpak\">any/org.example.Painter/x86_64/stable</bundle>", std::nullopt},
         Published{"OfADistributionTheHomepage", kDebian, "org.example.Painter",
                   "<url type=\"homepage\">https://painter.example</url>", "https://painter.example"},
         Published{"OfNobodyKnownWithoutAHomepageNothing", kDebian, "org.example.Painter", "", std::nullopt},

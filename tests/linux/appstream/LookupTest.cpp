@@ -39,6 +39,23 @@ TEST_F(StoreLookup, TheCatalogueSaysAllOfAnApplication)
     EXPECT_THAT(errors(), IsEmpty());
 }
 
+TEST_F(StoreLookup, ACatalogueInTheDistributionsFormatSaysTheSame)
+{
+    files.write("catalogue/yaml/painter.yml", "---\nFile: DEP-11\nVersion: '0.16'\nOrigin: debian-bookworm-main\n"
+                                              "---\nType: desktop-application\nID: org.example.Painter\n"
+                                              "Package: painter\nName:\n  C: Painter\n  de: Maler\n"
+                                              "Summary:\n  C: Paints\nDeveloperName:\n  C: The Painters\n"
+                                              "Url:\n  homepage: https://painter.example/\n"
+                                              "Categories:\n- Qt\n- Graphics\n");
+    options.locales = {"de_DE"};
+    const platform::StoreItem item = itemOf(kPainter);
+    EXPECT_THAT(item.displayName, Optional(std::string("Maler")));
+    EXPECT_THAT(item.artistName, Optional(std::string("The Painters")));
+    EXPECT_THAT(item.shortProductLink, Optional(std::string("https://painter.example/")));
+    EXPECT_THAT(item.genreNames, Optional(SizeIs(1)));
+    EXPECT_THAT(errors(), IsEmpty());
+}
+
 TEST_F(StoreLookup, WhatNobodyKnowsHasNoResult)
 {
     publishPainter();
@@ -154,6 +171,33 @@ TEST_F(StoreLookup, WithoutADeveloperThereIsNone)
     EXPECT_EQ(item.artistName, std::nullopt);
     EXPECT_EQ(item.shortProductLink, std::nullopt);
     EXPECT_EQ(item.genreNames, std::nullopt);
+}
+
+TEST_F(StoreLookup, GenresHaveTheNameOfTheirMainCategoryOnce)
+{
+    const auto genres = [this](const std::string& categories) {
+        install(kPainter, "<name>Painter</name><categories>" + categories + "</categories>");
+        return itemOf(kPainter).genreNames;
+    };
+    EXPECT_THAT(genres("<category>Utility</category><category>TextEditor</category><category>System</category>"),
+                Optional(ElementsAre("Utilities")));
+    EXPECT_EQ(genres("<category>Qt</category><category>X-Vendor</category>"), std::nullopt);
+}
+
+TEST_F(StoreLookup, TheDeveloperMayStandInAnElementOfItsOwn)
+{
+    const auto developer = [this](const std::string& body) {
+        install(kPainter, "<name>Painter</name>" + body);
+        return itemOf(kPainter).artistName;
+    };
+    EXPECT_THAT(developer("<developer id=\"example.org\"><name xml:lang=\"de\">Die Maler</name><name>The &amp; "
+                          "Painters</name></developer>"),
+                Optional(std::string("The & Painters")));
+    EXPECT_THAT(developer("<developer><name>New</name></developer><developer_name>Old</developer_name>"),
+                Optional(std::string("Old")));
+    EXPECT_EQ(developer("<developer id=\"example.org\"/>"), std::nullopt);
+    EXPECT_EQ(developer("<releases><developer><name>Elsewhere</name></developer></releases>"), std::nullopt);
+    EXPECT_EQ(developer("<developer><name>two\nlines</name></developer>"), std::nullopt);
 }
 
 TEST_F(StoreLookup, OfSeveralOriginsTheOneWithAPublicPageGoesFirst)

@@ -61,9 +61,9 @@ TEST(StoreLocales, AreNamesAndNoPaths)
 TEST(StoreLocales, OnlyEnglishNeedsNoTranslation)
 {
     for (const char* locale : {"C", "en", "en_GB", "en@shaw"})
-        EXPECT_TRUE(storefront::isEnglish(locale)) << locale;
-    for (const char* locale : {"de", "enm", "fr_FR"})
-        EXPECT_FALSE(storefront::isEnglish(locale)) << locale;
+        EXPECT_THAT(localesOf({{"LANGUAGE", std::string(locale) + ":de"}}), ElementsAre(locale));
+    for (const char* locale : {"enm", "fr_FR"})
+        EXPECT_THAT(localesOf({{"LANGUAGE", std::string(locale) + ":de"}}), ElementsAre(locale, "de"));
 }
 
 } // namespace
