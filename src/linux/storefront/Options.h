@@ -1,6 +1,7 @@
 /// Where the store looks, and in which languages.
 #pragma once
 
+#include <chrono>
 #include <filesystem>
 #include <functional>
 #include <string>
@@ -20,6 +21,9 @@ struct Options {
     bool usesMachineCatalogues = true;
     /// Where catalogues are kept in a form that is quick to search; where everybody keeps them when empty.
     std::filesystem::path cache;
+    /// How long an answer waits for catalogues that are still being read. The default is half of what a person who taps
+    /// something takes for at once.
+    std::chrono::milliseconds patience{50};
     /// The library that reads all of these, as dlopen() wants it.
     std::string library = "libclipsa-linux-appstream.so";
 

@@ -256,7 +256,7 @@ TEST_F(StoreLookup, PreparingReadsAheadOfTheFirstLookup)
     publishPainter();
     options.locales = {"de"};
     open().prepare();
-    ask({"no such profile", 1, {}}); // comes behind it
+    ask(requestFor({})); // comes behind it, and reads nothing itself
     std::filesystem::remove_all(files.path() / "catalogue");
     std::filesystem::remove_all(files.path() / "cache");
     EXPECT_THAT(itemOf(kPainter).displayName, Optional(std::string("Maler")));

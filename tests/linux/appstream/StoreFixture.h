@@ -37,6 +37,7 @@ protected:
         made.catalogues = {files.path() / "catalogue"};
         made.usesMachineCatalogues = false;
         made.cache = files.path() / "cache";
+        made.patience = std::chrono::seconds(60);
         return made;
     }
 
