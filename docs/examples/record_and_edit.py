@@ -40,7 +40,7 @@ def told(result):
     if result["outcome"] == "shared":
         print(f"shared{receiver} by {result['type']}", file=sys.stderr)
     elif result["outcome"] == "not-shared":
-        print(f"not shared{receiver} by {result['type']}: {result['reason']}", file=sys.stderr)
+        print(f"not shared{receiver} by {result['type']}: {result.get('reason', 'nobody knows why')}", file=sys.stderr)
 
 
 def failed(message):

@@ -39,8 +39,8 @@ bool areOfTheSame(const QVariantMap& one, const QVariantMap& other)
     });
 }
 
-/// The number of the process that a descriptor stands for, as we know it; less than 1 when it has ended, or is not among
-/// those that we can see.
+/// The number of the process that a descriptor stands for, as we know it; that of none, less than 1, when it has ended or
+/// is not among those that we can see.
 pid_t numberOf(int process)
 {
     static constexpr std::string_view kName = "Pid:\t";
@@ -70,8 +70,6 @@ Asker askerFrom(const QVariantMap& credentials)
         return asker;
     const posix::FileDescriptor process = descriptorFrom(credentials.value(QStringLiteral("ProcessFD")));
     const pid_t number = process ? numberOf(process.get()) : credentials.value(QStringLiteral("ProcessID")).toInt();
-    if (number < 1)
-        return asker;
     const std::string path = "/proc/" + std::to_string(number);
     posix::FileDescriptor directory(::open(path.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
     // It had the number all the time if it still has it.

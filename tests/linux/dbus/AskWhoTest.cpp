@@ -120,7 +120,8 @@ TEST_F(AskingWho, IsOfNobodyWhoHasLeft)
     EXPECT_FALSE(ask(caller.bus, name)->process);
 }
 
-/// A bus that says what a test says: each answer once, the last again and again.
+/// A bus that says what a test says: each answer once, the last again and again. A list is all values of an answer, and
+/// nothing ends the bus.
 class BusOnPaper final : public QDBusVirtualObject {
 public:
     BusOnPaper()
@@ -154,7 +155,8 @@ public:
         if (said.isNull())
             end();
         else
-            connection.send(message.createReply(said));
+            connection.send(said.metaType() == QMetaType::fromType<QVariantList>() ? message.createReply(said.toList())
+                                                                                   : message.createReply(said));
         return true;
     }
 
@@ -188,9 +190,11 @@ TEST_F(AskingWho, IsOfNobodyWhenTheNameOrTheNumberIsAnothersMeanwhile)
 
 TEST_F(AskingWho, IsOfNobodyWhereABusSaysSomethingElse)
 {
-    BusOnPaper paper;
-    paper.answers = {QStringLiteral("you know who")};
-    EXPECT_FALSE(ask(paper.bus, QStringLiteral(":1.7"))->process);
+    for (const QVariant& said : {QVariant(QStringLiteral("you know who")), QVariant(QVariantList())}) {
+        BusOnPaper paper;
+        paper.answers = {said};
+        EXPECT_FALSE(ask(paper.bus, QStringLiteral(":1.7"))->process);
+    }
 }
 
 TEST_F(AskingWho, IsAnsweredWhenTheBusEnds)

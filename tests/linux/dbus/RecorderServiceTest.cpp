@@ -7,6 +7,7 @@
 #include <gmock/gmock.h>
 
 #include <cerrno>
+#include <csignal>
 #include <map>
 #include <optional>
 #include <sys/stat.h>
@@ -382,6 +383,30 @@ TEST_F(Recorders, AreAnsweredByAServiceThatIsAboutToLeave)
     EXPECT_TRUE(tests::pumpUntil([&] { return reply.isFinished(); }));
     EXPECT_EQ(reply.error().message().toStdString(), "Clipsa is being closed");
     EXPECT_EQ(m_editors.size(), 1U);
+}
+
+TEST_F(Recorders, TheServiceStaysWhileItIsToldWhoCalls)
+{
+    serve();
+    Caller caller;
+    edit(caller);
+    m_service->close();
+    const QVariantMap options = {{QStringLiteral("attachment"), QStringLiteral("/notes.txt")}};
+    const auto bus = static_cast<pid_t>(caller.bus.interface()->servicePid(QStringLiteral("org.freedesktop.DBus")));
+    const QDBusPendingCall asked =
+        caller.start("org.clipsa.Recorder1", "Edit", {QVariant::fromValue(movie()), options});
+    caller.bus.interface()->isServiceRegistered(kService); // the bus has passed it on when it answers this
+    ASSERT_EQ(::kill(bus, SIGSTOP), 0);
+    letTimersPassOf(std::chrono::milliseconds(50)); // the service has asked, and hears nothing
+    m_editors[0]->events.ended({});
+    ASSERT_TRUE(tests::pumpUntil([&] { return m_editors[0]->gone; }));
+    letTimersPassOf(std::chrono::milliseconds(1));
+    EXPECT_EQ(m_idle, 0);
+    ASSERT_EQ(::kill(bus, SIGCONT), 0);
+    EXPECT_TRUE(tests::pumpUntil([&] { return m_idle > 0; }));
+    QDBusPendingCallWatcher reply(asked);
+    EXPECT_TRUE(tests::pumpUntil([&] { return reply.isFinished(); }));
+    EXPECT_EQ(reply.error().message().toStdString(), "Clipsa is being closed");
 }
 
 TEST_F(Recorders, OnlyOneServiceHasTheName)
