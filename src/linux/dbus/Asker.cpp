@@ -65,7 +65,7 @@ bool seesOurFiles(int process, int self)
         || !areTheSame(theirs, ours))
         return false;
     // If it is there we are in a sandbox, too, where the bus's numbers are none of our processes'.
-    return ::faccessat(root.get(), ".flatpak-info", F_OK, AT_SYMLINK_NOFOLLOW) != 0 && errno == ENOENT;
+    return ::fstatat(root.get(), ".flatpak-info", &theirs, AT_SYMLINK_NOFOLLOW) != 0 && errno == ENOENT;
 }
 
 } // namespace

@@ -3,6 +3,7 @@
 
 #include "linux/posix/FileDescriptor.h"
 #include "support/PrivateDirectory.h"
+#include "support/WithoutPrivileges.h"
 
 #include <gtest/gtest.h>
 
@@ -10,6 +11,7 @@
 #include <fcntl.h>
 #include <functional>
 #include <sched.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -127,6 +129,9 @@ TEST_F(AnAsker, IsConfinedInASandboxThatWeAreInAsWell)
     EXPECT_TRUE(isConfined()) << "whatever it is";
     std::filesystem::remove(m_directory.path() / "root/.flatpak-info");
     EXPECT_FALSE(isConfined());
+    ::chmod((m_directory.path() / "root").c_str(), 0);
+    const tests::WithoutPrivileges withoutPrivileges;
+    EXPECT_TRUE(isConfined()) << "it cannot be looked at";
 }
 
 /// A real process, which does something and then stays until it is asked.
