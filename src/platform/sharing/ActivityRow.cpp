@@ -54,6 +54,7 @@ void ActivityRow::showRunning()
     m_progress->setHidden(false);
     m_cancel->setHidden(false);
     m_cancel->setEnabled(true);
+    m_row->setBusy(true);
     setNeedsLayout();
 }
 
@@ -81,6 +82,7 @@ void ActivityRow::showIdle()
     assertHere();
     m_progress->setHidden(true);
     m_cancel->setHidden(true);
+    m_row->setBusy(false);
     setNeedsLayout();
 }
 

@@ -71,8 +71,6 @@ void ShareListView::showFooter()
     m_footer->setHidden(!hasFooter());
     m_indicator->setHidden(!m_isLooking);
     setNeedsLayout();
-    if (const auto above = superview())
-        above->setNeedsLayout();
 }
 
 void ShareListView::setEnabled(bool enabled)
@@ -100,12 +98,6 @@ double ShareListView::wantedHeight() const
 {
     assertHere();
     return m_frozenHeight.value_or(std::max(contentHeight(), kExpectedRows * ListRow::kHeight + 2 * kMargin));
-}
-
-void ShareListView::freezeHeight()
-{
-    assertHere();
-    m_frozenHeight = wantedHeight();
 }
 
 void ShareListView::layoutSubviews()

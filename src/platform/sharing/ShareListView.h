@@ -21,8 +21,8 @@ public:
               const runtime::Selector& pick, const runtime::Selector& cancel);
     void setLooking(bool looking);
     bool isLooking() const { return here(m_isLooking); }
-    /// From now on it would like to be as high as it is: what comes later is scrolled to.
-    void freezeHeight();
+    /// From now on it would like to be so high: what comes later is scrolled to.
+    void freezeHeight(double height) { here(m_frozenHeight) = height; }
 
     /// Whether its rows can be picked, those that come later included.
     void setEnabled(bool enabled);

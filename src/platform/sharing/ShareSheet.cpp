@@ -120,13 +120,15 @@ void ShareSheet::addFound(const std::vector<std::shared_ptr<Activity>>& activiti
     m_list->show(m_activities.activities(), weakSelf<ShareSheet>(), pickSelector(), cancelSelector());
     if (isLast)
         m_list->setLooking(false);
+    contentSizeDidChange();
 }
 
 base::Size ShareSheet::contentSizeThatFits(base::Size room)
 {
     assertHere();
     view();
-    return {room.width, std::min(room.height, m_summary->heightThatFits(room.width) + m_list->wantedHeight())};
+    m_listHeight = m_list->wantedHeight();
+    return {room.width, std::min(room.height, m_summary->heightThatFits(room.width) + m_listHeight)};
 }
 
 void ShareSheet::viewDidLayoutSubviews()
@@ -148,7 +150,13 @@ void ShareSheet::presentationDidShow()
 {
     assertHere();
     m_activities.freeze();
-    m_list->freezeHeight();
+    m_list->freezeHeight(m_listHeight);
+}
+
+std::shared_ptr<View> ShareSheet::preferredFocusView()
+{
+    assertHere();
+    return m_list && !m_list->rows().empty() ? m_list->rows().front()->row() : nullptr;
 }
 
 std::shared_ptr<ActivityRow> ShareSheet::runningRow() const

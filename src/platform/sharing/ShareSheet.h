@@ -62,6 +62,7 @@ public:
     void viewDidLayoutSubviews() override;
     base::Size contentSizeThatFits(base::Size room) override;
     void presentationDidShow() override;
+    std::shared_ptr<View> preferredFocusView() override;
     bool presentationShouldClose() override;
     void presentationDidEnd() override;
     void presentedViewControllerDidEnd(ViewController& presented) override;
@@ -103,6 +104,7 @@ private:
     std::shared_ptr<Activity> m_performed;
     std::weak_ptr<ViewController> m_activityController; ///< that it shows, in place of performing it
     bool m_isClosing = false;
+    double m_listHeight = 0; ///< that was asked for last
     std::shared_ptr<ShareSummary> m_summary;
     std::shared_ptr<ShareListView> m_list;
     std::shared_ptr<Button> m_closeButton;

@@ -185,6 +185,14 @@ bool AlertController::presentationShouldClose()
     return m_actions.empty();
 }
 
+std::shared_ptr<View> AlertController::preferredFocusView()
+{
+    assertHere();
+    const auto index = indexOf(AlertAction::Style::Default);
+    const auto harmless = index ? index : indexOf(AlertAction::Style::Cancel);
+    return harmless && *harmless < m_buttons.size() ? m_buttons[*harmless] : nullptr;
+}
+
 void AlertController::buttonPressed(std::shared_ptr<runtime::Object> button)
 {
     assertHere();

@@ -41,6 +41,7 @@ public:
     void viewDidLayoutSubviews() override;
     base::Size contentSizeThatFits(base::Size room) override;
     bool presentationShouldClose() override;
+    std::shared_ptr<View> preferredFocusView() override;
     bool canBecomeFirstResponder() const override { return true; }
     std::vector<KeyCommand> keyCommands() const override;
 

@@ -22,4 +22,13 @@ void ListRow::setTrailingInset(double inset)
     setNeedsDisplay();
 }
 
+void ListRow::setBusy(bool busy)
+{
+    assertHere();
+    if (m_busy == busy)
+        return;
+    m_busy = busy;
+    setNeedsDisplay();
+}
+
 } // namespace platform

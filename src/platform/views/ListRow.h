@@ -24,7 +24,12 @@ public:
     double trailingInset() const { return here(m_trailingInset); }
     void setTrailingInset(double inset);
 
+    /// It does what it is for: it looks as one that can be pressed, though it cannot.
+    bool isBusy() const { return here(m_busy); }
+    void setBusy(bool busy);
+
 private:
+    bool m_busy = false;
     double m_trailingInset = 0;
 };
 

@@ -85,6 +85,9 @@ void Presentation::begin(Window& window, bool animated, Completion shown)
     m_formerFocus = window.focusedView();
     m_formerResponder = window.firstResponder();
     m_phase = Phase::Coming;
+    m_isAnimated = animated;
+    m_shownHandler = std::move(shown);
+    m_surface->setUserInteractionEnabled(false); // what moves is not pressed
     m_dim->addGestureRecognizer(std::make_shared<TapGestureRecognizer>(weak, tapBesideSelector()));
     if (m_style == ModalPresentationStyle::Sheet)
         m_surface->addGestureRecognizer(std::make_shared<PanGestureRecognizer>(
@@ -119,23 +122,44 @@ void Presentation::begin(Window& window, bool animated, Completion shown)
         setNeedsLayout();
         layoutIfNeeded();
     };
-    animate(window.mainQueue(), duration(animated), comeUp, [weak, shown = std::move(shown)](bool) {
+    m_motions = 1;
+    animate(window.mainQueue(), duration(animated), comeUp, [weak](bool) {
         if (const auto presentation = weak.lock())
-            presentation->didShow(shown);
+            presentation->motionDidEnd();
     });
 }
 
-void Presentation::didShow(const Completion& shown)
+void Presentation::contentSizeDidChange()
+{
+    assertHere();
+    if (m_phase == Phase::Shown || (m_phase == Phase::Coming && m_takesSizes))
+        setNeedsLayout();
+}
+
+void Presentation::motionDidEnd()
 {
     if (m_phase != Phase::Coming)
         return;
     const auto keepAlive = shared_from_this();
+    layoutIfNeeded(); // with what came since the last picture
+    m_takesSizes = false;
+    if (--m_motions == 0)
+        didShow();
+}
+
+void Presentation::didShow()
+{
+    const auto keepAlive = shared_from_this();
     m_phase = Phase::Shown;
+    m_surface->setUserInteractionEnabled(true);
     // Who steers by keys goes on with them.
-    if (const auto itsWindow = window(); itsWindow && m_formerFocus.lock() && !itsWindow->focusedView())
-        itsWindow->moveFocus(true);
+    if (const auto itsWindow = window(); itsWindow && m_formerFocus.lock() && !itsWindow->focusedView()) {
+        itsWindow->restoreFocus(m_presented->preferredFocusView());
+        if (!itsWindow->focusedView())
+            itsWindow->moveFocus(true);
+    }
     m_presented->presentationDidShow();
-    if (shown)
+    if (const auto shown = std::exchange(m_shownHandler, {}))
         shown();
     if (m_phase != Phase::Shown)
         return;

@@ -40,6 +40,9 @@ public:
     /// Leaves at once, and tells nobody but the presented controller's view: for a presenter that goes itself.
     void abandon();
 
+    /// What is presented would like another size. On its way up it grows or shrinks to it; what is up already does so
+    /// without any motion.
+    void contentSizeDidChange();
     /// Stays at what it came from. For the window, with each picture.
     void followSource();
 
@@ -57,7 +60,10 @@ public:
 private:
     enum class Phase { Waiting, Coming, Shown, Leaving, Gone };
     base::Instant duration(bool animated) const;
-    void didShow(const Completion& shown);
+    void motionDidEnd();
+    void didShow();
+    void place();
+    void placeInMotion();
     void closeForUser();
     void leave(bool animated);
     void didLeave();
@@ -77,6 +83,10 @@ private:
     std::optional<base::Rect> m_anchor; ///< where the source was when it was laid out last
     Phase m_phase = Phase::Waiting;
     bool m_isUp = false;
+    bool m_isAnimated = false;
+    bool m_takesSizes = true; ///< on its way up
+    int m_motions = 0;        ///< that go on, on its way up
+    Completion m_shownHandler;
     bool m_closesWhenShown = false;
     double m_dragged = 0;             ///< down, by a finger
     std::optional<bool> m_waitingEnd; ///< whether it is to be animated

@@ -59,6 +59,29 @@ void Presentation::layoutSubviews()
 {
     assertHere();
     View::layoutSubviews();
+    const bool isOnItsWay = m_phase == Phase::Coming && m_isUp && m_isAnimated;
+    if (isOnItsWay && currentAnimationDuration() == base::Instant(0))
+        placeInMotion();
+    else
+        place();
+}
+
+void Presentation::placeInMotion()
+{
+    const auto itsWindow = window();
+    const base::Rect before = m_surface->frame();
+    animate(itsWindow->mainQueue(), kFadeDuration, [this] { place(); });
+    if (m_surface->frame() == before)
+        return;
+    ++m_motions;
+    itsWindow->mainQueue().postAfter(kFadeDuration, [weak = weakSelf<Presentation>()] {
+        if (const auto presentation = weak.lock())
+            presentation->motionDidEnd();
+    });
+}
+
+void Presentation::place()
+{
     m_dim->setFrame(bounds());
     base::Rect frame;
     switch (m_style) {

@@ -110,6 +110,10 @@ public:
     void setTitle(std::string title) { here(m_title) = std::move(title); }
     /// How large it would like to be where there is so much room; all of it by default. Asked with each layout.
     virtual base::Size contentSizeThatFits(base::Size room);
+    /// For the presented one, when it would like another size than it said.
+    void contentSizeDidChange();
+    /// Where keys go first while it is presented; null: to what stands first.
+    virtual std::shared_ptr<View> preferredFocusView() { return nullptr; }
     /// Said to the presented one before the completion: it is fully on screen.
     virtual void presentationDidShow() {}
     /// The user wants it away, by Esc, a swipe or a tap beside it. Whoever says no may dismiss itself later.

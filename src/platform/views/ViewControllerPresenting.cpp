@@ -63,6 +63,13 @@ void ViewController::forgetPresentation(const Presentation& presentation)
     former->presented()->m_presenting.reset();
 }
 
+void ViewController::contentSizeDidChange()
+{
+    assertHere();
+    if (const auto presenting = presentingViewController())
+        presenting->m_presentation->contentSizeDidChange();
+}
+
 base::Size ViewController::contentSizeThatFits(base::Size room)
 {
     assertHere();

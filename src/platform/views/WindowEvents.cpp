@@ -216,7 +216,11 @@ bool Window::moveFocusByArrow(Key key)
     // What is presented is a list of things to do; on the screen behind, up and down mean nothing.
     if (!topPresentation() || (key != Key::Up && key != Key::Down))
         return false;
-    moveFocus(key == Key::Down);
+    const auto preferred = focusedView() ? nullptr : topPresentation()->presented()->preferredFocusView();
+    if (preferred && isReachable(preferred))
+        focus(preferred);
+    else
+        moveFocus(key == Key::Down);
     return true;
 }
 

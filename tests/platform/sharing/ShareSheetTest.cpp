@@ -49,6 +49,59 @@ TEST_F(Sharing, WhatComesLateGoesToTheEndAndMovesNothing)
         EXPECT_EQ((base::Rect{row(i)->convertToRoot({}), row(i)->bounds().size}), before[i]);
 }
 
+TEST_F(Sharing, ItGrowsOnItsWayUpAndIsCompleteWhenItHasGrown)
+{
+    make();
+    bool complete = false;
+    root->present(sheet, true, [&] { complete = true; });
+    window->commit();
+    const auto height = [this] { return window->topPresentation()->surface()->frame().height(); };
+    const double before = height();
+    machine.advance(std::chrono::milliseconds(200));
+    std::vector<std::shared_ptr<platform::Activity>> many;
+    for (int i = 0; i < 9; ++i)
+        many.push_back(activity("device"));
+    provider.found(many, false);
+    tapRow(0);
+    EXPECT_FALSE(sheet->isPerforming()) << "what moves is not pressed";
+    window->commit();
+    EXPECT_GT(height(), before);
+    machine.advance(std::chrono::milliseconds(149));
+    EXPECT_FALSE(complete);
+    machine.advance(std::chrono::milliseconds(1));
+    EXPECT_TRUE(complete);
+    const double grown = height();
+    provider.found(many, true);
+    settle();
+    EXPECT_EQ(height(), grown);
+}
+
+TEST_F(Sharing, ADragInTheListScrollsItAndClosesOnlyFromItsTop)
+{
+    std::vector<std::shared_ptr<platform::Activity>> many;
+    for (int i = 0; i < 20; ++i)
+        many.push_back(activity("device"));
+    open(many);
+    const auto& scroll = *sheet->list()->scrollView();
+    const double y = scroll.convertToRoot({0, 0}).y;
+    const auto drag = [&](double from, double to) {
+        base::Instant now = machine.clock.now();
+        window->touchDown({1, {200, from}, now});
+        for (int i = 1; i <= 8; ++i)
+            window->touchMove({1, {200, from + (to - from) * i / 8}, now += std::chrono::milliseconds(100)});
+        window->touchUp({1, {200, to}, now + std::chrono::seconds(1)});
+        window->commit();
+        settle();
+    };
+    drag(y + 200, y + 100);
+    EXPECT_GT(scroll.contentOffset(), 0);
+    drag(y + 50, y + 300);
+    EXPECT_EQ(scroll.contentOffset(), 0);
+    EXPECT_FALSE(isGone());
+    drag(y + 10, y + 500);
+    EXPECT_TRUE(isGone());
+}
+
 TEST_F(Sharing, ItSaysThatItIsLookingUntilTheLastHasCome)
 {
     make();
@@ -333,6 +386,8 @@ TEST_F(Sharing, KeysGoThroughTheRowsAndPick)
     const auto folder = activity("folder");
     open({mail, folder});
     window->keyDown(Key::Down);
+    EXPECT_EQ(window->focusedView(), row(0)->row()) << "first to what it is for";
+    window->moveFocus(false);
     EXPECT_EQ(window->focusedView(), sheet->closeButton());
     window->keyDown(Key::Down);
     EXPECT_EQ(window->focusedView(), row(0)->row());

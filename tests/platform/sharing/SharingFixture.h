@@ -125,7 +125,9 @@ struct Sharing : testing::Test {
         make();
         begin();
         provider.found(activities, true);
+        window->commit();
         settle();
+        settle(); // where it grew on its way up
     }
     std::vector<std::string> titles() const
     {

@@ -26,7 +26,7 @@ QColor faded(QColor color, double opacity)
 
 double opacityOf(const ListRow& row)
 {
-    return row.isEnabled() ? 1 : metrics::kDisabledOpacity;
+    return row.isEnabled() || row.isBusy() ? 1 : metrics::kDisabledOpacity;
 }
 
 bool runsRightToLeft(const platform::View& view)
@@ -85,8 +85,7 @@ void RowItem::drawIcon(const ListRow& row, std::vector<Sprite>& sprites) const
     if (const auto image = row.currentImage()) {
         const QImage picture = toQImage(image);
         const QSizeF size = QSizeF(picture.size()).scaled(ListRow::kIconSize, ListRow::kIconSize, Qt::KeepAspectRatio);
-        sprites.push_back(
-            {centered(size), {}, row.isEnabled() ? picture : dimmed(picture, metrics::kDisabledOpacity), true});
+        sprites.push_back({centered(size), {}, opacityOf(row) < 1 ? dimmed(picture, opacityOf(row)) : picture, true});
     } else if (!row.glyph().empty()) {
         const QImage glyph = stage().icons.glyph(row.glyph(), faded(m_drawnTint, opacityOf(row)), stage().scale);
         sprites.push_back({centered(QSizeF(glyph.size()) / stage().scale), {}, glyph, false});
