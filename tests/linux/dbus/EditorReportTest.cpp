@@ -122,8 +122,10 @@ TEST_F(AnEditorsReport, IsPassedOverWhereAHostKnowsNoShares)
 
 TEST_F(AnEditorsReport, TakesNoTextForMoreThanOne)
 {
-    editor.add(
-        {.kind = Kind::Unshared, .why = "why\0saved", .type = "Mail\nsaved", .receiver = std::string("a\0b", 3)});
+    editor.add({.kind = Kind::Unshared,
+                .why = std::string("why\0saved", 9),
+                .type = "Mail\nsaved",
+                .receiver = std::string("a\0b", 3)});
     editor.add({.kind = Kind::Shared, .type = std::string("a\0b\nc", 5), .receiver = "d"});
     const auto notes = host.notes();
     ASSERT_THAT(notes, SizeIs(2));
