@@ -16,6 +16,13 @@ const runtime::Class& Activity::isa() const
     return classObject();
 }
 
+void Activity::setEndHandler(std::function<void(const End&)> handler)
+{
+    assertHere();
+    m_ended = m_ended && !handler;
+    m_endHandler = std::move(handler);
+}
+
 void Activity::activityDidFinish(bool completed)
 {
     assertHere();

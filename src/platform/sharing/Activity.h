@@ -2,7 +2,7 @@
 ///
 /// In this order: it is asked whether it can be performed with the items; when the user picks it, it is prepared with
 /// them, and then either its view controller is shown or, without one, it is performed. It ends once, whenever it calls
-/// activityDidFinish or activityDidFail; whoever performs it may let go of it then.
+/// activityDidFinish or activityDidFail; whoever performs it may let go of it then, or begin again: after an error, say.
 #pragma once
 
 #include "base/Error.h"
@@ -48,13 +48,13 @@ public:
     /// With whom it was shared, or where what was made lies, as far as that is known by its end: a device's name, a path.
     virtual std::string receiver() const { return {}; }
 
-    /// It is over. Only the first end counts.
+    /// It is over. Only the first end counts, until it is performed again.
     void activityDidFinish(bool completed);
     /// The same, not completed, with what the user has to know. The error carries a message for people.
     void activityDidFail(base::ErrorRef error);
 
-    // For whoever performs it.
-    void setEndHandler(std::function<void(const End&)> handler) { here(m_endHandler) = std::move(handler); }
+    // For whoever performs it, each time anew.
+    void setEndHandler(std::function<void(const End&)> handler);
     /// `progress` from 0 to 1, nothing while that is not known.
     void setProgressHandler(std::function<void(std::optional<double> progress)> handler)
     {

@@ -32,6 +32,27 @@ TEST(AnActivity, EndsOnceHoweverOftenItSaysSo)
     EXPECT_EQ(ends[0].error->description(), "the device has gone");
 }
 
+TEST(AnActivity, EndsAgainWhenItIsPerformedAgain)
+{
+    const auto sending = std::make_shared<Sending>();
+    std::vector<bool> ends;
+    const auto begin = [&] {
+        sending->setProgressHandler([&](std::optional<double>) { ends.push_back(false); });
+        sending->setEndHandler([&](const Activity::End& end) { ends.push_back(end.completed); });
+    };
+    begin();
+    sending->activityDidFail(base::Error::make("test", 1, "the device is asleep"));
+    sending->setEndHandler({});
+    sending->activityDidFinish(true);
+    EXPECT_EQ(ends, std::vector<bool>{false});
+
+    begin();
+    sending->tell(0.5);
+    sending->activityDidFinish(true);
+    sending->activityDidFinish(true);
+    EXPECT_EQ(ends, (std::vector<bool>{false, false, true}));
+}
+
 TEST(AnActivity, MayBeLetGoOfByWhoHearsOfItsEnd)
 {
     auto sending = std::make_shared<Sending>();
