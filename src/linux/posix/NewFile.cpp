@@ -141,6 +141,24 @@ int NewFile::takeName(const std::string& name)
     return failed;
 }
 
+int NewFile::replace(const std::string& name)
+{
+    // Only what has a name can take that of another.
+    std::string between;
+    int failed = 0;
+    do {
+        between = nextHiddenName();
+        failed = takeName(between);
+    } while (failed == EEXIST);
+    if (failed != 0)
+        return failed;
+    if (::renameat(m_directory, between.c_str(), m_directory, name.c_str()) == 0)
+        return 0;
+    failed = errno;
+    m_hiddenName = between; // which goes with this
+    return failed;
+}
+
 int NewFile::tryName(const std::string& name) const
 {
     if (m_hiddenName.empty()) {

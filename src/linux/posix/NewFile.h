@@ -39,6 +39,8 @@ public:
 
     /// Gives it its name; nothing that has that name already is replaced. After seal(); again after an error. 0, or errno.
     int takeName(const std::string& name);
+    /// The same, in the place of what has that name; there is a whole file of that name all the time. 0, or errno.
+    int replace(const std::string& name);
 
 private:
     NewFile(int directory, FileDescriptor file, std::string hiddenName);

@@ -122,6 +122,31 @@ TEST_F(ANewFile, ReplacesNothingAndCanTakeAnotherName)
     }
 }
 
+TEST_F(ANewFile, TakesThePlaceOfAnotherWhenItIsTold)
+{
+    for (const bool isHidden : {false, true}) {
+        directory.write("place/movie.mp4", "what was there");
+        int number = -1;
+        const std::vector<RefusedSystemCall> refused =
+            isHidden ? std::vector{tests::noUnnamedFiles()} : std::vector<RefusedSystemCall>();
+        const auto replace = [&] { number = make().replace("movie.mp4"); };
+        if (isHidden)
+            tests::whileRefusing(refused, replace);
+        else
+            replace();
+        EXPECT_EQ(number, 0);
+        EXPECT_EQ(contents(), "contents");
+        EXPECT_THAT(namesIn(place), ElementsAre("movie.mp4"));
+    }
+}
+
+TEST_F(ANewFile, ThatCannotTakeThePlaceOfAnotherLeavesNothingBehind)
+{
+    directory.write("place/movie.mp4/within", "it is a directory");
+    EXPECT_EQ(make().replace("movie.mp4"), EISDIR);
+    EXPECT_THAT(namesIn(place), ElementsAre("movie.mp4"));
+}
+
 TEST_F(ANewFile, TakesNoNameThatIsALinkToNothing)
 {
     fs::create_symlink("nowhere", place / "movie.mp4");

@@ -1,0 +1,13 @@
+#include "support/PrivateBus.h"
+
+#include <QCoreApplication>
+
+#include <gmock/gmock.h>
+
+int main(int argc, char** argv)
+{
+    const tests::PrivateBus bus;
+    const QCoreApplication application(argc, argv);
+    ::testing::InitGoogleMock(&argc, argv);
+    return RUN_ALL_TESTS();
+}
