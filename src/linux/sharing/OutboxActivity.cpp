@@ -87,7 +87,7 @@ void OutboxActivity::workInBackground(Work work, std::function<void()> done)
         return wanted->load();
     };
     m_environment.system.defaultQueue.post(
-        [weak, &main, goOn, work = std::move(work), done = std::move(done)]() mutable {
+        [weak, &main, turn = turn(), goOn, work = std::move(work), done = std::move(done)]() mutable {
             main.post([weak, turn, result = work(goOn), done = std::move(done)] {
                 // Locked here: a strong reference on the worker could be the last one and end us on the wrong thread.
                 const auto self = weak.lock();

@@ -370,6 +370,36 @@ TEST_F(ThePortal, TellsNothingOfHowLongTheUserTakes)
     EXPECT_FALSE(told.back());
 }
 
+TEST_F(ThePortal, CanBeAskedAgain)
+{
+    start("fail");
+    const auto activity = activityOf(kActivityTypeMail);
+    begin(activity);
+    ASSERT_TRUE(pump([&] { return end.has_value(); }));
+    expectFailure(*end, "SHARE_MAIL_REFUSED");
+    activity->setEndHandler({});
+    start("done");
+    begin(activity);
+    ASSERT_TRUE(pump([&] { return end.has_value(); }));
+    EXPECT_TRUE(end->completed);
+    EXPECT_EQ(options("ComposeEmail")["attachment_fds"].toArray().size(), 1);
+}
+
+TEST_F(ThePortal, IsNotAskedTwiceWhenItIsAskedAgainBeforeTheFileWasReady)
+{
+    start("hold");
+    const auto activity = activityOf(kActivityTypeMail);
+    begin(activity);
+    activity->cancel();
+    EXPECT_TRUE(end);
+    activity->setEndHandler({});
+    begin(activity);
+    ASSERT_TRUE(pump([&] { return !calls("ComposeEmail").empty(); }));
+    find();
+    EXPECT_THAT(calls("ComposeEmail"), SizeIs(1));
+    EXPECT_FALSE(end);
+}
+
 TEST_F(ThePortal, MayLetGoOfTheActivityInItsEnd)
 {
     start("done");
