@@ -50,6 +50,8 @@ BluetoothActivity::~BluetoothActivity()
 
 void BluetoothActivity::send()
 {
+    m_next = 0;
+    m_sent = 0;
     findService([this] {
         // Now that the user wants it, it may be started; it runs only while somebody sends.
         m_calls.ask(m_bus, questionToBus("StartServiceByName", {serviceName(), 0U}), kStartLimit,
@@ -166,6 +168,7 @@ void BluetoothActivity::look()
         return;
     }
     if (transfer.status == QLatin1String("error") || transfer.isRemoved) {
+        m_transfer.clear(); // there is nothing to be cancelled
         failed("SHARE_DEVICE_BROKEN_OFF", transfer.isRemoved ? "the transfer was removed" : "the transfer has failed");
         return;
     }

@@ -37,6 +37,12 @@ HandingOver::HandingOver(const sharing::Environment& environment, const Way& way
 
 void HandingOver::send()
 {
+    m_next = 0;
+    handOverNext();
+}
+
+void HandingOver::handOverNext()
+{
     if (m_next == files().size()) {
         complete();
         return;
@@ -57,7 +63,7 @@ void HandingOver::ask(const QDBusMessage& question, Calls::Answer answer)
 void HandingOver::accepted()
 {
     ++m_next;
-    send();
+    handOverNext();
 }
 
 void HandingOver::deviceGone(const std::string& why)

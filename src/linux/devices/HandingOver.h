@@ -28,6 +28,7 @@ protected:
 private:
     void send() final;
     void stop() final { m_calls.forget(); }
+    void handOverNext();
     void failed(const QDBusMessage& reply);
 
     QDBusConnection m_bus;

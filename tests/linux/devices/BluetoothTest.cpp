@@ -145,6 +145,22 @@ TEST_F(SendingByBluetooth, SaysThatTheTransferFailed)
     ASSERT_TRUE(hasSaid("session removed"));
 }
 
+TEST_F(SendingByBluetooth, CanBeTriedAgain)
+{
+    m_items.emplace_back(base::Url::fromPath(m_directory.write("notes.txt", std::string(100'001, 'n'))));
+    serve();
+    startSending();
+    m_obexd->command("complete");
+    ASSERT_TRUE(hasSaid("sending Tux Racer notes.txt"));
+    m_obexd->command("error");
+    awaitEnd();
+    start();
+    ASSERT_TRUE(hasSaid("sending Tux Racer notes.txt\nsession removed\nsession 00:00:5E:00:53:02 opp "
+                        "00:00:5E:00:53:01\nsending Tux Racer movie.mp4"));
+    m_obexd->command("progress 100000");
+    ASSERT_TRUE(hasTold(100'000.0 / 400'004));
+}
+
 TEST_F(SendingByBluetooth, SaysThatTheTransferVanished)
 {
     serve();

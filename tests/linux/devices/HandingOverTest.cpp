@@ -5,7 +5,6 @@
 
 #include <sys/syscall.h>
 
-using testing::ElementsAre;
 using testing::HasSubstr;
 
 namespace tests {
@@ -92,9 +91,25 @@ TEST_F(HandingOver, SaysWhichDeviceHasGone)
     EXPECT_FALSE(m_system.log.texts(base::MemoryLog::Line::Kind::Error).empty());
 }
 
+TEST_F(HandingOver, CanBeTriedAgain)
+{
+    m_items.emplace_back(base::Url::fromPath(m_directory.write("notes.txt", m_notes)));
+    Scripted daemon("kdeconnect.py", m_session.address(), phone(receiving(R"(, "refuses": "notes.txt")")));
+    find();
+    start();
+    awaitEnd();
+    EXPECT_FALSE(m_going.end->completed);
+    daemon.command("relent");
+    std::filesystem::remove(m_directory.path() / "received/Tux Racer movie.mp4");
+    start();
+    expectCompleted();
+    EXPECT_TRUE(isReceived("Tux Racer movie.mp4", m_bytes));
+    EXPECT_TRUE(isReceived("Tux Racer notes.txt", m_notes));
+}
+
 TEST_F(HandingOver, SaysWhatWasRefused)
 {
-    Scripted daemon("kdeconnect.py", m_session.address(), phone(receiving(R"(, "refuses": true)")));
+    Scripted daemon("kdeconnect.py", m_session.address(), phone(receiving(R"(, "refuses": "movie.mp4")")));
     find();
     start();
     expectFailure(
@@ -211,7 +226,8 @@ TEST_F(HandingOver, CanBeLetGoOfByWhoHearsOfItsEnd)
 TEST_F(HandingOver, TellsHowFarCopyingIs)
 {
     Scripted daemon("kdeconnect.py", m_session.address(), phone(receiving()));
-    const std::string large(20'000'000, 'x');
+    std::string large;
+    large.resize(20'000'000, 'x');
     m_items = {base::Url::fromPath(m_directory.write("large.mp4", large))};
     find();
     start();

@@ -2,7 +2,7 @@
 """KDE Connect's daemon as its users on the bus see it.
 
 The script has its `devices`: by identifier their properties and their `plugins`; where it is to receive files; whether it
-takes them `later`.
+takes them `later`; how the address of one that it `refuses` ends.
 """
 from gi.repository import GLib
 
@@ -52,13 +52,16 @@ class KdeConnect(Service):
         return GLib.Variant("(b)", (name in self.known[path.rsplit("/", 1)[1]]["plugins"],))
 
     def shareUrl(self, _path, url):
-        if "refuses" in self.script:
+        if url.endswith(self.script.get("refuses", "nothing")):
             raise Refusal("org.freedesktop.DBus.Error.Failed", "no")
         if "later" in self.script:
             self.waiting.append(url)
             self.tell("accepted " + url)
         else:
             self.receive(url)
+
+    def do_relent(self, _):
+        del self.script["refuses"]
 
     def do_transfer(self, _):
         for url in self.waiting:
