@@ -1,6 +1,7 @@
 // What the portal is asked for each of them, and what comes of what it answers.
 
 #include "linux/portals/Desktop.h"
+#include "linux/portals/OpenUri.h"
 #include "platform/sharing/ActivityTypes.h"
 
 #include <csignal>
@@ -19,6 +20,26 @@ namespace fs = std::filesystem;
 using tests::PrivateDirectory;
 
 class ThePortal : public tests::Desktop {};
+
+TEST_F(ThePortal, OpensAddresses)
+{
+    const auto portal = std::make_shared<portals::Portal>(machine.system, bus::Bus::session(),
+                                                          [] { return std::string("wayland:handle"); });
+    for (const auto& [behaviour, expected] : {std::pair("done", portals::PortalRequest::End::Done),
+                                              std::pair("cancel", portals::PortalRequest::End::Cancelled),
+                                              std::pair("fail", portals::PortalRequest::End::Refused)}) {
+        start(behaviour);
+        std::optional<portals::PortalRequest::End> how;
+        const auto request =
+            portals::openUri(portal, "https://example.org/?a=b",
+                             [&](const portals::PortalRequest::Outcome& outcome) { how = outcome.end; });
+        EXPECT_TRUE(pump([&] { return how.has_value(); }));
+        EXPECT_EQ(how, expected);
+    }
+    const QJsonArray arguments = calls("OpenURI")[0]["arguments"].toArray();
+    EXPECT_EQ(arguments[0].toString(), "wayland:handle");
+    EXPECT_EQ(arguments[1].toString(), "https://example.org/?a=b");
+}
 
 TEST_F(ThePortal, ComposesAMailWithTheMovieAndWhatGoesAlong)
 {
