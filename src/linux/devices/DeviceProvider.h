@@ -4,7 +4,7 @@
 /// have one name, their titles tell them apart, those that have been told before too.
 #pragma once
 
-#include "linux/devices/Bus.h"
+#include "linux/devices/Calls.h"
 #include "linux/sharing/Environment.h"
 #include "platform/sharing/ActivityProvider.h"
 

@@ -4,7 +4,6 @@
 /// it was ended before.
 #pragma once
 
-#include "linux/devices/Bus.h"
 #include "linux/devices/Calls.h"
 #include "linux/devices/DeviceActivity.h"
 
