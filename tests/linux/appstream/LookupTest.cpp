@@ -193,6 +193,7 @@ TEST_F(StoreLookup, TheDeveloperMayStandInAnElementOfItsOwn)
     EXPECT_THAT(developer("<developer id=\"example.org\"><name xml:lang=\"de\">Die Maler</name><name>The &amp; "
                           "Painters</name></developer>"),
                 Optional(std::string("The & Painters")));
+    EXPECT_THAT(developer("<developer><name>Solo</name>and friends</developer>"), Optional(std::string("Solo")));
     EXPECT_THAT(developer("<developer><name>New</name></developer><developer_name>Old</developer_name>"),
                 Optional(std::string("Old")));
     EXPECT_EQ(developer("<developer id=\"example.org\"/>"), std::nullopt);

@@ -25,6 +25,8 @@ struct Witness {
     std::set<std::thread::id> threads;
     std::map<std::string, Facts> known;
     std::shared_future<void> mayAnswer;
+    std::promise<void> asked; ///< for the first time
+    bool isAsked = false;
     std::promise<void> reviewed; ///< for the first time
     bool isReviewed = false;
 
@@ -44,6 +46,8 @@ public:
     std::optional<Facts> find(const std::string& identifier, bool inUsersLanguages) override
     {
         m_witness.saw(identifier + (inUsersLanguages ? " translated" : " as written"));
+        if (!std::exchange(m_witness.isAsked, true))
+            m_witness.asked.set_value();
         if (m_witness.mayAnswer.valid())
             m_witness.mayAnswer.wait();
         const auto found = m_witness.known.find(identifier);
@@ -203,6 +207,20 @@ TEST_F(StoreService, WithoutASourceThereIsNoResponse)
     EXPECT_FALSE(ask({"a"}).get());
     store.reset();
     EXPECT_THAT(published.calls, IsEmpty());
+}
+
+TEST_F(StoreService, WhatIsFoundAfterTheEndIsToldToNobody)
+{
+    std::promise<void> mayAnswer;
+    installed.mayAnswer = mayAnswer.get_future().share();
+    open();
+    store->start({platform::kStoreKeyProfileProduct, 1, {"a"}},
+                 [](const auto&, const auto&) { FAIL() << "it had ended"; });
+    installed.asked.get_future().wait();
+    store->end();
+    mayAnswer.set_value();
+    store.reset();
+    EXPECT_THAT(installed.calls, testing::Contains("a translated"));
 }
 
 TEST_F(StoreService, AfterTheEndNobodyIsAskedOrAnswered)
