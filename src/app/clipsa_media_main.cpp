@@ -6,6 +6,7 @@
 #include "app/host/MixMovie.h"
 #include "app/host/ProbeMovie.h"
 #include "app/host/SaveMovie.h"
+#include "app/host/ShareMovie.h"
 #include "app/host/Streams.h"
 #include "app/host/TrimMovie.h"
 
@@ -39,6 +40,11 @@ int run(const host::ProbeCommand& command)
 int run(const host::SaveCommand& command)
 {
     return host::saveMovie(command);
+}
+
+int run(const host::ShareCommand& command)
+{
+    return host::shareMovie(command);
 }
 
 } // namespace

@@ -95,6 +95,7 @@ const runtime::Class& VKVideoEditorViewController::classObject()
             .method("undoAction", &Self::undoAction)
             .method("doneAction", &Self::doneAction)
             .method("saveAction", &Self::saveAction)
+            .method("shareAction", &Self::shareAction)
             .method("togglePlayback", &Self::togglePlayback)
             .method("leave", &Self::leave)
             .method("seekBackward", &Self::seekBackward)
@@ -277,6 +278,7 @@ std::vector<platform::KeyCommand> VKVideoEditorViewController::keyCommands() con
         {Key::Character, 'i', false, Selector("trimStartHere")},
         {Key::Character, 'o', false, Selector("trimEndHere")},
         {Key::Return, 0, false, Selector("confirmTrim")},
+        {Key::Character, 's', true, Selector("shareAction"), true},
         {Key::Escape, 0, false, Selector("leave")},
     };
 }

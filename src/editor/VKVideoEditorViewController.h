@@ -2,13 +2,14 @@
 /// activities the user completed. Main queue only.
 ///
 /// Split by concern: construction and lifecycle here and in the .cpp of this name, the two arrangements in +Layout,
-/// playing in +Playback, the scrubber and trim mode in +Trimming, its pictures in +Thumbnails, finishing in +Finish.
+/// playing in +Playback, the scrubber and trim mode in +Trimming, its pictures in +Thumbnails, sharing in +Sharing, finishing in +Finish.
 #pragma once
 
 #include "editor/VKVideoEditorProperties.h"
 #include "platform/hosting/Platform.h"
 #include "platform/views/ViewController.h"
 
+class VKStoreInfo;
 class VKVideoEditorViewController;
 
 class VKVideoEditorViewControllerDelegate {
@@ -125,6 +126,12 @@ public:
     /// Saves and finishes; in trim mode it applies the trim instead.
     void saveAction();
 
+    // Sharing.
+    /// Opens the share sheet, on the main queue's next turn, and resets the top bar.
+    void shareAction();
+    /// Asks the store about the app first; the sheet comes with its answer.
+    void displayShareSheetWithVideoURL(const std::optional<base::Url>& url);
+
     // Keys: what has no button of its own.
     void togglePlayback();
     void leave();
@@ -165,6 +172,11 @@ private:
     static void saveMixed(const std::shared_ptr<VKVideoEditorViewController>& self,
                           const std::optional<base::Url>& output, const base::ErrorRef& error);
     void savedToLibrary(const base::ErrorRef& error);
+    void share();
+    void presentShareSheet(const std::optional<base::Url>& url, const VKStoreInfo& info);
+    platform::ShareItems shareItems(const std::optional<base::Url>& url, const VKStoreInfo& info) const;
+    std::string shareText(const VKStoreInfo& info) const;
+    std::shared_ptr<platform::Activity> videoServiceActivity() const;
     /// Any thread.
     static void handThumbnailOver(base::MainQueue& mainQueue, const std::weak_ptr<VKVideoEditorViewController>& editor,
                                   double timestamp);

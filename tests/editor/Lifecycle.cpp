@@ -240,7 +240,7 @@ TEST_F(Lifecycle, EveryKeyHasAnActionThatTheEditorAnswers)
             std::tuple(Key::Period, '\0', false, "stepForward"), std::tuple(Key::Home, '\0', false, "goToStart"),
             std::tuple(Key::End, '\0', false, "goToEnd"), std::tuple(Key::Character, 'i', false, "trimStartHere"),
             std::tuple(Key::Character, 'o', false, "trimEndHere"), std::tuple(Key::Return, '\0', false, "confirmTrim"),
-            std::tuple(Key::Escape, '\0', false, "leave")));
+            std::tuple(Key::Character, 's', true, "shareAction"), std::tuple(Key::Escape, '\0', false, "leave")));
 }
 
 TEST_F(Lifecycle, ArrowsMoveThePlayHeadByASecondAndHomeAndEndToTheEnds)

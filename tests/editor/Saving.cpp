@@ -275,9 +275,9 @@ TEST_F(Saving, TheLogSaysSoBeforeTheListDoes)
     const auto& system = fake->machine.system;
     const base::System heard{log, system.clock, system.mainQueue, system.backgroundQueue, system.defaultQueue};
     const auto& roles = fake->platform;
-    const platform::Platform platform{heard,          roles.notifications, roles.device,  roles.mainScreen,
-                                      roles.images,   roles.files,         roles.bundles, roles.words,
-                                      roles.calendar, roles.media,         roles.photos};
+    const platform::Platform platform{heard,        roles.notifications, roles.device, roles.mainScreen, roles.images,
+                                      roles.files,  roles.bundles,       roles.words,  roles.calendar,   roles.media,
+                                      roles.photos, roles.store,         roles.sharing};
     std::vector<std::size_t> listed;
     log.heard = [&](std::string_view text) {
         if (text == "saveAction")

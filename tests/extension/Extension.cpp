@@ -96,9 +96,9 @@ TEST_F(Extension, EachLineOfTheLogComesBeforeWhatItTellsOf)
     };
     const base::System system{log, fake.machine.clock, fake.machine.mainQueue, fake.machine.backgroundQueue,
                               fake.machine.defaultQueue};
-    const platform::Platform platform{system,        fake.notifications, fake.device,  *fake.window,
-                                      fake.images,   fake.files,         fake.bundles, fake.words,
-                                      fake.calendar, fake.media,         fake.photos};
+    const platform::Platform platform{system,      fake.notifications, fake.device, *fake.window,  fake.images,
+                                      fake.files,  fake.bundles,       fake.words,  fake.calendar, fake.media,
+                                      fake.photos, fake.store,         fake.sharing};
     offerRequired();
     start(platform);
     deliverRequired();

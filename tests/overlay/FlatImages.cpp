@@ -40,8 +40,8 @@ protected:
             const Masks& masks;
         } images(masks);
         const platform::Platform platform{
-            fake.machine.system, fake.notifications, fake.device,   *fake.window, images,     fake.files,
-            fake.bundles,        fake.words,         fake.calendar, fake.media,   fake.photos};
+            fake.machine.system, fake.notifications, fake.device, *fake.window, images,     fake.files,  fake.bundles,
+            fake.words,          fake.calendar,      fake.media,  fake.photos,  fake.store, fake.sharing};
         return FlatButton::_createOverlayImageWithBackgroundWhite_backgroundAlpha_glyphAlpha(platform, 1, 1, 1);
     }
 };

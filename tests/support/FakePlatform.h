@@ -10,6 +10,8 @@
 #include "support/FakeFileManager.h"
 #include "support/FakeMedia.h"
 #include "support/FakePhotoLibrary.h"
+#include "support/FakeSharing.h"
+#include "support/FakeStoreLookup.h"
 #include "support/TestSystem.h"
 
 #include <map>
@@ -87,14 +89,16 @@ struct FakePlatform {
     FakeCalendar calendar;
     FakeMediaFramework media;
     FakePhotoLibrary photos;
+    FakeStoreLookup store;
+    FakeSharing sharing;
     platform::Platform platform;
 
     explicit FakePlatform(base::Size size = kPhone, double scale = 1)
         : window(std::make_shared<platform::Window>(machine.mainQueue, size, scale)), images(*window),
           files(machine.system),
-          media(machine.mainQueue, notifications), platform{machine.system, notifications, device,  *window,
-                                                            images,         files,         bundles, words,
-                                                            calendar,       media,         photos}
+          media(machine.mainQueue, notifications), platform{machine.system, notifications, device, *window,  images,
+                                                            files,          bundles,       words,  calendar, media,
+                                                            photos,         store,         sharing}
     {
     }
 };

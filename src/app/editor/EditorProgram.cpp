@@ -1,6 +1,5 @@
 #include "app/editor/EditorProgram.h"
 
-#include "app/editor/MovieThumbnail.h"
 #include "app/editor/NoticeScreen.h"
 #include "app/editor/Script.h"
 #include "app/editor/StartTrace.h"
@@ -10,8 +9,8 @@
 #include "linux/dbus/Chassis.h"
 #include "linux/ffmpeg/CubebOutput.h"
 #include "linux/xdg/Chassis.h"
+#include "linux/xdg/InstalledResources.h"
 #include "linux/xdg/MountTable.h"
-#include "support/VKFileManagerExtensions.h"
 
 #include <QGuiApplication>
 #include <QScreen>
@@ -69,24 +68,11 @@ base::Size firstWindowSize(const EditorOptions& options)
     return {std::min<double>(wanted.width, room.width()), std::min<double>(wanted.height, room.height())};
 }
 
-/// Where the programs are installed, their resources are beside them: beside bin/, or beside libexec/clipsa/.
-std::string resourceDirectory()
-{
-    const std::string programs = QCoreApplication::applicationDirPath().toStdString();
-    const std::string beside = programs + "/../share/clipsa"; // first: another Clipsa's may be further away
-    return std::filesystem::exists(beside) ? beside : programs + "/../../share/clipsa";
-}
-
-std::string wordsPath()
-{
-    return resourceDirectory() + "/Clipsa.bundle";
-}
-
 xdg::MountTable mounts(const EditorOptions& options)
 {
     xdg::MountTable table;
     table.mount(xdg::kPrivateLibraryPrefix, options.deviceRoot);
-    table.mount(xdg::kSystemLibraryPrefix, resourceDirectory() + "/System/Library");
+    table.mount(xdg::kSystemLibraryPrefix, xdg::resourceDirectory() + "/System/Library");
     return table;
 }
 
@@ -106,13 +92,14 @@ EditorProgram::EditorProgram(const EditorOptions& options)
       m_window(std::make_shared<platform::Window>(m_mainQueue, firstWindowSize(options), 1.0)),
       m_device(deviceValues(options), [this] { return m_window->bounds().width(); }),
       m_images([this] { return m_window->scale(); }), m_files(m_system, mounts(options)),
-      m_bundles(m_files, m_languages, xdg::BundlePlaces::ofUser()), m_words(m_bundles, wordsPath()),
+      m_bundles(m_files, m_languages, xdg::BundlePlaces::ofUser()), m_words(m_bundles, xdg::wordsPath()),
       m_media(m_system, m_notifications,
               {[this](const std::string& path) { return m_files.resolvedPath(path); }, ffmpeg::cubebOutput(m_log),
                &m_works, kImageNiceness}),
-      m_photos(libraryOptions(), m_log, m_works), m_platform{m_system,   m_notifications, m_device,  *m_window,
-                                                             m_images,   m_files,         m_bundles, m_words,
-                                                             m_calendar, m_media,         m_photos},
+      m_photos(libraryOptions(), m_log, m_works), m_store(m_log, storefront::Options::ofUser()),
+      m_sharing(sharingOptions()), m_platform{m_system, m_notifications, m_device, *m_window,  m_images,
+                                              m_files,  m_bundles,       m_words,  m_calendar, m_media,
+                                              m_photos, m_store,         m_sharing},
       m_presenter(m_window, m_clock, m_words), m_connection(std::make_shared<dbus::ExtensionConnection>(m_mainQueue)),
       m_payload(m_mainQueue, [this] { openMovie(); }), m_busy(options.deviceRoot),
       m_workWatch(m_mainQueue, m_works,
@@ -175,14 +162,15 @@ base::Result<void> EditorProgram::start()
     m_connection->setDisconnectedHandler([this] { disconnected(); });
     m_connection->setSentHandler([this] { m_mainQueue.postAfter(kFarewellLimit, [this] { disconnected(); }); });
 
-    if (!m_bundles.bundleWithPath(wordsPath()))
-        m_log.error("there are no words at " + wordsPath() + "; install Clipsa again");
+    if (!m_bundles.bundleWithPath(xdg::wordsPath()))
+        m_log.error("there are no words at " + xdg::wordsPath() + "; install Clipsa again");
     m_presenter.setTitle("Clipsa");
     m_presenter.setCloseHandler([this] { closeRequested(); });
     m_presenter.setLiveBlur(m_device.graphicsQuality() != VKVideoOverlayButton::kGraphicsQualityWithoutBlur);
     m_presenter.setFirstPictureHandler([this] {
         m_pictureSeen = true;
         markStart("first-picture");
+        m_store.prepare(); // there is time now, and none when Share is pressed
     });
     if (const std::string script = base::environment("CLIPSA_SCRIPT"); !script.empty())
         m_script = std::make_unique<Script>(*this, script);
@@ -333,39 +321,6 @@ void EditorProgram::leaveWhenDone()
     m_leaving = true;
     if (!m_workWatch.isWorking())
         QGuiApplication::exit(); // quit() would ask the window, which never closes by itself
-}
-
-/// The library names the movie after the app and the date of the recording as it came.
-void EditorProgram::learnAboutRecording()
-{
-    const auto current = editor();
-    if (!current || !current->originalVideoURL())
-        return;
-    const auto created = VKExtensions::_srGetCreationDateForFile(m_files, *current->originalVideoURL());
-    if (created)
-        m_recording.setValue({current->applicationName().value_or(""), created});
-}
-
-photos::LibraryOptions EditorProgram::libraryOptions()
-{
-    photos::LibraryOptions options;
-    options.directories = photos::UserDirectories::ofUser();
-    options.resolvedPath = [this](const std::string& path) { return m_files.resolvedPath(path); };
-    options.recording = [this](const std::string&) { return m_recording.value(); };
-    options.thumbnail = [this](const std::string& path, int side) {
-        return movieThumbnail(m_mainQueue, m_media, path, side);
-    };
-    options.published = [this](const std::string& path) { m_report.add({dbus::MovieNote::Kind::Saved, path, {}}); };
-    // A save ends the editor, whose end empties the store: what could not be saved must be elsewhere by then. Beside
-    // the store there is always a way, as it needs no room there.
-    options.unsavedDirectories = {options.directories.unsaved,
-                                  std::filesystem::path(m_options.deviceRoot).parent_path().parent_path() / "unsaved"};
-    options.unsaved = [this](const base::ErrorRef& why, const base::Result<std::string>& kept) {
-        const std::string words = why->description();
-        m_report.add({dbus::MovieNote::Kind::Unsaved, kept.valueOr({}),
-                      kept ? words : words + "; " + kept.error()->description()});
-    };
-    return options;
 }
 
 } // namespace app

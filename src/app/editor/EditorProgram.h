@@ -9,6 +9,7 @@
 #include "app/editor/PayloadWatch.h"
 #include "app/editor/ScriptClock.h"
 #include "app/editor/WorkWatch.h"
+#include "app/sharing/ShareServices.h"
 #include "base/Affinity.h"
 #include "base/SharedValue.h"
 #include "base/WorkList.h"
@@ -23,6 +24,7 @@
 #include "linux/photos/VideoLibrary.h"
 #include "linux/qt/Presenter.h"
 #include "linux/qt/SvgImageCatalog.h"
+#include "linux/storefront/AppStreamStore.h"
 #include "linux/xdg/Bundles.h"
 #include "linux/xdg/DeviceProfile.h"
 #include "linux/xdg/FileManager.h"
@@ -100,6 +102,9 @@ private:
     void cancelTrims() const;
     void leaveWhenDone();
     photos::LibraryOptions libraryOptions();
+    ShareServices::Options sharingOptions();
+    std::string nameOf(const base::Url& file) const;
+    void reportShared(const platform::Activity& activity, const platform::Activity::End& end);
     void learnAboutRecording();
 
     base::Affinity m_affinity;
@@ -127,6 +132,8 @@ private:
     intl::Calendar m_calendar;
     ffmpeg::FFmpegMediaFramework m_media;
     photos::VideoLibrary m_photos;
+    storefront::AppStreamStore m_store;
+    ShareServices m_sharing;
     platform::Platform m_platform;
     qtui::Presenter m_presenter;
 

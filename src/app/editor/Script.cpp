@@ -189,68 +189,9 @@ bool Script::carryOut(const Words& words)
     return false;
 }
 
-bool Script::waitFor(const std::string& what)
-{
-    if (what == "waiting")
-        return true; // it is not started earlier
-    if (what == "busy")
-        return m_program.presenter().workLine().isUnderWay() && m_program.presenter().workLine().width() > 0;
-    const auto editor = m_program.editor();
-    if (!editor)
-        return false;
-    if (what == "picture") {
-        if (editor->currentItemLoaded() && editor->avAsset()->tracksWithMediaType(platform::MediaType::Video).empty())
-            fail("the movie has no pictures to show, only sound");
-        return m_program.hasShownPicture();
-    }
-    if (what == "ready")
-        return editor->currentItemLoaded() || editor->avPlayerItem()->status() == platform::PlayerItem::Status::Failed;
-    if (what == "thumbnails") {
-        const auto& wanted = editor->avTrimmer()->timestamps();
-        const auto& here = editor->avTrimmer()->thumbnails();
-        return !wanted.empty()
-               && std::all_of(wanted.begin(), wanted.end(), [&](double timestamp) { return here.contains(timestamp); });
-    }
-    if (what == "zoomed")
-        return editor->avTrimmer()->isZoomed();
-    if (what == "fine") {
-        const auto frame = editor->avPlayer()->currentFrame();
-        return frame && !ffmpeg::FFmpegMediaFramework::isReduced(*frame);
-    }
-    if (what == "trimming")
-        return editor->isTrimming();
-    if (what == "trimmed")
-        return !editor->isTrimming() && editor->currentItemLoaded();
-    if (what == "hidden" || what == "shown") // and what the fade takes
-        return editor->isUIHidden() == (what == "hidden")
-               && m_program.system().clock.now() - *m_since > VKVideoEditorViewController::kFadeDuration;
-    return false;
-}
-
-bool Script::waitForFrame(const Words& words)
-{
-    constexpr double kLongestFrame = 0.5; // seconds
-    constexpr base::Instant kStill = std::chrono::seconds(3);
-    const auto editor = m_program.editor();
-    const auto frame = editor ? editor->avPlayer()->currentFrame() : nullptr;
-    if (!frame)
-        return false;
-    if (words.size() > 2)
-        return frame->time().seconds() >= number(words[2]);
-    // A recording that stands still has one picture for a long time, and one that begins late has its first picture
-    // before that: what does not change any more is the one.
-    const base::Instant now = m_program.system().clock.now();
-    if (m_waitedFrame.lock() != frame || m_waitedSince < *m_since) {
-        m_waitedFrame = frame;
-        m_waitedSince = now;
-    }
-    const double since = editor->avPlayer()->currentTime().seconds() - frame->time().seconds();
-    return (since >= 0 && since < kLongestFrame) || now - m_waitedSince > kStill;
-}
-
 std::optional<base::Point> Script::middleOf(const std::string& name) const
 {
-    const auto view = viewNamed(m_program.window().rootViewController()->view(), m_program.words().text(name));
+    const auto view = viewNamed(m_program.window().self<platform::View>(), m_program.words().text(name));
     if (!view)
         return std::nullopt;
     return view->convertToRoot({view->bounds().width() / 2, view->bounds().height() / 2});

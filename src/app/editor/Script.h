@@ -9,6 +9,7 @@
 ///   wait thumbnails        until the strip has all its pictures
 ///   wait zoomed            until the strip shows the moments around a grip that is held still
 ///   wait trimming|trimmed  until trim mode is on; until it is off and the movie then shown is ready
+///   wait sheet|editor      until the share sheet is all there; until nothing stands above the editor any more
 ///   wait frame [SECONDS]   until the picture of the present time is on the screen (the one that does not change any
 ///                          more, where the recording stands still), or that of SECONDS or a later one
 ///   wait fine              until that picture is as fine as the recording's: one that is dragged past is not at first

@@ -23,6 +23,8 @@ const char* const kHelpText = R"(Clipsa looks at, trims, saves and shares a scre
   clipsa probe MOVIE [--json]   say what MOVIE is made of
   clipsa save MOVIE [--app-name NAME]
                                 mix the sound of MOVIE and put it into the library of videos
+  clipsa share MOVIE --list | --with TYPE [--message TEXT]
+                                say what MOVIE could be shared with, or share it
   clipsa --help, --version
 
 Options of open, and of tour:

@@ -183,6 +183,25 @@ base::Result<void> expectWhole(const SaveCommand&)
     return {};
 }
 
+base::Result<void> takeOption(ShareCommand& command, Words& words)
+{
+    if (words.word() == "--list")
+        return takeFlag(command.list, words);
+    if (words.word() == "--with")
+        return takeText(command.with, words);
+    if (words.word() == "--message")
+        return takeText(command.message, words);
+    return unknownOption("share", words);
+}
+
+base::Result<void> expectWhole(const ShareCommand& command)
+{
+    if (command.list == !command.with.empty())
+        return usageError(command.list ? "share either lists (--list) or shares (--with TYPE)"
+                                       : "say with what to share: --with TYPE; --list says what there is");
+    return {};
+}
+
 /// `words` stand at the command's name.
 template <typename Command> base::Result<std::optional<MediaCommand>> parse(const std::string& name, Words words)
 {
@@ -206,11 +225,9 @@ struct Parser {
     base::Result<std::optional<MediaCommand>> (*parse)(const std::string& name, Words words);
 };
 
-constexpr Parser kParsers[] = {{"trim", parse<TrimCommand>},
-                               {"mix", parse<MixCommand>},
-                               {"thumbnails", parse<ThumbnailsCommand>},
-                               {"probe", parse<ProbeCommand>},
-                               {"save", parse<SaveCommand>}};
+constexpr Parser kParsers[] = {
+    {"trim", parse<TrimCommand>},   {"mix", parse<MixCommand>},   {"thumbnails", parse<ThumbnailsCommand>},
+    {"probe", parse<ProbeCommand>}, {"save", parse<SaveCommand>}, {"share", parse<ShareCommand>}};
 
 const Parser* parserOf(const std::string& name)
 {

@@ -44,7 +44,15 @@ struct SaveCommand {
     std::string appName; ///< empty: the movie's file name without its extension
 };
 
-using MediaCommand = std::variant<TrimCommand, MixCommand, ThumbnailsCommand, ProbeCommand, SaveCommand>;
+struct ShareCommand {
+    std::string movie;
+    bool list = false; ///< only says what it could be shared with
+    /// An activity type, or the type and whom to share with: "Bluetooth:Pixel 7".
+    std::string with;
+    std::string message; ///< text that goes along
+};
+
+using MediaCommand = std::variant<TrimCommand, MixCommand, ThumbnailsCommand, ProbeCommand, SaveCommand, ShareCommand>;
 
 /// "12.5", "1:30" or "01:02:03.25", exact to the microsecond. Nothing when it is no time.
 std::optional<base::MediaTime> momentIn(const std::string& text);

@@ -9,6 +9,8 @@
 #include "platform/files/MessageCatalog.h"
 #include "platform/media/MediaFramework.h"
 #include "platform/photos/PhotoLibrary.h"
+#include "platform/sharing/Sharing.h"
+#include "platform/storefront/StoreLookup.h"
 #include "platform/views/Image.h"
 #include "platform/views/Screen.h"
 #include "runtime/NotificationCenter.h"
@@ -27,6 +29,8 @@ struct Platform {
     Calendar& calendar;
     MediaFramework& media;
     PhotoLibrary& photos;
+    StoreLookup& store;
+    Sharing& sharing;
 };
 
 } // namespace platform

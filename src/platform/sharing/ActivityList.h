@@ -19,6 +19,8 @@ public:
 
     explicit ActivityList(ShareItems items) : m_items(std::move(items)) {}
 
+    const std::vector<std::string>& excludedTypes() const { return m_excluded; }
+    const std::vector<std::string>& typeOrder() const { return m_order; }
     void setExcludedTypes(std::vector<std::string> types);
     /// These types first, in that order; all others behind them, in the order in which they were found.
     void setTypeOrder(std::vector<std::string> types);

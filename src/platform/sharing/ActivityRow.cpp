@@ -81,6 +81,7 @@ void ActivityRow::showIdle()
 {
     assertHere();
     m_progress->setHidden(true);
+    m_progress->setProgress(0); // so that nothing runs unseen
     m_cancel->setHidden(true);
     m_row->setBusy(false);
     setNeedsLayout();

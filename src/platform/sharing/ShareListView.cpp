@@ -70,6 +70,7 @@ void ShareListView::showFooter()
     m_footer->setText(m_words.text(m_isLooking ? "SHARE_LOOKING" : "SHARE_NOTHING"));
     m_footer->setHidden(!hasFooter());
     m_indicator->setHidden(!m_isLooking);
+    m_indicator->setAnimating(m_isLooking);
     setNeedsLayout();
 }
 

@@ -230,6 +230,8 @@ void ShareSheet::activityEnded(const Activity& activity, const Activity::End& en
     if (m_running.get() != &activity)
         return;
     const auto ended = m_running;
+    if (m_services.activityEnded)
+        m_services.activityEnded(activity, end);
     const bool closes = end.completed || m_isClosing;
     if (closes) {
         m_outcome = {ended->activityType(), end.completed, end.error};

@@ -36,6 +36,8 @@ public:
         base::MainQueue& mainQueue;
         /// What the movie is called at the sheet's top; its file's name where there is no function.
         std::function<std::string(const base::Url& movie)> movieName = {};
+        /// Told of each activity that was performed, while the sheet is there.
+        std::function<void(const Activity& activity, const Activity::End& end)> activityEnded = {};
     };
     /// `activityType` is empty when nothing was done. `error` is why something was not, null when the user wanted it so.
     using CompletionHandler = std::function<void(const std::string& activityType, bool completed,
@@ -73,6 +75,8 @@ public:
     void cancelPressed();
 
     // For those who look at it: tests.
+    const ShareItems& activityItems() const { return here(m_items); }
+    const ActivityList& activityList() const { return here(m_activities); }
     const std::shared_ptr<ShareSummary>& summary() const { return here(m_summary); }
     const std::shared_ptr<ShareListView>& list() const { return here(m_list); }
     const std::shared_ptr<Button>& closeButton() const { return here(m_closeButton); }

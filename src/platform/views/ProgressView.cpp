@@ -127,6 +127,13 @@ void ActivityIndicator::didMoveToWindow()
     step();
 }
 
+void ActivityIndicator::setAnimating(bool animating)
+{
+    assertHere();
+    m_isAnimating = animating;
+    step();
+}
+
 void ActivityIndicator::layoutSubviews()
 {
     assertHere();
@@ -140,7 +147,7 @@ void ActivityIndicator::layoutSubviews()
 void ActivityIndicator::step()
 {
     const auto itsWindow = window();
-    if (m_runs || !itsWindow)
+    if (m_runs || !m_isAnimating || !itsWindow)
         return;
     m_runs = true;
     const auto light = [this] {

@@ -17,7 +17,7 @@ public:
     static const runtime::Class& classObject();
     const runtime::Class& isa() const override;
 
-    /// From 0 to 1; nothing while it is not known, as at first.
+    /// From 0, as at first, to 1; nothing while it is not known.
     std::optional<double> progress() const { return here(m_progress); }
     /// `spoken` is how a person says it: "40 %".
     void setProgress(std::optional<double> progress, std::string spoken = {});
@@ -34,7 +34,7 @@ private:
 
     std::shared_ptr<SurfaceView> m_track;
     std::shared_ptr<SurfaceView> m_fill;
-    std::optional<double> m_progress;
+    std::optional<double> m_progress = 0;
     std::string m_spoken;
     bool m_runs = false;    ///< a next step is posted
     bool m_atStart = false; ///< the piece that runs along
@@ -48,6 +48,9 @@ public:
 
     explicit ActivityIndicator(base::Rect frame = {});
 
+    /// Whether the dots move, which they do not at first: what moves costs a picture after the other, also unseen.
+    void setAnimating(bool animating);
+
     void layoutSubviews() override;
 
 protected:
@@ -58,7 +61,8 @@ private:
 
     std::vector<std::shared_ptr<SurfaceView>> m_dots;
     std::size_t m_next = 0;
-    bool m_runs = false;
+    bool m_isAnimating = false;
+    bool m_runs = false; ///< a next step is posted
 };
 
 } // namespace platform

@@ -15,9 +15,9 @@ using tests::Words;
 
 const std::string kAccepted = "(accepted)";
 
-TEST(MediaCommands, AreFive)
+TEST(MediaCommands, AreSix)
 {
-    for (const char* name : {"trim", "mix", "thumbnails", "probe", "save"})
+    for (const char* name : {"trim", "mix", "thumbnails", "probe", "save", "share"})
         EXPECT_TRUE(host::isMediaCommand(name)) << name;
     for (const char* name : {"", "open", "Trim", "tri", "trimm", "tour", "service"})
         EXPECT_FALSE(host::isMediaCommand(name)) << name;
@@ -25,7 +25,7 @@ TEST(MediaCommands, AreFive)
 
 TEST(MediaCommands, AskForHelpAnywhereButInAValue)
 {
-    for (const char* name : {"trim", "mix", "thumbnails", "probe", "save"})
+    for (const char* name : {"trim", "mix", "thumbnails", "probe", "save", "share"})
         for (const Words& words : {Words{name, "--help"}, Words{name, "m", "-h"}, Words{name, "-h", "--nonsense"}}) {
             const auto command = host::parseMediaCommand(words);
             ASSERT_TRUE(command);
@@ -37,8 +37,8 @@ TEST(MediaCommands, AskForHelpAnywhereButInAValue)
 
 TEST(MediaCommands, NeedOneMovieWithAName)
 {
-    const Words kRests[] = {
-        {"trim", "-o", "o"}, {"mix", "-o", "o"}, {"thumbnails", "-o", "d", "-n", "1"}, {"probe"}, {"save"}};
+    const Words kRests[] = {{"trim", "-o", "o"}, {"mix", "-o", "o"}, {"thumbnails", "-o", "d", "-n", "1"},
+                            {"probe"},           {"save"},           {"share", "--list"}};
     for (const Words& rest : kRests) {
         const auto with = [&](const Words& movies) {
             Words words = rest;

@@ -283,6 +283,9 @@ TEST_F(Progressing, FillsFromWhereRowsBegin)
 TEST_F(Progressing, RunsAlongWhileNobodyKnowsHowFarItIs)
 {
     window->commit();
+    EXPECT_FALSE(machine.mainQueue.untilNext()) << "nothing moves at first";
+    bar->setProgress(std::nullopt);
+    window->commit();
     const base::Rect before = fill();
     EXPECT_EQ(bar->accessibility().maximum, 0);
     machine.advance(std::chrono::seconds(1));
@@ -290,6 +293,19 @@ TEST_F(Progressing, RunsAlongWhileNobodyKnowsHowFarItIs)
     bar->setProgress(1);
     machine.advance(std::chrono::seconds(1));
     EXPECT_FALSE(machine.mainQueue.untilNext()) << "and stands still when it is known";
+}
+
+TEST_F(Progressing, OfSomebodyWhoLooksMovesWhileHeLooks)
+{
+    const auto dots = add<platform::ActivityIndicator>(base::Rect::make(0, 20, 28, 8), window);
+    window->commit();
+    EXPECT_FALSE(machine.mainQueue.untilNext());
+    dots->setAnimating(true);
+    machine.advance(std::chrono::seconds(2));
+    EXPECT_TRUE(machine.mainQueue.untilNext());
+    dots->setAnimating(false);
+    machine.advance(std::chrono::seconds(2));
+    EXPECT_FALSE(machine.mainQueue.untilNext());
 }
 
 } // namespace

@@ -1,0 +1,55 @@
+/// What can be done with a movie on this machine, for the editor's share sheet and for `clipsa share`: all who know some of
+/// it, and the outbox that they use. Main thread, with a Qt event loop.
+#pragma once
+
+#include "base/Affinity.h"
+#include "linux/sharing/Environment.h"
+#include "linux/sharing/Outbox.h"
+#include "platform/photos/PhotoLibrary.h"
+#include "platform/sharing/CombinedActivities.h"
+#include "platform/sharing/Sharing.h"
+
+#include <functional>
+#include <string>
+
+namespace app {
+
+class ShareServices final : public platform::Sharing {
+public:
+    /// What it refers to outlives this.
+    struct Options {
+        const base::System& system;
+        const platform::MessageCatalog& words;
+        platform::FileManager& files;
+        base::WorkList& works;
+        platform::PhotoLibrary& photos;
+        std::function<std::string(const base::Url& file)> nameOf;
+        /// Our window, as portals call it; empty without one.
+        std::function<std::string()> parentWindow = {};
+        std::function<void(const platform::Activity& activity, const platform::Activity::End& end)> ended = {};
+    };
+
+    explicit ShareServices(Options options);
+
+    platform::ActivityProvider& activities() override;
+    std::string nameOf(const base::Url& file) const override;
+    void activityEnded(const platform::Activity& activity, const platform::Activity::End& end) override;
+
+private:
+    /// Offers to put the movie into the library.
+    class Keeping final : public platform::ActivityProvider {
+    public:
+        explicit Keeping(const Options& options) : m_options(options) {}
+        void findActivities(const platform::ShareItems& items, Found found) override;
+
+    private:
+        const Options& m_options;
+    };
+
+    const Options m_options;
+    Keeping m_keeping;
+    platform::CombinedActivities m_all;
+    base::Affinity m_affinity;
+};
+
+} // namespace app
