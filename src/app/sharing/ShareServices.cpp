@@ -1,42 +1,93 @@
 #include "app/sharing/ShareServices.h"
 
+#include "linux/devices/DeviceProvider.h"
 #include "linux/photos/UserDirectories.h"
+#include "linux/sharing/Environment.h"
+#include "platform/sharing/CombinedActivities.h"
 #include "platform/sharing/SaveToVideosActivity.h"
 
 #include <utility>
 
 namespace app {
 
-ShareServices::ShareServices(Options options) : m_options(std::move(options)), m_keeping(m_options), m_all({&m_keeping})
+namespace {
+
+/// Where nothing can be put that has no place at all.
+sharing::Outbox userOutbox(base::Log& log)
 {
+    const auto outbox = sharing::Outbox::ofUser();
+    if (!outbox)
+        log.error(outbox.error()->description());
+    return outbox.valueOr(sharing::Outbox("/dev/null/outbox"));
+}
+
+/// Offers to put the movie into the library.
+class Keeping final : public platform::ActivityProvider {
+public:
+    explicit Keeping(const ShareServices::Options& options) : m_options(options) {}
+
+    void findActivities(const platform::ShareItems&, Found found) override
+    {
+        m_options.system.mainQueue.post([weak = std::weak_ptr(m_alive), this, found = std::move(found)] {
+            if (!weak.expired())
+                found({std::make_shared<platform::SaveToVideosActivity>(m_options.words, m_options.photos,
+                                                                        m_options.system.mainQueue)},
+                      true);
+        });
+    }
+
+private:
+    const ShareServices::Options& m_options;
+    std::shared_ptr<bool> m_alive = std::make_shared<bool>(true);
+};
+
+} // namespace
+
+struct ShareServices::Services {
+    explicit Services(Options given)
+        : options(std::move(given)),
+          outbox(userOutbox(options.system.log)), environment{options.system, options.words, options.files,
+                                                              options.works,  outbox,        options.nameOf},
+          devices(environment), keeping(options), all({&devices, &keeping})
+    {
+    }
+
+    const Options options;
+    const sharing::Outbox outbox;
+    const sharing::Environment environment;
+    devices::DeviceProvider devices;
+    Keeping keeping;
+    platform::CombinedActivities all;
+};
+
+ShareServices::ShareServices(Options options) : m_services(std::make_unique<Services>(std::move(options)))
+{
+    // What is a day old has had its readers; nobody waits for the disk.
+    m_services->options.system.backgroundQueue.post([outbox = m_services->outbox] { outbox.sweep(); });
+}
+
+ShareServices::~ShareServices()
+{
+    m_affinity.assertHere();
 }
 
 platform::ActivityProvider& ShareServices::activities()
 {
     m_affinity.assertHere();
-    return m_all;
+    return m_services->all;
 }
 
 std::string ShareServices::nameOf(const base::Url& file) const
 {
     m_affinity.assertHere();
-    return m_options.nameOf(file);
+    return m_services->options.nameOf(file);
 }
 
 void ShareServices::activityEnded(const platform::Activity& activity, const platform::Activity::End& end)
 {
     m_affinity.assertHere();
-    if (m_options.ended)
-        m_options.ended(activity, end);
-}
-
-void ShareServices::Keeping::findActivities(const platform::ShareItems&, Found found)
-{
-    m_options.system.mainQueue.post([found = std::move(found), this] {
-        found({std::make_shared<platform::SaveToVideosActivity>(m_options.words, m_options.photos,
-                                                                m_options.system.mainQueue)},
-              true);
-    });
+    if (m_services->options.ended)
+        m_services->options.ended(activity, end);
 }
 
 } // namespace app

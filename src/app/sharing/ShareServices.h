@@ -3,13 +3,15 @@
 #pragma once
 
 #include "base/Affinity.h"
-#include "linux/sharing/Environment.h"
-#include "linux/sharing/Outbox.h"
+#include "base/System.h"
+#include "base/WorkList.h"
+#include "platform/files/FileManager.h"
+#include "platform/files/MessageCatalog.h"
 #include "platform/photos/PhotoLibrary.h"
-#include "platform/sharing/CombinedActivities.h"
 #include "platform/sharing/Sharing.h"
 
 #include <functional>
+#include <memory>
 #include <string>
 
 namespace app {
@@ -20,7 +22,7 @@ public:
     struct Options {
         const base::System& system;
         const platform::MessageCatalog& words;
-        platform::FileManager& files;
+        const platform::FileManager& files;
         base::WorkList& works;
         platform::PhotoLibrary& photos;
         std::function<std::string(const base::Url& file)> nameOf;
@@ -30,25 +32,16 @@ public:
     };
 
     explicit ShareServices(Options options);
+    ~ShareServices() override;
 
     platform::ActivityProvider& activities() override;
     std::string nameOf(const base::Url& file) const override;
     void activityEnded(const platform::Activity& activity, const platform::Activity::End& end) override;
 
 private:
-    /// Offers to put the movie into the library.
-    class Keeping final : public platform::ActivityProvider {
-    public:
-        explicit Keeping(const Options& options) : m_options(options) {}
-        void findActivities(const platform::ShareItems& items, Found found) override;
+    struct Services;
 
-    private:
-        const Options& m_options;
-    };
-
-    const Options m_options;
-    Keeping m_keeping;
-    platform::CombinedActivities m_all;
+    std::unique_ptr<Services> m_services;
     base::Affinity m_affinity;
 };
 
