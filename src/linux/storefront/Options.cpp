@@ -58,8 +58,11 @@ std::vector<std::string> preferredLocales(const Environment& environment)
                 return isServedBy(locale, other);
             }))
             continue;
-        locales.push_back(locale);
-        if (isEnglish(locale))
+        // What is behind it would never be asked; nor need it be where another fails: that is what texts are written in.
+        const bool isLast = isEnglish(locale);
+        if (!isLast || locales.empty())
+            locales.push_back(locale);
+        if (isLast)
             break;
     }
     if (locales.empty())

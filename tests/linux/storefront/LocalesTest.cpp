@@ -37,9 +37,12 @@ TEST(StoreLocales, HaveNoCodesetButKeepTheirModifier)
     EXPECT_THAT(localesOf({{"LANG", "de_DE.UTF-8"}}), ElementsAre("de_DE"));
 }
 
-TEST(StoreLocales, EndWithEnglishInWhichTextsAreWritten)
+TEST(StoreLocales, EndAtEnglishInWhichTextsAreWritten)
 {
-    EXPECT_THAT(localesOf({{"LANGUAGE", "fr:en_GB:de"}, {"LANG", "es_ES"}}), ElementsAre("fr", "en_GB"));
+    EXPECT_THAT(localesOf({{"LANGUAGE", "fr:en_GB:de"}, {"LANG", "es_ES"}}), ElementsAre("fr"));
+    EXPECT_THAT(localesOf({{"LANGUAGE", "de_DE:de:en"}, {"LANG", "de_DE.UTF-8"}}), ElementsAre("de_DE"));
+    EXPECT_THAT(localesOf({{"LANGUAGE", "de"}, {"LC_ALL", "C.UTF-8"}}), ElementsAre("de"));
+    EXPECT_THAT(localesOf({{"LANGUAGE", "en_GB:de"}}), ElementsAre("en_GB"));
     EXPECT_THAT(localesOf({{"LANGUAGE", "C:de"}}), ElementsAre("C"));
     EXPECT_THAT(localesOf({{"LANG", "POSIX"}}), ElementsAre("C"));
     EXPECT_THAT(localesOf({{"LANG", "C.UTF-8"}}), ElementsAre("C"));
