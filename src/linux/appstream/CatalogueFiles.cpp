@@ -1,6 +1,5 @@
 #include "linux/appstream/CatalogueFiles.h"
 
-#include <glib.h>
 #include <string_view>
 #include <system_error>
 
@@ -64,8 +63,8 @@ CatalogueFiles catalogueFiles(const storefront::Options& options)
             for (const char* kind :
                  {"swcatalog/xml", "swcatalog/yaml", "app-info/xml", "app-info/xmls", "app-info/yaml"})
                 add(files, fs::path(place) / kind);
-        addRemotes(files, "/var/lib/flatpak/appstream");
-        addRemotes(files, fs::path(g_get_user_data_dir()) / "flatpak/appstream");
+        for (const fs::path& directory : options.remotes)
+            addRemotes(files, directory);
     }
     return files;
 }

@@ -44,11 +44,11 @@ private:
 
 } // namespace
 
-std::optional<storefront::Facts> factsOf(const FindComponent& find, const std::vector<std::string>& locales,
+std::optional<storefront::Facts> factsOf(const FindComponent& find, const storefront::Options& options,
                                          bool inUsersLanguages)
 {
     const std::vector<std::string> asWritten = {"C"};
-    const std::vector<std::string>& wanted = inUsersLanguages ? locales : asWritten;
+    const std::vector<std::string>& wanted = inUsersLanguages ? options.locales : asWritten;
     Translations translations(find, wanted);
     const auto& component = translations.in(wanted.front());
     if (!component)
@@ -56,7 +56,7 @@ std::optional<storefront::Facts> factsOf(const FindComponent& find, const std::v
     storefront::Facts facts;
     facts.name = translations.text(&Component::name);
     facts.developer = translations.text(&Component::developer);
-    facts.page = publicPage(*component);
+    facts.page = publicPage(*component, options.remotes);
     facts.homepage = component->homepage();
     facts.genres = Genres(inUsersLanguages).namesOf(component->categories());
     return facts;

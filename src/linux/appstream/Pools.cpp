@@ -15,10 +15,10 @@ namespace appstream {
 namespace {
 
 /// The lower the better, from the first difference on.
-auto rank(const Component& component, const std::string& identifier)
+auto rank(const Component& component, const std::string& identifier, const storefront::Options& options)
 {
     return std::tuple(!component.isApplication(), withoutDesktop(component.identifier()) != withoutDesktop(identifier),
-                      !publicPage(component), -component.priority(), component.origin());
+                      !publicPage(component, options.remotes), -component.priority(), component.origin());
 }
 
 } // namespace
@@ -76,7 +76,8 @@ std::optional<Component> Pools::find(const std::string& identifier, const std::s
     for (const std::string& form : {plain, plain + ".desktop"}) {
         const Owned<GPtrArray> found(as_pool_get_components_by_id(known, form.c_str()));
         for (AsComponent* each : Elements<AsComponent>(found.get()))
-            if (const Component component(each); !best || rank(component, identifier) < rank(*best, identifier))
+            if (const Component component(each);
+                !best || rank(component, identifier, m_options) < rank(*best, identifier, m_options))
                 best = component;
     }
     m_hasMissed = m_hasMissed || !best;

@@ -17,7 +17,7 @@ void InstalledSource::load()
 std::optional<storefront::Facts> InstalledSource::find(const std::string& identifier, bool inUsersLanguages)
 {
     m_affinity.assertHere();
-    return factsOf([&](const std::string& locale) { return m_metainfo.find(identifier, locale); }, m_options.locales,
+    return factsOf([&](const std::string& locale) { return m_metainfo.find(identifier, locale); }, m_options,
                    inUsersLanguages);
 }
 
@@ -47,7 +47,7 @@ void PublishedSource::load()
 std::optional<storefront::Facts> PublishedSource::find(const std::string& identifier, bool inUsersLanguages)
 {
     m_affinity.assertHere();
-    return factsOf([&](const std::string& locale) { return m_pools.find(identifier, locale); }, m_options.locales,
+    return factsOf([&](const std::string& locale) { return m_pools.find(identifier, locale); }, m_options,
                    inUsersLanguages);
 }
 

@@ -77,6 +77,7 @@ Options Options::ofUser()
     std::vector<std::filesystem::path> data = {g_get_user_data_dir()};
     for (const char* const* each = g_get_system_data_dirs(); *each; ++each)
         data.emplace_back(*each);
+    options.remotes.push_back(data.front() / "flatpak/appstream");
     for (const auto& directory : data)
         options.metainfo.push_back(directory / "metainfo");
     return options;

@@ -19,6 +19,8 @@ struct Options {
     std::vector<std::filesystem::path> catalogues;
     /// The machine's own catalogues, and those of its Flatpak remotes.
     bool usesMachineCatalogues = true;
+    /// Where Flatpak keeps what its remotes publish, a directory for each remote.
+    std::vector<std::filesystem::path> remotes = {"/var/lib/flatpak/appstream"};
     /// Where catalogues are kept in a form that is quick to search; where everybody keeps them when empty.
     std::filesystem::path cache;
     /// How long an answer waits for catalogues that are still being read. The default is half of what a person who taps

@@ -77,6 +77,27 @@ INSTANTIATE_TEST_SUITE_P(
                   "<url type=\"bugtracker\">https://painter.example</url>", std::nullopt}),
     nameOf);
 
+TEST_F(StoreFixture, ARepositorysOriginIsKnownByTheIconsOfItsRemote)
+{
+    const auto linkIn = [this](const std::string& remote) {
+        store.reset();
+        files.write(remote + "/aarch64/active/icons/64x64/org.example.Painter.png", "");
+        publish("one",
+                component("org.example.Painter.desktop", "<name>Painter</name>" + homepage("https://painter.example")),
+                kFlatpak);
+        return itemOf(kPainter).shortProductLink;
+    };
+    EXPECT_EQ(linkIn("system remotes/another"), "https://painter.example");
+    EXPECT_EQ(linkIn("user remotes/flathub"), "https://flathub.org/apps/org.example.Painter");
+}
+
+TEST_F(StoreFixture, TheOriginOfADistributionIsNoRemotes)
+{
+    files.write("system remotes/flathub/x86_64/active/icons/128x128/org.example.Painter.png", "");
+    publish("one", component(kPainter, "<name>Painter</name>" + homepage("https://painter.example")), kDebian);
+    EXPECT_EQ(itemOf(kPainter).shortProductLink, "https://painter.example");
+}
+
 TEST_F(StoreFixture, LinksAreOfTheWebOnly)
 {
     for (const char* address : {"file:///etc/passwd", "javascript:alert(1)", "appstream://org.example.Painter",

@@ -36,6 +36,7 @@ protected:
         made.metainfo = {files.path() / "home/metainfo", files.path() / "usr/metainfo"};
         made.catalogues = {files.path() / "catalogue"};
         made.usesMachineCatalogues = false;
+        made.remotes = {files.path() / "system remotes", files.path() / "user remotes"};
         made.cache = files.path() / "cache";
         made.patience = std::chrono::seconds(60);
         return made;
