@@ -217,6 +217,14 @@ TEST_F(FindingDevices, MakesHostileNamesHarmless)
     EXPECT_THAT(find(), ElementsAre("Ada enohP {name}", "Unnamed device"));
 }
 
+TEST_F(FindingDevices, IsNotDisturbedByWhatIsListedAndNotThere)
+{
+    Scripted kdeConnect("kdeconnect.py", m_session.address(),
+                        R"({"ghosts": ["", "no path!", "../..", "gone"], "devices": {
+        "p1": {"name": "Phone", "type": "", "isReachable": true, "isPaired": true, "plugins": ["kdeconnect_share"]}}})");
+    EXPECT_THAT(find(), ElementsAre("Phone"));
+}
+
 TEST_F(FindingDevices, TellsDevicesOfOneNameApartByTheWayToThem)
 {
     Scripted kdeConnect("kdeconnect.py", m_session.address(), R"({"devices": {

@@ -2,7 +2,8 @@
 """KDE Connect's daemon as its users on the bus see it.
 
 The script has its `devices`: by identifier their properties and their `plugins`; where it is to receive files; whether it
-takes them `later`; how the address of one that it `refuses` ends.
+takes them `later`; how the address of one that it `refuses` ends; `ghosts`, which are
+listed and not there.
 """
 from gi.repository import GLib
 
@@ -46,7 +47,7 @@ class KdeConnect(Service):
 
     def devices(self, _path, only_reachable, only_paired):
         self.tell(f"devices {only_reachable} {only_paired}")
-        return GLib.Variant("(as)", ([*self.known],))
+        return GLib.Variant("(as)", ([*self.script.get("ghosts", []), *self.known],))
 
     def hasPlugin(self, path, name):
         return GLib.Variant("(b)", (name in self.known[path.rsplit("/", 1)[1]]["plugins"],))
