@@ -153,7 +153,7 @@ TEST_F(Input, KeysArriveByTheirMeaning)
         {Qt::Key_Space, Key::Space},   {Qt::Key_Escape, Key::Escape}, {Qt::Key_Return, Key::Return},
         {Qt::Key_Enter, Key::Return},  {Qt::Key_Left, Key::Left},     {Qt::Key_Right, Key::Right},
         {Qt::Key_Home, Key::Home},     {Qt::Key_End, Key::End},       {Qt::Key_Comma, Key::Comma},
-        {Qt::Key_Period, Key::Period},
+        {Qt::Key_Period, Key::Period}, {Qt::Key_Up, Key::Up},         {Qt::Key_Down, Key::Down},
     };
     for (const auto& [key, meaning] : meanings) {
         keyboard->command.key = meaning;

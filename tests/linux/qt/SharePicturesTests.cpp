@@ -307,6 +307,18 @@ TEST_F(Sharing, AssistiveTechnologySeesOnlyWhatIsPresented)
     EXPECT_THAT(spoken(*top), ElementsAre("text ")) << "and everything again afterwards";
 }
 
+TEST_F(SharingAtTwo, ItsFirstPictureComesAtOnceHoweverMuchThereIsToSay)
+{
+    items[0] = std::string(1'000'000, 'w') + "\u202E";
+    fill({360, 720}, false);
+    const auto begin = std::chrono::steady_clock::now();
+    root->present(sheet, true);
+    presenter->commit();
+    const std::chrono::duration<double, std::milli> passed = std::chrono::steady_clock::now() - begin;
+    RecordProperty("milliseconds", std::to_string(passed.count()));
+    EXPECT_LT(passed.count(), 1000) << "and far less on a machine that has nothing else to do";
+}
+
 TEST_F(Sharing, TheWheelScrollsItsList)
 {
     fill({360, 480}, false);
