@@ -94,9 +94,7 @@ double PanGestureRecognizer::velocityAt(base::Instant time) const
     const Touch& first = m_samples.front();
     const Touch& last = m_samples.back();
     const std::chrono::duration<double> passed = time - first.time;
-    if (passed.count() <= 0 || time - first.time > 2 * kSampled)
-        return 0;
-    return (last.position.y - first.position.y) / passed.count();
+    return passed.count() > 0 ? (last.position.y - first.position.y) / passed.count() : 0;
 }
 
 void PanGestureRecognizer::tell(State state, const Touch& touch, double velocity)

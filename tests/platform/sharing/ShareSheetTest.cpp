@@ -146,6 +146,20 @@ TEST_F(Sharing, ItShowsTheMovieWithoutWaitingForIt)
     EXPECT_EQ(summary.frame().height(), height);
 }
 
+TEST_F(Sharing, NothingAtItsTopStandsOnAnythingElse)
+{
+    items = {"A race", base::Url::fromPath("/tmp/a race with a name that is rather long.mp4"),
+             base::Url::fromPath("/tmp/some notes that were written while it was raced.txt"),
+             base::Url::fromPath("/tmp/b.txt")};
+    open({});
+    const auto& summary = *sheet->summary();
+    EXPECT_LE(summary.nameLabel()->frame().maxX(), sheet->closeButton()->frame().minX());
+    EXPECT_LE(summary.nameLabel()->frame().maxY(), summary.detailsLabel()->frame().minY());
+    EXPECT_LE(summary.detailsLabel()->frame().maxY(), summary.filesLabel()->frame().minY());
+    EXPECT_LE(summary.filesLabel()->frame().maxY(), summary.textLabel()->frame().minY());
+    EXPECT_LE(summary.textLabel()->frame().maxY(), summary.frame().height());
+}
+
 TEST_F(Sharing, WhatIsNotKnownOfTheMovieIsNotSaid)
 {
     media.movies["/tmp/race.mp4"] = FakeMovie::failing();

@@ -180,6 +180,7 @@ TEST_F(Presenting, TheSecondOfTwoTapsDoesNotCloseWhatComesUp)
     settle();
     settle();
     EXPECT_FALSE(isGone());
+    EXPECT_EQ(shown->asked, 0);
 }
 
 TEST_F(Presenting, EscapeClosesItEvenWhileItComesUp)
@@ -296,6 +297,15 @@ TEST_F(Presenting, KeysAndTheFocusStayInside)
     EXPECT_THAT(taken(), ElementsAre("root command"));
 }
 
+TEST_F(Presenting, WhoTookTheKeysBeforeTakesThemAfterwards)
+{
+    presentAndSettle();
+    EXPECT_NE(window->firstResponder(), root);
+    root->dismiss(true);
+    settle();
+    EXPECT_EQ(window->firstResponder(), root);
+}
+
 TEST_F(Presenting, WithoutAFocusBeforeThereIsNoneAfterwards)
 {
     presentAndSettle();
@@ -345,9 +355,9 @@ TEST_F(Presenting, WhatItPresentsItselfStandsAboveAndGoesFirst)
     shown->present(above, true);
     settle();
     root->dismiss(true);
+    EXPECT_FALSE(above->window()) << "before it slides";
     settle();
     EXPECT_TRUE(isGone());
-    EXPECT_FALSE(above->window());
 }
 
 TEST_F(Presenting, NothingIsLeftWhenItsPresenterGoes)
@@ -360,6 +370,42 @@ TEST_F(Presenting, NothingIsLeftWhenItsPresenterGoes)
     settle();
     root.reset();
     settle();
+}
+
+TEST_F(Presenting, NothingIsLeftWhenAChildThatPresentsGoes)
+{
+    auto child = controller("child");
+    root->addChildViewController(child);
+    root->view()->addSubview(child->view());
+    child->didMoveToParentViewController(root.get());
+    child->present(shown, true);
+    settle();
+    child->willMoveToParentViewController(nullptr);
+    child->view()->removeFromSuperview();
+    child->removeFromParentViewController();
+    ASSERT_TRUE(window->topPresentation());
+    child.reset();
+    EXPECT_FALSE(window->topPresentation());
+    EXPECT_FALSE(shown->window());
+    EXPECT_FALSE(shown->presentingViewController());
+}
+
+TEST_F(Presenting, ASizeThatChangesOnTheWayUpIsTakenBeforeItIsComplete)
+{
+    present();
+    shown->height = 400;
+    shown->contentSizeDidChange();
+    settle();
+    EXPECT_EQ(surface().height(), 416);
+    EXPECT_THAT(shown->events, IsEmpty()) << "it still grows";
+    shown->height = 500;
+    shown->contentSizeDidChange();
+    settle();
+    EXPECT_EQ(surface().height(), 416) << "nobody waits for ever";
+    EXPECT_THAT(shown->events, ElementsAre("shown", "completed"));
+    shown->contentSizeDidChange();
+    window->commit();
+    EXPECT_EQ(surface().height(), 516) << "what is up follows at once";
 }
 
 struct Popping : Presenting {

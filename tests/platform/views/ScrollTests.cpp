@@ -123,6 +123,23 @@ TEST_F(Scrolling, TheFocusGoesThroughAllRowsInOrderAndIsScrolledIntoView)
     EXPECT_EQ(scroll->contentOffset(), 0);
 }
 
+TEST_F(Scrolling, WhatIsScrolledOutOfSightComesBetweenWhatStandsAboveAndBelow)
+{
+    const auto above = add<platform::ListRow>(base::Rect::make(0, 20, 400, 44), window);
+    const auto below = add<platform::ListRow>(base::Rect::make(0, 320, 400, 44), window);
+    scroll->setContentOffset(200);
+    window->commit();
+    window->moveFocus(true);
+    EXPECT_EQ(window->focusedView(), above);
+    window->moveFocus(true);
+    EXPECT_EQ(window->focusedView(), rows[0]);
+    window->moveFocus(false);
+    window->moveFocus(false);
+    EXPECT_EQ(window->focusedView(), below);
+    window->moveFocus(false);
+    EXPECT_EQ(window->focusedView(), rows[9]);
+}
+
 TEST_F(Scrolling, WhatIsLowerThanItsRoomDoesNotScroll)
 {
     scroll->setContentHeight(150);
