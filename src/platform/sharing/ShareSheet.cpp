@@ -227,9 +227,11 @@ void ShareSheet::activityProgressed(const Activity& activity, std::optional<doub
 
 void ShareSheet::activityEnded(const Activity& activity, const Activity::End& end)
 {
-    if (m_running.get() != &activity)
+    // One that the user thought was given up may have been too quick: what the receiver has, it has.
+    const bool isLate = !m_running && end.completed;
+    if (m_performed.get() != &activity || (!m_running && !isLate))
         return;
-    const auto ended = m_running;
+    const auto ended = m_performed;
     if (m_services.activityEnded)
         m_services.activityEnded(activity, end);
     const bool closes = end.completed || m_isClosing;

@@ -394,6 +394,59 @@ TEST_F(Sharing, ClosingWhatAnActivityShowsCancelsIt)
     EXPECT_TRUE(row(0)->row()->isEnabled());
 }
 
+TEST_F(Sharing, WhatWasGivenUpTooLateStillCounts)
+{
+    const auto upload = activity("upload");
+    upload->endsWhenCancelled = false;
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    window->keyDown(Key::Escape);
+    settle();
+    EXPECT_FALSE(sheet->isPerforming());
+    upload->activityDidFinish(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre("upload yes"));
+}
+
+TEST_F(Sharing, WhatWasGivenUpDoesNotEndWhatIsPerformedNow)
+{
+    const auto upload = activity("upload");
+    const auto mail = activity("mail");
+    upload->endsWhenCancelled = false;
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload, mail});
+    tapRow(0);
+    settle();
+    window->keyDown(Key::Escape);
+    settle();
+    tapRow(1);
+    upload->activityDidFail(error("no network"));
+    settle();
+    EXPECT_TRUE(sheet->isPerforming());
+    EXPECT_FALSE(sheet->presentedViewController());
+    mail->activityDidFinish(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre("mail yes"));
+}
+
+TEST_F(Sharing, WhatWasGivenUpAndFailsAfterwardsIsNoNews)
+{
+    const auto upload = activity("upload");
+    upload->endsWhenCancelled = false;
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    window->keyDown(Key::Escape);
+    settle();
+    upload->activityDidFail(error("no network"));
+    settle();
+    EXPECT_FALSE(sheet->presentedViewController());
+    EXPECT_FALSE(isGone());
+}
+
 TEST_F(Sharing, KeysGoThroughTheRowsAndPick)
 {
     const auto mail = activity("mail");
