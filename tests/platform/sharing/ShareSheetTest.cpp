@@ -222,6 +222,8 @@ TEST_F(Sharing, WhatTheUserCancelsInItsOwnDialogueLeadsBackToTheList)
     tapRow(0);
     mail->activityDidFinish(false);
     settle();
+    machine.advance(std::chrono::seconds(2));
+    EXPECT_FALSE(machine.mainQueue.untilNext()) << "nothing moves any more";
     EXPECT_FALSE(isGone());
     EXPECT_TRUE(row(0)->row()->isEnabled());
     EXPECT_TRUE(row(1)->row()->isEnabled());
