@@ -391,6 +391,23 @@ TEST_F(ThePortal, TellsNothingOfHowLongTheUserTakes)
     EXPECT_FALSE(told.back());
 }
 
+TEST_F(ThePortal, IsNotTakenForSomebodyElseOnTheBus)
+{
+    start("hold");
+    begin(activityOf(kActivityTypeMail));
+    ASSERT_TRUE(pump([&] { return !calls("ComposeEmail").empty(); }));
+    auto liar = QDBusConnection::connectToBus(QDBusConnection::SessionBus, QStringLiteral("liar"));
+    auto response = QDBusMessage::createTargetedSignal(
+        QDBusConnection::sessionBus().baseService(), calls("ComposeEmail")[0]["path"].toString(),
+        QStringLiteral("org.freedesktop.portal.Request"), QStringLiteral("Response"));
+    response << 0U << QVariantMap();
+    liar.send(response);
+    liar.call(bus::questionToBus("GetId", {})); // the bus has passed it on
+    find();
+    EXPECT_FALSE(end);
+    QDBusConnection::disconnectFromBus(QStringLiteral("liar"));
+}
+
 TEST_F(ThePortal, CanBeAskedAgain)
 {
     start("fail");
