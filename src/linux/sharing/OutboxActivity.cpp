@@ -91,7 +91,7 @@ void OutboxActivity::workInBackground(Work work, std::function<void()> done)
             main.post([weak, turn, result = work(goOn), done = std::move(done)] {
                 // Locked here: a strong reference on the worker could be the last one and end us on the wrong thread.
                 const auto self = weak.lock();
-                if (!self || !self->isUnderWay())
+                if (!self || !self->isUnderWay(turn))
                     return;
                 if (result)
                     done();

@@ -10,9 +10,7 @@
 namespace {
 
 using namespace platform;
-using testing::ElementsAre;
 using testing::EndsWith;
-using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::SizeIs;
 using testing::StartsWith;
@@ -301,6 +299,7 @@ TEST_F(ThePortal, ClosesItsDialogueWhenTheUserCancels)
     const auto activity = activityOf(kActivityTypeOpenWith);
     begin(activity);
     ASSERT_TRUE(pump([&] { return calls("OpenFile").size() == 1; }));
+    find(); // its answer to the call is there
     activity->cancel();
     ASSERT_TRUE(end) << "at once";
     EXPECT_FALSE(end->completed);
@@ -312,9 +311,11 @@ TEST_F(ThePortal, ClosesItsDialogueWhenTheUserCancels)
 TEST_F(ThePortal, ClosesItsDialogueWhenItIsLetGoOf)
 {
     start("hold");
-    begin(activityOf(kActivityTypeOpenWith));
+    auto activity = activityOf(kActivityTypeOpenWith);
+    begin(activity);
     ASSERT_TRUE(pump([&] { return calls("OpenFile").size() == 1; }));
-    activities.clear();
+    find();
+    activity.reset();
     EXPECT_TRUE(pump([&] { return !calls("Close").empty(); }));
     EXPECT_FALSE(end) << "nobody is there to be told";
 }
@@ -341,8 +342,7 @@ TEST_F(ThePortal, MayVanishInTheMiddle)
         ASSERT_TRUE(pump([&] { return calls("ComposeEmail").size() == before + 1; }));
         stop();
         ASSERT_TRUE(pump([&] { return end.has_value(); }));
-        EXPECT_FALSE(end->completed);
-        ASSERT_TRUE(end->error) << behaviour;
+        expectFailure(*end, "SHARE_DESKTOP_GONE");
     }
 }
 
@@ -423,18 +423,18 @@ TEST_F(ThePortal, CanBeAskedAgain)
     EXPECT_EQ(options("ComposeEmail")["attachment_fds"].toArray().size(), 1);
 }
 
-TEST_F(ThePortal, IsNotAskedTwiceWhenItIsAskedAgainBeforeTheFileWasReady)
+TEST_F(ThePortal, IsAskedAgainWhateverBecameOfWhatWasCancelled)
 {
     start("hold");
     const auto activity = activityOf(kActivityTypeMail);
+    const ShareItems now = std::exchange(items, {base::Url::fromPath(movie + ".gone")});
     begin(activity);
     activity->cancel();
     EXPECT_TRUE(end);
     activity->setEndHandler({});
+    items = now;
     begin(activity);
-    ASSERT_TRUE(pump([&] { return !calls("ComposeEmail").empty(); }));
-    find();
-    EXPECT_THAT(calls("ComposeEmail"), SizeIs(1));
+    ASSERT_TRUE(pump([&] { return end || !calls("ComposeEmail").empty(); }));
     EXPECT_FALSE(end);
 }
 
