@@ -394,7 +394,8 @@ TEST_F(ThePortal, TellsNothingOfHowLongTheUserTakes)
 TEST_F(ThePortal, IsNotTakenForSomebodyElseOnTheBus)
 {
     start("hold");
-    begin(activityOf(kActivityTypeMail));
+    const auto activity = activityOf(kActivityTypeMail);
+    begin(activity);
     ASSERT_TRUE(pump([&] { return !calls("ComposeEmail").empty(); }));
     auto liar = QDBusConnection::connectToBus(QDBusConnection::SessionBus, QStringLiteral("liar"));
     auto response = QDBusMessage::createTargetedSignal(
