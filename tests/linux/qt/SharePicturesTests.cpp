@@ -217,9 +217,10 @@ TEST_F(SharingAtTwo, ASheetOfLongWords)
     items = {std::string(5000, 'w') + " and more", base::Url::fromPath("/tmp/Marble Racer.mp4")};
     fill({360, 640}, false);
     open(5);
+    keep("share-phone-long-words");
     tapOn(*sheet->list()->rows()[2]->row());
     pass(100);
-    keep("share-phone-long-words");
+    keep("share-phone-long-words-running");
     const auto& row = *sheet->list()->rows()[2];
     EXPECT_LE(row.cancelButton()->frame().maxX(), 360);
     EXPECT_GE(row.cancelButton()->frame().width(), 44);
@@ -317,6 +318,33 @@ TEST_F(SharingAtTwo, ItsFirstPictureComesAtOnceHoweverMuchThereIsToSay)
     const std::chrono::duration<double, std::milli> passed = std::chrono::steady_clock::now() - begin;
     RecordProperty("milliseconds", std::to_string(passed.count()));
     EXPECT_LT(passed.count(), 1000) << "and far less on a machine that has nothing else to do";
+}
+
+TEST_F(SharingAtTwo, ASheetOnAPhoneThatLiesOnItsSide)
+{
+    fill({720, 360}, false);
+    open(6);
+    keep("share-phone-lying");
+    EXPECT_GE(sheet->list()->bounds().height(), 2 * 56);
+}
+
+TEST_F(Sharing, ItIsToldOnceWhenItComes)
+{
+    fill({360, 640}, false);
+    using Event = std::pair<QAccessible::Event, std::string>;
+    std::vector<Event> events;
+    qtui::Announcer announcer{[&](QAccessibleEvent* event) {
+        events.emplace_back(event->type(), event->accessibleInterface()->text(QAccessible::Name).toStdString());
+    }};
+    auto& stage = dynamic_cast<qtui::StageWindow&>(presenter->quickWindow());
+    open(2);
+    announcer.announce(stage);
+    announcer.announce(stage);
+    EXPECT_THAT(events, ElementsAre(Event(QAccessible::ObjectShow, "Share"), Event(QAccessible::Alert, "Share")));
+    root->dismiss(true);
+    pass(400);
+    announcer.announce(stage);
+    EXPECT_EQ(events.size(), 2U);
 }
 
 TEST_F(Sharing, TheWheelScrollsItsList)

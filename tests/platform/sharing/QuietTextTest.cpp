@@ -39,13 +39,15 @@ TEST(AQuietText, EndsInAnEllipsisWhereItIsCutOff)
 
 TEST(AQuietText, CostsNothingHoweverLongTheTextIs)
 {
-    const auto begin = std::chrono::steady_clock::now();
-    EXPECT_LT(quietText(std::string(100'000'000, 'x')).size(), 500U);
+    std::string letters;
+    letters.resize(50'000'000, 'x');
     std::string marks;
     while (marks.size() < 30'000'000)
         marks += "\u202E";
+    const auto begin = std::chrono::steady_clock::now();
+    EXPECT_LT(quietText(letters).size(), 500U);
     EXPECT_EQ(quietText(marks), "…");
-    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(2)) << "making them, too";
+    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::milliseconds(50));
 }
 
 TEST(AQuietName, IsOneLineSetApart)

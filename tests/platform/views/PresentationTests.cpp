@@ -32,13 +32,13 @@ public:
         ++asked;
         return allowsClosing;
     }
-    void presentationDidShow() override { events.push_back("shown"); }
-    void presentationDidEnd() override { events.push_back("ended"); }
+    void presentationDidShow() override { events.emplace_back("shown"); }
+    void presentationDidEnd() override { events.emplace_back("ended"); }
     void viewWillTransitionToSize_withTransitionCoordinator(base::Size size,
                                                             platform::TransitionCoordinator& coordinator) override
     {
         ViewController::viewWillTransitionToSize_withTransitionCoordinator(size, coordinator);
-        events.push_back("resized");
+        events.emplace_back("resized");
     }
 
     double height = 300;
@@ -73,7 +73,7 @@ struct Presenting : WindowFixture {
     void settle() { machine.advance(std::chrono::milliseconds(300)); }
     void present(bool animated = true)
     {
-        root->present(shown, animated, [this] { shown->events.push_back("completed"); });
+        root->present(shown, animated, [this] { shown->events.emplace_back("completed"); });
         window->commit();
     }
     void presentAndSettle()
@@ -154,7 +154,7 @@ TEST_F(Presenting, OneThatIsDismissedOnItsWayUpComesUpFirst)
 {
     present();
     std::vector<std::string> ends;
-    root->dismiss(true, [&] { ends.push_back("gone"); });
+    root->dismiss(true, [&] { ends.emplace_back("gone"); });
     settle();
     EXPECT_THAT(shown->events, ElementsAre("shown", "completed"));
     settle();
