@@ -115,8 +115,14 @@ std::vector<fs::path> Machine::editorDirectories() const
     std::vector<fs::path> found;
     std::error_code error;
     for (const auto& entry : fs::directory_iterator(m_directory.path() / "cache/clipsa", error))
-        found.push_back(entry.path());
+        if (entry.path() != outbox())
+            found.push_back(entry.path());
     return found;
+}
+
+fs::path Machine::outbox() const
+{
+    return m_directory.path() / "cache/clipsa/outbox";
 }
 
 std::vector<pid_t> Machine::processes(const std::string& name) const

@@ -45,6 +45,8 @@ public:
 
     /// The directories of editors, living or left behind.
     std::vector<std::filesystem::path> editorDirectories() const;
+    /// Where lies what was given to other programs.
+    std::filesystem::path outbox() const;
     /// Processes of that name in this machine; all of them when it is empty.
     std::vector<pid_t> processes(const std::string& name = {}) const;
     /// What is left of programs that have ended: names of files and processes, for messages. Empty when all is well.

@@ -156,6 +156,8 @@ bool Script::carryOut(const Words& words)
         return waitForFrame(words);
     if (command == "wait" && argument(1) == "file")
         return QFile::exists(QString::fromStdString(joined(words, 2, words.size())));
+    if (command == "wait" && argument(1) == "gone")
+        return !middleOf(joined(words, 2, words.size()));
     if (command == "wait")
         return waitFor(argument(1));
     if (command == "tap")

@@ -9,7 +9,10 @@
 ///   wait thumbnails        until the strip has all its pictures
 ///   wait zoomed            until the strip shows the moments around a grip that is held still
 ///   wait trimming|trimmed  until trim mode is on; until it is off and the movie then shown is ready
-///   wait sheet|editor      until the share sheet is all there; until nothing stands above the editor any more
+///   wait sheet|alert|editor  until the share sheet is all there; until an alert comes above it; until nothing stands
+///                          above the editor any more
+///   wait still             until nothing moves or fades
+///   wait gone NAME         until no control of that name can be seen
 ///   wait frame [SECONDS]   until the picture of the present time is on the screen (the one that does not change any
 ///                          more, where the recording stands still), or that of SECONDS or a later one
 ///   wait fine              until that picture is as fine as the recording's: one that is dragged past is not at first
@@ -92,6 +95,7 @@ private:
     std::optional<TransitionTrial> m_trial;
     std::weak_ptr<const platform::VideoFrame> m_waitedFrame; ///< what is there while `wait frame` waits…
     base::Instant m_waitedSince{};                           ///< …and since when
+    bool m_wasAlone = false;                                 ///< the editor, at the last look
     std::optional<base::Point> m_finger;                     ///< where it is held
     std::shared_ptr<bool> m_alive = std::make_shared<bool>(true);
     base::Affinity m_affinity;

@@ -8,6 +8,7 @@
 
 #include <algorithm>
 #include <cstdlib>
+#include <utility>
 
 namespace app {
 
@@ -17,6 +18,10 @@ bool Script::waitFor(const std::string& what)
         return true; // it is not started earlier
     if (what == "busy")
         return m_program.presenter().workLine().isUnderWay() && m_program.presenter().workLine().width() > 0;
+    if (what == "still") {
+        m_program.presenter().commit();
+        return !m_program.presenter().isAnimating();
+    }
     const auto editor = m_program.editor();
     if (!editor)
         return false;
@@ -41,8 +46,13 @@ bool Script::waitFor(const std::string& what)
     }
     if (what == "sheet")
         return editor->isShareSheetUp();
-    if (what == "editor")
-        return !editor->presentedViewController();
+    if (what == "alert")
+        return editor->presentedViewController() && editor->presentedViewController()->presentedViewController();
+    if (what == "editor") {
+        // What a sheet leaves to be done when it goes is done by the next look.
+        const bool isAlone = !editor->presentedViewController();
+        return std::exchange(m_wasAlone, isAlone) && isAlone;
+    }
     if (what == "trimming")
         return editor->isTrimming();
     if (what == "trimmed")

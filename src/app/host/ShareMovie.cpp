@@ -13,6 +13,7 @@
 #include "linux/xdg/Bundles.h"
 #include "linux/xdg/FileManager.h"
 #include "linux/xdg/InstalledResources.h"
+#include "platform/sharing/ActivityList.h"
 
 #include <QCoreApplication>
 
@@ -92,12 +93,13 @@ public:
         if (!command.message.empty())
             m_items.emplace_back(command.message);
         m_items.emplace_back(base::Url::fromPath(movie));
+        m_list = platform::ActivityList(m_items);
     }
 
     int run()
     {
         m_machine.services.activities().findActivities(m_items, [this](const Activities& activities, bool isLast) {
-            m_found.insert(m_found.end(), activities.begin(), activities.end());
+            m_list.add(activities);
             if (isLast)
                 foundAll();
         });
@@ -118,14 +120,13 @@ public:
 private:
     void foundAll()
     {
-        std::erase_if(m_found, [this](const auto& each) { return !each->canPerformWithActivityItems(m_items); });
         if (m_command.list) {
-            for (const auto& each : m_found)
-                std::printf("%s\t%s\n", nameOf(*each, m_found).c_str(), each->activityTitle().c_str());
+            for (const auto& each : m_list.activities())
+                std::printf("%s\t%s\n", nameOf(*each, m_list.activities()).c_str(), each->activityTitle().c_str());
             leave(kExitDone);
             return;
         }
-        m_activity = activityNamed(m_command.with, m_found);
+        m_activity = activityNamed(m_command.with, m_list.activities());
         if (!m_activity) {
             complain("nothing here shares by " + m_command.with + "; `clipsa share --list` says what does");
             leave(kExitFailed);
@@ -159,7 +160,7 @@ private:
     const ShareCommand& m_command;
     Machine& m_machine;
     platform::ShareItems m_items;
-    Activities m_found;
+    platform::ActivityList m_list{{}};
     std::shared_ptr<platform::Activity> m_activity;
     ProgressBar m_bar{"Sharing"};
     int m_interruption = 0;

@@ -2,6 +2,7 @@
 
 #include "linux/devices/DeviceProvider.h"
 #include "linux/photos/UserDirectories.h"
+#include "linux/portals/DesktopActivities.h"
 #include "linux/sharing/Environment.h"
 #include "platform/sharing/CombinedActivities.h"
 #include "platform/sharing/SaveToVideosActivity.h"
@@ -48,13 +49,16 @@ struct ShareServices::Services {
         : options(std::move(given)),
           outbox(userOutbox(options.system.log)), environment{options.system, options.words, options.files,
                                                               options.works,  outbox,        options.nameOf},
-          devices(environment), keeping(options), all({&devices, &keeping})
+          desktop(environment,
+                  {.parentWindow = options.parentWindow, .folder = photos::UserDirectories::ofUser().videos}),
+          devices(environment), keeping(options), all({&desktop, &devices, &keeping})
     {
     }
 
     const Options options;
     const sharing::Outbox outbox;
     const sharing::Environment environment;
+    portals::DesktopActivities desktop;
     devices::DeviceProvider devices;
     Keeping keeping;
     platform::CombinedActivities all;

@@ -1,9 +1,30 @@
 #include "platform/sharing/ActivityList.h"
 
+#include "platform/sharing/ActivityTypes.h"
+
 #include <algorithm>
+#include <iterator>
+#include <string_view>
 #include <utility>
 
 namespace platform {
+
+namespace {
+
+/// What people share with most, then what keeps the movie on this machine.
+constexpr std::string_view kUsualOrder[] = {
+    kActivityTypeMail,      kActivityTypeMessage,      kActivityTypeKdeConnect,
+    kActivityTypeGsConnect, kActivityTypeBluetooth,    kActivityTypeOpenWith,
+    kActivityTypeSaveACopy, kActivityTypeShowInFolder, kActivityTypeSaveToCameraRoll};
+
+std::size_t usualRankOf(std::string_view type)
+{
+    const auto* const found = std::find(std::begin(kUsualOrder), std::end(kUsualOrder), type);
+    // The application's own stand where people look first for what is special.
+    return found == std::end(kUsualOrder) ? 0 : static_cast<std::size_t>(found - std::begin(kUsualOrder)) + 1;
+}
+
+} // namespace
 
 void ActivityList::setExcludedTypes(std::vector<std::string> types)
 {
@@ -39,10 +60,11 @@ void ActivityList::freeze()
     m_isFrozen = true;
 }
 
-std::size_t ActivityList::rankOf(const Activity& activity) const
+std::pair<std::size_t, std::size_t> ActivityList::rankOf(const Activity& activity) const
 {
-    const auto found = std::find(m_order.begin(), m_order.end(), activity.activityType());
-    return static_cast<std::size_t>(found - m_order.begin());
+    const std::string type = activity.activityType();
+    const auto found = std::find(m_order.begin(), m_order.end(), type);
+    return {static_cast<std::size_t>(found - m_order.begin()), usualRankOf(type)};
 }
 
 void ActivityList::sort()

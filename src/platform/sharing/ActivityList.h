@@ -9,6 +9,7 @@
 
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace platform {
@@ -22,7 +23,8 @@ public:
     const std::vector<std::string>& excludedTypes() const { return m_excluded; }
     const std::vector<std::string>& typeOrder() const { return m_order; }
     void setExcludedTypes(std::vector<std::string> types);
-    /// These types first, in that order; all others behind them, in the order in which they were found.
+    /// These types first, in that order; all others behind them as usual: the application's own, then those of the
+    /// platform, from mail to the library; of one type in the order in which they were found.
     void setTypeOrder(std::vector<std::string> types);
     /// Those that can do something with the items and are not excluded.
     void add(const Activities& activities);
@@ -35,7 +37,7 @@ public:
     }
 
 private:
-    std::size_t rankOf(const Activity& activity) const;
+    std::pair<std::size_t, std::size_t> rankOf(const Activity& activity) const;
     void sort();
 
     base::Affinity m_affinity;

@@ -1,0 +1,192 @@
+// Sharing with the real processes: the movie goes to a mail program, and is there when the editor has gone.
+#include "end_to_end/Machine.h"
+
+#include <QJsonArray>
+#include <QJsonDocument>
+#include <QJsonObject>
+
+#include <gmock/gmock.h>
+
+#include <algorithm>
+
+using namespace tests;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::SizeIs;
+
+namespace {
+
+namespace fs = std::filesystem;
+
+class Share : public testing::Test {
+protected:
+    Share() : m_movie(m_machine.movie("clock.mp4")), m_bytes(PrivateDirectory::read(m_movie))
+    {
+        const std::string address = "unix:path=" + (m_machine.home() / "bus").native();
+        m_bus = std::make_unique<Child>(Machine::Words{"dbus-daemon", "--session", "--nofork", "--nopidfile",
+                                                       "--print-address=1", "--address=" + address},
+                                        m_machine.environment());
+        EXPECT_TRUE(m_bus->waitForText("\n"));
+        m_machine.set("DBUS_SESSION_BUS_ADDRESS", address);
+    }
+    ~Share() override
+    {
+        if (m_desktop) {
+            m_desktop->signal(SIGTERM);
+            m_desktop->wait();
+        }
+        m_bus->signal(SIGTERM);
+        m_bus->wait();
+        EXPECT_EQ(PrivateDirectory::read(m_movie), m_bytes) << "the user's own file";
+        EXPECT_THAT(m_machine.remains(), IsEmpty());
+    }
+
+    /// A portal whose user does that with each request.
+    void startDesktop(const std::string& behaviour)
+    {
+        m_machine.write("home/desktop/calls", "");
+        m_desktop =
+            std::make_unique<Child>(Machine::Words{"/usr/bin/python3", sourceFile("tests/linux/portals/portal.py"),
+                                                   desktop(), behaviour, "Email=4", "OpenURI=4", "FileChooser=4"},
+                                    m_machine.environment());
+        ASSERT_TRUE(m_desktop->waitForText("ready")) << m_desktop->wait(Milliseconds(0)).err;
+    }
+    fs::path desktop() const { return m_machine.home() / "desktop"; }
+    /// The only request to the portal.
+    QJsonObject request() const
+    {
+        const auto lines = QByteArray::fromStdString(PrivateDirectory::read(desktop() / "calls")).trimmed().split('\n');
+        EXPECT_EQ(lines.size(), 1);
+        return QJsonDocument::fromJson(lines.front()).object();
+    }
+    /// Files in the outbox.
+    std::vector<fs::path> outbox() const
+    {
+        std::vector<fs::path> files;
+        const fs::path root = m_machine.outbox();
+        if (fs::exists(root))
+            for (const auto& entry : fs::recursive_directory_iterator(root))
+                if (entry.is_regular_file() && entry.path().filename() != "lock")
+                    files.push_back(entry.path());
+        std::sort(files.begin(), files.end());
+        return files;
+    }
+    Child::End share(const std::string& steps, const Machine::Words& options = {})
+    {
+        m_machine.setScript("wait picture\nwait ready\ntap BAR_SHARE\nwait sheet\n" + steps);
+        Machine::Words all{"--app-name", "Tux Racer", "--device", "phone"};
+        all.insert(all.end(), options.begin(), options.end());
+        return m_machine.open(m_movie, all);
+    }
+
+    Machine m_machine;
+    const fs::path m_movie;
+    const std::string m_bytes;
+    std::unique_ptr<Child> m_bus;
+    std::unique_ptr<Child> m_desktop;
+};
+
+constexpr const char* kMailAndDone = "tap SHARE_MAIL\nwait editor\ntap BAR_DONE";
+
+} // namespace
+
+TEST_F(Share, ByMailGivesTheMovieToThePortalAndTellsTheHost)
+{
+    startDesktop("done");
+    const auto end = share(kMailAndDone);
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_EQ(end.out, "Mail\n");
+    EXPECT_EQ(PrivateDirectory::read(desktop() / "bytes-0"), m_bytes);
+    EXPECT_FALSE(fs::exists(desktop() / "bytes-1")) << "nothing went along";
+}
+
+TEST_F(Share, ByMailSendsTheHostsMessageAndItsAttachment)
+{
+    startDesktop("done");
+    const fs::path log = m_machine.write("race.log", "third place\n");
+    const auto end = share(kMailAndDone, {"--message", "Look at this", "--attachment", log, "--json"});
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    const QJsonObject said = QJsonDocument::fromJson(QByteArray::fromStdString(end.out)).object();
+    EXPECT_EQ(said["activityTypes"].toArray(), QJsonArray{"Mail"});
+    ASSERT_EQ(said["results"].toArray().size(), 1);
+    EXPECT_EQ(said["results"].toArray()[0].toObject()["outcome"], "shared");
+    EXPECT_EQ(said["results"].toArray()[0].toObject()["type"], "Mail");
+    EXPECT_THAT(PrivateDirectory::read(desktop() / "calls"), HasSubstr("Look at this"));
+    EXPECT_EQ(PrivateDirectory::read(desktop() / "bytes-0"), m_bytes);
+    EXPECT_EQ(PrivateDirectory::read(desktop() / "bytes-1"), "third place\n");
+}
+
+TEST_F(Share, ThatTheUserCancelsInTheMailProgramIsNotTold)
+{
+    startDesktop("cancel");
+    const auto end = share("tap SHARE_MAIL\nwait file " + (desktop() / "bytes-0").native()
+                           + "\ntap SHARE_CLOSE\nwait editor\ntap BAR_DONE");
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_THAT(end.out, IsEmpty());
+}
+
+TEST_F(Share, ThatFailsIsToldByAnAlertAndByTheResults)
+{
+    startDesktop("fail");
+    const auto end = share("tap SHARE_MAIL\nwait alert\nwait still\ntap SHARE_OK\nwait gone SHARE_OK\ntap "
+                           "SHARE_CLOSE\nwait editor\ntap BAR_DONE",
+                           {"--json"});
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    const QJsonObject said = QJsonDocument::fromJson(QByteArray::fromStdString(end.out)).object();
+    EXPECT_EQ(said["activityTypes"].toArray(), QJsonArray());
+    ASSERT_EQ(said["results"].toArray().size(), 1);
+    EXPECT_EQ(said["results"].toArray()[0].toObject()["outcome"], "not-shared");
+    EXPECT_EQ(said["results"].toArray()[0].toObject()["type"], "Mail");
+}
+
+TEST_F(Share, ByAMailProgramThatReadsLaterFindsTheMovieWhenTheEditorHasGone)
+{
+    // No portal, but xdg-email and somebody who takes mail.
+    const fs::path program =
+        m_machine.write("home/bin/xdg-email", "#!/bin/sh\nprintf '%s\\n' \"$@\" >\"$HOME/mail\"\n");
+    fs::permissions(program, fs::perms::owner_all);
+    m_machine.write("home/.config/mimeapps.list", "[Default Applications]\nx-scheme-handler/mailto=mail.desktop\n");
+    m_machine.write("home/.local/share/applications/mail.desktop",
+                    "[Desktop Entry]\nType=Application\nName=Mail\nExec=mail %u\nMimeType=x-scheme-handler/mailto;\n");
+    m_machine.set("PATH", (m_machine.home() / "bin").native() + ":" + std::getenv("PATH"));
+    const auto end = share(kMailAndDone);
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_EQ(end.out, "Mail\n");
+
+    EXPECT_THAT(m_machine.editorDirectories(), IsEmpty()) << "the editor's store";
+    ASSERT_THAT(outbox(), SizeIs(1));
+    const fs::path kept = outbox().front();
+    EXPECT_THAT(kept.filename().native(), testing::StartsWith("Tux Racer 2024-05-17 09-30-00"));
+    EXPECT_THAT(PrivateDirectory::read(m_machine.home() / "mail"), HasSubstr(kept.native()));
+    EXPECT_EQ(PrivateDirectory::read(kept), m_bytes);
+}
+
+TEST_F(Share, FromAShellIsWhatTheSheetOffers)
+{
+    startDesktop("done");
+    const auto listed = m_machine.run({"share", m_movie, "--list"});
+    EXPECT_EQ(listed.exitStatus, 0) << listed.err;
+    EXPECT_EQ(listed.out, "Mail\tMail\nOpenWith\tOpen with…\nSaveACopy\tSave a copy…\nShowInFolder\tShow in folder\n"
+                          "SaveToCameraRoll\tSave to Videos\n");
+
+    const auto shared = m_machine.run({"share", m_movie, "--with", "Mail", "--message", "Look at this"});
+    EXPECT_EQ(shared.exitStatus, 0) << shared.err;
+    EXPECT_THAT(shared.out + shared.err, IsEmpty());
+    EXPECT_THAT(PrivateDirectory::read(desktop() / "calls"), HasSubstr("Look at this"));
+    EXPECT_EQ(PrivateDirectory::read(desktop() / "bytes-0"), m_bytes);
+}
+
+TEST_F(Share, FromAShellSaysWhenTheUserCancelsAndWhenNobodyTakesIt)
+{
+    startDesktop("cancel");
+    const auto cancelled = m_machine.run({"share", m_movie, "--with", "Mail"});
+    EXPECT_EQ(cancelled.exitStatus, 3);
+    EXPECT_EQ(cancelled.err, "clipsa: it was cancelled\n");
+
+    const auto unknown = m_machine.run({"share", m_movie, "--with", "Telepathy"});
+    EXPECT_EQ(unknown.exitStatus, 1);
+    EXPECT_THAT(unknown.err, HasSubstr("nothing here shares by Telepathy"));
+
+    const auto missing = m_machine.run({"share", m_movie.native() + ".not", "--list"});
+    EXPECT_EQ(missing.exitStatus, 2);
+}
