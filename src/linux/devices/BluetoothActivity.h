@@ -46,7 +46,7 @@ private:
     void send() override;
     void stop() override;
     /// What Bluetooth carries in a minute is copied in a moment.
-    bool tellsCopying() const override { return false; }
+    bool tellsPutting() const override { return false; }
 
     /// Goes on with the service where it runs.
     void findService(std::function<void()> otherwise);

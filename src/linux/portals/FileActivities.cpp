@@ -70,14 +70,14 @@ void OpenWithActivity::give()
 
 void SaveACopyActivity::give()
 {
-    m_movie = std::make_shared<posix::FileDescriptor>(openToRead(moviePath()));
+    m_movie = std::make_shared<posix::FileDescriptor>(openToRead(originals().front().path));
     if (!*m_movie) {
-        fail(cannotOpen(moviePath()));
+        fail(cannotOpen(originals().front().path));
         return;
     }
     QVariantMap options;
-    options.insert(QStringLiteral("current_name"),
-                   QString::fromStdString(posix::wholeFileNameSafe(movieName(), sharing::Outbox::kLongestName)));
+    options.insert(QStringLiteral("current_name"), QString::fromStdString(posix::wholeFileNameSafe(
+                                                       originals().front().name, sharing::Outbox::kLongestName)));
     if (!m_folder.empty()) // with the zero byte at its end
         options.insert(QStringLiteral("current_folder"),
                        QByteArray(m_folder.c_str(), static_cast<qsizetype>(m_folder.size()) + 1));

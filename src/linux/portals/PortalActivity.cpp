@@ -19,6 +19,7 @@ base::ErrorRef errorOf(const PortalRequest::Outcome& outcome, const char* refuse
 void PortalActivity::request(PortalRequest::Call call)
 {
     assertHere();
+    noteProgress(std::nullopt); // how long the user takes is not known
     // It goes with us, and so does what it calls.
     m_request =
         std::make_unique<PortalRequest>(m_portal, std::move(call), [this](const PortalRequest::Outcome& outcome) {

@@ -9,6 +9,7 @@ namespace portals {
 
 void MailProgramActivity::give()
 {
+    noteProgress(std::nullopt);
     std::vector<std::string> words{m_program, "--utf8", "--subject", mailSubject(title())};
     if (std::string body = mailBody(text()); !body.empty()) {
         words.emplace_back("--body");
@@ -67,6 +68,7 @@ std::string MessageActivity::activityTitle() const
 
 void MessageActivity::give()
 {
+    noteProgress(std::nullopt);
     if (m_application.command.empty()) {
         m_portal->bus().use([this, weak = weak_from_this(), turn = turn()](const QDBusConnection& bus) {
             if (const auto self = weak.lock(); self && isUnderWay(turn))

@@ -1,5 +1,6 @@
 #include "linux/sharing/OutboxActivity.h"
 
+#include <cerrno>
 #include <optional>
 
 namespace sharing {
@@ -28,9 +29,9 @@ void OutboxActivity::prepareWithActivityItems(const platform::ShareItems& items)
 {
     assertHere();
     m_text = platform::textOf(items);
-    m_toGive.clear();
+    m_originals.clear();
     for (const base::Url& file : platform::filesOf(items)) {
-        m_toGive.emplace_back(m_environment.files.resolvedPath(file.path()), m_environment.nameOf(file));
+        m_originals.push_back({m_environment.files.resolvedPath(file.path()), m_environment.nameOf(file)});
         if (takesOnlyTheMovie())
             break;
     }
@@ -38,7 +39,7 @@ void OutboxActivity::prepareWithActivityItems(const platform::ShareItems& items)
 
 std::string OutboxActivity::title() const
 {
-    const std::string name = m_toGive.empty() ? std::string() : m_toGive.front().second;
+    const std::string name = m_originals.empty() ? std::string() : m_originals.front().name;
     const std::size_t dot = name.rfind('.');
     return dot == 0 ? name : name.substr(0, dot);
 }
@@ -50,12 +51,16 @@ void OutboxActivity::performActivity()
     m_wanted = std::make_shared<std::atomic<bool>>(true);
     noteProgress(std::nullopt);
     const auto kept = std::make_shared<Files>();
-    const auto put = [toGive = m_toGive, outbox = m_environment.outbox, use = m_use,
+    const auto put = [originals = m_originals, outbox = m_environment.outbox, use = m_use, tells = tellsPutting(),
                       kept](const std::function<bool(double)>& goOn) -> base::Result<void> {
-        for (const auto& [path, name] : toGive) {
+        for (const auto& [path, name] : originals) {
+            if (!goOn(0))
+                return base::Error::fromErrno(ECANCELED, "putting it into the outbox");
             const auto tell = [&](std::uint64_t copied, std::uint64_t total) {
                 const double part = total > 0 ? static_cast<double>(copied) / static_cast<double>(total) : 0;
-                return goOn((static_cast<double>(kept->size()) + part) / static_cast<double>(toGive.size()));
+                const double progress =
+                    (static_cast<double>(kept->size()) + part) / static_cast<double>(originals.size());
+                return goOn(tells ? progress : 0);
             };
             auto file = outbox.put(path, name, tell, use);
             if (!file)
@@ -67,7 +72,6 @@ void OutboxActivity::performActivity()
     const auto nothing = [](const auto&) { return base::Result<void>(); };
     workInBackground(needsOutbox() ? Work(put) : Work(nothing), [this, kept] {
         m_files = std::move(*kept);
-        noteProgress(std::nullopt); // how long others take is not known
         give();
     });
 }
@@ -103,6 +107,8 @@ void OutboxActivity::workInBackground(Work work, std::function<void()> done)
 
 void OutboxActivity::setProgress(double progress) const
 {
+    if (!isUnderWay())
+        return;
     m_work->setProgress(progress);
     noteProgress(progress);
 }
@@ -113,7 +119,6 @@ void OutboxActivity::cancel()
     if (!isUnderWay())
         return;
     *m_wanted = false;
-    stop();
     giveUp();
 }
 
@@ -122,10 +127,11 @@ void OutboxActivity::end(bool completed, base::ErrorRef error)
     assertHere();
     if (!isUnderWay())
         return;
+    stop();
     // Kept until those who wait for us have been told: the process may end with it.
     const auto work = std::move(m_work);
     if (error)
-        m_environment.system.log.error("cannot share as " + activityType() + ": " + error->description());
+        m_environment.system.log.error("cannot share by " + activityType() + ": " + error->description());
     if (completed || !error)
         activityDidFinish(completed);
     else

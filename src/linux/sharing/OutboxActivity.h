@@ -43,13 +43,17 @@ protected:
     virtual bool needsOutbox() const { return true; }
     /// The files are ready. Ends, at some time, with complete(), giveUp() or fail().
     virtual void give() = 0;
-    /// Gives up what give() began; may be called whether it did or not.
+    /// Lets go of what give() began and is not over; called before each end.
     virtual void stop() = 0;
+    /// Whether putting the files there is worth being told: not where what follows takes so much longer.
+    virtual bool tellsPutting() const { return true; }
 
-    /// Where the first file is, as it was before it was put into the outbox.
-    const std::string& moviePath() const { return m_toGive.front().first; }
-    /// And what its receiver is to see.
-    const std::string& movieName() const { return m_toGive.front().second; }
+    struct Original {
+        std::string path;
+        std::string name; ///< what its receiver is to see
+    };
+    /// The files as they were before they were put into the outbox; the first is the movie.
+    const std::vector<Original>& originals() const { return m_originals; }
 
     /// `work` runs on a worker. It tells how far it is, from 0 to 1, and stops when that gives false. When it has failed this
     /// ends with its error; else `done` runs here, unless it was ended meanwhile.
@@ -61,6 +65,7 @@ protected:
     using Turn = std::weak_ptr<const std::atomic<bool>>;
     Turn turn() const { return m_wanted; }
     bool isUnderWay(const Turn& turn) const { return isUnderWay() && turn.lock() == m_wanted; }
+    void setProgress(double progress) const;
     void complete() { end(true, nullptr); }
     /// The user wanted it so.
     void giveUp() { end(false, nullptr); }
@@ -68,13 +73,12 @@ protected:
     void fail(base::ErrorRef error) { end(false, std::move(error)); }
 
 private:
-    void setProgress(double progress) const;
     void end(bool completed, base::ErrorRef error);
 
     const Environment& m_environment;
     const Outbox::Use m_use;
     std::string m_text;
-    std::vector<std::pair<std::string, std::string>> m_toGive; ///< paths and names
+    std::vector<Original> m_originals;
     Files m_files;
     std::shared_ptr<base::Work> m_work;
     std::shared_ptr<std::atomic<bool>> m_wanted; ///< by the worker's task
