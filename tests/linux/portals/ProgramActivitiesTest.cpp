@@ -322,12 +322,23 @@ TEST(MailTexts, KeepTheirLinesAndDirectionInTheBody)
 
 TEST(ApplicationsOfTheUser, AreWhereTheEnvironmentSays)
 {
-    ::setenv("XDG_DATA_HOME", "/data", 1);
-    ::setenv("XDG_DATA_DIRS", "/one:relative:/two", 1);
-    ::setenv("XDG_CONFIG_HOME", "not-a-path", 1);
-    ::unsetenv("XDG_CONFIG_DIRS");
-    ::setenv("HOME", "/home/me", 1);
+    const std::pair<const char*, const char*> kVariables[] = {{"XDG_DATA_HOME", "/data"},
+                                                              {"XDG_DATA_DIRS", "/one:relative:/two"},
+                                                              {"XDG_CONFIG_HOME", "not-a-path"},
+                                                              {"XDG_CONFIG_DIRS", ""},
+                                                              {"HOME", "/home/me"}};
+    std::vector<std::pair<const char*, std::optional<std::string>>> before;
+    for (const auto& [name, value] : kVariables) {
+        const char* const old = ::getenv(name);
+        before.emplace_back(name, old ? std::optional<std::string>(old) : std::nullopt);
+        ::setenv(name, value, 1);
+    }
     const auto found = portals::ApplicationDirectories::ofUser();
+    for (const auto& [name, value] : before)
+        if (value)
+            ::setenv(name, value->c_str(), 1);
+        else
+            ::unsetenv(name);
     EXPECT_THAT(found.data, ElementsAre("/data", "/one", "/two"));
     EXPECT_THAT(found.configuration, ElementsAre("/home/me/.config", "/etc/xdg"));
 }
