@@ -1,5 +1,5 @@
 // Sharing with the real processes: the movie goes to a mail program, and is there when the editor has gone.
-#include "end_to_end/Machine.h"
+#include "end_to_end/Desktop.h"
 
 #include <QJsonArray>
 #include <QJsonDocument>
@@ -20,45 +20,14 @@ namespace fs = std::filesystem;
 
 class Share : public testing::Test {
 protected:
-    Share() : m_movie(m_machine.movie("clock.mp4")), m_bytes(PrivateDirectory::read(m_movie))
-    {
-        const std::string address = "unix:path=" + (m_machine.home() / "bus").native();
-        m_bus = std::make_unique<Child>(Machine::Words{"dbus-daemon", "--session", "--nofork", "--nopidfile",
-                                                       "--print-address=1", "--address=" + address},
-                                        m_machine.environment());
-        EXPECT_TRUE(m_bus->waitForText("\n"));
-        m_machine.set("DBUS_SESSION_BUS_ADDRESS", address);
-    }
+    Share() : m_movie(m_machine.movie("clock.mp4")), m_bytes(PrivateDirectory::read(m_movie)) {}
     ~Share() override
     {
-        if (m_desktop) {
-            m_desktop->signal(SIGTERM);
-            m_desktop->wait();
-        }
-        m_bus->signal(SIGTERM);
-        m_bus->wait();
         EXPECT_EQ(PrivateDirectory::read(m_movie), m_bytes) << "the user's own file";
+        m_desktop.end();
         EXPECT_THAT(m_machine.remains(), IsEmpty());
     }
 
-    /// A portal whose user does that with each request.
-    void startDesktop(const std::string& behaviour)
-    {
-        m_machine.write("home/desktop/calls", "");
-        m_desktop =
-            std::make_unique<Child>(Machine::Words{"/usr/bin/python3", sourceFile("tests/linux/portals/portal.py"),
-                                                   desktop(), behaviour, "Email=4", "OpenURI=4", "FileChooser=4"},
-                                    m_machine.environment());
-        ASSERT_TRUE(m_desktop->waitForText("ready")) << m_desktop->wait(Milliseconds(0)).err;
-    }
-    fs::path desktop() const { return m_machine.home() / "desktop"; }
-    /// The only request to the portal.
-    QJsonObject request() const
-    {
-        const auto lines = QByteArray::fromStdString(PrivateDirectory::read(desktop() / "calls")).trimmed().split('\n');
-        EXPECT_EQ(lines.size(), 1);
-        return QJsonDocument::fromJson(lines.front()).object();
-    }
     /// Files in the outbox.
     std::vector<fs::path> outbox() const
     {
@@ -82,8 +51,7 @@ protected:
     Machine m_machine;
     const fs::path m_movie;
     const std::string m_bytes;
-    std::unique_ptr<Child> m_bus;
-    std::unique_ptr<Child> m_desktop;
+    Desktop m_desktop{m_machine};
 };
 
 constexpr const char* kMailAndDone = "tap SHARE_MAIL\nwait editor\ntap BAR_DONE";
@@ -92,17 +60,17 @@ constexpr const char* kMailAndDone = "tap SHARE_MAIL\nwait editor\ntap BAR_DONE"
 
 TEST_F(Share, ByMailGivesTheMovieToThePortalAndTellsTheHost)
 {
-    startDesktop("done");
+    m_desktop.startPortal("done");
     const auto end = share(kMailAndDone);
     EXPECT_EQ(end.exitStatus, 0) << end.err;
     EXPECT_EQ(end.out, "Mail\n");
-    EXPECT_EQ(PrivateDirectory::read(desktop() / "bytes-0"), m_bytes);
-    EXPECT_FALSE(fs::exists(desktop() / "bytes-1")) << "nothing went along";
+    EXPECT_EQ(m_desktop.received(0), m_bytes);
+    EXPECT_FALSE(m_desktop.hasReceived(1)) << "nothing went along";
 }
 
 TEST_F(Share, ByMailSendsTheHostsMessageAndItsAttachment)
 {
-    startDesktop("done");
+    m_desktop.startPortal("done");
     const fs::path log = m_machine.write("race.log", "third place\n");
     const auto end = share(kMailAndDone, {"--message", "Look at this", "--attachment", log, "--json"});
     EXPECT_EQ(end.exitStatus, 0) << end.err;
@@ -111,15 +79,15 @@ TEST_F(Share, ByMailSendsTheHostsMessageAndItsAttachment)
     ASSERT_EQ(said["results"].toArray().size(), 1);
     EXPECT_EQ(said["results"].toArray()[0].toObject()["outcome"], "shared");
     EXPECT_EQ(said["results"].toArray()[0].toObject()["type"], "Mail");
-    EXPECT_THAT(PrivateDirectory::read(desktop() / "calls"), HasSubstr("Look at this"));
-    EXPECT_EQ(PrivateDirectory::read(desktop() / "bytes-0"), m_bytes);
-    EXPECT_EQ(PrivateDirectory::read(desktop() / "bytes-1"), "third place\n");
+    EXPECT_THAT(m_desktop.calls(), HasSubstr("Look at this"));
+    EXPECT_EQ(m_desktop.received(0), m_bytes);
+    EXPECT_EQ(m_desktop.received(1), "third place\n");
 }
 
 TEST_F(Share, ThatTheUserCancelsInTheMailProgramIsNotTold)
 {
-    startDesktop("cancel");
-    const auto end = share("tap SHARE_MAIL\nwait file " + (desktop() / "bytes-0").native()
+    m_desktop.startPortal("cancel");
+    const auto end = share("tap SHARE_MAIL\nwait file " + (m_desktop.path() / "bytes-0").native()
                            + "\ntap SHARE_CLOSE\nwait editor\ntap BAR_DONE");
     EXPECT_EQ(end.exitStatus, 0) << end.err;
     EXPECT_THAT(end.out, IsEmpty());
@@ -127,7 +95,7 @@ TEST_F(Share, ThatTheUserCancelsInTheMailProgramIsNotTold)
 
 TEST_F(Share, ThatFailsIsToldByAnAlertAndByTheResults)
 {
-    startDesktop("fail");
+    m_desktop.startPortal("fail");
     const auto end = share("tap SHARE_MAIL\nwait alert\nwait still\ntap SHARE_OK\nwait gone SHARE_OK\ntap "
                            "SHARE_CLOSE\nwait editor\ntap BAR_DONE",
                            {"--json"});
@@ -163,7 +131,7 @@ TEST_F(Share, ByAMailProgramThatReadsLaterFindsTheMovieWhenTheEditorHasGone)
 
 TEST_F(Share, FromAShellIsWhatTheSheetOffers)
 {
-    startDesktop("done");
+    m_desktop.startPortal("done");
     const auto listed = m_machine.run({"share", m_movie, "--list"});
     EXPECT_EQ(listed.exitStatus, 0) << listed.err;
     EXPECT_EQ(listed.out, "Mail\tMail\nOpenWith\tOpen with…\nSaveACopy\tSave a copy…\nShowInFolder\tShow in folder\n"
@@ -172,13 +140,13 @@ TEST_F(Share, FromAShellIsWhatTheSheetOffers)
     const auto shared = m_machine.run({"share", m_movie, "--with", "Mail", "--message", "Look at this"});
     EXPECT_EQ(shared.exitStatus, 0) << shared.err;
     EXPECT_THAT(shared.out + shared.err, IsEmpty());
-    EXPECT_THAT(PrivateDirectory::read(desktop() / "calls"), HasSubstr("Look at this"));
-    EXPECT_EQ(PrivateDirectory::read(desktop() / "bytes-0"), m_bytes);
+    EXPECT_THAT(m_desktop.calls(), HasSubstr("Look at this"));
+    EXPECT_EQ(m_desktop.received(0), m_bytes);
 }
 
 TEST_F(Share, FromAShellSaysWhenTheUserCancelsAndWhenNobodyTakesIt)
 {
-    startDesktop("cancel");
+    m_desktop.startPortal("cancel");
     const auto cancelled = m_machine.run({"share", m_movie, "--with", "Mail"});
     EXPECT_EQ(cancelled.exitStatus, 3);
     EXPECT_EQ(cancelled.err, "clipsa: it was cancelled\n");
