@@ -47,7 +47,8 @@ TEST_P(Picture, LooksAsItDid)
 INSTANTIATE_TEST_SUITE_P(EndToEnd, Picture,
                          testing::Values("phone", "phone-landscape", "phone-landscape-flat",
                                          "phone-without-home-button", "phone-dark", "phone-trim", "phone-dark-trim",
-                                         "pad", "pad-without-home-button", "pad-flat", "pad-dark", "pad-trim"),
+                                         "phone-share", "phone-dark-share", "phone-arabic", "phone-arabic-share", "pad",
+                                         "pad-without-home-button", "pad-flat", "pad-dark", "pad-trim", "pad-share"),
                          [](const auto& picture) { return caseName(picture.param); });
 
 TEST(TurningAPhone, ToItsSideAndBackShowsWhatWasThere)
