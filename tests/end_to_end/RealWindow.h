@@ -29,6 +29,7 @@ inline constexpr double kTopBar = 60;
 inline constexpr double kBottomBar = 44;
 inline constexpr double kStrip = 38;
 inline constexpr double kStripInset = 10 + 16; // to the pictures, behind a grip
+inline constexpr double kShareEnd = 8 + 44;    ///< the bar's first item
 inline constexpr double kBarMiddle = kLong - kBottomBar / 2;
 inline constexpr double kStripMiddle = kLong - kBottomBar - kStrip / 2;
 
@@ -128,14 +129,14 @@ protected:
                     return false;
         return true;
     }
-    /// Of the bottom bar: play is one solid thing, pause is two.
+    /// Of the bottom bar, behind the share item: play is one solid thing, pause is two.
     bool showsPlay(const Screenshot& picture) const { return blueThingsInBottomBar(picture) == 1; }
     bool showsPause(const Screenshot& picture) const { return blueThingsInBottomBar(picture) == 2; }
     int blueThingsInBottomBar(const Screenshot& picture) const
     {
         int things = 0;
         bool wasBlue = false;
-        for (double x = 0; x < kShort; ++x) { // what is disabled is too pale to count
+        for (double x = kShareEnd; x < kShort; ++x) {
             const bool now = isBlue(at(picture, x, kBarMiddle));
             things += now && !wasBlue ? 1 : 0;
             wasBlue = now;

@@ -115,6 +115,7 @@ EditorProgram::EditorProgram(const EditorOptions& options)
                    [this](std::optional<double> progress) { m_presenter.showWork(progress); },
                    [this] { m_presenter.hideWork(); }})
 {
+    m_window->setLog(m_log);
     m_window->setRightToLeft(m_words.isRightToLeft());
     // Declares the classes that the declaration names.
     VKVideoEditorExtensionContext::classObject();
