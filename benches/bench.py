@@ -12,11 +12,12 @@ import mixing
 import playing
 import report
 import seeking
+import sharing
 import start
 import thumbnails
 import trimming
 
-KINDS = ("start", "seek", "scrub", "play", "memory", "thumbnails", "trim", "mix")
+KINDS = ("start", "seek", "scrub", "play", "memory", "thumbnails", "trim", "mix", "share")
 
 
 class Settings:
@@ -67,6 +68,8 @@ def main():
             mixing.measure(settings, (own or [settings.movie("ten-minutes-two-tracks.mp4")])[0])
         elif kind == "trim":
             trimming.measure(settings, (own or [settings.movie("ten-minutes-1080p60.mp4")])[0])
+        elif kind == "share":
+            sharing.measure(settings, (own or [recording])[0])
         elif kind == "thumbnails":
             thumbnails.measure(settings, (own or [settings.movie("ten-minutes-1080p60.mp4")])[0])
 

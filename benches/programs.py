@@ -173,6 +173,9 @@ class Window:
 
     pid = property(lambda self: self._process.pid)
 
+    def is_running(self):
+        return self._process.poll() is None
+
     def processes(self):
         return [self.pid, *children(self.pid)]
 

@@ -62,7 +62,8 @@ TEST_F(Closing, InJsonTheListOfActivitiesIsEmptyToo)
     m_machine.setScript(kClose);
     const auto end = m_machine.open(movie, {"--json"});
     EXPECT_EQ(end.exitStatus, 0) << end.err;
-    EXPECT_EQ(end.out, "{\"activityTypes\":[],\"movie\":\"" + movie.native() + "\",\"saved\":[],\"unsaved\":[],\"results\":[]}\n");
+    EXPECT_EQ(end.out, "{\"activityTypes\":[],\"movie\":\"" + movie.native()
+                           + "\",\"saved\":[],\"unsaved\":[],\"results\":[]}\n");
 }
 
 TEST_F(Closing, OnRequestTheEditorSaysWhatItDoes)

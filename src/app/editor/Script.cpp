@@ -1,6 +1,7 @@
 #include "app/editor/Script.h"
 
 #include "app/editor/EditorProgram.h"
+#include "app/editor/StartTrace.h"
 #include "app/editor/SyntheticInput.h"
 #include "base/Environment.h"
 #include "editor/VKVideoEditorViewController.h"
@@ -178,6 +179,10 @@ bool Script::carryOut(const Words& words)
     }
     if (command == "later") {
         m_program.clock().putAhead(number(argument(1)));
+        return true;
+    }
+    if (command == "mark") {
+        markStart(argument(1).c_str());
         return true;
     }
     if (command == "picture")

@@ -26,6 +26,7 @@
 ///   close                  ask the window to close, as its title bar does
 ///   scheme light|dark
 ///   later SECONDS          put the calendar ahead
+///   mark NAME              tell the time of that moment, for ./bench: see StartTrace.h
 ///   picture FILE [WORDS]   once nothing moves or fades, write what is on the screen as a PNG, into $CLIPSA_PICTURES or
 ///                          here; with WORDS, say so
 ///   print WORDS            a line at the end of the file $CLIPSA_REPORT, or on standard output; filled in are {time},
