@@ -57,8 +57,19 @@ TEST_P(Words, AreAllUnderstood)
 {
     for (const auto& [key, text] : table()) {
         EXPECT_EQ(m_catalog.text(key), text);
-        const std::string shown = m_catalog.text(
-            key, {{"name", "a.mp4"}, {"duration", "long"}, {"rest", "short"}, {"position", "here"}, {"part", 0.5}});
+        const std::string shown = m_catalog.text(key, {{"name", "a.mp4"},
+                                                       {"names", "a.log and b.log"},
+                                                       {"duration", "long"},
+                                                       {"length", "0:42"},
+                                                       {"size", "12.4 MB"},
+                                                       {"rest", "short"},
+                                                       {"position", "here"},
+                                                       {"part", 0.5},
+                                                       {"device", "Phone"},
+                                                       {"way", "Bluetooth"},
+                                                       {"number", std::int64_t{2}},
+                                                       {"activity", "Mail"},
+                                                       {"application", "Letters"}});
         EXPECT_THAT(shown, Not(testing::ContainsRegex("[{}]"))) << key;
         if (text.find("{name}") != std::string::npos) {
             EXPECT_THAT(shown, HasSubstr("a.mp4")) << key;
