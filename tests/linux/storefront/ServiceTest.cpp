@@ -197,6 +197,7 @@ TEST_F(StoreService, WithoutCataloguesWhatIsInstalledIsTheAnswer)
     open();
     store->prepare();
     EXPECT_THAT(itemOf("a").displayName, Optional(std::string("Mine")));
+    EXPECT_THAT(itemOf("a").displayName, Optional(std::string("Mine"))) << "also behind the first answer";
     store.reset();
 }
 
@@ -207,6 +208,22 @@ TEST_F(StoreService, WithoutASourceThereIsNoResponse)
     EXPECT_FALSE(ask({"a"}).get());
     store.reset();
     EXPECT_THAT(published.calls, IsEmpty());
+}
+
+TEST_F(StoreService, AnUnknownProfileIsAnsweredWithAnErrorAndAsksNobody)
+{
+    open();
+    std::promise<base::ErrorRef> answered;
+    store->start({"lockup", 1, {"a"}}, [&](const auto& response, const base::ErrorRef& error) {
+        EXPECT_FALSE(response);
+        answered.set_value(error);
+    });
+    const base::ErrorRef error = answered.get_future().get();
+    ASSERT_TRUE(error);
+    EXPECT_EQ(error->domain(), storefront::kStoreErrorDomain);
+    EXPECT_EQ(error->code(), storefront::kStoreBadRequest);
+    store.reset();
+    EXPECT_THAT(installed.calls, IsEmpty());
 }
 
 TEST_F(StoreService, WhatIsFoundAfterTheEndIsToldToNobody)
