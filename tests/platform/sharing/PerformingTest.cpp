@@ -1,0 +1,280 @@
+// The share sheet while an activity is performed: how that goes on, and how all of it ends.
+#include "SharingFixture.h"
+
+namespace tests {
+
+namespace {
+
+using platform::AlertController;
+using platform::Key;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+base::ErrorRef error(const std::string& why)
+{
+    return base::Error::make("test", 1, why);
+}
+
+TEST_F(Sharing, WhatCompletesClosesTheSheetAndIsTold)
+{
+    const auto mail = activity("mail");
+    open({mail});
+    tapRow(0);
+    EXPECT_EQ(mail->prepared, items);
+    EXPECT_EQ(mail->performed, 1);
+    EXPECT_THAT(results, IsEmpty());
+    mail->activityDidFinish(true);
+    EXPECT_THAT(results, IsEmpty()) << "not before it is gone";
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_THAT(results, ElementsAre("mail yes"));
+    EXPECT_EQ(sheet->performedActivity(), mail);
+}
+
+TEST_F(Sharing, WhatEndsAtOnceDoesSo)
+{
+    const auto folder = activity("folder");
+    folder->endsAtOnce = true;
+    open({folder});
+    tapRow(0);
+    settle();
+    EXPECT_THAT(results, ElementsAre("folder yes"));
+}
+
+TEST_F(Sharing, WhatTheUserCancelsInItsOwnDialogueLeadsBackToTheList)
+{
+    const auto mail = activity("mail");
+    open({mail, activity("folder")});
+    tapRow(0);
+    mail->activityDidFinish(false);
+    settle();
+    machine.advance(std::chrono::seconds(2));
+    EXPECT_FALSE(machine.mainQueue.untilNext()) << "nothing moves any more";
+    EXPECT_FALSE(isGone());
+    EXPECT_TRUE(row(0)->row()->isEnabled());
+    EXPECT_TRUE(row(1)->row()->isEnabled());
+    EXPECT_FALSE(sheet->presentedViewController());
+    tapOn(*sheet->closeButton());
+    settle();
+    EXPECT_THAT(results, ElementsAre(" no"));
+}
+
+TEST_F(Sharing, WhatFailsSaysWhyAndLeadsBackToTheList)
+{
+    const auto mail = activity("mail");
+    open({mail});
+    tapRow(0);
+    mail->activityDidFail(base::Error::withMessage(error("for the log"), "MOVIE_GONE", {{"name", "race.mp4"}}));
+    settle();
+    const auto alert = std::dynamic_pointer_cast<AlertController>(sheet->presentedViewController());
+    ASSERT_TRUE(alert);
+    EXPECT_EQ(alert->title(), "“mail” did not work");
+    EXPECT_EQ(alert->message(), "“race.mp4” cannot be opened: it is no longer there.");
+    window->keyDown(Key::Return);
+    settle();
+    EXPECT_FALSE(sheet->presentedViewController());
+    EXPECT_FALSE(isGone());
+    EXPECT_TRUE(row(0)->row()->isEnabled());
+    EXPECT_THAT(results, IsEmpty());
+}
+
+TEST_F(Sharing, WhileOneIsPerformedTheOthersWait)
+{
+    const auto send = activity("device");
+    const auto mail = activity("mail");
+    open({send, mail});
+    tapRow(0);
+    window->commit();
+    EXPECT_FALSE(row(0)->progressView()->isHidden());
+    EXPECT_FALSE(row(0)->cancelButton()->isHidden());
+    EXPECT_EQ(row(0)->progressView()->progress(), std::nullopt);
+    EXPECT_GE(row(0)->cancelButton()->frame().width(), 44);
+    EXPECT_EQ(row(0)->cancelButton()->frame().height(), 44);
+    send->tell(0.404);
+    EXPECT_EQ(row(0)->progressView()->progress(), 0.4);
+    tapRow(1);
+    EXPECT_EQ(mail->performed, 0);
+    provider.found({activity("late")}, true);
+    EXPECT_FALSE(row(2)->row()->isEnabled()) << "what comes meanwhile waits, too";
+    tapOn(*row(0)->cancelButton());
+    settle();
+    EXPECT_EQ(send->cancelled, 1);
+    EXPECT_FALSE(isGone());
+    EXPECT_TRUE(row(0)->cancelButton()->isHidden());
+    EXPECT_TRUE(row(0)->progressView()->isHidden());
+    tapRow(1);
+    EXPECT_EQ(mail->performed, 1);
+}
+
+TEST_F(Sharing, ClosingItWhileOneIsPerformedCancelsThatFirst)
+{
+    const auto send = activity("device");
+    send->endsWhenCancelled = false;
+    open({send});
+    tapRow(0);
+    window->keyDown(Key::Escape);
+    machine.advance(std::chrono::milliseconds(500));
+    EXPECT_EQ(send->cancelled, 1);
+    EXPECT_FALSE(isGone());
+    window->keyDown(Key::Escape);
+    EXPECT_EQ(send->cancelled, 1);
+    send->activityDidFinish(false);
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_THAT(results, ElementsAre("device no"));
+}
+
+TEST_F(Sharing, OneThatEndsAsSoonAsItIsCancelledLetsItCloseAtOnce)
+{
+    const auto send = activity("device");
+    open({send});
+    tapRow(0);
+    tapOn(*sheet->closeButton());
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_THAT(results, ElementsAre("device no"));
+}
+
+TEST_F(Sharing, ItDoesNotWaitForeverForOneThatDoesNotEnd)
+{
+    const auto send = activity("device");
+    send->endsWhenCancelled = false;
+    open({send});
+    tapRow(0);
+    window->keyDown(Key::Escape);
+    machine.advance(std::chrono::milliseconds(999));
+    EXPECT_EQ(sheet->presentingViewController(), root);
+    machine.advance(std::chrono::milliseconds(1));
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_THAT(results, ElementsAre(" no"));
+    send->activityDidFinish(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre(" no")) << "too late";
+}
+
+TEST_F(Sharing, WhatCompletesWhileItClosesStillCounts)
+{
+    const auto send = activity("device");
+    send->endsWhenCancelled = false;
+    open({send});
+    tapRow(0);
+    window->keyDown(Key::Escape);
+    machine.advance(std::chrono::seconds(1));
+    EXPECT_THAT(results, IsEmpty());
+    send->activityDidFinish(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre("device yes"));
+}
+
+TEST_F(Sharing, ItIsToldOnceHoweverItGoes)
+{
+    open({activity("mail")});
+    root->dismiss(true);
+    root->dismiss(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre(" no"));
+}
+
+TEST_F(Sharing, WhatAnActivityShowsStandsAboveTheSheet)
+{
+    const auto upload = activity("upload");
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    EXPECT_EQ(sheet->presentedViewController(), upload->controller);
+    EXPECT_EQ(upload->performed, 0) << "it is shown in place of being performed";
+    upload->activityDidFinish(true);
+    settle();
+    EXPECT_TRUE(isGone());
+    EXPECT_FALSE(upload->controller->window());
+    EXPECT_THAT(results, ElementsAre("upload yes"));
+}
+
+TEST_F(Sharing, WhatAnActivityShowsGoesBeforeItsErrorIsTold)
+{
+    const auto upload = activity("upload");
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    upload->activityDidFail(error("no network"));
+    settle();
+    settle();
+    const auto alert = std::dynamic_pointer_cast<AlertController>(sheet->presentedViewController());
+    ASSERT_TRUE(alert);
+    EXPECT_EQ(alert->message(), "no network");
+}
+
+TEST_F(Sharing, ClosingWhatAnActivityShowsCancelsIt)
+{
+    const auto upload = activity("upload");
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    window->keyDown(Key::Escape);
+    settle();
+    EXPECT_EQ(upload->cancelled, 1);
+    EXPECT_FALSE(isGone());
+    EXPECT_FALSE(sheet->isPerforming());
+    EXPECT_TRUE(row(0)->row()->isEnabled());
+}
+
+TEST_F(Sharing, WhatWasGivenUpTooLateStillCounts)
+{
+    const auto upload = activity("upload");
+    upload->endsWhenCancelled = false;
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    window->keyDown(Key::Escape);
+    settle();
+    EXPECT_FALSE(sheet->isPerforming());
+    upload->activityDidFinish(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre("upload yes"));
+}
+
+TEST_F(Sharing, WhatWasGivenUpDoesNotEndWhatIsPerformedNow)
+{
+    const auto upload = activity("upload");
+    const auto mail = activity("mail");
+    upload->endsWhenCancelled = false;
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload, mail});
+    tapRow(0);
+    settle();
+    window->keyDown(Key::Escape);
+    settle();
+    tapRow(1);
+    upload->activityDidFail(error("no network"));
+    settle();
+    EXPECT_TRUE(sheet->isPerforming());
+    EXPECT_FALSE(sheet->presentedViewController());
+    mail->activityDidFinish(true);
+    settle();
+    EXPECT_THAT(results, ElementsAre("mail yes"));
+}
+
+TEST_F(Sharing, WhatWasGivenUpAndFailsAfterwardsIsNoNews)
+{
+    const auto upload = activity("upload");
+    upload->endsWhenCancelled = false;
+    upload->controller = std::make_shared<platform::ViewController>();
+    open({upload});
+    tapRow(0);
+    settle();
+    window->keyDown(Key::Escape);
+    settle();
+    upload->activityDidFail(error("no network"));
+    settle();
+    EXPECT_FALSE(sheet->presentedViewController());
+    EXPECT_FALSE(isGone());
+}
+
+} // namespace
+
+} // namespace tests
