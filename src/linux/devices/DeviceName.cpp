@@ -55,7 +55,8 @@ std::string readableName(std::string_view name)
             line += "…";
             break;
         }
-        line += (spaced ? " " : "") + std::string(character);
+        line += spaced ? " " : "";
+        line += character;
         count += more;
         spaced = false;
         seen =
