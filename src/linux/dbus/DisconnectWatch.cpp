@@ -20,6 +20,14 @@ void DisconnectWatch::watch(QDBusConnection connection)
         QMetaObject::invokeMethod(this, &DisconnectWatch::tell, Qt::QueuedConnection);
 }
 
+void DisconnectWatch::forget(QDBusConnection connection)
+{
+    m_affinity.assertHere();
+    connection.disconnect(QString(), QStringLiteral("/org/freedesktop/DBus/Local"),
+                          QStringLiteral("org.freedesktop.DBus.Local"), QStringLiteral("Disconnected"), this,
+                          SLOT(tell()));
+}
+
 void DisconnectWatch::tell()
 {
     if (const auto ended = std::exchange(m_ended, {}))

@@ -18,6 +18,9 @@ public:
     explicit DisconnectWatch(std::function<void()> ended, QObject* parent = nullptr);
 
     void watch(QDBusConnection connection);
+    /// Before the connection is let go of: Qt tells of its end while it is being deleted, and what has been told and not
+    /// delivered by then refers to it.
+    void forget(QDBusConnection connection);
 
 private Q_SLOTS:
     void tell();

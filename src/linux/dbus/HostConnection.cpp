@@ -80,8 +80,11 @@ struct HostConnection::State final : QDBusVirtualObject {
         handlers = {};
         const auto connection = peer->value();
         peer->setValue(std::nullopt);
-        if (connection)
-            QDBusConnection::disconnectFromPeer(connection->name());
+        if (!connection)
+            return;
+        watch.forget(*connection);
+        QDBusConnection(*connection).unregisterObject(QLatin1String(kHostPath));
+        QDBusConnection::disconnectFromPeer(connection->name());
     }
 
     QString introspect(const QString& path) const override
