@@ -88,7 +88,7 @@ class Run:
             data = os.path.join(folder, "data")
             write_catalogue(data)
             window = programs.Window(
-                [settings.program("clipsa"), "open", movie, "--device", "phone", "--bundle-id", APP], screen,
+                [settings.program("clipsa"), "open", movie, "--device", "pad", "--bundle-id", APP], screen,
                 CLIPSA_TRACE_START="1", CLIPSA_SCRIPT=script, DBUS_SESSION_BUS_ADDRESS=desktop.address,
                 XDG_DATA_HOME=data, XDG_CACHE_HOME=os.path.join(folder, "cache"))
             self._dimmed = []
