@@ -19,7 +19,6 @@ const runtime::Class& Activity::isa() const
 void Activity::setEndHandler(std::function<void(const End&)> handler)
 {
     assertHere();
-    m_ended = m_ended && !handler;
     m_endHandler = std::move(handler);
 }
 
@@ -38,14 +37,12 @@ void Activity::activityDidFail(base::ErrorRef error)
 void Activity::noteProgress(std::optional<double> progress) const
 {
     assertHere();
-    if (m_progressHandler && !m_ended)
+    if (m_progressHandler)
         m_progressHandler(progress);
 }
 
 void Activity::end(const End& how)
 {
-    if (std::exchange(m_ended, true))
-        return;
     const auto keepAlive = weak_from_this().lock(); // its owner lets go of it
     m_progressHandler = {};
     if (const auto handler = std::exchange(m_endHandler, {}))

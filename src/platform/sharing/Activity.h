@@ -67,7 +67,6 @@ protected:
 private:
     void end(const End& how);
 
-    bool m_ended = false;
     std::function<void(const End&)> m_endHandler;
     std::function<void(std::optional<double>)> m_progressHandler;
 };

@@ -32,7 +32,6 @@ void ShareListView::didMoveToWindow()
     addSubview(m_scroll);
     m_scroll->contentView()->addSubview(m_footer);
     m_scroll->contentView()->addSubview(m_indicator);
-    showFooter();
 }
 
 void ShareListView::show(const ActivityList::Activities& activities, const std::weak_ptr<runtime::Object>& target,
@@ -49,9 +48,6 @@ void ShareListView::show(const ActivityList::Activities& activities, const std::
         }
         rows.push_back(row);
     }
-    for (const auto& row : m_rows)
-        if (std::find(rows.begin(), rows.end(), row) == rows.end())
-            row->removeFromSuperview();
     m_rows = std::move(rows);
     for (const auto& row : m_rows)
         m_scroll->contentView()->addSubview(row); // those who are there come to the front: into this order

@@ -16,7 +16,7 @@ public:
     /// `words` outlive it.
     explicit ShareListView(const MessageCatalog& words);
 
-    /// A row for each of them, in that order; those that have one keep it.
+    /// A row for each of them, in that order; those that have one keep it, and they all stay.
     void show(const ActivityList::Activities& activities, const std::weak_ptr<runtime::Object>& target,
               const runtime::Selector& pick, const runtime::Selector& cancel);
     void setLooking(bool looking);

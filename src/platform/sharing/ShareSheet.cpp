@@ -53,10 +53,6 @@ ShareSheet::ShareSheet(Services services, ShareItems items, std::vector<std::sha
 ShareSheet::~ShareSheet()
 {
     assertHere();
-    if (m_running) {
-        m_running->setEndHandler({});
-        m_running->setProgressHandler({});
-    }
 }
 
 const runtime::Class& ShareSheet::classObject()
@@ -161,7 +157,7 @@ std::shared_ptr<View> ShareSheet::preferredFocusView()
 
 std::shared_ptr<ActivityRow> ShareSheet::runningRow() const
 {
-    return m_running && m_list ? m_list->rowOf(*m_running) : nullptr;
+    return m_list->rowOf(*m_running);
 }
 
 void ShareSheet::rowPicked(std::shared_ptr<runtime::Object> row)
@@ -266,7 +262,6 @@ void ShareSheet::goBackToList()
     if (!row)
         return;
     row->showIdle();
-    view()->layoutIfNeeded();
     if (isSteeredByKeys)
         itsWindow->restoreFocus(row->row());
 }

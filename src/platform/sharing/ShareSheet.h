@@ -97,6 +97,7 @@ private:
     void showError(const Activity& activity, const base::ErrorRef& error);
     /// For good: takes itself away.
     void close();
+    /// While one is performed.
     std::shared_ptr<ActivityRow> runningRow() const;
 
     Services m_services;

@@ -76,7 +76,6 @@ void ShareSheet::presentedViewControllerDidEnd(ViewController& presented)
 void ShareSheet::close()
 {
     m_isClosing = true;
-    m_list->setEnabled(false);
     if (const auto presenting = presentingViewController())
         presenting->dismiss(true);
 }

@@ -134,8 +134,6 @@ void ShareSummary::loadMovie()
 
 void ShareSummary::showPicture(const ImageRef& image)
 {
-    if (m_picture)
-        m_picture->removeFromSuperview();
     m_picture = std::make_shared<ImageView>(image);
     m_pictureFrame->addSubview(m_picture);
     // It fills the square; what is over is cut off, the same on both sides.
