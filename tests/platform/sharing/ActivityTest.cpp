@@ -63,6 +63,28 @@ TEST(AnActivity, MayBeLetGoOfByWhoHearsOfItsEnd)
     EXPECT_EQ(sending, nullptr);
 }
 
+TEST(AnActivity, CanBePerformedWithAnythingUnlessItSaysOtherwise)
+{
+    EXPECT_TRUE(std::make_shared<Sending>()->canPerformWithActivityItems({"text"}));
+}
+
+TEST(AnActivity, ToldToNobodyIsNoHarm)
+{
+    const auto sending = std::make_shared<Sending>();
+    sending->tell(0.5);
+    sending->activityDidFinish(true);
+}
+
+TEST(AnActivity, LetsGoOfThoseWhoListenOnceItHasEnded)
+{
+    const auto sending = std::make_shared<Sending>();
+    const auto listener = std::make_shared<int>();
+    sending->setProgressHandler([listener](std::optional<double>) {});
+    sending->setEndHandler([listener](const Activity::End&) {});
+    sending->activityDidFinish(true);
+    EXPECT_EQ(listener.use_count(), 1);
+}
+
 TEST(AnActivity, TellsNoProgressOnceItHasEnded)
 {
     const auto sending = std::make_shared<Sending>();

@@ -51,6 +51,9 @@ TEST_F(SharingLayout, WordsStandBesideThePictureAndTheTextBelowIt)
     expectAt(sheet->closeButton(), Rect::make(352, 4, 44, 44));
     EXPECT_THAT(summary.frame(), IsAt(Rect::make(0, 0, 400, 131)));
     EXPECT_THAT(sheet->list()->frame(), IsAt(Rect::make(0, 131, 400, sheet->view()->bounds().height() - 131)));
+    const auto line = std::dynamic_pointer_cast<platform::SurfaceView>(sheet->view()->subviews().back());
+    ASSERT_TRUE(line);
+    EXPECT_THAT(line->frame(), IsAt(Rect::make(0, 131, 400, 0.5))) << "a pixel between the two";
 }
 
 TEST_F(SharingLayout, ThePicturesSquareStandsWhereRowsBegin)
@@ -79,6 +82,44 @@ TEST_F(SharingLayout, ManyWordsBesideThePictureMoveTheTextDown)
     expectAt(summary.filesLabel(), Rect::make(100, 85, 284, 35));
     expectAt(summary.textLabel(), Rect::make(16, 132, 368, 19));
     EXPECT_EQ(summary.frame().height(), 163);
+}
+
+TEST_F(SharingLayout, WhatStandsAtTheTopTakesItsLinesAndNoMore)
+{
+    const auto letters = [](std::size_t count) { return std::string(count, 'x'); };
+    const auto heightOf = [this](const std::string& name, const std::string& file, const std::string& text) {
+        const platform::ShareItems what{text, base::Url::fromPath("/tmp/race.mp4"),
+                                        base::Url::fromPath("/tmp/" + file)};
+        const auto summary = std::make_shared<platform::ShareSummary>(
+            platform::ShareSummary::Services{words, media, files, machine.mainQueue}, what, name);
+        summary->setTrailingInset(48);
+        return summary->heightThatFits(400);
+    };
+    const double fixed = 16 + 4 + 18 + 4 + 12 + 12;
+    EXPECT_EQ(heightOf(letters(24), letters(60), "x"), fixed + 22 + 35 + 19);
+    EXPECT_EQ(heightOf(letters(26), letters(60), "x"), fixed + 43 + 35 + 19);
+    EXPECT_EQ(heightOf(letters(110), letters(110), letters(390)), fixed + 43 + 35 + 57) << "the rest is cut off";
+    EXPECT_EQ(heightOf(letters(26), letters(26), "x"), fixed + 43 + 18 + 19);
+    EXPECT_EQ(heightOf(letters(26), letters(28), "x"), fixed + 43 + 35 + 19);
+    EXPECT_EQ(heightOf(letters(26), letters(26), letters(40)), fixed + 43 + 18 + 19);
+    EXPECT_EQ(heightOf(letters(26), letters(26), letters(41)), fixed + 43 + 18 + 38);
+}
+
+TEST_F(SharingLayout, WordsBeginWhereRowsBeginAndTheLesserOnesStepBack)
+{
+    open({});
+    const auto& summary = *sheet->summary();
+    EXPECT_TRUE(summary.nameLabel()->isEmphasized());
+    const auto& footer = sheet->list()->footerLabel();
+    for (const auto& label :
+         {summary.nameLabel(), summary.detailsLabel(), summary.filesLabel(), summary.textLabel(), footer})
+        EXPECT_EQ(label->textAlignment(), platform::TextAlignment::Leading);
+    EXPECT_EQ(summary.nameLabel()->textColor(), platform::Color::black());
+    EXPECT_EQ(summary.textLabel()->textColor(), platform::Color::black());
+    for (const auto& label : {summary.detailsLabel(), summary.filesLabel(), footer})
+        EXPECT_EQ(label->textColor(), (platform::Color{0, 0, 0, 0.7})) << "no paler: it has to be read";
+    EXPECT_EQ(summary.detailsLabel()->numberOfLines(), 1);
+    EXPECT_EQ(summary.detailsLabel()->fontSize(), 14);
 }
 
 TEST_F(SharingLayout, RowsStandBelowEachOtherAndWhatIsLookedForBehindThem)
@@ -112,12 +153,17 @@ TEST_F(SharingLayout, RowsStandBelowEachOtherAndWhatIsLookedForBehindThem)
 TEST_F(SharingLayout, ThatThereIsNothingStandsWhereRowsBegin)
 {
     open({});
-    expectAt(sheet->list()->footerLabel(), Rect::make(16, 8 + (56 - 38) / 2.0, 368, 38));
+    const auto& footer = sheet->list()->footerLabel();
+    expectAt(footer, Rect::make(16, 8 + (56 - 38) / 2.0, 368, 38));
+    window->transitionToSize({200, 800});
+    window->commit();
+    EXPECT_EQ(footer->frame().height(), 38) << "no more than two lines";
 }
 
 TEST_F(SharingLayout, ASheetHasRoomForSomeRowsBeforeTheyComeAndForAllThatCame)
 {
     make();
+    EXPECT_EQ(sheet->contentSizeThatFits({400, 2000}).height, 131 + 5 * 56 + 16) << "also before anybody sees it";
     begin();
     const auto height = [this] { return sheet->contentSizeThatFits({400, 2000}).height - 131; };
     EXPECT_EQ(height(), 5 * 56 + 16);

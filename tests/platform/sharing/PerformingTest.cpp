@@ -28,7 +28,9 @@ TEST_F(Sharing, WhatCompletesClosesTheSheetAndIsTold)
     settle();
     EXPECT_TRUE(isGone());
     EXPECT_THAT(results, ElementsAre("mail yes"));
+    EXPECT_THAT(ended, ElementsAre("mail yes"));
     EXPECT_EQ(sheet->performedActivity(), mail);
+    EXPECT_EQ(mail->cancelled, 0) << "it has ended";
 }
 
 TEST_F(Sharing, WhatEndsAtOnceDoesSo)
@@ -87,6 +89,8 @@ TEST_F(Sharing, WhileOneIsPerformedTheOthersWait)
     window->commit();
     EXPECT_FALSE(row(0)->progressView()->isHidden());
     EXPECT_FALSE(row(0)->cancelButton()->isHidden());
+    EXPECT_TRUE(row(0)->row()->isBusy()) << "it looks as what can be pressed";
+    EXPECT_FALSE(row(1)->row()->isEnabled());
     EXPECT_EQ(row(0)->progressView()->progress(), std::nullopt);
     EXPECT_GE(row(0)->cancelButton()->frame().width(), 44);
     EXPECT_EQ(row(0)->cancelButton()->frame().height(), 44);
@@ -102,6 +106,7 @@ TEST_F(Sharing, WhileOneIsPerformedTheOthersWait)
     EXPECT_FALSE(isGone());
     EXPECT_TRUE(row(0)->cancelButton()->isHidden());
     EXPECT_TRUE(row(0)->progressView()->isHidden());
+    EXPECT_FALSE(row(0)->row()->isBusy());
     tapRow(1);
     EXPECT_EQ(mail->performed, 1);
 }
@@ -117,10 +122,13 @@ TEST_F(Sharing, ClosingItWhileOneIsPerformedCancelsThatFirst)
     EXPECT_EQ(send->cancelled, 1);
     EXPECT_FALSE(isGone());
     window->keyDown(Key::Escape);
+    machine.advance(std::chrono::milliseconds(400));
     EXPECT_EQ(send->cancelled, 1);
+    EXPECT_FALSE(isGone()) << "nor does asking twice make it quicker";
     send->activityDidFinish(false);
     settle();
     EXPECT_TRUE(isGone());
+    EXPECT_THAT(ended, ElementsAre("device no"));
     EXPECT_THAT(results, ElementsAre("device no"));
 }
 
@@ -133,6 +141,9 @@ TEST_F(Sharing, OneThatEndsAsSoonAsItIsCancelledLetsItCloseAtOnce)
     settle();
     EXPECT_TRUE(isGone());
     EXPECT_THAT(results, ElementsAre("device no"));
+    const std::weak_ptr<platform::ShareSheet> weak = sheet;
+    sheet.reset();
+    EXPECT_TRUE(weak.expired()) << "nothing waits for it any more";
 }
 
 TEST_F(Sharing, ItDoesNotWaitForeverForOneThatDoesNotEnd)
@@ -151,6 +162,7 @@ TEST_F(Sharing, ItDoesNotWaitForeverForOneThatDoesNotEnd)
     send->activityDidFinish(true);
     settle();
     EXPECT_THAT(results, ElementsAre(" no")) << "too late";
+    EXPECT_THAT(ended, IsEmpty());
 }
 
 TEST_F(Sharing, WhatCompletesWhileItClosesStillCounts)
@@ -176,13 +188,117 @@ TEST_F(Sharing, ItIsToldOnceHoweverItGoes)
     EXPECT_THAT(results, ElementsAre(" no"));
 }
 
-TEST_F(Sharing, WhatAnActivityShowsStandsAboveTheSheet)
+TEST_F(Sharing, ASheetThatIsTakenAwayCancelsWhatItPerforms)
+{
+    for (const bool hasBeenTaken : {false, true}) {
+        results.clear();
+        const auto send = activity("device");
+        send->hasBeenTaken = hasBeenTaken;
+        open({send});
+        tapRow(0);
+        root->dismiss(true);
+        settle();
+        EXPECT_TRUE(isGone());
+        EXPECT_EQ(send->cancelled, 1);
+        EXPECT_THAT(results, ElementsAre(" no"));
+        EXPECT_THAT(ended, IsEmpty()) << "it is not there to tell";
+    }
+}
+
+TEST_F(Sharing, WhatLeavesTakesNoMorePicks)
+{
+    const auto mail = activity("mail");
+    open({mail});
+    sheet->closePressed();
+    row(0)->row()->activate();
+    EXPECT_EQ(mail->performed, 0);
+    settle();
+    EXPECT_THAT(results, ElementsAre(" no"));
+}
+
+TEST_F(Sharing, ASheetIsKeptByNothingThatItPerforms)
+{
+    const auto send = activity("device");
+    open({send});
+    tapRow(0);
+    const std::weak_ptr<platform::ShareSheet> weak = sheet;
+    dropEverything();
+    EXPECT_TRUE(weak.expired());
+    send->tell(0.5);
+    send->activityDidFinish(true);
+    settle();
+    EXPECT_THAT(ended, IsEmpty());
+}
+
+TEST_F(Sharing, ProgressIsThatOfWhatIsPerformedNow)
 {
     const auto upload = activity("upload");
+    const auto mail = activity("mail");
+    upload->endsWhenCancelled = false;
     upload->controller = std::make_shared<platform::ViewController>();
+    open({mail, upload});
+    tapRow(1);
+    settle();
+    window->keyDown(Key::Escape);
+    settle();
+    tapRow(0);
+    const auto& bar = *row(0)->progressView();
+    mail->tell(0.25);
+    upload->tell(0.75);
+    EXPECT_EQ(bar.progress(), 0.25) << "that one was given up";
+    mail->tell(1.5);
+    EXPECT_EQ(bar.progress(), 1);
+    mail->tell(-1);
+    EXPECT_EQ(bar.progress(), 0);
+    mail->tell(std::nullopt);
+    EXPECT_EQ(bar.progress(), std::nullopt);
+}
+
+TEST_F(Sharing, WhatIsBeingCancelledIsCancelledOnceAndTellsNoMoreProgress)
+{
+    for (const bool isClosed : {false, true}) {
+        const auto send = activity("device");
+        send->endsWhenCancelled = false;
+        open({send});
+        tapRow(0);
+        send->tell(0.5);
+        if (isClosed)
+            window->keyDown(Key::Escape);
+        else
+            tapOn(*row(0)->cancelButton());
+        EXPECT_FALSE(row(0)->cancelButton()->isEnabled());
+        EXPECT_EQ(row(0)->progressView()->progress(), std::nullopt);
+        send->tell(0.9);
+        EXPECT_EQ(row(0)->progressView()->progress(), std::nullopt);
+        send->activityDidFinish(false);
+        settle();
+        EXPECT_EQ(isGone(), isClosed);
+        if (isClosed)
+            continue;
+        tapRow(0);
+        window->commit();
+        EXPECT_TRUE(row(0)->cancelButton()->isEnabled()) << "it can be cancelled anew";
+        send->activityDidFinish(true);
+        settle();
+        EXPECT_TRUE(isGone());
+    }
+}
+
+TEST_F(Sharing, WhatAnActivityShowsStandsAboveTheSheet)
+{
+    struct Shown final : platform::ViewController {
+        void presentationDidShow() override { isUp = true; }
+        bool isUp = false;
+    };
+    const auto upload = activity("upload");
+    const auto shown = std::make_shared<Shown>();
+    upload->controller = shown;
     open({upload});
     tapRow(0);
+    machine.drain();
+    EXPECT_FALSE(shown->isUp) << "it slides up";
     settle();
+    EXPECT_TRUE(shown->isUp);
     EXPECT_EQ(sheet->presentedViewController(), upload->controller);
     EXPECT_EQ(upload->performed, 0) << "it is shown in place of being performed";
     upload->activityDidFinish(true);

@@ -58,11 +58,28 @@ TEST_F(SavingToVideos, SaysWhyItFailed)
 TEST_F(SavingToVideos, MayBeForgottenWhileTheLibraryWorks)
 {
     perform();
+    const std::weak_ptr<platform::Activity> weak = activity;
     activity.reset();
+    EXPECT_TRUE(weak.expired());
     library.finish();
     machine.drain();
     EXPECT_TRUE(ends.empty());
     EXPECT_EQ(library.assets.size(), 1U);
+}
+
+TEST_F(SavingToVideos, MayBeForgottenBeforeTheMainQueueHearsOfItsEnd)
+{
+    perform();
+    library.finish();
+    activity.reset();
+    machine.drain();
+    EXPECT_TRUE(ends.empty());
+}
+
+TEST_F(SavingToVideos, SaysWhereTheLibraryHasPutTheMovie)
+{
+    activity->setReceiver("/home/u/Videos/race.mp4");
+    EXPECT_EQ(activity->receiver(), "/home/u/Videos/race.mp4");
 }
 
 TEST_F(SavingToVideos, NeedsAMovie)

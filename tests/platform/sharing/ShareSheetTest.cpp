@@ -22,6 +22,37 @@ TEST_F(Sharing, ItOffersWhatCanBePerformedInTheOrderWanted)
     EXPECT_THAT(titles(), ElementsAre("mail", "message", "own", "folder"));
 }
 
+TEST_F(Sharing, WhatTheApplicationBringsIsThereAtOnceAndChosenLikeTheRest)
+{
+    make({activity("b"), activity("c"), activity("a")}).setActivityTypeOrder({"a", "b"});
+    sheet->setExcludedActivityTypes({"c"});
+    begin();
+    EXPECT_THAT(titles(), ElementsAre("a", "b"));
+}
+
+TEST_F(Sharing, ItSaysWhatItIsAndHowItIsClosed)
+{
+    open({activity("mail")});
+    EXPECT_EQ(sheet->title(), "Share");
+    EXPECT_EQ(sheet->closeButton()->glyph(), "close");
+    EXPECT_EQ(sheet->closeButton()->accessibility().name, "Close");
+}
+
+TEST_F(Sharing, ARowShowsWhatItsActivityIs)
+{
+    const auto mail = activity("mail");
+    mail->image = std::make_shared<platform::Image>(platform::Bitmap::transparent(28, 28), 1);
+    open({mail});
+    const platform::ActivityRow& it = *row(0);
+    EXPECT_EQ(it.row()->title(), "mail");
+    EXPECT_EQ(it.row()->glyph(), "share");
+    EXPECT_EQ(it.row()->image(platform::Button::State::Normal), mail->image);
+    EXPECT_EQ(it.progressView()->accessibility().name, "mail");
+    EXPECT_TRUE(it.progressView()->isHidden());
+    EXPECT_TRUE(it.cancelButton()->isHidden());
+    EXPECT_EQ(it.subviews().front(), it.row()) << "the bar stands on it";
+}
+
 TEST_F(Sharing, WhatComesLateGoesToTheEndAndMovesNothing)
 {
     make().setActivityTypeOrder({"mail", "message"});
@@ -125,13 +156,20 @@ TEST_F(Sharing, ItShowsTheMovieWithoutWaitingForIt)
     EXPECT_EQ(summary.textLabel()->text(), "A race");
     EXPECT_EQ(summary.filesLabel()->text(), "With \u2068notes.txt\u2069");
     EXPECT_TRUE(summary.detailsLabel()->isHidden());
+    EXPECT_THAT(files.calls, testing::IsEmpty()) << "a look at a file can take its time";
     const double height = summary.frame().height();
+    machine.mainQueue.drain();
+    machine.defaultQueue.drain();
+    EXPECT_EQ(summary.detailsLabel()->text(), "0:42") << "what a worker has found is shown on the main queue";
     settle();
+    EXPECT_FALSE(summary.detailsLabel()->isHidden());
     EXPECT_EQ(summary.detailsLabel()->text(), "0:42 · 12400000 bytes");
     EXPECT_EQ(summary.detailsLabel()->accessibility().name, "42 s, 12400000 bytes");
     ASSERT_EQ(media.imageGenerator()->requests.size(), 1U);
     EXPECT_EQ(media.imageGenerator()->requests[0].time, base::MediaTime::zero());
+    EXPECT_EQ(media.imageGenerator()->maximumSize(), (base::Size{288, 288})) << "sharp on every screen, and no more";
     media.imageGenerator()->succeed(0, std::make_shared<platform::Image>(platform::Bitmap::transparent(160, 288), 1));
+    EXPECT_FALSE(summary.picture());
     machine.drain();
     ASSERT_TRUE(summary.picture());
     EXPECT_EQ(summary.picture()->frame(), base::Rect::make(0, (72 - 129.6) / 2, 72, 129.6)) << "it fills its square";
@@ -161,6 +199,51 @@ TEST_F(Sharing, WhatIsNotKnownOfTheMovieIsNotSaid)
     media.imageGenerator()->fail(0);
     machine.drain();
     EXPECT_FALSE(sheet->summary()->picture());
+}
+
+TEST_F(Sharing, WithoutItsSizeTheMoviesLengthIsSaid)
+{
+    files.fail(FileOperation::Attributes, "/tmp/race.mp4", EACCES);
+    open({});
+    EXPECT_EQ(sheet->summary()->detailsLabel()->text(), "0:42");
+    EXPECT_EQ(sheet->summary()->detailsLabel()->accessibility().name, "42 s");
+    EXPECT_FALSE(sheet->summary()->detailsLabel()->isHidden());
+}
+
+TEST_F(Sharing, OfManyFilesTheFirstAreNamed)
+{
+    for (const char* name : {"1", "2", "3", "4", "5", "6", "7"})
+        items.emplace_back(base::Url::fromPath(std::string("/tmp/") + name));
+    open({});
+    const std::string& along = sheet->summary()->filesLabel()->text();
+    EXPECT_THAT(along, testing::HasSubstr("5"));
+    EXPECT_THAT(along, testing::Not(testing::HasSubstr("6")));
+}
+
+TEST_F(Sharing, NobodyWhoLooksAtTheMovieKeepsTheSheet)
+{
+    make();
+    begin();
+    const auto generator = media.imageGenerator();
+    const auto asset = media.asset();
+    machine.defaultQueue.drain();
+    generator->succeed(0, std::make_shared<platform::Image>(platform::Bitmap::transparent(10, 10), 1));
+    const std::weak_ptr<platform::ShareSheet> weak = sheet;
+    const std::weak_ptr<platform::View> weakSummary = sheet->summary();
+    dropEverything();
+    EXPECT_TRUE(weak.expired());
+    EXPECT_TRUE(weakSummary.expired());
+    machine.drain();
+}
+
+TEST_F(Sharing, AWorkerThatHasNotLookedYetKeepsNothing)
+{
+    make();
+    begin();
+    const std::weak_ptr<platform::View> weakSummary = sheet->summary();
+    dropEverything();
+    EXPECT_TRUE(weakSummary.expired()) << "it would end on the worker";
+    machine.drain();
 }
 
 TEST_F(Sharing, APictureThatComesAfterTheSheetHasGoneIsNobodys)
@@ -204,6 +287,13 @@ TEST_F(Sharing, KeysGoThroughTheRowsAndPick)
     EXPECT_EQ(window->focusedView(), row(0)->row());
 }
 
+TEST_F(Sharing, WithoutRowsKeysGoToTheCloseButton)
+{
+    open({});
+    window->keyDown(Key::Down);
+    EXPECT_EQ(window->focusedView(), sheet->closeButton());
+}
+
 TEST_F(Sharing, ItIsMirroredWhereWordsRunFromRightToLeft)
 {
     window->setRightToLeft(true);
@@ -243,7 +333,9 @@ TEST_F(Sharing, AnAnswerAfterTheSheetHasGoneChangesNothing)
     settle();
     const auto found = provider.found;
     found({activity("mail")}, false);
+    const std::weak_ptr<platform::ShareSheet> weak = sheet;
     sheet.reset();
+    EXPECT_TRUE(weak.expired()) << "whoever still looks does not keep it";
     found({activity("mail")}, true);
     EXPECT_THAT(results, ElementsAre(" no"));
 }

@@ -33,6 +33,7 @@ public:
     std::string activityType() const override { return m_type; }
     std::string activityTitle() const override { return m_title.empty() ? m_type : m_title; }
     std::string glyph() const override { return "share"; }
+    platform::ImageRef activityImage() const override { return image; }
     bool canPerformWithActivityItems(const platform::ShareItems&) const override { return canPerform; }
     void prepareWithActivityItems(const platform::ShareItems& items) override { prepared = items; }
     std::shared_ptr<platform::ViewController> activityViewController() override { return controller; }
@@ -46,16 +47,18 @@ public:
     {
         ++cancelled;
         if (endsWhenCancelled)
-            activityDidFinish(false);
+            activityDidFinish(hasBeenTaken);
     }
     void tell(std::optional<double> progress) const { noteProgress(progress); }
 
     bool canPerform = true;
     bool endsAtOnce = false;
     bool endsWhenCancelled = true;
+    bool hasBeenTaken = false; ///< by its receiver, when it is cancelled
     int performed = 0;
     int cancelled = 0;
     platform::ShareItems prepared;
+    platform::ImageRef image;
     std::shared_ptr<platform::ViewController> controller;
 
 private:
@@ -87,6 +90,7 @@ struct Sharing : testing::Test {
     platform::ShareItems items{"A race", base::Url::fromPath("/tmp/race.mp4")};
     std::shared_ptr<platform::ShareSheet> sheet;
     std::vector<std::string> results; ///< "TYPE yes", "TYPE no WHY"
+    std::vector<std::string> ended;   ///< while the sheet is there: "TYPE yes", "TYPE no"
 
     Sharing()
     {
@@ -101,7 +105,17 @@ struct Sharing : testing::Test {
     platform::ShareSheet& make(std::vector<std::shared_ptr<platform::Activity>> extra = {})
     {
         sheet = std::make_shared<platform::ShareSheet>(
-            platform::ShareSheet::Services{words, media, files, provider, machine.mainQueue}, items, std::move(extra));
+            platform::ShareSheet::Services{
+                words,
+                media,
+                files,
+                provider,
+                machine.mainQueue,
+                {},
+                [this](const platform::Activity& activity, const platform::Activity::End& end) {
+                    ended.push_back(activity.activityType() + (end.completed ? " yes" : " no"));
+                }},
+            items, std::move(extra));
         sheet->setCompletionHandler(
             [this](const std::string& type, bool completed, const platform::ShareItems&, const base::ErrorRef& error) {
                 EXPECT_FALSE(sheet->presentingViewController()) << "it has gone";
@@ -146,6 +160,13 @@ struct Sharing : testing::Test {
     }
     void tapRow(std::size_t index) { tapOn(*row(index)->row()); }
     bool isGone() const { return !root->presentedViewController(); }
+    /// Takes the sheet away with all that is below it, before anything else can happen.
+    void dropEverything()
+    {
+        window->setRootViewController(std::make_shared<platform::ViewController>());
+        root.reset();
+        sheet.reset();
+    }
 };
 
 } // namespace tests
