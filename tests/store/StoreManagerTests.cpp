@@ -218,6 +218,7 @@ TEST_F(StoreManager, CanBeSentAMessage)
     ASSERT_TRUE(manager->respondsTo(load));
     manager->perform(load, {&services, std::string(kApp), completion()});
     ASSERT_TRUE(store.isBusy());
+    EXPECT_THAT(store.requests.back().bundleIdentifiers, ElementsAre(kApp));
     store.answer({painter()});
     machine.drain();
     EXPECT_THAT(lastTold().appName(), Optional(std::string("Painter")));
