@@ -5,6 +5,7 @@
 #include "platform/sharing/ActivityTypes.h"
 #include "platform/sharing/ShareListView.h"
 #include "platform/sharing/ShareSheet.h"
+#include "platform/sharing/ShareSummary.h"
 #include "support/FakeActivities.h"
 
 #include <gmock/gmock.h>
@@ -161,6 +162,14 @@ TEST_F(Sharing, GivesTheMovieOfTheMomentOfTheTap)
     EXPECT_THAT(sheet()->activityItems(), Contains(platform::ShareItem(Url::fromPath(kMovie))));
 }
 
+TEST_F(Sharing, CallsTheMovieWhatItsReceiverSeesWithoutItsKind)
+{
+    open();
+    shareAndWait();
+    const std::string name = Url::fromPath(kMovie).lastPathComponent();
+    EXPECT_EQ(sheet()->summary()->nameLabel()->text(), "Recording of " + name.substr(0, name.rfind('.')));
+}
+
 TEST_F(Sharing, LeavesOutThePasteboardAndKeepsTheSheetsOwnOrder)
 {
     open();
@@ -228,6 +237,46 @@ TEST_F(Sharing, AsksTheStoreAnewEachTimeAlsoWhileTheSheetIsUp)
     storeAnswers("Tux Racer", "Tux", "");
     EXPECT_EQ(sheet(), first) << "who presents already presents nothing else";
     EXPECT_TRUE(editor->isShareSheetUp());
+}
+
+TEST_F(Sharing, NotesItInATurnOfItsOwn)
+{
+    open();
+    shareAndWait();
+    const auto mail = std::make_shared<tests::FakeActivity>(kActivityTypeMail);
+    fake->sharing.found.answers.back()({mail}, true);
+    settle();
+    sheet()->list()->rowOf(*mail)->row()->activate();
+    mail->activityDidFinish(true);
+    fake->machine.clock.advance(std::chrono::seconds(1));
+    while (sheet() && fake->machine.mainQueue.runDue() > 0)
+        EXPECT_THAT(done(), IsEmpty());
+    EXPECT_EQ(sheet(), nullptr);
+    EXPECT_THAT(done(), IsEmpty()) << "whoever hears of the sheet's end comes first";
+    settle();
+    EXPECT_THAT(done(), ElementsAre(kActivityTypeMail));
+}
+
+TEST_F(Sharing, KeepsNoEditorThatHasGone)
+{
+    const auto drop = [this] {
+        const std::weak_ptr<VKVideoEditorViewController> weak = editor;
+        editor.reset();
+        fake->window->setRootViewController(nullptr);
+        container.reset();
+        return weak.expired();
+    };
+    open();
+    editor->shareAction();
+    EXPECT_TRUE(drop()) << "before the main queue's next turn";
+    fake->machine.drain();
+
+    open();
+    share();
+    storeAnswers("Tux Racer", "Tux", "");
+    const auto sheetOfIt = sheet();
+    EXPECT_TRUE(drop()) << "on the sheet's way up";
+    fake->machine.drain();
 }
 
 TEST_F(Sharing, ShowsNothingWhenTheStoreAnswersAnEditorThatHasGone)
