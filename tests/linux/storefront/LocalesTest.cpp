@@ -1,9 +1,12 @@
-// Which languages the store is asked in.
+// Which languages the store is asked in, and where it looks.
 #include "linux/storefront/Options.h"
 
 #include <gmock/gmock.h>
 
+#include <chrono>
+#include <cstdlib>
 #include <map>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -67,6 +70,45 @@ TEST(StoreLocales, OnlyEnglishNeedsNoTranslation)
         EXPECT_THAT(localesOf({{"LANGUAGE", std::string(locale) + ":de"}}), ElementsAre(locale));
     for (const char* locale : {"enm", "fr_FR"})
         EXPECT_THAT(localesOf({{"LANGUAGE", std::string(locale) + ":de"}}), ElementsAre(locale, "de"));
+}
+
+/// While it lives; what was set before comes back.
+class SetVariable {
+public:
+    SetVariable(const char* name, const char* value) : m_name(name)
+    {
+        if (const char* const former = std::getenv(name))
+            m_former = former;
+        ::setenv(name, value, 1);
+    }
+    ~SetVariable()
+    {
+        if (m_former)
+            ::setenv(m_name, m_former->c_str(), 1);
+        else
+            ::unsetenv(m_name);
+    }
+    SetVariable(const SetVariable&) = delete;
+    SetVariable& operator=(const SetVariable&) = delete;
+
+private:
+    const char* m_name;
+    std::optional<std::string> m_former;
+};
+
+TEST(StoreOptions, OfTheUserNameHisOwnDirectoriesFirst)
+{
+    // GLib reads these once in a process; nobody else here asks for them.
+    const SetVariable home("XDG_DATA_HOME", "/home/u/data");
+    const SetVariable system("XDG_DATA_DIRS", "/opt/share:/usr/share");
+    const SetVariable languages("LANGUAGE", "fr:es");
+    const SetVariable locale("LC_ALL", "C.UTF-8");
+    const storefront::Options options = storefront::Options::ofUser();
+    EXPECT_THAT(options.locales, ElementsAre("fr", "es"));
+    EXPECT_THAT(options.metainfo, ElementsAre("/home/u/data/metainfo", "/opt/share/metainfo", "/usr/share/metainfo"));
+    EXPECT_THAT(options.remotes, ElementsAre("/var/lib/flatpak/appstream", "/home/u/data/flatpak/appstream"));
+    EXPECT_TRUE(options.usesMachineCatalogues);
+    EXPECT_LE(options.patience, std::chrono::milliseconds(50)) << "half of what a person takes for at once";
 }
 
 } // namespace
