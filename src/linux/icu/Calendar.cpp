@@ -28,7 +28,7 @@ std::unique_ptr<icu::TimeZone> zoneNamed(const std::string& name)
 }
 
 /// Null when TZ is written in one of the ways that only the C library understands: as rules, or as a path.
-std::unique_ptr<icu::TimeZone> zoneOfTheDevice(const Environment& environment)
+std::unique_ptr<icu::TimeZone> zoneOfTheDevice(const base::Environment& environment)
 {
     std::string name = environment("TZ");
     if (name.starts_with(':'))
@@ -58,7 +58,7 @@ std::unique_ptr<icu::TimeZone> zoneOfTheLibrary(base::Date date)
 
 class DateFormatter final : public platform::DateFormatter {
 public:
-    DateFormatter(const std::string& locale, const Environment& environment)
+    DateFormatter(const std::string& locale, const base::Environment& environment)
     {
         UErrorCode status = U_ZERO_ERROR;
         m_format = std::make_unique<icu::SimpleDateFormat>(icu::UnicodeString(), icu::Locale(locale.c_str()), status);
@@ -122,8 +122,8 @@ std::string localeFromPosixName(std::string_view name)
     return locale.insert(std::min(locale.find('_'), locale.size()), script);
 }
 
-Calendar::Calendar(Environment environment)
-    : m_environment(environment ? std::move(environment) : Environment(base::environment))
+Calendar::Calendar(base::Environment environment)
+    : m_environment(environment ? std::move(environment) : base::Environment(base::environment))
 {
 }
 

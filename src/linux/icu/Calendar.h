@@ -4,6 +4,7 @@
 /// of the device, so that a change shows in the next title.
 #pragma once
 
+#include "base/Environment.h"
 #include "platform/files/DateFormatter.h"
 
 #include <functional>
@@ -13,9 +14,6 @@
 /// Not `icu`, which is the library's own.
 namespace intl {
 
-/// A variable of the environment; empty when it is not set.
-using Environment = std::function<std::string(const char* name)>;
-
 /// What ICU calls the locale that POSIX calls `name`: no codeset, `@latin` and `@cyrillic` as scripts, other modifiers
 /// dropped, "C" and "POSIX" and nothing as "en_US_POSIX".
 std::string localeFromPosixName(std::string_view name);
@@ -23,13 +21,13 @@ std::string localeFromPosixName(std::string_view name);
 class Calendar final : public platform::Calendar {
 public:
     /// Asks the process's own environment unless given another.
-    explicit Calendar(Environment environment = {});
+    explicit Calendar(base::Environment environment = {});
 
     std::unique_ptr<platform::DateFormatter> makeDateFormatter() const override;
     std::optional<platform::TimeZone> timeZoneWithName(const std::string& name) const override;
 
 private:
-    Environment m_environment;
+    base::Environment m_environment;
 };
 
 } // namespace intl

@@ -8,7 +8,6 @@
 #include <algorithm>
 #include <iterator>
 #include <optional>
-#include <sstream>
 #include <utility>
 
 namespace intl {
@@ -31,20 +30,10 @@ std::optional<std::string> languageTag(const std::string& posixName)
     return tag;
 }
 
-std::vector<std::string> preferredIn(const Environment& environment)
+std::vector<std::string> preferredIn(const base::Environment& environment)
 {
-    std::vector<std::string> names;
-    std::istringstream languages(environment("LANGUAGE"));
-    for (std::string name; std::getline(languages, name, ':');)
-        names.push_back(name);
-    for (const char* variable : {"LC_ALL", "LC_MESSAGES", "LANG"})
-        if (const std::string name = environment(variable); !name.empty()) {
-            names.push_back(name);
-            break;
-        }
-
     std::vector<std::string> preferred;
-    for (const std::string& name : names)
+    for (const std::string& name : base::preferredLocales(environment))
         if (const auto tag = languageTag(name);
             tag && std::find(preferred.begin(), preferred.end(), *tag) == preferred.end())
             preferred.push_back(*tag);
@@ -64,8 +53,8 @@ icu::Locale localeOf(const std::string& tag)
 
 } // namespace
 
-Languages::Languages(const Environment& environment)
-    : m_preferred(preferredIn(environment ? environment : Environment(base::environment)))
+Languages::Languages(const base::Environment& environment)
+    : m_preferred(preferredIn(environment ? environment : base::Environment(base::environment)))
 {
 }
 

@@ -12,7 +12,7 @@ namespace intl {
 class Languages final : public platform::Languages {
 public:
     /// Asks the process's own environment unless given another.
-    explicit Languages(const Environment& environment = {});
+    explicit Languages(const base::Environment& environment = {});
 
     std::vector<std::string> preferredLanguages() const override { return m_preferred; }
     /// A close relative serves where the language itself is missing: "de" for "de-AT", "pt-BR" for "pt-PT", "zh-Hant" for

@@ -49,6 +49,25 @@ std::string formatted(const icu::MeasureFormat& format, const std::vector<icu::M
     return toUtf8(text);
 }
 
+class Measures {
+public:
+    explicit Measures(UErrorCode& status) : m_status(status) {}
+
+    void addHours(double number) { add(number, icu::MeasureUnit::createHour(m_status)); }
+    void addMinutes(double number) { add(number, icu::MeasureUnit::createMinute(m_status)); }
+    void addSeconds(double number) { add(number, icu::MeasureUnit::createSecond(m_status)); }
+    const std::vector<icu::Measure>& all() const { return m_measures; }
+
+private:
+    void add(double number, icu::MeasureUnit* unit)
+    {
+        m_measures.emplace_back(icu::Formattable(number), unit, m_status);
+    }
+
+    UErrorCode& m_status;
+    std::vector<icu::Measure> m_measures;
+};
+
 } // namespace
 
 std::string MessageCatalog::duration(double seconds, int decimals) const
@@ -60,22 +79,19 @@ std::string MessageCatalog::duration(double seconds, int decimals) const
     const double hours = std::floor(minutes / kMinutesInAnHour);
 
     UErrorCode status = U_ZERO_ERROR;
-    std::vector<icu::Measure> measures;
-    const auto add = [&](double number, icu::MeasureUnit* unit) {
-        measures.emplace_back(icu::Formattable(number), unit, status);
-    };
+    Measures measures(status);
     if (hours > 0)
-        add(hours, icu::MeasureUnit::createHour(status));
+        measures.addHours(hours);
     if (minutes > 0)
-        add(minutes - hours * kMinutesInAnHour, icu::MeasureUnit::createMinute(status));
-    add(reached - minutes * kSecondsInAMinute, icu::MeasureUnit::createSecond(status));
+        measures.addMinutes(minutes - hours * kMinutesInAnHour);
+    measures.addSeconds(reached - minutes * kSecondsInAMinute);
 
     const icu::Locale locale = localeOf(m_locale);
     icu::NumberFormat* numbers = icu::NumberFormat::createInstance(locale, status);
     if (numbers)
         numbers->setMaximumFractionDigits(decimals);
     const icu::MeasureFormat format(locale, UMEASFMT_WIDTH_WIDE, numbers, status); // owns the numbers
-    return formatted(format, measures, status);
+    return formatted(format, measures.all(), status);
 }
 
 std::string MessageCatalog::clock(double seconds) const
@@ -84,15 +100,12 @@ std::string MessageCatalog::clock(double seconds) const
     const double minutes = std::floor(whole / kSecondsInAMinute);
     const double hours = std::floor(minutes / kMinutesInAnHour);
     UErrorCode status = U_ZERO_ERROR;
-    std::vector<icu::Measure> measures;
-    const auto add = [&](double number, icu::MeasureUnit* unit) {
-        measures.emplace_back(icu::Formattable(number), unit, status);
-    };
+    Measures measures(status);
     if (hours > 0)
-        add(hours, icu::MeasureUnit::createHour(status));
-    add(minutes - hours * kMinutesInAnHour, icu::MeasureUnit::createMinute(status));
-    add(whole - minutes * kSecondsInAMinute, icu::MeasureUnit::createSecond(status));
-    return formatted({localeOf(m_locale), UMEASFMT_WIDTH_NUMERIC, status}, measures, status);
+        measures.addHours(hours);
+    measures.addMinutes(minutes - hours * kMinutesInAnHour);
+    measures.addSeconds(whole - minutes * kSecondsInAMinute);
+    return formatted({localeOf(m_locale), UMEASFMT_WIDTH_NUMERIC, status}, measures.all(), status);
 }
 
 std::string MessageCatalog::fileSize(std::int64_t bytes) const

@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <cctype>
 #include <glib.h>
-#include <sstream>
 #include <utility>
 
 namespace storefront {
@@ -39,20 +38,10 @@ bool isEnglish(const std::string& locale)
 
 } // namespace
 
-std::vector<std::string> preferredLocales(const Environment& environment)
+std::vector<std::string> preferredLocales(const base::Environment& environment)
 {
-    std::vector<std::string> names;
-    std::istringstream languages(environment("LANGUAGE"));
-    for (std::string name; std::getline(languages, name, ':');)
-        names.push_back(name);
-    for (const char* variable : {"LC_ALL", "LC_MESSAGES", "LANG"})
-        if (const std::string name = environment(variable); !name.empty()) {
-            names.push_back(name);
-            break;
-        }
-
     std::vector<std::string> locales;
-    for (const std::string& name : names) {
+    for (const std::string& name : base::preferredLocales(environment)) {
         const std::string locale = withoutCodeset(name);
         if (locale.empty() || std::any_of(locales.begin(), locales.end(), [&](const std::string& other) {
                 return isServedBy(locale, other);

@@ -1,9 +1,10 @@
 /// Where the store looks, and in which languages.
 #pragma once
 
+#include "base/Environment.h"
+
 #include <chrono>
 #include <filesystem>
-#include <functional>
 #include <string>
 #include <vector>
 
@@ -33,12 +34,9 @@ struct Options {
     static Options ofUser();
 };
 
-/// The value of a variable of the environment; empty where it is not set.
-using Environment = std::function<std::string(const char* name)>;
-
 /// The locales of LANGUAGE, then of the first of LC_ALL, LC_MESSAGES and LANG that is set: without codesets, each once.
 /// They end at English, which is among them only when it is the first: texts are written in it, and each language more may
 /// be all catalogues once more. A language goes without saying behind one of its own locales.
-std::vector<std::string> preferredLocales(const Environment& environment);
+std::vector<std::string> preferredLocales(const base::Environment& environment);
 
 } // namespace storefront
