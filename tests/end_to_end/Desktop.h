@@ -24,11 +24,15 @@ public:
     }
     ~Desktop() { end(); }
 
+    /// The bus is there, and lets nobody in; until it ends.
+    void freeze() { m_bus->signal(SIGSTOP); }
+
     void end()
     {
         for (auto* program : {&m_portal, &m_bus})
             if (*program) {
                 (*program)->signal(SIGTERM);
+                (*program)->signal(SIGCONT);
                 (*program)->wait();
                 program->reset();
             }

@@ -158,3 +158,41 @@ TEST_F(Share, FromAShellSaysWhenTheUserCancelsAndWhenNobodyTakesIt)
     const auto missing = m_machine.run({"share", m_movie.native() + ".not", "--list"});
     EXPECT_EQ(missing.exitStatus, 2);
 }
+
+TEST_F(Share, FromAShellSaysInTheUsersWordsWhatWentWrong)
+{
+    m_desktop.startPortal("fail");
+    const auto failed = m_machine.run({"share", m_movie, "--with", "Mail"});
+    EXPECT_EQ(failed.exitStatus, 1);
+    EXPECT_THAT(failed.err, HasSubstr("cannot share by Mail: its response is 2\n")) << "for who looks for the cause";
+    EXPECT_THAT(
+        failed.err,
+        HasSubstr("\nclipsa: No mail program has taken the movie. Set one up, or share the movie in another way.\n"));
+}
+
+TEST_F(Share, GoesOnWithoutABusThatLetsNobodyIn)
+{
+    m_desktop.freeze();
+    const auto end = share("key escape\nwait editor\ntap BAR_DONE", {"--json"});
+    EXPECT_TRUE(end.inTime);
+    EXPECT_EQ(end.exitStatus, 0) << end.err;
+    EXPECT_THAT(end.out, HasSubstr(R"("activityTypes":[])")) << "the host has heard of the end";
+
+    const auto listed = m_machine.run({"share", m_movie, "--list"});
+    EXPECT_TRUE(listed.inTime);
+    EXPECT_EQ(listed.out, "SaveToCameraRoll\tSave to Videos\n");
+}
+
+TEST_F(Share, EndsWithTheWindowThatIsClosedAroundTheSheet)
+{
+    m_desktop.startPortal("hold");
+    const std::string pickMail = "tap SHARE_MAIL\nwait file " + (m_desktop.path() / "bytes-0").native() + "\n";
+    for (const std::string& before : {std::string(), pickMail}) {
+        SCOPED_TRACE(before);
+        const auto end = share(before + "close", {"--json"});
+        EXPECT_TRUE(end.inTime);
+        EXPECT_EQ(end.exitStatus, 0) << end.err;
+        EXPECT_THAT(end.out, HasSubstr(R"("activityTypes":[])"));
+    }
+    EXPECT_THAT(m_desktop.calls(), HasSubstr("\"Close\"")) << "the mail program is not left with half a message";
+}

@@ -1,5 +1,7 @@
 #include "linux/bus/Bus.h"
 
+#undef signals // GIO has a member of that name
+#include <gio/gio.h>
 #include <mutex>
 #include <optional>
 #include <thread>
@@ -7,6 +9,35 @@
 #include <vector>
 
 namespace bus {
+
+namespace {
+
+/// Whether it answers who connects. Qt has one thread for all connections of a process, waits on it for the bus to say
+/// hello for as long as that takes, and joins it at the process's end: one bus that is stuck would hold up our host's
+/// messages as well, and us for ever.
+bool letsUsIn(GBusType bus)
+{
+    gchar* const address = g_dbus_address_get_for_bus_sync(bus, nullptr, nullptr);
+    if (!address)
+        return false;
+    const auto flags = static_cast<GDBusConnectionFlags>(G_DBUS_CONNECTION_FLAGS_AUTHENTICATION_CLIENT
+                                                         | G_DBUS_CONNECTION_FLAGS_MESSAGE_BUS_CONNECTION);
+    GDBusConnection* const trial = g_dbus_connection_new_for_address_sync(address, flags, nullptr, nullptr, nullptr);
+    g_free(address);
+    if (!trial)
+        return false;
+    g_dbus_connection_close_sync(trial, nullptr, nullptr);
+    g_object_unref(trial);
+    return true;
+}
+
+/// What is not connected.
+QDBusConnection nothing()
+{
+    return QDBusConnection(QString());
+}
+
+} // namespace
 
 struct Bus::State {
     Connect connect;
@@ -21,12 +52,12 @@ struct Bus::State {
 
 Bus::Connect Bus::session()
 {
-    return [] { return QDBusConnection::sessionBus(); };
+    return [] { return letsUsIn(G_BUS_TYPE_SESSION) ? QDBusConnection::sessionBus() : nothing(); };
 }
 
 Bus::Connect Bus::system()
 {
-    return [] { return QDBusConnection::systemBus(); };
+    return [] { return letsUsIn(G_BUS_TYPE_SYSTEM) ? QDBusConnection::systemBus() : nothing(); };
 }
 
 Bus::Bus(base::MainQueue& queue, Connect connect) : m_state(std::make_shared<State>())
