@@ -145,7 +145,7 @@ private:
     {
         m_bar.clear();
         if (end.error)
-            complain(end.error->description());
+            complain(platform::wordsFor(*end.error, m_machine.words)); // the log has the cause
         else if (!end.completed && m_interruption == 0)
             complain("it was cancelled");
         leave(end.completed ? kExitDone : end.error ? kExitFailed : kExitEditorEnded);
