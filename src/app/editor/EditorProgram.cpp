@@ -286,10 +286,22 @@ void EditorProgram::closeRequested()
 {
     // As the close button: the host is told what was done, and then closes us. Before the recording is there nothing
     // has been done, not even looked at.
-    if (const auto current = editor(); current && !m_waiting)
-        current->doneAction();
-    else
+    const auto current = editor();
+    if (!current || m_waiting) {
         disconnected();
+        return;
+    }
+    if (std::exchange(m_closing, true))
+        return;
+    // What stands above the editor is closed first: it holds up the editor's end.
+    current->closePresented([this] {
+        // Later: what was shared until now is noted first.
+        m_mainQueue.post([this] {
+            m_closing = false;
+            if (const auto closed = editor())
+                closed->doneAction();
+        });
+    });
 }
 
 void EditorProgram::disconnected()

@@ -145,6 +145,7 @@ private:
     std::unique_ptr<Script> m_script;
     bool m_waiting = false; ///< the window is open, but not on the extension
     bool m_shown = false;
+    bool m_closing = false; ///< the window was asked to, and what stands above the editor goes
     bool m_leaving = false;
     bool m_pictureSeen = false;
 };

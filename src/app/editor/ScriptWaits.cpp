@@ -5,6 +5,7 @@
 #include "app/editor/EditorProgram.h"
 #include "editor/VKVideoEditorViewController.h"
 #include "linux/qt/items/WorkLine.h"
+#include "platform/views/Presentation.h"
 
 #include <algorithm>
 #include <cstdlib>
@@ -20,7 +21,8 @@ bool Script::waitFor(const std::string& what)
         return m_program.presenter().workLine().isUnderWay() && m_program.presenter().workLine().width() > 0;
     if (what == "still") {
         m_program.presenter().commit();
-        return !m_program.presenter().isAnimating();
+        const auto above = m_program.window().topPresentation();
+        return !m_program.presenter().isAnimating() && !(above && above->isMoving());
     }
     const auto editor = m_program.editor();
     if (!editor)

@@ -181,6 +181,13 @@ void Presentation::end(bool animated, Completion gone)
         leave(animated);
 }
 
+void Presentation::close(Completion gone)
+{
+    assertHere();
+    m_goneHandlers.push_back(std::move(gone));
+    escape();
+}
+
 void Presentation::leave(bool animated)
 {
     const auto itsWindow = window();

@@ -37,9 +37,13 @@ public:
     void begin(Window& window, bool animated, Completion shown);
     /// Leaves; `gone` runs on the main queue when nothing is left of it. What has not come yet comes first.
     void end(bool animated, Completion gone);
+    /// The same, as the user does it: what is presented may take its time.
+    void close(Completion gone);
     /// Leaves at once, and tells nobody but the presented controller's view: for a presenter that goes itself.
     void abandon();
 
+    /// On its way up or down: what is touched or typed then does not reach it.
+    bool isMoving() const { return here(m_phase) == Phase::Coming || m_phase == Phase::Leaving; }
     /// What is presented would like another size. On its way up it grows or shrinks to it; what is up already does so
     /// without any motion.
     void contentSizeDidChange();

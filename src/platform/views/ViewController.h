@@ -96,6 +96,9 @@ public:
     /// Takes away what this presents or, if that is nothing, this itself from who presents it. What is still on its way up
     /// comes first. `completion` runs on the main queue when it is gone.
     void dismiss(bool animated, std::function<void()> completion = {});
+    /// As the user closes what this presents, with all that stands above it: whoever is in the middle of something ends that
+    /// first. `completion` runs on the main queue when nothing is presented any more; at once when nothing is.
+    void closePresented(std::function<void()> completion);
     /// Null when there is none. Both stay until all is off the screen.
     std::shared_ptr<ViewController> presentedViewController() const;
     std::shared_ptr<ViewController> presentingViewController() const { return here(m_presenting).lock(); }

@@ -39,6 +39,16 @@ void ViewController::dismiss(bool animated, std::function<void()> completion)
         itsWindow->mainQueue().post(std::move(completion));
 }
 
+void ViewController::closePresented(std::function<void()> completion)
+{
+    assertHere();
+    const auto keepAlive = shared_from_this();
+    if (const auto presentation = m_presentation)
+        presentation->close(std::move(completion));
+    else
+        completion();
+}
+
 std::shared_ptr<ViewController> ViewController::presentedViewController() const
 {
     assertHere();

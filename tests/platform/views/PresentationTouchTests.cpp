@@ -41,6 +41,32 @@ TEST_F(Presenting, EscapeClosesItEvenWhileItComesUp)
     EXPECT_THAT(taken(), testing::Not(testing::Contains("root command")));
 }
 
+TEST_F(Presenting, WhoWantsItClosedIsToldWhenItHasGone)
+{
+    bool told = false;
+    const auto tell = [&] { told = true; };
+    root->closePresented(tell);
+    EXPECT_TRUE(std::exchange(told, false)) << "there is nothing";
+
+    present();
+    root->closePresented(tell);
+    settle();
+    EXPECT_FALSE(told) << "it was on its way up";
+    settle();
+    EXPECT_TRUE(std::exchange(told, false));
+    EXPECT_TRUE(isGone());
+
+    shown->allowsClosing = false; // it is in the middle of something…
+    presentAndSettle();
+    root->closePresented(tell);
+    settle();
+    EXPECT_FALSE(isGone());
+    shown->dismiss(true); // …and ends that first
+    EXPECT_FALSE(told);
+    settle();
+    EXPECT_TRUE(told);
+}
+
 TEST_F(Presenting, ItStaysWhereItDoesNotLetItselfBeClosed)
 {
     shown->allowsClosing = false;
