@@ -2,14 +2,11 @@
 #include "Recorders.h"
 
 #include <QDBusConnectionInterface>
-#include <QTimer>
 
 #include <gmock/gmock.h>
 
 #include <cerrno>
-#include <csignal>
 #include <map>
-#include <optional>
 #include <sys/stat.h>
 
 using testing::ElementsAre;

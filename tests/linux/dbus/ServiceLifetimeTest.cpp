@@ -6,17 +6,9 @@
 
 #include <gmock/gmock.h>
 
-#include <cerrno>
 #include <csignal>
-#include <map>
-#include <optional>
-#include <sys/stat.h>
 
-using testing::ElementsAre;
 using testing::HasSubstr;
-using testing::IsEmpty;
-using testing::Not;
-using testing::StartsWith;
 
 namespace {
 
