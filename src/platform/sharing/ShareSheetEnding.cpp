@@ -10,12 +10,28 @@
 
 namespace platform {
 
+namespace {
+
+/// The same, with names that stay in one piece, in whatever direction they and the words around them run.
+base::ErrorRef quieted(const base::Error& error)
+{
+    const auto plain = base::Error::make(error.domain(), error.code(), quietText(error.description()));
+    base::Error::UserInfo places = error.userInfo();
+    const auto key = places.extract(base::Error::kMessageKey);
+    if (key.empty())
+        return plain;
+    for (auto& [place, text] : places)
+        text = quietName(text);
+    return base::Error::withMessage(plain, key.mapped(), std::move(places));
+}
+
+} // namespace
+
 void ShareSheet::showError(const Activity& activity, const base::ErrorRef& error)
 {
     const MessageCatalog& words = m_services.words;
-    const auto alert =
-        std::make_shared<AlertController>(words.text("SHARE_FAILED", {{"name", quietText(activity.activityTitle())}}),
-                                          quietText(wordsFor(*error, words)));
+    const auto alert = std::make_shared<AlertController>(
+        words.text("SHARE_FAILED", {{"name", quietName(activity.activityTitle())}}), wordsFor(*quieted(*error), words));
     alert->addAction({words.text("SHARE_OK"), AlertAction::Style::Default});
     present(alert, true);
 }

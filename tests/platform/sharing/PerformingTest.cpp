@@ -70,14 +70,41 @@ TEST_F(Sharing, WhatFailsSaysWhyAndLeadsBackToTheList)
     settle();
     const auto alert = std::dynamic_pointer_cast<AlertController>(sheet->presentedViewController());
     ASSERT_TRUE(alert);
-    EXPECT_EQ(alert->title(), "“mail” did not work");
-    EXPECT_EQ(alert->message(), "“race.mp4” cannot be opened: it is no longer there.");
+    EXPECT_EQ(alert->title(), "“\u2068mail\u2069” did not work");
+    EXPECT_EQ(alert->message(), "“\u2068race.mp4\u2069” cannot be opened: it is no longer there.");
     window->keyDown(Key::Return);
     settle();
     EXPECT_FALSE(sheet->presentedViewController());
     EXPECT_FALSE(isGone());
     EXPECT_TRUE(row(0)->row()->isEnabled());
     EXPECT_THAT(results, IsEmpty());
+}
+
+TEST_F(Sharing, NamesStayInOnePieceInWhatFailed)
+{
+    // Whoever named them had another direction in mind, or something bad.
+    const auto phone = activity("הטלפון\u202E של");
+    open({phone});
+    tapRow(0);
+    phone->activityDidFail(
+        base::Error::withMessage(error("for the log"), "MOVIE_GONE", {{"name", "a\u202E\n4pm.exe"}}));
+    settle();
+    const auto alert = std::dynamic_pointer_cast<AlertController>(sheet->presentedViewController());
+    ASSERT_TRUE(alert);
+    EXPECT_EQ(alert->title(), "“\u2068הטלפון של\u2069” did not work");
+    EXPECT_EQ(alert->message(), "“\u2068a 4pm.exe\u2069” cannot be opened: it is no longer there.");
+}
+
+TEST_F(Sharing, WhatFailsWithoutWordsShowsItsDescription)
+{
+    const auto phone = activity("phone");
+    open({phone});
+    tapRow(0);
+    phone->activityDidFail(error("for\u202E the log\x1b"));
+    settle();
+    const auto alert = std::dynamic_pointer_cast<AlertController>(sheet->presentedViewController());
+    ASSERT_TRUE(alert);
+    EXPECT_EQ(alert->message(), "for the log");
 }
 
 TEST_F(Sharing, WhileOneIsPerformedTheOthersWait)
