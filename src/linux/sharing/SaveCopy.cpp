@@ -40,6 +40,11 @@ base::Result<void> save(int source, const std::string& directoryPath, const std:
     const posix::FileDescriptor directory(::open(directoryPath.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (!directory)
         return base::Error::fromErrno(errno, "cannot open " + directoryPath);
+    // Nobody means a device or a pipe, though somebody who may do anything could put a file in its place.
+    struct stat there = {};
+    if (::fstatat(directory.get(), name.c_str(), &there, AT_SYMLINK_NOFOLLOW) == 0 && !S_ISREG(there.st_mode)
+        && !S_ISLNK(there.st_mode))
+        return base::Error::fromErrno(S_ISDIR(there.st_mode) ? EISDIR : EEXIST, "it is no file: " + name);
     posix::sweepNewFiles(directory.get());
     auto made = posix::NewFile::make(directory.get());
     if (!made)

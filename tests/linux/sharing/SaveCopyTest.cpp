@@ -108,6 +108,14 @@ TEST_F(SavingACopy, SaysThatItFailedWhereNobodyKnowsWhy)
     expectRefusal(save(directory.path() / "nowhere/race.mp4"), "SHARE_COPY_FAILED");
 }
 
+TEST_F(SavingACopy, TakesThePlaceOfNothingButFiles)
+{
+    const fs::path pipe = directory.path() / "pipe"; // beside what else is there
+    ASSERT_EQ(::mkfifo(pipe.c_str(), S_IRWXU), 0);
+    expectRefusal(save(pipe), "SHARE_COPY_FAILED", "pipe");
+    EXPECT_TRUE(fs::is_fifo(pipe));
+}
+
 TEST_F(SavingACopy, NeedsAName)
 {
     for (const char* name : {"", ".", ".."})
