@@ -77,6 +77,64 @@ TEST_F(Popping, APopoverWhoseSourceIsNowhereStandsInTheMiddle)
     EXPECT_EQ(surface().center(), (base::Point{500, 350}));
 }
 
+TEST_F(Popping, APopoverStandsInTheMiddleOfItsSourceWhereThereIsRoom)
+{
+    bar->setItems({platform::BarButtonItem::flexibleSpace(), share, platform::BarButtonItem::flexibleSpace()});
+    presentAndSettle();
+    EXPECT_EQ(surface().width(), 376);
+    EXPECT_EQ(surface().center().x, sourceMiddle());
+    EXPECT_EQ(shown->view()->frame(), base::Rect::make(0, 0, 376, 300));
+    EXPECT_TRUE(grabber()->isHidden());
+    EXPECT_EQ(dim()->backgroundColor(), (platform::Color{0, 0, 0, 0.15})) << "what it points at can be made out";
+}
+
+TEST_F(Popping, AtTheScreensEdgesItsArrowKeepsClearOfItsCorners)
+{
+    constexpr double kInset = SurfaceView::kCorner + SurfaceView::kArrowWidth / 2;
+    const auto position = [this] { return window->topPresentation()->surface()->arrow().position; };
+    presentAndSettle();
+    bar->setItems({share});
+    window->commit();
+    EXPECT_EQ(surface().minX(), 8);
+    EXPECT_EQ(position(), std::max(kInset, sourceMiddle() - 8));
+    bar->setItems({platform::BarButtonItem::flexibleSpace(), share});
+    window->commit();
+    EXPECT_EQ(surface().maxX(), 992);
+    EXPECT_EQ(position(), std::min(376 - kInset, sourceMiddle() - surface().minX()));
+    bar->setFrame(base::Rect::make(20, 0, 1000, 60)); // a bit of the source stands out of the window
+    window->commit();
+    EXPECT_EQ(position(), 376 - kInset);
+}
+
+TEST_F(Popping, AHighPopoverStaysOnTheScreen)
+{
+    shown->height = 5000;
+    presentAndSettle();
+    EXPECT_EQ(surface().maxY(), 692);
+    bar->setFrame(base::Rect::make(0, 640, 1000, 60));
+    window->commit();
+    EXPECT_EQ(surface().minY(), 8);
+    bar->setItems({save});
+    window->commit();
+    EXPECT_EQ(surface(), base::Rect::make(312, 24, 376, 652));
+    window->transitionToSize({300, 700});
+    window->commit();
+    EXPECT_EQ(surface(), base::Rect::make(8, 24, 284, 652));
+}
+
+TEST_F(Popping, ASourceThatIsOutOfTheWindowIsNowhere)
+{
+    presentAndSettle();
+    for (const base::Point away : {base::Point{0, -60}, {0, 700}, {-1000, 0}, {1000, 0}}) {
+        bar->setFrame(base::Rect::make(away.x, away.y, 1000, 60));
+        window->commit();
+        EXPECT_EQ(edge(), SurfaceView::Arrow::Edge::None) << away.x << ", " << away.y;
+        bar->setFrame(base::Rect::make(0, 0, 1000, 60));
+        window->commit();
+        EXPECT_EQ(edge(), SurfaceView::Arrow::Edge::Top);
+    }
+}
+
 TEST_F(Popping, ItFollowsTheMirroredBar)
 {
     presentAndSettle();

@@ -23,7 +23,11 @@ public:
         button->setFrame(base::Rect::make(0, 0, 100, 44));
         view()->addSubview(button);
     }
-    base::Size contentSizeThatFits(base::Size room) override { return {room.width, std::min(height, room.height)}; }
+    base::Size contentSizeThatFits(base::Size most) override
+    {
+        room = most;
+        return {room.width, std::min(height, room.height)};
+    }
     bool presentationShouldClose() override
     {
         ++asked;
@@ -39,6 +43,7 @@ public:
     }
 
     double height = 300;
+    base::Size room; ///< that there was when it was asked last
     bool allowsClosing = true;
     int asked = 0;
     std::vector<std::string> events;
@@ -81,6 +86,8 @@ struct Presenting : WindowFixture {
         shown->events.clear();
     }
     base::Rect surface() const { return window->topPresentation()->surface()->frame(); }
+    std::shared_ptr<platform::View> dim() const { return window->topPresentation()->subviews().front(); }
+    std::shared_ptr<platform::View> grabber() const { return window->topPresentation()->surface()->subviews().back(); }
     bool isGone() const { return !root->presentedViewController() && !window->topPresentation(); }
     void drag(double fromY, double toY, std::chrono::milliseconds step)
     {

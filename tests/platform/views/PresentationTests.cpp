@@ -115,10 +115,49 @@ TEST_F(Presenting, NothingIsLeftWhenItsPresenterGoes)
     window->setRootViewController(controller("other"));
     EXPECT_FALSE(window->topPresentation());
     EXPECT_FALSE(shown->window());
+    EXPECT_FALSE(root->presentedViewController());
+    EXPECT_FALSE(shown->presentingViewController());
     tap(200, 20);
     settle();
     root.reset();
     settle();
+}
+
+TEST_F(Presenting, NothingOfWhatStandsAboveIsLeftEither)
+{
+    presentAndSettle();
+    const auto above = std::make_shared<Shown>();
+    shown->present(above, true);
+    settle();
+    window->setRootViewController(controller("other"));
+    EXPECT_FALSE(window->topPresentation());
+    EXPECT_FALSE(above->window());
+    EXPECT_FALSE(shown->presentedViewController());
+}
+
+TEST_F(Presenting, OneIsPresentedInOnePlaceOnly)
+{
+    presentAndSettle();
+    const auto child = controller("child");
+    root->addChildViewController(child);
+    root->view()->addSubview(child->view());
+    child->present(shown, true);
+    EXPECT_FALSE(child->presentedViewController());
+    EXPECT_EQ(shown->presentingViewController(), root);
+    EXPECT_TRUE(machine.log.contains(base::MemoryLog::Line::Kind::Error,
+                                     "a controller that is presented already cannot be presented"));
+    const auto nowhere = controller("nowhere");
+    nowhere->present(std::make_shared<Shown>(), true);
+    EXPECT_FALSE(nowhere->presentedViewController()) << "it is in no window";
+}
+
+TEST_F(Presenting, WhereNothingIsPresentedItIsGoneInTheNextTurn)
+{
+    bool gone = false;
+    root->dismiss(true, [&] { gone = true; });
+    EXPECT_FALSE(gone);
+    machine.drain();
+    EXPECT_TRUE(gone);
 }
 
 TEST_F(Presenting, NothingIsLeftWhenAChildThatPresentsGoes)

@@ -97,6 +97,47 @@ TEST_F(Presenting, ASwipeFollowsTheFingerAndCloses)
     EXPECT_TRUE(isGone());
 }
 
+TEST_F(Presenting, APullOfAThirdClosesAndOneOfLessDoesNot)
+{
+    const auto pull = [this](double by) {
+        base::Instant now{0};
+        window->touchDown({1, {200, 600}, now});
+        window->touchMove({1, {200, 612}, now += std::chrono::milliseconds(50)});
+        window->touchMove({1, {200, 612 + by}, now += std::chrono::seconds(1)});
+        window->touchUp({1, {200, 612 + by}, now += std::chrono::seconds(1)});
+        settle();
+        window->commit();
+    };
+    presentAndSettle();
+    pull(105);
+    EXPECT_FALSE(isGone());
+    pull(106);
+    EXPECT_TRUE(isGone());
+}
+
+TEST_F(Presenting, AThrowClosesFromACertainSpeedOn)
+{
+    presentAndSettle();
+    drag(600, 660, std::chrono::milliseconds(10));
+    settle();
+    EXPECT_FALSE(isGone());
+    drag(600, 660, std::chrono::milliseconds(8));
+    settle();
+    EXPECT_TRUE(isGone());
+}
+
+TEST_F(Presenting, WhatMovesIsNotPressed)
+{
+    shown->button->addTarget(target, Target::action(), platform::kTouchUpInside);
+    present();
+    const base::Point at = shown->button->convertToRoot({50, 20});
+    tap(at.x, at.y);
+    EXPECT_THAT(target->senders, IsEmpty());
+    settle();
+    tap(at.x, at.y);
+    EXPECT_EQ(target->senders.size(), 1U);
+}
+
 TEST_F(Presenting, AShortSlowPullSpringsBack)
 {
     presentAndSettle();

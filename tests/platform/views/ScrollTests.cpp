@@ -1,7 +1,6 @@
-// Views that scroll, alerts, and what progress says.
+// Views that scroll, and what progress says.
 #include "Fixture.h"
 
-#include "platform/views/AlertController.h"
 #include "platform/views/ListRow.h"
 #include "platform/views/ProgressView.h"
 #include "platform/views/ScrollView.h"
@@ -12,7 +11,6 @@ namespace tests {
 
 namespace {
 
-using platform::Key;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
@@ -157,113 +155,116 @@ TEST_F(Scrolling, AContentThatShrinksIsNotLeftOutOfSight)
     EXPECT_EQ(scroll->contentOffset(), 100);
 }
 
-struct Alerting : WindowFixture {
-    std::shared_ptr<Controller> root = controller("root");
-    std::shared_ptr<platform::AlertController> alert =
-        std::make_shared<platform::AlertController>("Delete it?", "It cannot be brought back.");
-    std::vector<std::string> picked;
-
-    Alerting()
-    {
-        window->setRootViewController(root);
-        window->setVisible(true);
-    }
-    void addAction(const std::string& title, platform::AlertAction::Style style)
-    {
-        alert->addAction({title, style, [this, title] {
-                              EXPECT_FALSE(root->presentedViewController()) << "it has gone first";
-                              picked.push_back(title);
-                          }});
-    }
-    void present()
-    {
-        root->present(alert, true);
-        settle();
-    }
-    void settle()
-    {
-        machine.advance(std::chrono::milliseconds(300));
-        window->commit();
-    }
-    std::vector<std::shared_ptr<platform::Button>> buttons()
-    {
-        std::vector<std::shared_ptr<platform::Button>> found;
-        for (const auto& each : alert->view()->subviews())
-            if (const auto button = std::dynamic_pointer_cast<platform::Button>(each))
-                found.push_back(button);
-        return found;
-    }
-};
-
-TEST_F(Alerting, ReturnConfirmsAndEscapeCancels)
+TEST_F(Scrolling, TheContentFollowsTheFingerFromWhereItWas)
 {
-    addAction("Keep", platform::AlertAction::Style::Cancel);
-    addAction("Delete", platform::AlertAction::Style::Default);
-    present();
-    EXPECT_TRUE(window->keyDown(Key::Return));
-    settle();
-    EXPECT_THAT(picked, ElementsAre("Delete"));
-}
-
-TEST_F(Alerting, EscapeDoesWhatCancelDoes)
-{
-    addAction("Keep", platform::AlertAction::Style::Cancel);
-    addAction("Delete", platform::AlertAction::Style::Destructive);
-    present();
-    window->keyDown(Key::Return);
-    settle();
-    EXPECT_THAT(picked, IsEmpty()) << "what cannot be taken back is not done by a key pressed too often";
-    EXPECT_TRUE(window->keyDown(Key::Escape));
-    settle();
-    EXPECT_THAT(picked, ElementsAre("Keep"));
-}
-
-TEST_F(Alerting, TheOnlyActionIsDoneByEveryWayOut)
-{
-    addAction("OK", platform::AlertAction::Style::Default);
-    present();
-    window->keyDown(Key::Escape);
-    window->keyDown(Key::Return);
-    settle();
-    EXPECT_THAT(picked, ElementsAre("OK")) << "once";
-}
-
-TEST_F(Alerting, ItsButtonsAreHighEnoughForFingersAndStandSideBySideWhereTheyFit)
-{
-    addAction("Keep", platform::AlertAction::Style::Cancel);
-    addAction("Delete", platform::AlertAction::Style::Destructive);
-    present();
-    const auto two = buttons();
-    ASSERT_EQ(two.size(), 2U);
-    EXPECT_EQ(two[0]->frame().height(), 44);
-    EXPECT_EQ(two[0]->frame().minY(), two[1]->frame().minY());
-    EXPECT_LT(two[0]->frame().minX(), two[1]->frame().minX());
-    window->setRightToLeft(true);
+    scroll->setContentOffset(100);
     window->commit();
-    EXPECT_GT(two[0]->frame().minX(), two[1]->frame().minX());
-    tap(two[1]->convertToRoot({20, 20}).x, two[1]->convertToRoot({20, 20}).y);
-    settle();
-    EXPECT_THAT(picked, ElementsAre("Delete"));
+    window->touchDown({1, {200, 280}, {}});
+    window->touchMove({1, {200, 260}, {}});
+    const double begun = scroll->contentOffset();
+    window->touchMove({1, {200, 230}, {}});
+    EXPECT_EQ(scroll->contentOffset(), begun + 30);
+    EXPECT_GE(begun, 100);
+    window->touchUp({1, {200, 225}, std::chrono::seconds(1)});
+    EXPECT_EQ(scroll->contentOffset(), begun + 35) << "also the last bit of its way";
 }
 
-TEST_F(Alerting, LongTitlesStandOneAboveTheOther)
+TEST_F(Scrolling, AThrowSlowsDownEvenly)
 {
-    addAction("Keep everything as it is now", platform::AlertAction::Style::Cancel);
-    addAction("Delete", platform::AlertAction::Style::Destructive);
-    present();
-    const auto two = buttons();
-    EXPECT_EQ(two[0]->frame().maxY(), two[1]->frame().minY());
-    EXPECT_EQ(two[0]->frame().width(), 288);
+    scroll->setContentHeight(50'000);
+    window->commit();
+    drag(280, 230, std::chrono::milliseconds(10));
+    std::vector<double> steps;
+    double before = scroll->contentOffset();
+    while (machine.mainQueue.untilNext() && steps.size() < 1000) {
+        machine.advance(std::chrono::milliseconds(16));
+        steps.push_back(scroll->contentOffset() - before);
+        before = scroll->contentOffset();
+    }
+    ASSERT_GT(steps.size(), 10U);
+    EXPECT_NEAR(steps[0], 500 * 0.016, 1e-6) << "as fast as the finger was";
+    for (std::size_t i = 1; i < steps.size(); ++i)
+        EXPECT_NEAR(steps[i], steps[i - 1] * 0.95, 1e-6);
+    EXPECT_GE(steps.back() / 0.016, 20);
+    EXPECT_LT(steps.back() / 0.016 * 0.95, 20) << "slower than that nobody sees it move";
 }
 
-TEST_F(Alerting, ALongMessageLeavesTheButtonsOnTheScreen)
+TEST_F(Scrolling, TheWheelAndTheFocusStopAThrow)
 {
-    alert = std::make_shared<platform::AlertController>("Why", std::string(5000, 'w'));
-    addAction("OK", platform::AlertAction::Style::Default);
-    window->transitionToSize({640, 240});
-    present();
-    const auto button = buttons().front();
-    EXPECT_LE(button->convertToRoot({0, 44}).y, 240);
+    const auto isAtRest = [this] {
+        window->commit();
+        const double before = scroll->contentOffset();
+        machine.advance(std::chrono::milliseconds(16));
+        return scroll->contentOffset() == before;
+    };
+    drag(280, 230, std::chrono::milliseconds(10));
+    EXPECT_FALSE(isAtRest());
+    window->scroll({200, 150}, -1);
+    EXPECT_TRUE(isAtRest());
+    drag(280, 230, std::chrono::milliseconds(10));
+    EXPECT_FALSE(isAtRest());
+    scroll->reveal(*rows[3]);
+    EXPECT_TRUE(isAtRest());
+}
+
+TEST_F(Scrolling, WhatIsRevealedHasABitOfItsNeighbourBesideIt)
+{
+    const auto reveal = [this](std::size_t row, double from) {
+        scroll->setContentOffset(from);
+        window->commit();
+        scroll->reveal(*rows[row]);
+        return scroll->contentOffset();
+    };
+    EXPECT_EQ(reveal(5, 0), 6 * 56 + 8 - 200);
+    EXPECT_EQ(reveal(3, 360), 3 * 56 - 8);
+    EXPECT_EQ(reveal(5, 150), 150) << "what is there already stays";
+    EXPECT_EQ(reveal(0, 360), 0);
+    EXPECT_EQ(reveal(9, 0), 360);
+    const auto elsewhere = add<platform::ListRow>(base::Rect::make(0, 700, 400, 56), window);
+    scroll->reveal(*elsewhere);
+    EXPECT_EQ(scroll->contentOffset(), 360) << "what is not in it is nothing to it";
+}
+
+TEST_F(Scrolling, AScrollerSaysWhatPartIsSeen)
+{
+    const auto scroller = [this] {
+        window->commit();
+        return scroll->subviews().back();
+    };
+    const double length = 194.0 * 200 / 560;
+    const auto expectAt = [&](double x, double y, double height) {
+        const base::Rect frame = scroller()->frame();
+        EXPECT_EQ(frame.minX(), x);
+        EXPECT_NEAR(frame.minY(), y, 1e-6);
+        EXPECT_EQ(frame.width(), 3);
+        EXPECT_NEAR(frame.height(), height, 1e-6);
+    };
+    expectAt(394, 3, length);
+    EXPECT_FALSE(scroller()->isHidden());
+    scroll->setContentOffset(180);
+    expectAt(394, 3 + (194 - length) / 2, length);
+    scroll->setContentOffset(360);
+    expectAt(394, 197 - length, length);
+    window->setRightToLeft(true);
+    expectAt(3, 197 - length, length);
+    window->setRightToLeft(false);
+    tap(395, 296);
+    EXPECT_THAT(target->senders, ElementsAre(rows[9])) << "it is not in the way";
+    scroll->setContentHeight(50'000);
+    scroll->setContentOffset(0);
+    expectAt(394, 3, 24);
+    EXPECT_EQ(scroll->contentView()->frame(), base::Rect::make(0, 0, 400, 50'000));
+    scroll->setContentHeight(200);
+    EXPECT_TRUE(scroller()->isHidden()) << "all of it is seen";
+}
+
+TEST_F(Scrolling, IsGoneWhenNobodyHoldsIt)
+{
+    const std::weak_ptr<platform::View> weak = scroll;
+    scroll->removeFromSuperview();
+    scroll.reset();
+    rows.clear();
+    EXPECT_TRUE(weak.expired());
 }
 
 TEST(AText, TakesNoMoreLinesThanItMay)
