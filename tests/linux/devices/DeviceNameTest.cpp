@@ -28,6 +28,21 @@ TEST(ADevicesName, LosesControlCharactersAndMarksThatTurnTextAround)
     EXPECT_EQ(readableName("a\U000E0041b"), "ab");
 }
 
+TEST(ADevicesName, LosesEveryMarkAndNoneOfItsNeighbours)
+{
+    const auto between = [](const char* character) { return readableName(std::string("a") + character + "b"); };
+    for (const char* hidden : {"\x01",   "\x08",   "\x0E",   "\x1F",   "\x7F",       "\u0080",    "\u009F", "\u00AD",
+                               "\u061C", "\u180E", "\u200B", "\u200E", "\u200F",     "\u202A",    "\u202E", "\u2060",
+                               "\u206F", "\uFEFF", "\uFFF9", "\uFFFB", "\U000E0000", "\U000E007F"})
+        EXPECT_EQ(between(hidden), "ab");
+    for (const char* space :
+         {" ", "\t", "\r", "\u00A0", "\u1680", "\u2000", "\u200A", "\u2028", "\u2029", "\u202F", "\u205F", "\u3000"})
+        EXPECT_EQ(between(space), "a b");
+    for (const char* seen : {"!", "~", "\u00A1", "\u00AC", "\u00AE", "\u061B", "\u1FFF", "\u2010", "\u2027", "\u2030",
+                             "\u2070", "\uFFFC", "\U000E0080", "\u200C", "\u200D"})
+        EXPECT_EQ(between(seen), std::string("a") + seen + "b");
+}
+
 TEST(ADevicesName, LosesBytesThatAreNoText)
 {
     EXPECT_EQ(readableName("a\xFF\xC0\x80z"), "az");
@@ -52,5 +67,6 @@ TEST(ADevicesName, IsEmptyWhenThereIsNothingToSee)
 {
     EXPECT_EQ(readableName(""), "");
     EXPECT_EQ(readableName(" \t\u202E\u200B\u200D"), "");
-    EXPECT_EQ(readableName("\u3164"), "");
+    for (const char* blank : {"\u3164", "\u2800", "\u200C", "\u200D"})
+        EXPECT_EQ(readableName(blank), "");
 }
