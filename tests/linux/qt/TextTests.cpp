@@ -67,6 +67,31 @@ TEST_F(Texts, EachLineReadsInTheDirectionOfItsParagraph)
     EXPECT_FALSE(qtui::wrapped("Marble", font, 200, 0).front().isRightToLeft());
 }
 
+TEST_F(Texts, NamesThatAreIsolatedStaySoOnTheirNextLine)
+{
+    const auto beginsWith = [](const QString& line, std::initializer_list<char16_t> marks) {
+        QString all;
+        for (const char16_t mark : marks)
+            all += QChar(mark);
+        return line.startsWith(all) && line.size() > all.size() && !(line[all.size()].unicode() >> 4 == 0x206);
+    };
+    const double width = widthOf("three.mp4") + 1;
+    const auto found =
+        qtui::wrapped(QString::fromUtf8("سباق \u2068one1234 22-11 three.mp4\u2069 سباق"), font, width, 0);
+    ASSERT_EQ(found.size(), 5U);
+    EXPECT_TRUE(beginsWith(found[0], {0x200F}));
+    for (const int next : {2, 3})
+        EXPECT_TRUE(beginsWith(found[next], {0x200F, 0x2066})) << "as all of the name, whatever the rest begins with";
+    EXPECT_TRUE(beginsWith(found[4], {0x200F})) << "it is over";
+
+    const auto other = qtui::wrapped(QString::fromUtf8("Racer \u2068سباق_سباق Marble\u2069"), font, width, 0);
+    ASSERT_GE(other.size(), 3U);
+    EXPECT_TRUE(beginsWith(other.back(), {0x200E, 0x2067}));
+    EXPECT_TRUE(
+        beginsWith(qtui::wrapped(QString::fromUtf8("\u2069one two"), font, widthOf("\u2069one "), 0).back(), {0x200E}))
+        << "what was not begun is not over";
+}
+
 TEST_F(Texts, TakeTheRoomThatWasMeasuredForThem)
 {
     const qtui::FontMeasuring measuring;

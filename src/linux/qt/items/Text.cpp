@@ -20,6 +20,31 @@ constexpr char16_t kEllipsis = 0x2026;
 constexpr char16_t kLeftToRight = 0x200E;
 constexpr char16_t kRightToLeft = 0x200F;
 
+constexpr char16_t kLeftToRightIsolate = 0x2066;
+constexpr char16_t kRightToLeftIsolate = 0x2067;
+constexpr char16_t kFirstStrongIsolate = 0x2068;
+constexpr char16_t kPopDirectionalIsolate = 0x2069;
+
+/// What opens again the isolates in which a line of `paragraph` begins at `start`, each in the direction that it has as a
+/// whole: that is not to be seen in the rest of it.
+QString isolatesAt(const QString& paragraph, qsizetype start)
+{
+    QString open;
+    for (qsizetype i = 0; i < start; ++i) {
+        const char16_t character = paragraph[i].unicode();
+        if (character == kLeftToRightIsolate || character == kRightToLeftIsolate) {
+            open += QChar(character);
+        } else if (character == kFirstStrongIsolate) {
+            const qsizetype end = paragraph.indexOf(QChar(kPopDirectionalIsolate), i);
+            const bool isRightToLeft = paragraph.mid(i + 1, end < 0 ? -1 : end - i - 1).isRightToLeft();
+            open += QChar(isRightToLeft ? kRightToLeftIsolate : kLeftToRightIsolate);
+        } else if (character == kPopDirectionalIsolate) {
+            open.chop(1);
+        }
+    }
+    return open;
+}
+
 /// Where in `paragraph` its lines begin; no more of them than asked for.
 std::vector<int> lineStarts(const QString& paragraph, const QFont& font, double width, std::size_t most)
 {
@@ -85,7 +110,7 @@ std::vector<QString> wrapped(const QString& text, const QFont& font, double widt
             QString line = paragraph.mid(start, hasNext && !isLast ? starts[i + 1] - start : -1).trimmed();
             if (isLast && !hasNext && at + 1 < paragraphs.size())
                 line += QChar(kEllipsis);
-            line.prepend(mark);
+            line.prepend(mark + isolatesAt(paragraph, start));
             lines.push_back(metrics.elidedText(line, Qt::ElideRight, isLast ? width : 2 * width));
         }
     }
