@@ -17,7 +17,6 @@ using platform::kActivityTypeCopyToPasteboard;
 using platform::kActivityTypeMail;
 using platform::kActivityTypeMessage;
 using platform::kActivityTypePostToFacebook;
-using platform::kActivityTypeSaveToCameraRoll;
 using platform::ShareItems;
 using platform::ShareSheet;
 using testing::Contains;

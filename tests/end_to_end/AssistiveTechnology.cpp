@@ -7,7 +7,6 @@
 #include <cstdlib>
 
 using namespace tests;
-using testing::HasSubstr;
 using testing::IsEmpty;
 
 namespace {

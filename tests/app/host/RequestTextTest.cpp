@@ -3,9 +3,6 @@
 
 #include <gmock/gmock.h>
 
-using testing::HasSubstr;
-using testing::IsEmpty;
-
 namespace {
 
 TEST(Texts, AreCheckedAsUtf8)
