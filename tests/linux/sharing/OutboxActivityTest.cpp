@@ -117,6 +117,8 @@ TEST_F(AnOutboxActivity, GivesAllFilesUnderTheNamesThatTheirReceiverSees)
 {
     begin();
     EXPECT_EQ(activity->given, 0) << "not before they are there";
+    machine.defaultQueue.drain();
+    EXPECT_EQ(activity->given, 0) << "not on the worker";
     machine.drain();
     EXPECT_EQ(activity->given, 1);
     EXPECT_THAT(names(), ElementsAre("seen race.mp4", "seen notes.txt"));
@@ -229,7 +231,9 @@ TEST_F(AnOutboxActivity, CancellingItStopsTheCopyAndIsNoError)
 TEST_F(AnOutboxActivity, WhoeverLetsGoOfItStopsTheCopy)
 {
     beginToCopy();
+    const std::weak_ptr<Giving> weak = activity;
     activity.reset();
+    EXPECT_TRUE(weak.expired()) << "the worker would end it";
     copy();
     EXPECT_EQ(bytesThere(), 0U);
     EXPECT_THAT(ends, IsEmpty());

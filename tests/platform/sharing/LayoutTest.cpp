@@ -65,6 +65,7 @@ TEST_F(SharingLayout, ThePicturesSquareStandsWhereRowsBegin)
     const auto square = sheet->summary()->picture()->superview();
     expectAt(square, Rect::make(16, 16, 72, 72));
     EXPECT_TRUE(square->clipsToBounds());
+    EXPECT_NE(square->backgroundColor(), platform::Color::clear()) << "one sees where it will be";
     EXPECT_THAT(sheet->summary()->picture()->frame(), IsAt(Rect::make((72 - 129.6) / 2, 0, 129.6, 72)));
     EXPECT_THAT(sheet->summary()->frame(), IsAt(Rect::make(0, 0, 400, 100)))
         << "without a text there is no room for it";

@@ -217,6 +217,8 @@ TEST_F(Scrolling, WhatIsRevealedHasABitOfItsNeighbourBesideIt)
     };
     EXPECT_EQ(reveal(5, 0), 6 * 56 + 8 - 200);
     EXPECT_EQ(reveal(3, 360), 3 * 56 - 8);
+    EXPECT_EQ(reveal(5, 140), 144) << "it is there, but nothing beside it";
+    EXPECT_EQ(reveal(3, 164), 160);
     EXPECT_EQ(reveal(5, 150), 150) << "what is there already stays";
     EXPECT_EQ(reveal(0, 360), 0);
     EXPECT_EQ(reveal(9, 0), 360);
