@@ -27,6 +27,11 @@ public:
     /// The bus is there, and lets nobody in; until it ends.
     void freeze() { m_bus->signal(SIGSTOP); }
 
+    /// Until the portal, told to hold, has what it was asked.
+    bool waitUntilHeld() { return m_portal->waitForText("holds"); }
+    /// The bus dies, with nobody told that anybody has left it.
+    void killBus() { m_bus->signal(SIGKILL); }
+
     void end()
     {
         for (auto* program : {&m_portal, &m_bus})

@@ -183,6 +183,18 @@ TEST_F(Share, GoesOnWithoutABusThatLetsNobodyIn)
     EXPECT_EQ(listed.out, "SaveToCameraRoll\tSave to Videos\n");
 }
 
+TEST_F(Share, FromAShellEndsWhenTheBusDies)
+{
+    m_desktop.startPortal("hold");
+    Child program = m_machine.start({"share", m_movie, "--with", "Mail"});
+    EXPECT_TRUE(m_desktop.waitUntilHeld());
+    m_desktop.killBus();
+    const auto end = program.wait();
+    EXPECT_TRUE(end.inTime);
+    EXPECT_EQ(end.exitStatus, 1);
+    EXPECT_THAT(end.err, HasSubstr("cannot share by Mail: "));
+}
+
 TEST_F(Share, EndsWithTheWindowThatIsClosedAroundTheSheet)
 {
     m_desktop.startPortal("hold");

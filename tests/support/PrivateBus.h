@@ -39,13 +39,19 @@ public:
         for (const char* const variable : variables)
             ::setenv(variable, m_address.c_str(), 1);
     }
-    ~PrivateBus()
-    {
-        ::kill(m_process, SIGTERM);
-        ::waitpid(m_process, nullptr, 0);
-    }
+    ~PrivateBus() { end(); }
     PrivateBus(const PrivateBus&) = delete;
     PrivateBus& operator=(const PrivateBus&) = delete;
+
+    /// Before all who are on it.
+    void end()
+    {
+        if (m_process <= 0)
+            return;
+        ::kill(m_process, SIGTERM);
+        ::waitpid(m_process, nullptr, 0);
+        m_process = -1;
+    }
 
     const std::string& address() const { return m_address; }
 

@@ -22,6 +22,8 @@ ObexWatch::ObexWatch(QDBusConnection bus, const QString& owner, Handlers handler
     bus.connect(QStringLiteral("org.freedesktop.DBus"), QStringLiteral("/org/freedesktop/DBus"),
                 QStringLiteral("org.freedesktop.DBus"), QStringLiteral("NameOwnerChanged"), {owner},
                 QStringLiteral("sss"), this, SLOT(nameOwnerChanged(QString, QString, QString)));
+    bus.connect(QString(), QStringLiteral("/org/freedesktop/DBus/Local"), QStringLiteral("org.freedesktop.DBus.Local"),
+                QStringLiteral("Disconnected"), this, SLOT(busEnded()));
 }
 
 void ObexWatch::letGo()
@@ -54,6 +56,13 @@ void ObexWatch::nameOwnerChanged(const QString&, const QString&, const QString& 
 {
     m_affinity.assertHere();
     if (const auto gone = m_handlers.gone; gone && now.isEmpty())
+        gone();
+}
+
+void ObexWatch::busEnded()
+{
+    m_affinity.assertHere();
+    if (const auto gone = m_handlers.gone)
         gone();
 }
 

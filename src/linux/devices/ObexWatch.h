@@ -32,6 +32,7 @@ private Q_SLOTS:
     void propertiesChanged(const QDBusMessage& signal);
     void interfacesRemoved(const QDBusMessage& signal);
     void nameOwnerChanged(const QString& name, const QString& before, const QString& now);
+    void busEnded();
 
 private:
     Handlers m_handlers;

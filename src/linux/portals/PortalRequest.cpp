@@ -46,6 +46,7 @@ PortalRequest::PortalRequest(std::shared_ptr<Portal> portal, Call call, Ended en
         if (change.arguments().at(2).toString().isEmpty())
             end(End::Vanished, "the portal has left the bus");
     };
+    m_signals.busEnded = [this] { end(End::Vanished, "the bus has ended"); };
     m_portal->system().mainQueue.postAfter(kCallLimit, [this, alive = std::weak_ptr(m_alive)] {
         if (alive.lock() && !m_isAsked)
             end(End::NoAnswer, "the bus or the portal did not answer in time");

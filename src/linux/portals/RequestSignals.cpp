@@ -16,6 +16,8 @@ void RequestSignals::listenToOwner(QDBusConnection bus, const QString& owner)
     bus.connect(QString(), QStringLiteral("/org/freedesktop/DBus"), QStringLiteral("org.freedesktop.DBus"),
                 QStringLiteral("NameOwnerChanged"), {owner}, QStringLiteral("sss"), this,
                 SLOT(changeOwner(QDBusMessage)));
+    bus.connect(QString(), QStringLiteral("/org/freedesktop/DBus/Local"), QStringLiteral("org.freedesktop.DBus.Local"),
+                QStringLiteral("Disconnected"), this, SLOT(endBus()));
 }
 
 void RequestSignals::respond(const QDBusMessage& response)
@@ -29,6 +31,12 @@ void RequestSignals::changeOwner(const QDBusMessage& change)
     m_affinity.assertHere();
     if (change.service() == QStringLiteral("org.freedesktop.DBus"))
         ownerChanged(change);
+}
+
+void RequestSignals::endBus()
+{
+    m_affinity.assertHere();
+    busEnded();
 }
 
 } // namespace portals

@@ -17,15 +17,17 @@ class RequestSignals final : public QObject {
 public:
     std::function<void(const QDBusMessage& response)> responded;
     std::function<void(const QDBusMessage& change)> ownerChanged;
+    std::function<void()> busEnded;
 
     /// To the responses of the request at `path`, by nobody but `owner`.
     void listenToRequest(QDBusConnection bus, const QString& owner, const QString& path);
-    /// To changes of the name `owner`.
+    /// To changes of the name `owner`, and to the end of the bus, which takes all names with it and says so of none.
     void listenToOwner(QDBusConnection bus, const QString& owner);
 
 private Q_SLOTS:
     void respond(const QDBusMessage& response);
     void changeOwner(const QDBusMessage& change);
+    void endBus();
 
 private:
     base::Affinity m_affinity;

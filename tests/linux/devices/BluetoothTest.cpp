@@ -185,6 +185,14 @@ TEST_F(SendingByBluetooth, SaysThatTheServiceWasKilled)
     expectFailure(kNotRunning);
 }
 
+TEST_F(SendingByBluetooth, SaysSoWhenTheBusEndsAndNobodyIsToldWhoLeft)
+{
+    serve();
+    startSending();
+    m_session.end();
+    expectFailure(kNotRunning);
+}
+
 TEST_F(SendingByBluetooth, SaysThatTheServiceIsNotThereAnyMore)
 {
     serve();

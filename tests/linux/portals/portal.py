@@ -137,6 +137,8 @@ def request(call, interface, member):
         reply(call, "s", "yes")
     elif behaviour == "hold":
         answer()
+        bus.flush()
+        print("holds", flush=True)
         when_told(lambda: respond(call, path, 0, results_of(member)))
     elif behaviour == "silent":
         when_told(answer)
