@@ -299,6 +299,7 @@ TEST(MailTexts, HaveASubjectOfOneLine)
     EXPECT_EQ(mailSubject("Tux Racer"), "Tux Racer");
     EXPECT_EQ(mailSubject("a\nBcc: all@example.org\tb"), "a Bcc: all@example.org b");
     EXPECT_EQ(mailSubject("movie\u202E4pm"), "movie4pm");
+    EXPECT_EQ(mailSubject("a\u200Cb\u200Dc"), "a\u200Cb\u200Dc") << "joiners belong to words and faces";
     const std::string cut = mailSubject(std::string(199, 'x') + "éé");
     EXPECT_EQ(cut, std::string(197, 'x') + "…");
     EXPECT_EQ(mailSubject(std::string(200, 'x')), std::string(200, 'x'));
