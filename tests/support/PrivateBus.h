@@ -48,7 +48,7 @@ public:
     {
         if (m_process <= 0)
             return;
-        ::kill(m_process, SIGTERM);
+        ::kill(m_process, SIGKILL); // else it says who leaves
         ::waitpid(m_process, nullptr, 0);
         m_process = -1;
     }
