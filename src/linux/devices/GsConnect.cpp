@@ -61,6 +61,7 @@ bool takesFiles(const QDBusMessage& description)
     QDBusSignature parameter;
     action.beginStructure();
     action >> isEnabled >> parameter;
+    action.endStructure(); // or what Qt reads it with is never let go of
     return isEnabled && parameter.signature() == QLatin1String("(sb)");
 }
 

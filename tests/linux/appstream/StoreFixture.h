@@ -4,6 +4,7 @@
 
 #include "base/Log.h"
 #include "linux/storefront/AppStreamStore.h"
+#include "support/Paths.h"
 #include "support/PrivateDirectory.h"
 
 #include <chrono>
@@ -39,6 +40,8 @@ protected:
         made.remotes = {files.path() / "system remotes", files.path() / "user remotes"};
         made.cache = files.path() / "cache";
         made.patience = std::chrono::seconds(60);
+        // The sanitizer for addresses opens libraries in our place, and does not look where we would.
+        made.library = program(made.library);
         return made;
     }
 
