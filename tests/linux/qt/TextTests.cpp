@@ -80,7 +80,7 @@ TEST_F(Texts, NamesThatAreIsolatedStaySoOnTheirNextLine)
         qtui::wrapped(QString::fromUtf8("سباق \u2068one1234 22-11 three.mp4\u2069 سباق"), font, width, 0);
     ASSERT_EQ(found.size(), 5U);
     EXPECT_TRUE(beginsWith(found[0], {0x200F}));
-    for (const int next : {2, 3})
+    for (const std::size_t next : {2U, 3U})
         EXPECT_TRUE(beginsWith(found[next], {0x200F, 0x2066})) << "as all of the name, whatever the rest begins with";
     EXPECT_TRUE(beginsWith(found[4], {0x200F})) << "it is over";
 
