@@ -166,16 +166,14 @@ TEST_F(Service, FollowsNoPathOfARecorderWithAnotherRoot)
 {
     startBus("finish= wait");
     expectScenario("other_root");
-    if (m_output.starts_with("SKIPPED"))
-        GTEST_SKIP() << m_output;
+    EXPECT_THAT(m_output, IsEmpty()) << "it could not take the place of a sandbox";
 }
 
 TEST_F(Service, FollowsNoPathOfARecorderWithOtherMounts)
 {
     startBus("finish= wait");
     expectScenario("other_mounts");
-    if (m_output.starts_with("SKIPPED"))
-        GTEST_SKIP() << m_output;
+    EXPECT_THAT(m_output, IsEmpty()) << "it could not take the place of a sandbox";
 }
 
 TEST_F(Service, OpensWhatAFileManagerGivesIt)

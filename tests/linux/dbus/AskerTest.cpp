@@ -192,16 +192,14 @@ TEST(ARealAsker, IsConfinedWithAnotherRoot)
         const auto change = [&] { return ::chroot(root.path().c_str()) == 0 && ::chdir("/") == 0; };
         return change() || (::unshare(CLONE_NEWUSER) == 0 && change());
     });
-    if (!process.isReady())
-        GTEST_SKIP() << "no process can change its root here";
+    ASSERT_TRUE(process.isReady()) << "a process can change its root as root, or in a namespace of its own";
     EXPECT_TRUE(dbus::isConfined(process.asker()));
 }
 
 TEST(ARealAsker, IsConfinedWithMountsOfItsOwn)
 {
     const Process process([] { return ::unshare(CLONE_NEWNS) == 0 || ::unshare(CLONE_NEWUSER | CLONE_NEWNS) == 0; });
-    if (!process.isReady())
-        GTEST_SKIP() << "no process can have mounts of its own here";
+    ASSERT_TRUE(process.isReady()) << "a process can have mounts of its own as root, or in a namespace of its own";
     EXPECT_TRUE(dbus::isConfined(process.asker()));
 }
 

@@ -10,11 +10,6 @@ using platform::Key;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-base::ErrorRef error(const std::string& why)
-{
-    return base::Error::make("test", 1, why);
-}
-
 TEST_F(Sharing, WhatCompletesClosesTheSheetAndIsTold)
 {
     const auto mail = activity("mail");
@@ -257,30 +252,6 @@ TEST_F(Sharing, ASheetIsKeptByNothingThatItPerforms)
     EXPECT_THAT(ended, IsEmpty());
 }
 
-TEST_F(Sharing, ProgressIsThatOfWhatIsPerformedNow)
-{
-    const auto upload = activity("upload");
-    const auto mail = activity("mail");
-    upload->endsWhenCancelled = false;
-    upload->controller = std::make_shared<platform::ViewController>();
-    open({mail, upload});
-    tapRow(1);
-    settle();
-    window->keyDown(Key::Escape);
-    settle();
-    tapRow(0);
-    const auto& bar = *row(0)->progressView();
-    mail->tell(0.25);
-    upload->tell(0.75);
-    EXPECT_EQ(bar.progress(), 0.25) << "that one was given up";
-    mail->tell(1.5);
-    EXPECT_EQ(bar.progress(), 1);
-    mail->tell(-1);
-    EXPECT_EQ(bar.progress(), 0);
-    mail->tell(std::nullopt);
-    EXPECT_EQ(bar.progress(), std::nullopt);
-}
-
 TEST_F(Sharing, WhatIsBeingCancelledIsCancelledOnceAndTellsNoMoreProgress)
 {
     for (const bool isClosed : {false, true}) {
@@ -309,113 +280,6 @@ TEST_F(Sharing, WhatIsBeingCancelledIsCancelledOnceAndTellsNoMoreProgress)
         settle();
         EXPECT_TRUE(isGone());
     }
-}
-
-TEST_F(Sharing, WhatAnActivityShowsStandsAboveTheSheet)
-{
-    struct Shown final : platform::ViewController {
-        void presentationDidShow() override { isUp = true; }
-        bool isUp = false;
-    };
-    const auto upload = activity("upload");
-    const auto shown = std::make_shared<Shown>();
-    upload->controller = shown;
-    open({upload});
-    tapRow(0);
-    machine.drain();
-    EXPECT_FALSE(shown->isUp) << "it slides up";
-    settle();
-    EXPECT_TRUE(shown->isUp);
-    EXPECT_EQ(sheet->presentedViewController(), upload->controller);
-    EXPECT_EQ(upload->performed, 0) << "it is shown in place of being performed";
-    upload->activityDidFinish(true);
-    settle();
-    EXPECT_TRUE(isGone());
-    EXPECT_FALSE(upload->controller->window());
-    EXPECT_THAT(results, ElementsAre("upload yes"));
-}
-
-TEST_F(Sharing, WhatAnActivityShowsGoesBeforeItsErrorIsTold)
-{
-    const auto upload = activity("upload");
-    upload->controller = std::make_shared<platform::ViewController>();
-    open({upload});
-    tapRow(0);
-    settle();
-    upload->activityDidFail(error("no network"));
-    settle();
-    settle();
-    const auto alert = std::dynamic_pointer_cast<AlertController>(sheet->presentedViewController());
-    ASSERT_TRUE(alert);
-    EXPECT_EQ(alert->message(), "no network");
-}
-
-TEST_F(Sharing, ClosingWhatAnActivityShowsCancelsIt)
-{
-    const auto upload = activity("upload");
-    upload->controller = std::make_shared<platform::ViewController>();
-    open({upload});
-    tapRow(0);
-    settle();
-    window->keyDown(Key::Escape);
-    settle();
-    EXPECT_EQ(upload->cancelled, 1);
-    EXPECT_FALSE(isGone());
-    EXPECT_FALSE(sheet->isPerforming());
-    EXPECT_TRUE(row(0)->row()->isEnabled());
-}
-
-TEST_F(Sharing, WhatWasGivenUpTooLateStillCounts)
-{
-    const auto upload = activity("upload");
-    upload->endsWhenCancelled = false;
-    upload->controller = std::make_shared<platform::ViewController>();
-    open({upload});
-    tapRow(0);
-    settle();
-    window->keyDown(Key::Escape);
-    settle();
-    EXPECT_FALSE(sheet->isPerforming());
-    upload->activityDidFinish(true);
-    settle();
-    EXPECT_THAT(results, ElementsAre("upload yes"));
-}
-
-TEST_F(Sharing, WhatWasGivenUpDoesNotEndWhatIsPerformedNow)
-{
-    const auto upload = activity("upload");
-    const auto mail = activity("mail");
-    upload->endsWhenCancelled = false;
-    upload->controller = std::make_shared<platform::ViewController>();
-    open({upload, mail});
-    tapRow(0);
-    settle();
-    window->keyDown(Key::Escape);
-    settle();
-    tapRow(1);
-    upload->activityDidFail(error("no network"));
-    settle();
-    EXPECT_TRUE(sheet->isPerforming());
-    EXPECT_FALSE(sheet->presentedViewController());
-    mail->activityDidFinish(true);
-    settle();
-    EXPECT_THAT(results, ElementsAre("mail yes"));
-}
-
-TEST_F(Sharing, WhatWasGivenUpAndFailsAfterwardsIsNoNews)
-{
-    const auto upload = activity("upload");
-    upload->endsWhenCancelled = false;
-    upload->controller = std::make_shared<platform::ViewController>();
-    open({upload});
-    tapRow(0);
-    settle();
-    window->keyDown(Key::Escape);
-    settle();
-    upload->activityDidFail(error("no network"));
-    settle();
-    EXPECT_FALSE(sheet->presentedViewController());
-    EXPECT_FALSE(isGone());
 }
 
 } // namespace

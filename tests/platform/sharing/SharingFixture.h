@@ -77,6 +77,11 @@ public:
     Found found;
 };
 
+inline base::ErrorRef error(const std::string& why)
+{
+    return base::Error::make("test", 1, why);
+}
+
 struct Sharing : testing::Test {
     TestSystem machine;
     runtime::NotificationCenter center;
